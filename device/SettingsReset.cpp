@@ -1,0 +1,51 @@
+// The start of a program load: the per-load state goes back to its beginning, and the target with
+// it as far as the host's settings ask.
+
+#include "device/DeviceClass.h"
+#include "device/FlashCorvane.h"
+#include "device/RegisterMap.h"
+#include "device/SettingKeys.h"
+#include "plugin/Conversions.h"
+#include "plugin/Trace.h"
+
+namespace {
+
+namespace ResetMode {
+constexpr std::int32_t TargetWillRun = 1;
+constexpr std::int32_t LoadComplete = 2;
+constexpr std::int32_t KeepErased = 4;
+}  // namespace ResetMode
+
+}  // namespace
+
+// The state is reset before any setting is read, so that a bad setting cannot leave half a load
+// behind.
+void FlashCorvane::ResetSettings(std::int32_t mode) {
+    TRACE(Entry, "FlashCorvane::ResetSettings(%d)", mode);
+    if (mode != ResetMode::KeepErased) p_mFlashErased = false;
+    p_mResetPending = true;
+    p_mErasedSectors.clear();
+
+    const bool resetTarget = ParseBoolean(Host().GetSetting(Setting::FlashResetSetting));
+    if (resetTarget && mode != ResetMode::TargetWillRun) SystemResetAndHalt();
+
+    if (mode == ResetMode::LoadComplete) {
+        if (ParseBoolean(Host().GetSetting(Setting::FlashProgramCRCOption))) {
+            CalculateChecksumByAddress(0, p_mFlashSize - 1);
+        }
+    } else if (mode == ResetMode::TargetWillRun) {
+        ResetWatchdogs();
+        Host().SetSetting(Setting::FlashChecksumValue, "--");
+    }
+    TRACE(Result, "FlashCorvane::ResetSettings()");
+}
+
+bool FlashCorvane::ResetWatchdogs() {
+    const bool newer = p_mClassRev > DeviceClass::Quen;
+    const std::uint32_t address = newer ? Register::WatchdogReset : Register::SoftwareReset0;
+    const std::uint32_t watchdogs = newer ? 0x3 : 0x10000008;
+
+    Host().WriteWord(address, Host().ReadWord(address) | watchdogs);
+    Host().WriteWord(address, Host().ReadWord(address) & ~watchdogs);
+    return true;
+}
