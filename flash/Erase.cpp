@@ -1,0 +1,178 @@
+// Erasing flash: the whole of it at once, or the sectors that cover an address range.
+
+#include <algorithm>
+#include <exception>
+
+#include "device/DeviceClass.h"
+#include "device/FlashCorvane.h"
+#include "device/RegisterMap.h"
+#include "device/SettingKeys.h"
+#include "plugin/Conversions.h"
+#include "plugin/ErrorText.h"
+#include "plugin/Trace.h"
+
+namespace {
+
+// The flash address register must point into the upper bank when a larger device is erased whole.
+constexpr std::uint32_t UpperBank = 0x20000;
+
+constexpr int MassErasePolls = 500;
+constexpr std::uint32_t MassErasePauseMs = 10;
+constexpr int SectorErasePolls = 200;
+constexpr std::uint32_t SectorErasePauseMs = 5;
+
+// Mesk devices erase whole only when the block registers beyond the end of flash are clear. Where
+// the flash ends inside a register's blocks, the lower half of block register 0 is written there.
+struct FlashBlockRow {
+    std::uint32_t flashSize;
+    std::uint32_t lowestCleared;  ///< cleared from block register 3 down to this one
+    std::uint32_t halved;         ///< receives the lower half; 0 for none
+};
+
+constexpr FlashBlockRow FlashBlockRows[] = {
+    {0x08000, Register::FlashBlock1, Register::FlashBlock0},
+    {0x10000, Register::FlashBlock1, 0},
+    {0x18000, Register::FlashBlock2, Register::FlashBlock1},
+    {0x20000, Register::FlashBlock2, 0},
+};
+
+}  // namespace
+
+bool FlashCorvane::Erase() {
+    TRACE(Entry, "FlashCorvane::Erase()");
+    ProgressHandle progress = Host().OpenProgress("Erasing Flash.");
+    bool erased = false;
+    try {
+        erased = EraseAsSelected();
+        HostAccess::CloseProgress(progress);
+    } catch (const std::exception& error) {
+        Host().ShowErrorText(
+            std::string("Flash Programmer: Current erase option is not valid; please try changing "
+                        "option to erase Entire Flash or By Address Range. ") +
+            error.what());
+        progress.CloseQuietly();
+        TRACE(Result, "FlashCorvane::Erase() = false");
+        return false;
+    }
+    TRACE(Result, "FlashCorvane::Erase() = %s", erased ? "true" : "false");
+    return erased;
+}
+
+bool FlashCorvane::EraseAsSelected() {
+    const std::string type = Host().GetSetting(Setting::FlashEraseType);
+    if (type == Choice::EntireFlash) {
+        Host().WriteWord(Register::FlashAddress, 0);
+        if (VerboseMode() != 0) {
+            Host().ShowMessageText("Performing Mass Erase on Flash memory");
+        }
+        if (p_mFlashSize > UpperBank) Host().WriteWord(Register::FlashAddress, UpperBank);
+        return MassErase();
+    }
+    if (type == Choice::ByAddressRange) {
+        const std::uint32_t end = ParseHex(Host().GetSetting(Setting::FlashEraseEndAddr));
+        const std::uint32_t start = ParseHex(Host().GetSetting(Setting::FlashEraseStartAddr));
+        return PageErase(start, end);
+    }
+    return false;
+}
+
+bool FlashCorvane::MassErase() {
+    TRACE(Entry, "FlashCorvane::MassErase()");
+    ThrowOnError(p_mHost->HaltTarget());
+    const bool mesk = p_mClassRev == DeviceClass::MeskRevA || p_mClassRev == DeviceClass::MeskRevB;
+    if (mesk && !PrepareFlashBlocks()) {
+        TRACE(Result, "FlashCorvane::MassErase() = false, p_mFlashSize %u unsupported.",
+              p_mFlashSize);
+        return false;
+    }
+
+    Host().WriteWord(Register::FlashCommand, KeyedCommand(FlashCommand::EraseAll));
+    ThrowOnError(p_mHost->Sleep(MassErasePauseMs));
+    if (!EraseFinished(FlashCommand::EraseAll, MassErasePolls, MassErasePauseMs)) {
+        Host().ShowErrorText("Flash Programmer: Erasing all of the flash contents failed!");
+        TRACE(Result, "FlashCorvane::MassErase() = false");
+        return false;
+    }
+    ThrowOnError(p_mHost->ResetTarget(false));
+    ROMAliasClear();
+    TRACE(Result, "FlashCorvane::MassErase() = true");
+    return true;
+}
+
+bool FlashCorvane::PrepareFlashBlocks() {
+    const auto row = std::ranges::find(FlashBlockRows, p_mFlashSize, &FlashBlockRow::flashSize);
+    if (row == std::end(FlashBlockRows)) return false;
+
+    const auto writeAndPause = [this](std::uint32_t address, std::uint32_t value) {
+        Host().WriteWord(address, value);
+        ThrowOnError(p_mHost->Sleep(MassErasePauseMs));
+    };
+    for (std::uint32_t address = Register::FlashBlock3; address >= row->lowestCleared;
+         address -= 4) {
+        writeAndPause(address, 0);
+    }
+    if (row->halved != 0) {
+        writeAndPause(row->halved, Host().ReadWord(Register::FlashBlock0) & 0xFFFF);
+    }
+    return true;
+}
+
+bool FlashCorvane::PageErase(std::uint32_t start, std::uint32_t end) {
+    TRACE(Entry, "FlashCorvane::PageErase(0x%08X, 0x%08X)", start, end);
+    ThrowOnError(p_mHost->HaltTarget());
+    if (start >= p_mFlashSize || end >= p_mFlashSize) {
+        Host().ShowErrorText("Flash Programmer: Invalid Address Range for erase operation!");
+        TRACE(Result, "FlashCorvane::PageErase() = false");
+        return false;
+    }
+
+    const std::uint32_t command = KeyedCommand(FlashCommand::EraseSector);
+    // A range that ends before it starts is an empty one, even when both ends share a sector.
+    const bool empty = start > end;
+    if (!empty && !EraseSectors(start / p_mSectorSize, end / p_mSectorSize, command)) {
+        Host().ShowErrorText("Flash Programmer: Erasing flash contents timed out!");
+        TRACE(Result, "FlashCorvane::PageErase() = false");
+        return false;
+    }
+    ThrowOnError(p_mHost->ResetTarget(false));
+    ROMAliasClear();
+    TRACE(Result, "FlashCorvane::PageErase() = true");
+    return true;
+}
+
+// The erased sectors are kept in ascending order, and walked along with the range: no sector is
+// searched for, and in a load whose sections ascend each is appended.
+bool FlashCorvane::EraseSectors(std::uint32_t first, std::uint32_t last,
+                                std::uint32_t keyedCommand) {
+    auto erased = std::ranges::lower_bound(p_mErasedSectors, first);
+    for (std::uint32_t sector = first; sector <= last; ++sector, ++erased) {
+        if (erased != p_mErasedSectors.end() && *erased == sector) continue;
+        if (!EraseSector(sector, keyedCommand)) return false;
+        erased = p_mErasedSectors.insert(erased, sector);
+    }
+    return true;
+}
+
+bool FlashCorvane::EraseSector(std::uint32_t sector, std::uint32_t keyedCommand) {
+    const std::uint32_t address = sector * p_mSectorSize;
+    if (VerboseMode() != 0) {
+        const std::string text = "Erasing Flash Page @ address 0x" + ToHexText(address) +
+                                 " of size 0x" + ToHexText(p_mSectorSize);
+        TRACE_TEXT(Information, text);
+        Host().ShowMessageText(text);
+    }
+    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
+    Host().WriteWord(Register::FlashAddress, address);
+    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
+    Host().WriteWord(Register::FlashCommand, keyedCommand);
+    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
+    return EraseFinished(FlashCommand::EraseSector, SectorErasePolls, SectorErasePauseMs);
+}
+
+bool FlashCorvane::EraseFinished(std::uint32_t command, int polls, std::uint32_t pollIntervalMs) {
+    for (int poll = 0; poll < polls; ++poll) {
+        if ((Host().ReadWord(Register::FlashCommand) & command) == 0) return true;
+        ThrowOnError(p_mHost->Sleep(pollIntervalMs));
+    }
+    return false;
+}
