@@ -1,0 +1,264 @@
+// The binary boundary of the built library, and what it makes of the extremes that it can carry.
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <array>
+#include <cstdio>
+#include <locale>
+
+#include "logger/ostrel_logger.h"
+#include "tests/support/RecordingHost.h"
+
+namespace {
+
+using test::Plugin;
+using test::RecordingHost;
+using test::TextOf;
+
+std::string OutputOf(const std::string& command) {
+    std::string output;
+    std::FILE* pipe = popen(command.c_str(), "r");
+    std::array<char, 256> buffer{};
+    while (std::fgets(buffer.data(), buffer.size(), pipe) != nullptr)
+        output += buffer.data();
+    EXPECT_EQ(pclose(pipe), 0) << command;
+    return output;
+}
+
+TEST(Library, ExportsOneFunction) {
+    EXPECT_EQ(OutputOf("nm -D --defined-only --format=just-symbols " FLASH_CORVANE_LIBRARY),
+              "CreateFlashDevice2\n");
+}
+
+// Seen in a process of its own, where nobody else holds the library.
+TEST(Library, IsUnloadedAfterUse) {
+    const auto loadUseUnload = [] {
+        void* library = dlopen(FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
+        RecordingHost host("tolva,fail-access=1");
+        IFlashDevice2* device = nullptr;
+        const auto factory =
+            reinterpret_cast<CreateFlashDevice2Function>(dlsym(library, "CreateFlashDevice2"));
+        const bool failed = factory("", "", "", &host, &device) != nullptr && device == nullptr;
+        const bool created = factory("", "", "", &host, &device) == nullptr;
+        device->PerformOperation("nothing");
+        device->Destroy();
+        dlclose(library);
+        const bool gone = dlopen(FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_NOLOAD) == nullptr;
+        std::_Exit(failed && created && gone ? 0 : 1);
+    };
+    EXPECT_EXIT(loadUseUnload(), testing::ExitedWithCode(0), "");
+}
+
+struct Identified {
+    const char* device;
+    const char* family;
+    const char* flashSize;
+    const char* ramSize;
+    const char* sectorSize;
+};
+
+TEST(Identification, OfEveryClass) {
+    const Identified rows[] = {
+        {"ravik,flash=64K,ram=8K", "Ravik", "64KB", "8KB", "1KB"},
+        {"ravik,id=0x00020000", "Ravik", "64KB", "8KB", "1KB"},
+        {"tolva,revision=A,flash=256K,ram=64K", "Tolva Rev.A", "256KB", "64KB", "1KB"},
+        {"tolva,revision=B,flash=256K,ram=64K", "Tolva Rev.B", "256KB", "64KB", "1KB"},
+        {"tolva,id=0x00010200,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},
+        {"mesk,revision=A,flash=2K,ram=64K", "Mesk Rev.A", "2KB", "64KB", "1KB"},
+        {"mesk,revision=B,flash=256K,ram=64K", "Mesk Rev.B", "256KB", "64KB", "1KB"},
+        {"orrin,flash=128K,ram=64K", "Orrin", "128KB", "64KB", "1KB"},
+        {"pell,flash=128K,ram=32K", "Pell", "128KB", "32KB", "1KB"},
+        {"quen,flash=128M,ram=64K", "Quen", "131072KB", "64KB", "1KB"},
+        {"velk,flash=256K,ram=32K,sector=8K", "Velk", "0KB", "32KB", "8KB"},
+        {"dorna,flash=1M,ram=256K,sector=128K", "Dorna", "1024KB", "256KB", "128KB"},
+        // With bit 31, bits 23 to 20 do not count for the class; they do for the sizes.
+        {"dorna,id=0x801A0000,flash=1M,ram=256K,sector=2K", "Dorna", "1024KB", "256KB", "2KB"},
+        {"dorna,id=0x001A0000,flash=1M,ram=256K,sector=2K", "Ravik", "1024KB", "256KB", "2KB"},
+    };
+    for (const Identified& row : rows) {
+        SCOPED_TRACE(row.device);
+        RecordingHost host(row.device);
+        Plugin plugin(host);
+        bool flash = false;
+        const char* operations = nullptr;
+        EXPECT_EQ(plugin->Initialize(&flash, &operations), nullptr);
+        EXPECT_EQ(host.settings["DeviceInfoFamily"], row.family);
+        EXPECT_EQ(flash, std::string(row.flashSize) != "0KB");
+        if (std::string(row.device) == "ravik,id=0x00020000") continue;  // sizes of no interest
+        EXPECT_EQ(host.settings["DeviceInfoFlashSize"], row.flashSize);
+        EXPECT_EQ(host.settings["DeviceInfoRAMSize"], row.ramSize);
+        EXPECT_EQ(host.settings["DeviceInfoSectorSize"], row.sectorSize);
+    }
+}
+
+TEST(Addresses, AreComparedStrictlyInThirtyTwoBits) {
+    RecordingHost host("tolva,flash=256K");
+    Plugin plugin(host);
+    const auto within = [&](std::uint64_t address, auto... size) {
+        bool result = true;
+        const std::string error = TextOf(plugin->AddressWithinFlash(address, size..., &result));
+        return error.empty() ? std::string(result ? "yes" : "no") : error;
+    };
+    const std::string tooBig = "Address value is too big";
+    EXPECT_EQ(within(0x3FFFF), "yes");
+    EXPECT_EQ(within(0x40000), "no");
+    EXPECT_EQ(within(0xFFFFFFFF), "no");
+    EXPECT_EQ(within(0x100000000), tooBig);
+    EXPECT_EQ(within(0x3F000, 0xFFF), "yes");
+    EXPECT_EQ(within(0x3F000, 0x1000), "no");
+    EXPECT_EQ(within(0x1000, -0x1000), "yes");
+    EXPECT_EQ(within(0x1000, -0x1001), "no");
+    EXPECT_EQ(within(0x1000, INT32_MIN), "no");
+    EXPECT_EQ(within(~0ull, 0), tooBig);
+
+    bool special = true;
+    EXPECT_EQ(TextOf(plugin->AddressWithinSpecialRegion(~0ull, &special)), tooBig);
+    EXPECT_TRUE(special);
+    EXPECT_EQ(plugin->AddressWithinSpecialRegion(0, &special), nullptr);
+    EXPECT_FALSE(special);
+    EXPECT_EQ(TextOf(plugin->WriteDataToFlash(static_cast<const unsigned char*>(nullptr),
+                                              0x100000000, 0, 0)),
+              tooBig);
+    EXPECT_EQ(TextOf(plugin->WriteDataToFlash(static_cast<const uint16_t*>(nullptr), 0, 0, 0)),
+              "Unsupported target data type");
+}
+
+TEST(ErrorTexts, StayReadableUntilTheNextFailure) {
+    RecordingHost host;
+    Plugin plugin(host);
+    const std::string longText(100'000, 'x');
+    host.fault = {host.calls + 1, 1, longText};
+    bool flash = false;
+    const char* operations = nullptr;
+    const char* kept = plugin->Initialize(&flash, &operations);
+    EXPECT_EQ(operations, nullptr);
+    EXPECT_EQ(plugin->Initialize(&flash, &operations), nullptr);
+    EXPECT_EQ(kept, longText);
+}
+
+// What a setting's text is taken for shows in what the device is told. The second run is under a
+// global locale that groups digits, which must make no difference.
+class SettingTexts : public testing::TestWithParam<bool> {
+    struct Grouping : std::numpunct<char> {
+        char do_thousands_sep() const override { return ','; }
+        std::string do_grouping() const override { return "\3"; }
+    };
+
+  protected:
+    void SetUp() override {
+        if (GetParam()) std::locale::global(std::locale(std::locale::classic(), new Grouping));
+    }
+    void TearDown() override { std::locale::global(std::locale::classic()); }
+};
+
+TEST_P(SettingTexts, AreReadInTheirForms) {
+    RecordingHost host("dorna,flash=64K,sector=1K");
+    Plugin plugin(host);
+    const auto registerValueOf = [&](const std::string& text) {
+        host.settings["FlashUserRegister0Input"] = text;
+        host.messages.clear();
+        plugin->PerformOperation("ProgramUserRegister0");
+        return host.messages.at(1);
+    };
+    const auto writing = [](const std::string& digits) {
+        return "Writing 0x" + digits + " to User Register 0";
+    };
+    const std::pair<const char*, const char*> addresses[] = {
+        {"0x3FFFF", "3ffff"},
+        {" 3FFFF ", "3ffff"},
+        {"20000", "20000"},
+        {"12-34", "12"},
+        {"0X1f", "1f"},
+        {"", "0"},
+        {"G1", "0"},
+        {"0x", "0"},
+        {"-1", "ffffffff"},
+        {"+a", "a"},
+        {"1FFFFFFFF", "ffffffff"},
+        {"1,000", "1"},
+    };
+    for (const auto& [text, digits] : addresses) {
+        EXPECT_EQ(registerValueOf(text), writing(digits)) << text;
+    }
+
+    const std::string badCast =
+        "bad lexical cast: source type value could not be interpreted as target";
+    const std::pair<const char*, bool> booleans[] = {
+        {"1", true}, {"0", true},   {"01", true}, {"+1", true}, {"-0", true},  {"0001", true},
+        {"", false}, {"-1", false}, {"+", false}, {"2", false}, {" 1", false}, {"true", false},
+    };
+    for (const auto& [text, good] : booleans) {
+        host.settings["FlashResetSetting"] = text;
+        EXPECT_EQ(TextOf(plugin->ResetSettings(0)), good ? "" : badCast) << text;
+    }
+    const std::pair<const char*, bool> integers[] = {
+        {"-2147483648", true}, {"2147483647", true}, {"+7", true},   {"256", true},
+        {"2147483648", false}, {" 1", false},        {"1.0", false}, {"1,000", false},
+    };
+    for (const auto& [text, good] : integers) {
+        host.settings["FlashVerboseMode"] = text;
+        EXPECT_EQ(TextOf(plugin->PerformOperation("CalculateChecksum")), good ? "" : badCast);
+    }
+}
+
+TEST_P(SettingTexts, OfTheTimeOut) {
+    RecordingHost host("dorna,flash=64K,sector=1K",
+                       {{"FlashProgramOption", "Do Not Erase Flash Memory"}});
+    Plugin plugin(host);
+    const std::string timedOut = "shown: Flash Programmer: Flash programming timed out.";
+    const std::pair<const char*, std::string> texts[] = {
+        {"5 s", ""},
+        {" \t+5", ""},
+        {"2147483647", ""},
+        {"0", timedOut},
+        {"-5", timedOut},
+        {"-2147483648", timedOut},
+        {"s5", "invalid stoi argument"},
+        {"+-5", "invalid stoi argument"},
+        {"", "invalid stoi argument"},
+        {"- 5", "invalid stoi argument"},
+        {"2147483648", "stoi argument out of range"},
+    };
+    for (const auto& [text, outcome] : texts) {
+        host.settings["FlashTimeoutValue"] = text;
+        host.errors.clear();
+        const unsigned char byte = 0;
+        std::string actual = TextOf(plugin->WriteDataToFlash(&byte, 0, 1, 1));
+        if (!host.errors.empty()) actual += "shown: " + host.errors[0];
+        EXPECT_EQ(actual, outcome) << text;
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(, SettingTexts, testing::Bool(), [](const auto& grouped) {
+    return grouped.param ? "UnderAnOddLocale" : "UnderTheUsualLocale";
+});
+
+TEST(Extremes, ErasingTheLargestFlashTakesTimeInProportion) {
+    RecordingHost host("quen,flash=128M", {{"FlashEraseEndAddr", "7FFFFFF"}});
+    Plugin plugin(host);
+    EXPECT_EQ(plugin->PerformOperation("Erase"), nullptr);
+    EXPECT_EQ(host.errors, std::vector<std::string>());
+    const std::uint64_t first = host.calls;
+    EXPECT_GT(first, 131072u * 6);
+
+    // In one load, nothing is erased twice.
+    host.settings["FlashProgramOption"] = "Use the Erase Options Specified Below";
+    EXPECT_EQ(plugin->WriteDataToFlash(static_cast<const unsigned char*>(nullptr), 0, 0, 1),
+              nullptr);
+    EXPECT_LT(host.calls - first, 100u);
+}
+
+// A line reaches whoever listens, and nobody is asked for a logger when nobody does.
+TEST(Logging, CanBeSwitchedOffAtAnyTime) {
+    RecordingHost host;
+    Plugin plugin(host);
+    OstrelLoggerSetSink(nullptr, nullptr);
+    host.transcribe = true;
+    bool within = false;
+    plugin->AddressWithinFlash(0, &within);
+    EXPECT_EQ(host.transcript, std::vector<std::string>());
+}
+
+}  // namespace
