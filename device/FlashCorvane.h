@@ -19,7 +19,8 @@ class FlashCorvane {
   public:
     /// Identifies the device through the host, and halts it. The second and the third text mean
     /// nothing to this family.
-    FlashCorvane(std::string variant, std::string text2, std::string text3, IFlashHost* host);
+    FlashCorvane(std::string variant, const std::string& text2, const std::string& text3,
+                 IFlashHost* host);
 
     // device/Identification.cpp
     bool FlashAvailable() const;
@@ -128,7 +129,7 @@ class FlashCorvane {
     void RunTest(const std::string& operationName);
 
     // operations/UserRegisters.cpp
-    bool UserRegisterOperation(std::string operationName);
+    bool UserRegisterOperation(const std::string& operationName);
     void ReadUserRegisters(const std::string& operationName);
     bool ProgramUserRegisters(const std::string& operationName);
     void ReadUserRegister(std::uint32_t index, const RegisterValues& values);

@@ -46,8 +46,8 @@ const ClassRow& FindClass(std::uint32_t classField, std::uint32_t majorRevision)
 
 }  // namespace
 
-FlashCorvane::FlashCorvane(std::string variant, std::string /*text2*/, std::string /*text3*/,
-                           IFlashHost* host)
+FlashCorvane::FlashCorvane(std::string variant, const std::string& /*text2*/,
+                           const std::string& /*text3*/, IFlashHost* host)
     : p_mHost(host), p_mVariant(std::move(variant)) {
     TRACE(Entry, "FlashCorvane Constructor, variant = %s", p_mVariant.c_str());
     IdentifyClass(Host().ReadWord(Register::DeviceIdentification0));

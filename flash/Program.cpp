@@ -23,7 +23,7 @@ constexpr std::uint32_t BlockSize = 128;
 constexpr std::int32_t PollIntervalMs = 100;
 
 // Two levels up from the host's directory; the loader's host side runs on one kind of system.
-constexpr auto LoaderSubdirectory = "..\\..\\merrow\\";
+constexpr auto LoaderSubdirectory = R"(..\..\merrow\)";
 constexpr auto LoaderFile = "FlashLoaderMerrow.out";
 
 std::int32_t BudgetMs(std::int32_t seconds) {

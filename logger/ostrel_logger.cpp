@@ -38,7 +38,8 @@ class Logger final : public Logging::ILogger {
         enabled_ = sink_ != nullptr || file_.IsOpen();
     }
 
-    void Line(std::uint64_t, int, int, int level, const char* format, ...) override {
+    [[gnu::format(printf, 6, 7)]] void Line(std::uint64_t, int, int, int level, const char* format,
+                                            ...) override {
         std::va_list values;
         va_start(values, format);
         const std::string text = Formatted(format, values);

@@ -30,7 +30,7 @@ bool IsReadOperation(const std::string& operationName) {
 
 }  // namespace
 
-bool FlashCorvane::UserRegisterOperation(std::string operationName) {
+bool FlashCorvane::UserRegisterOperation(const std::string& operationName) {
     TRACE(Entry, "FlashCorvane::UserRegisterOperation(%s)", operationName.c_str());
     if (p_mClassRev == DeviceClass::Ravik) {
         Host().ShowErrorText(
@@ -56,10 +56,8 @@ bool FlashCorvane::UserRegisterOperation(std::string operationName) {
 
 // Both registers are read before one is published.
 void FlashCorvane::ReadUserRegisters(const std::string& operationName) {
-    RegisterValues values{};
-    for (std::uint32_t index = 0; index < values.size(); ++index) {
-        values[index] = Host().ReadWord(RegisterAddresses[index]);
-    }
+    const RegisterValues values = {Host().ReadWord(Register::UserRegister0),
+                                   Host().ReadWord(Register::UserRegister1)};
     if (operationName == "ReadUserRegister0") {
         ReadUserRegister(0, values);
     } else if (operationName == "ReadUserRegister1") {

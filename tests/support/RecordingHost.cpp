@@ -224,7 +224,7 @@ const char* RecordingHost::ShowMessage(const char* text) {
 
 const char* RecordingHost::GetDirectory() {
     Note("directory");
-    answer_ = "C:\\host\\";
+    answer_ = R"(C:\host\)";
     return answer_.c_str();
 }
 
