@@ -1,0 +1,68 @@
+// Loader: the flash loader as it runs on the target. It works on its own while the debugger goes
+// on, and shares with it nothing but two buffers and two parameter blocks in RAM.
+
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <optional>
+
+#include "target/DeviceOptions.h"
+#include "target/FlashArray.h"
+#include "target/FlashController.h"
+#include "target/Ram.h"
+#include "target/Rules.h"
+
+namespace target {
+
+class Loader {
+  public:
+    using Time = std::chrono::nanoseconds;
+
+    static constexpr char kFileName[] = "FlashLoaderMerrow.out";
+
+    Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash,
+           const FlashController& controller, RuleLog& rules);
+
+    /// Enters the program at its start: both status words become 0 (idle) at once, and block 0
+    /// is served first, then the two in turn.
+    void Start();
+
+    /// The core was halted or reset. Of a chunk at work, the first half has been programmed and
+    /// its status stays; nobody goes on with it.
+    void Stop();
+
+    /// Does what the loader has got done by `now`.
+    void AdvanceTo(Time now);
+
+    /// Whether it programs flash at the moment, so that flash can't be read.
+    bool IsProgramming() const { return chunk_.has_value(); }
+
+    /// Whether a write there would change a chunk that was handed over and isn't finished.
+    bool Owns(std::uint32_t address, std::uint64_t sizeBytes);
+
+    Time BusyTime() const { return busyTime_; }
+
+  private:
+    struct Chunk {
+        std::uint32_t flashAddress;
+        std::uint32_t sizeBytes;
+        Time end;
+    };
+
+    bool StartChunk(Time start);
+    void FinishChunk();
+    void ProgramFromBuffer(std::uint32_t sizeBytes);
+
+    const DeviceOptions& options_;
+    Ram& ram_;
+    FlashArray& flash_;
+    const FlashController& controller_;
+    RuleLog& rules_;
+    bool running_ = false;
+    std::uint32_t block_ = 0;     ///< served now or next: 0 or 1
+    std::optional<Chunk> chunk_;  ///< at work
+    Time busyTime_{0};
+};
+
+}  // namespace target

@@ -1,0 +1,149 @@
+// Address decoding: every transfer is checked as a whole, then reaches flash, RAM or registers.
+
+#include "target/MemoryMap.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+
+#include "target/Rules.h"
+
+namespace target {
+
+namespace {
+
+constexpr std::uint64_t kAddressSpaceBytes = 0x100000000;
+
+// Flash can be reached on either page, everything else on the general one only.
+constexpr int kFlashPage = 0;
+constexpr int kGeneralPage = 1;
+
+constexpr std::uint32_t kRegisterSizeBytes = 4;
+
+// What can be told from the transfer alone.
+void CheckForm(const Transfer& transfer) {
+    const std::size_t width = transfer.width;
+    if (transfer.page != kFlashPage && transfer.page != kGeneralPage) {
+        Refuse(rule::kPage, "the device has the pages 0 (flash) and 1 (everything)");
+    }
+    if (width != 1 && width != 2 && width != 4) {
+        Refuse(rule::kAccessWidth, "elements are 1, 2 or 4 bytes wide");
+    }
+    if (transfer.address % width != 0) {
+        Refuse(rule::kAlignedAccess, fmt::format("the address is no multiple of {}", width));
+    }
+    if (transfer.count != 0 && transfer.SizeBytes() == 0) {
+        Refuse(rule::kMappedAddress, "the range runs past the end of the address space");
+    }
+}
+
+}  // namespace
+
+std::uint64_t Transfer::SizeBytes() const {
+    const std::uint64_t room = kAddressSpaceBytes - address;
+    return width == 0 || count > room / width ? 0 : std::uint64_t{count} * width;
+}
+
+MemoryMap::MemoryMap(const DeviceOptions& options, FlashArray& flash, Ram& ram,
+                     RegisterFile& registers, FlashController& controller, Loader& loader)
+    : registerFault_(options.faults.registers),
+      flash_(flash),
+      ram_(ram),
+      registers_(registers),
+      controller_(controller),
+      loader_(loader) {}
+
+MemoryMap::Region MemoryMap::CheckedRegion(const Transfer& transfer) const {
+    CheckForm(transfer);
+    const std::uint32_t address = transfer.address;
+    const std::uint64_t size = std::max<std::uint64_t>(transfer.SizeBytes(), 1);
+    if (flash_.Contains(address, size)) return Region::Flash;
+    const bool inRam = ram_.Contains(address, 1);
+    if (flash_.Contains(address, 1) || (inRam && !ram_.Contains(address, size))) {
+        Refuse(rule::kMappedAddress, "the range runs past the end of the memory it starts in");
+    }
+    if (transfer.page != kGeneralPage) {
+        Refuse(rule::kPage, fmt::format("page 0 holds nothing but the 0x{:X} bytes of flash",
+                                        flash_.SizeBytes()));
+    }
+    if (inRam) return Region::Ram;
+    if (transfer.width != kRegisterSizeBytes) {
+        Refuse(rule::kAccessWidth,
+               "there is no memory here, and registers are accessed as 32-bit words only");
+    }
+    return Region::Registers;
+}
+
+void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes) const {
+    const std::uint32_t address = transfer.address;
+    const std::size_t size = transfer.SizeBytes();
+    switch (CheckedRegion(transfer)) {
+        case Region::Flash:
+            if (controller_.IsBusy() || loader_.IsProgramming()) {
+                Refuse(rule::kFlashBusy, "the flash is being erased or programmed");
+            }
+            flash_.Read(address, {bytes, size});
+            return;
+        case Region::Ram: {
+            const auto held = ram_.Bytes(address, size);
+            std::copy(held.begin(), held.end(), bytes);
+            return;
+        }
+        case Region::Registers:
+            for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
+                StoreWord(bytes + offset, ReadRegister(address + offset));
+            }
+            return;
+    }
+}
+
+void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, bool coreRunning,
+                      std::chrono::nanoseconds now) {
+    const std::uint32_t address = transfer.address;
+    const std::size_t size = transfer.SizeBytes();
+    switch (CheckedRegion(transfer)) {
+        case Region::Flash:
+            Refuse(rule::kFlashReadOnly, "flash can't be written like memory; use the loader");
+        case Region::Ram:
+            if (loader_.Owns(address, size)) {
+                Refuse(rule::kBufferInUse,
+                       "the loader hasn't finished the chunk that was handed over in this buffer");
+            }
+            std::copy_n(bytes, size, ram_.Bytes(address, size).begin());
+            return;
+        case Region::Registers:
+            for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
+                WriteRegister(address + offset, LoadWord(bytes + offset), coreRunning, now);
+            }
+            return;
+    }
+}
+
+std::uint32_t MemoryMap::ReadRegister(std::uint32_t address) const {
+    switch (registerFault_) {
+        case RegisterFault::Ones:
+            return 0xFFFFFFFF;
+        case RegisterFault::Zeros:
+            return 0;
+        case RegisterFault::None:
+            break;
+    }
+    return address == reg::kFlashCommand ? controller_.Status() : registers_.Read(address);
+}
+
+void MemoryMap::WriteRegister(std::uint32_t address, std::uint32_t value, bool coreRunning,
+                              std::chrono::nanoseconds now) {
+    // A register bus that reads constants doesn't bring a write through either.
+    if (registerFault_ != RegisterFault::None) return;
+    const bool flashRegister = address == reg::kFlashAddress || address == reg::kFlashCommand;
+    if (flashRegister && loader_.IsProgramming()) {
+        Refuse(rule::kFlashBusy, "the loader is using the flash controller");
+    }
+    if (address == reg::kFlashCommand) {
+        controller_.Command(value, coreRunning, now);
+    } else {
+        registers_.Write(address, value);
+    }
+}
+
+}  // namespace target

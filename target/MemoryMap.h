@@ -1,0 +1,56 @@
+// MemoryMap: what lies where in the target's address space, and the rules for reaching it.
+
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+
+#include "target/DeviceOptions.h"
+#include "target/FlashArray.h"
+#include "target/FlashController.h"
+#include "target/Loader.h"
+#include "target/Ram.h"
+#include "target/RegisterFile.h"
+
+namespace target {
+
+struct Transfer {
+    std::size_t count;
+    std::uint32_t address;
+    int page;
+    std::size_t width;
+
+    /// 0 when the transfer doesn't fit into the address space.
+    std::uint64_t SizeBytes() const;
+};
+
+class MemoryMap {
+  public:
+    MemoryMap(const DeviceOptions& options, FlashArray& flash, Ram& ram, RegisterFile& registers,
+              FlashController& controller, Loader& loader);
+
+    /// Both throw RuleBroken; of a transfer to several registers, those before the refused one
+    /// have been written then.
+    void Read(const Transfer& transfer, std::uint8_t* bytes) const;
+    void Write(const Transfer& transfer, const std::uint8_t* bytes, bool coreRunning,
+               std::chrono::nanoseconds now);
+
+    std::uint32_t ReadRegister(std::uint32_t address) const;
+
+  private:
+    enum class Region { Flash, Ram, Registers };
+
+    Region CheckedRegion(const Transfer& transfer) const;
+    void WriteRegister(std::uint32_t address, std::uint32_t value, bool coreRunning,
+                       std::chrono::nanoseconds now);
+
+    const RegisterFault registerFault_;
+    FlashArray& flash_;
+    Ram& ram_;
+    RegisterFile& registers_;
+    FlashController& controller_;
+    Loader& loader_;
+};
+
+}  // namespace target

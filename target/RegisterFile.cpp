@@ -1,0 +1,139 @@
+// The register table of the family and the rules of plain register access.
+
+#include "target/RegisterFile.h"
+
+#include <fmt/format.h>
+
+#include <bit>
+
+#include "target/DeviceClass.h"
+#include "target/Rules.h"
+
+namespace target {
+
+namespace {
+
+// What a register's presence can depend on; a device has a register when they share a trait.
+using Traits = std::uint32_t;
+constexpr Traits Of(DeviceKind kind) {
+    return 1U << static_cast<unsigned>(kind);
+}
+constexpr Traits kRavik = Of(DeviceKind::Ravik);
+constexpr Traits kMesk = Of(DeviceKind::Mesk);
+constexpr Traits kOrrin = Of(DeviceKind::Orrin);
+constexpr Traits kQuen = Of(DeviceKind::Quen);
+constexpr Traits kOldest = kRavik | Of(DeviceKind::Tolva) | kMesk;
+constexpr Traits kNewest = Of(DeviceKind::Velk) | Of(DeviceKind::Dorna);
+constexpr Traits kAll = 0xFF;
+constexpr Traits kRom = 0x100;
+constexpr Traits kOneSizeRegister = 0x200;
+constexpr Traits kTwoSizeRegisters = 0x400;
+
+Traits TraitsOf(const DeviceOptions& options) {
+    return Of(KindOf(options)) | (HasRom(options) ? kRom : 0) |
+           (HasSizeRegisters(options) ? kTwoSizeRegisters : kOneSizeRegister);
+}
+
+}  // namespace
+
+struct RegisterFile::Row {
+    std::uint32_t address;
+    Kind kind;
+    const char* name;
+    Traits devices;
+    std::uint32_t resetValue;
+};
+
+// Reset values of 0 in read-only rows and in the key configuration come from the options. The
+// clock registers wake up with the bits set that a driver has to clear.
+const RegisterFile::Row RegisterFile::kRows[] = {
+    {0x400AE2C0, Kind::ReadWrite, "flash prefetch control", kQuen, 0x00000001},
+    {reg::kFlashAddress, Kind::ReadWrite, "flash address", kAll, 0},
+    {0x400FD0FC, Kind::ReadWrite, "flash test control", kQuen, 0},
+    {reg::kFlashSize, Kind::ReadOnly, "flash size", kTwoSizeRegisters, 0},
+    {reg::kRamSize, Kind::ReadOnly, "SRAM size", kTwoSizeRegisters, 0},
+    {reg::kIdentification, Kind::ReadOnly, "device identification 0", kAll, 0},
+    {reg::kCapabilities, Kind::ReadOnly, "device capabilities 0", kOneSizeRegister, 0},
+    {0x400FE040, Kind::ReadWrite, "software reset control 0", kAll, 0},
+    {0x400FE044, Kind::ReadWrite, "software reset control 1", kAll, 0},
+    {0x400FE048, Kind::ReadWrite, "software reset control 2", kAll, 0},
+    {0x400FE058, Kind::ReadWrite, "interrupt clear", kOldest, 0},
+    {0x400FE060, Kind::ReadWrite, "clock configuration", kAll, 0x01C03FF3},
+    {0x400FE070, Kind::ReadWrite, "clock configuration 2", kOrrin, 0x80007810},
+    {0x400FE0F0, Kind::WriteOneToClear, "ROM control", kRom, 0x00000001},
+    {0x400FE140, Kind::ReadWrite, "flash timing", kOldest, 0x00000031},
+    {0x400FE1A0, Kind::ReadOnly, "flash-buffer capability", kAll & ~kOldest, 0x00000001},
+    {0x400FE1A0, Kind::ReadOnly, "flash-buffer capability", kOldest, 0},
+    {reg::kKeyConfiguration, Kind::ReadOnly, "key configuration", kAll, 0},
+    {reg::kUserRegister0, Kind::ReadWrite, "user register 0", kAll & ~kRavik, 0xFFFFFFFF},
+    {reg::kUserRegister1, Kind::ReadWrite, "user register 1", kAll & ~kRavik, 0xFFFFFFFF},
+    {reg::kFlashBlocks0, Kind::ReadWrite, "flash block 0", kMesk, 0xFFFFFFFF},
+    {reg::kFlashBlocks0 + 4, Kind::ReadWrite, "flash block 1", kMesk, 0xFFFFFFFF},
+    {reg::kFlashBlocks0 + 8, Kind::ReadWrite, "flash block 2", kMesk, 0xFFFFFFFF},
+    {reg::kFlashBlocks0 + 12, Kind::ReadWrite, "flash block 3", kMesk, 0xFFFFFFFF},
+    {0x400FE500, Kind::ReadWrite, "watchdog software reset", kNewest, 0},
+};
+
+RegisterFile::RegisterFile(const DeviceOptions& options) : className_(options.className) {
+    const Traits traits = TraitsOf(options);
+    for (const Row& row : kRows) {
+        if ((row.devices & traits) == 0) continue;
+        registers_[row.address] = {row.name, row.kind, row.resetValue, row.resetValue};
+    }
+    SetOptionValues(options);
+    Reset();
+}
+
+void RegisterFile::SetOptionValues(const DeviceOptions& options) {
+    const std::uint32_t flashField = options.flashSizeBytes / 2048 - 1;
+    const std::uint32_t ramField = options.ramSizeBytes / 256 - 1;
+    SetResetValue(reg::kIdentification, options.identification);
+    SetResetValue(reg::kKeyConfiguration, options.keyConfiguration);
+    if (!HasSizeRegisters(options)) {
+        SetResetValue(reg::kCapabilities, ramField << 16 | flashField);
+        return;
+    }
+    const auto sectorExponent =
+        static_cast<std::uint32_t>(std::countr_zero(options.sectorSizeBytes / 1024));
+    SetResetValue(reg::kFlashSize, sectorExponent << 16 | flashField);
+    SetResetValue(reg::kRamSize, ramField);
+}
+
+const RegisterFile::Register& RegisterFile::Find(std::uint32_t address) const {
+    const auto found = registers_.find(address);
+    if (found == registers_.end()) {
+        Refuse(rule::kMappedAddress,
+               fmt::format("a device of class {} has no memory and no register at 0x{:08X}",
+                           className_, address));
+    }
+    return found->second;
+}
+
+std::uint32_t RegisterFile::Read(std::uint32_t address) const {
+    return Find(address).value;
+}
+
+void RegisterFile::Write(std::uint32_t address, std::uint32_t value) {
+    const Register& found = Find(address);
+    if (found.kind == Kind::ReadOnly) {
+        Refuse(rule::kReadOnlyRegister, fmt::format("the {} register is read-only", found.name));
+    }
+    Register& written = registers_.at(address);
+    written.value = found.kind == Kind::WriteOneToClear ? written.value & ~value : value;
+}
+
+void RegisterFile::Reset() {
+    for (auto& [address, entry] : registers_)
+        entry.value = entry.resetValue;
+}
+
+std::uint32_t RegisterFile::ResetValue(std::uint32_t address) const {
+    return Find(address).resetValue;
+}
+
+void RegisterFile::SetResetValue(std::uint32_t address, std::uint32_t value) {
+    Find(address);
+    registers_.at(address).resetValue = value;
+}
+
+}  // namespace target

@@ -1,0 +1,184 @@
+// The debug port of the simulated device: every access pays its time, brings the device up to now,
+// may fail on request, and is then carried out or refused.
+
+#include "target/SimulatedDevice.h"
+
+#include <fmt/format.h>
+
+#include <type_traits>
+
+namespace target {
+
+namespace {
+
+const DeviceOptions& Checked(const DeviceOptions& options) {
+    CheckDeviceOptions(options);
+    return options;
+}
+
+}  // namespace
+
+SimulatedDevice::SimulatedDevice(const DeviceOptions& options, Clock* clock)
+    : options_(Checked(options)),
+      time_(options_.timings, clock),
+      flash_(options_.flashSizeBytes, options_.faults.stuckCell),
+      ram_(options_.ramSizeBytes),
+      registers_(options_),
+      controller_(options_, registers_, flash_, rules_),
+      loader_(options_, ram_, flash_, controller_, rules_),
+      memory_(options_, flash_, ram_, registers_, controller_, loader_) {
+    PowerCycle();
+}
+
+void SimulatedDevice::Read(void* buffer, std::size_t count, std::uint32_t address, int page,
+                           std::size_t width) {
+    const Transfer transfer{count, address, page, width};
+    const auto describe = [&] {
+        return fmt::format("Reading {} x {} bytes at 0x{:08X} on page {}", count, width, address,
+                           page);
+    };
+    Perform(transfer.SizeBytes(), describe,
+            [&] { memory_.Read(transfer, static_cast<std::uint8_t*>(buffer)); });
+}
+
+void SimulatedDevice::Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
+                            std::size_t width) {
+    const Transfer transfer{count, address, page, width};
+    const auto describe = [&] {
+        return fmt::format("Writing {} x {} bytes at 0x{:08X} on page {}", count, width, address,
+                           page);
+    };
+    Perform(transfer.SizeBytes(), describe, [&] {
+        memory_.Write(transfer, static_cast<const std::uint8_t*>(buffer), running_, time_.Now());
+    });
+}
+
+void SimulatedDevice::LoadProgram(const std::string& fileName, const std::string& directory) {
+    const auto describe = [&] {
+        return fmt::format(R"(Loading the program "{}" from "{}")", fileName, directory);
+    };
+    Perform(0, describe, [&] {
+        if (running_) Refuse(rule::kHaltedForLoad, "the target is running; halt it first");
+        if (fileName != Loader::kFileName) {
+            Refuse(rule::kKnownProgram,
+                   fmt::format("no such program; this device has only \"{}\"", Loader::kFileName));
+        }
+        programLoaded_ = true;
+    });
+}
+
+void SimulatedDevice::Run() {
+    Perform(0, "Running the target", [&] {
+        if (running_) Refuse(rule::kHaltedForRun, "the target is running already");
+        if (!programLoaded_) {
+            Refuse(rule::kLoadedForRun, "no program has been loaded since the last reset");
+        }
+        running_ = true;
+        loader_.Start();
+    });
+}
+
+void SimulatedDevice::Halt() {
+    Perform(0, "Halting the target", [&] { StopCore(); });
+}
+
+// The two kinds of reset differ in how the probe goes about them, not in what becomes of the
+// device.
+void SimulatedDevice::Reset(bool /*flag*/) {
+    Perform(0, "Resetting the target", [&] {
+        StopCore();
+        controller_.Abort();
+        registers_.Reset();
+        programLoaded_ = false;
+    });
+}
+
+void SimulatedDevice::Pause(std::uint32_t milliseconds) {
+    time_.AddPause(milliseconds);
+    AdvanceToNow();
+}
+
+template <typename Describe, typename Action>
+void SimulatedDevice::Perform(std::uint64_t sizeBytes, const Describe& describe,
+                              const Action& action) {
+    const auto text = [&describe]() -> std::string {
+        if constexpr (std::is_invocable_v<Describe>) {
+            return describe();
+        } else {
+            return describe;
+        }
+    };
+    ++accessCount_;
+    time_.AddAccess(sizeBytes);
+    AdvanceToNow();
+    if (const char* fault = RequestedFault()) {
+        throw TargetError(fmt::format("{}: the connection to the target failed at access {} [{}]",
+                                      text(), accessCount_, fault));
+    }
+    try {
+        action();
+    } catch (const RuleBroken& error) {
+        const std::string refusal = text() + ": " + error.what();
+        rules_.Record(refusal);
+        throw TargetError(refusal);
+    }
+    AdvanceToNow();  // The loader sees at once what was handed over to it.
+}
+
+void SimulatedDevice::AdvanceToNow() {
+    const auto now = time_.Now();
+    controller_.AdvanceTo(now);
+    loader_.AdvanceTo(now);
+}
+
+const char* SimulatedDevice::RequestedFault() const {
+    const Faults& faults = options_.faults;
+    if (accessCount_ == faults.failAccess) return "fail-access";
+    if (faults.failFrom != 0 && accessCount_ >= faults.failFrom) return "fail-from";
+    return nullptr;
+}
+
+void SimulatedDevice::StopCore() {
+    loader_.Stop();
+    running_ = false;
+}
+
+void SimulatedDevice::PowerCycle() {
+    StopCore();
+    controller_.Abort();
+    registers_.Reset();
+    ram_.LosePower();
+    programLoaded_ = false;
+    running_ = true;
+}
+
+std::vector<std::uint8_t> SimulatedDevice::FlashContents() const {
+    std::vector<std::uint8_t> contents(flash_.SizeBytes());
+    flash_.Read(0, contents);
+    return contents;
+}
+
+std::array<std::uint32_t, 2> SimulatedDevice::CommittedUserRegisters() const {
+    if (!registers_.Has(reg::kUserRegister0)) return {0xFFFFFFFF, 0xFFFFFFFF};
+    return {registers_.ResetValue(reg::kUserRegister0), registers_.ResetValue(reg::kUserRegister1)};
+}
+
+void SimulatedDevice::PresetCommittedUserRegisters(const std::array<std::uint32_t, 2>& values) {
+    std::uint32_t address = reg::kUserRegister0;
+    for (const std::uint32_t value : values) {
+        if (!registers_.Has(address)) return;
+        registers_.SetResetValue(address, value);
+        registers_.Write(address, value);
+        address += 4;
+    }
+}
+
+std::uint32_t SimulatedDevice::PeekRegister(std::uint32_t address) const {
+    try {
+        return memory_.ReadRegister(address);
+    } catch (const RuleBroken& error) {
+        throw TargetError(error.what());
+    }
+}
+
+}  // namespace target

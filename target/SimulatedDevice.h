@@ -1,0 +1,105 @@
+// SimulatedDevice: a Corvane microcontroller as it looks through a debug probe: flash at 0, RAM at
+// 0x20000000, registers above, and a core that runs the flash loader.
+//
+// It is stricter than silicon. What real hardware would ignore, garble or lose is a TargetError
+// that names the broken rule. Time is simulated: it goes on with every pause, with what each
+// access costs, and with the injected clock. There is no thread; each access first brings the
+// device up to now.
+
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "target/Clock.h"
+#include "target/DeviceOptions.h"
+#include "target/FlashArray.h"
+#include "target/FlashController.h"
+#include "target/Loader.h"
+#include "target/MemoryMap.h"
+#include "target/Ram.h"
+#include "target/RegisterFile.h"
+#include "target/Rules.h"
+#include "target/SimulatedTime.h"
+#include "target/Target.h"
+
+namespace target {
+
+class SimulatedDevice final : public Target {
+  public:
+    /// A device in its power-up state, running the (empty) program in its flash. `clock` is not
+    /// owned and must outlive the device; null means the steady clock. Throws OptionError when
+    /// the options make no device.
+    explicit SimulatedDevice(const DeviceOptions& options, Clock* clock = nullptr);
+
+    SimulatedDevice(const SimulatedDevice&) = delete;
+    SimulatedDevice& operator=(const SimulatedDevice&) = delete;
+
+    void Read(void* buffer, std::size_t count, std::uint32_t address, int page,
+              std::size_t width) override;
+    void Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
+               std::size_t width) override;
+    void LoadProgram(const std::string& fileName, const std::string& directory) override;
+    void Run() override;
+    void Halt() override;
+    void Reset(bool flag) override;
+    void Pause(std::uint32_t milliseconds) override;
+
+    // What follows is for tests and tools: it counts as no access, costs no simulated time and
+    // breaks no rule.
+
+    const DeviceOptions& Options() const { return options_; }
+
+    /// Off and on again: RAM, registers and everything in progress are lost; flash and committed
+    /// user registers stay. Counters, violations and simulated time go on.
+    void PowerCycle();
+
+    /// The whole flash as it reads now, work in progress not included.
+    std::vector<std::uint8_t> FlashContents() const;
+
+    /// The flash cells themselves, to be looked at or preset.
+    const FlashArray& Flash() const { return flash_; }
+    FlashArray& Flash() { return flash_; }
+
+    std::array<std::uint32_t, 2> CommittedUserRegisters() const;
+    void PresetCommittedUserRegisters(const std::array<std::uint32_t, 2>& values);
+
+    /// The register's value as of the last access. Throws TargetError where there is none.
+    std::uint32_t PeekRegister(std::uint32_t address) const;
+
+    /// One text for every rule that was broken, whether or not the access was refused: what was
+    /// done, where, and the rule's name in brackets. At most RuleLog::kTextsMax are kept.
+    const std::vector<std::string>& Violations() const { return rules_.Texts(); }
+
+    std::uint64_t AccessCount() const { return accessCount_; }
+    bool IsRunning() const { return running_; }
+
+    /// How much simulated time went where.
+    TimeSpent Time() const { return time_.Spent(); }
+    std::chrono::nanoseconds LoaderBusyTime() const { return loader_.BusyTime(); }
+
+  private:
+    template <typename Describe, typename Action>
+    void Perform(std::uint64_t sizeBytes, const Describe& describe, const Action& action);
+    void AdvanceToNow();
+    const char* RequestedFault() const;
+    void StopCore();
+
+    const DeviceOptions options_;
+    RuleLog rules_;
+    SimulatedTime time_;
+    FlashArray flash_;
+    Ram ram_;
+    RegisterFile registers_;
+    FlashController controller_;
+    Loader loader_;
+    MemoryMap memory_;
+    std::uint64_t accessCount_ = 0;
+    bool running_ = false;
+    bool programLoaded_ = false;
+};
+
+}  // namespace target

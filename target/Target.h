@@ -1,0 +1,44 @@
+// Target: what a host drives, whether a board behind a probe or a simulation.
+//
+// It knows nothing of flash programming. Addresses are byte addresses; a transfer moves `count`
+// elements of `width` bytes (1, 2 or 4); `page` numbers the target's memory space.
+
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <stdexcept>
+#include <string>
+
+namespace target {
+
+/// Any failure of a target access. The text says what was tried, where, and why it failed.
+class TargetError : public std::runtime_error {
+  public:
+    using std::runtime_error::runtime_error;
+};
+
+class Target {
+  public:
+    virtual ~Target() = default;
+
+    virtual void Read(void* buffer, std::size_t count, std::uint32_t address, int page,
+                      std::size_t width) = 0;
+    virtual void Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
+                       std::size_t width) = 0;
+
+    /// Loads a target-side program, named by its file name and the directory it lies in, into
+    /// the halted target, ready for Run.
+    virtual void LoadProgram(const std::string& fileName, const std::string& directory) = 0;
+
+    virtual void Run() = 0;
+    virtual void Halt() = 0;
+
+    /// Resets the target and leaves it halted.
+    virtual void Reset(bool flag) = 0;
+
+    /// Lets `milliseconds` of the target's time pass.
+    virtual void Pause(std::uint32_t milliseconds) = 0;
+};
+
+}  // namespace target

@@ -1,0 +1,576 @@
+// The simulated device's own tests: it has to be strict before it can catch anybody else.
+
+#include "target/SimulatedDevice.h"
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <iterator>
+#include <memory>
+#include <numeric>
+
+#include "target/ContentsFile.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using Bytes = std::vector<std::uint8_t>;
+
+constexpr std::uint32_t kFlashAddress = 0x400FD000;
+constexpr std::uint32_t kFlashCommand = 0x400FD008;
+constexpr std::uint32_t kUser0 = 0x400FE1E0;
+constexpr std::uint32_t kStatus[] = {0x2000100C, 0x2000101C};
+constexpr std::uint32_t kBusy = 0xFFFFFFFF;
+constexpr char kLoader[] = "FlashLoaderMerrow.out";
+
+// A device under a clock that stands still, and the few things that a debugger does with it.
+struct Rig {
+    explicit Rig(const std::string& options = "tolva")
+        : device(target::ParseDeviceOptions(options), &clock) {
+        device.Halt();
+    }
+
+    std::uint32_t Word(std::uint32_t address) {
+        std::uint32_t value = 0;
+        device.Read(&value, 1, address, 1, 4);
+        return value;
+    }
+    void SetWord(std::uint32_t address, std::uint32_t value) {
+        device.Write(&value, 1, address, 1, 4);
+    }
+    void Command(std::uint32_t address, std::uint32_t command) {
+        SetWord(kFlashAddress, address);
+        SetWord(kFlashCommand, command);
+    }
+    void StartLoader() {
+        device.LoadProgram(kLoader, "anywhere/");
+        device.Run();
+    }
+    void HandOver(int block, std::uint32_t address, const Bytes& bytes) {
+        const auto index = static_cast<std::uint32_t>(block);
+        device.Write(bytes.data(), bytes.size(), 0x20000000 + index * 0x800, 1, 1);
+        const std::uint32_t parameters[] = {address, static_cast<std::uint32_t>(bytes.size()),
+                                            kBusy};
+        device.Write(parameters, 12, 0x20001004 + index * 0x10, 1, 1);
+    }
+    Bytes Flash(std::uint32_t address, std::size_t size) {
+        Bytes bytes(size);
+        device.Read(bytes.data(), size, address, 0, 1);
+        return bytes;
+    }
+
+    target::ManualClock clock;
+    target::SimulatedDevice device;
+};
+
+Bytes Pattern(std::size_t size) {
+    Bytes bytes(size);
+    std::iota(bytes.begin(), bytes.end(), std::uint8_t{1});
+    return bytes;
+}
+
+std::string ErrorOf(const std::function<void()>& action) {
+    try {
+        action();
+    } catch (const std::exception& error) {
+        return error.what();
+    }
+    return "no error";
+}
+
+TEST(Rules, RefusedAccessNamesTheRule) {
+    const struct {
+        const char* text;
+        std::function<void(Rig&)> access;
+    } cases[] = {
+        {"0x400FD000 on page 2: the device has the pages 0 (flash) and 1 (everything) [page]",
+         [](Rig& r) { r.device.Read(nullptr, 1, 0x400FD000, 2, 4); }},
+        {"[page]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE000, 0, 4); }},
+        {"[access-width]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE000, 1, 2); }},
+        {"[access-width]", [](Rig& r) { r.device.Read(nullptr, 1, 0x20000000, 1, 0); }},
+        {"[aligned-access]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE002, 1, 4); }},
+        {"[aligned-access]", [](Rig& r) { r.device.Write(nullptr, 1, 0x20000001, 1, 2); }},
+        {"[mapped-address]", [](Rig& r) { r.Flash(0x3FFFF, 2); }},
+        {"[mapped-address]", [](Rig& r) { r.device.Read(nullptr, SIZE_MAX, 0x100, 0, 4); }},
+        {"class tolva has no memory and no register at 0x400FE070 [mapped-address]",
+         [](Rig& r) { r.Word(0x400FE070); }},
+        {"[read-only-register]", [](Rig& r) { r.SetWord(0x400FE1D0, 0); }},
+        {"[flash-read-only]", [](Rig& r) { r.device.Write("x", 1, 0, 1, 1); }},
+        {"[known-command]", [](Rig& r) { r.SetWord(kFlashCommand, 0xA4420006); }},
+        {"[one-command]",
+         [](Rig& r) {
+             r.Command(0, 0xA4420002);
+             r.Command(0, 0xA4420002);
+         }},
+        {"[flash-busy]",
+         [](Rig& r) {
+             r.Command(0, 0xA4420002);
+             r.Flash(0x8000, 1);
+         }},
+        {"[flash-busy]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.HandOver(0, 0, Pattern(128));
+             r.Flash(0x8000, 1);
+         }},
+        {"[flash-busy]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.HandOver(0, 0, Pattern(128));
+             r.SetWord(kFlashAddress, 0);
+         }},
+        {"[halted-for-erase]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.Command(0, 0xA4420004);
+         }},
+        {"the flash address register holds 0x00000200, which is not the start of a 0x400-byte "
+         "sector of the 0x40000-byte flash [sector-address]",
+         [](Rig& r) { r.Command(0x200, 0xA4420002); }},
+        {"[sector-address]", [](Rig& r) { r.Command(0x40000, 0xA4420002); }},
+        {"[commit-address]", [](Rig& r) { r.Command(0x80000002, 0xA4420008); }},
+        {"[loaded-for-run]", [](Rig& r) { r.device.Run(); }},
+        {"[loaded-for-run]",
+         [](Rig& r) {
+             r.device.LoadProgram(kLoader, "");
+             r.device.Reset(true);
+             r.device.Run();
+         }},
+        {"[known-program]", [](Rig& r) { r.device.LoadProgram("other.out", "d/"); }},
+        {"[halted-for-load]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.StartLoader();
+         }},
+        {"[halted-for-run]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.device.Run();
+         }},
+        {"[buffer-in-use]",
+         [](Rig& r) {
+             r.StartLoader();
+             r.HandOver(0, 0, Pattern(128));
+             r.HandOver(0, 0x80, Pattern(128));
+         }},
+    };
+    for (const auto& [text, access] : cases) {
+        Rig rig;
+        const std::string error = ErrorOf([&, &run = access] { run(rig); });
+        EXPECT_TRUE(error.ends_with(text)) << error << " instead of " << text;
+        EXPECT_EQ(rig.device.Violations(), std::vector{error});
+    }
+}
+
+TEST(Registers, EachClassHasItsOwn) {
+    constexpr std::uint32_t none = 0xDEAD0000;
+    const struct {
+        const char* options;
+        std::uint32_t identification, capabilities, flashSize, ramSize, rom, buffer, user0;
+    } cases[] = {
+        {"ravik", 0x00000202, 0x001F001F, none, none, none, 0, none},
+        {"tolva,revision=A,flash=2K", 0x10010000, 0x00FF0000, none, none, none, 0, kBusy},
+        {"tolva,flash=128M,ram=16M", 0x10010100, 0xFFFFFFFF, none, none, 1, 0, kBusy},
+        {"mesk,revision=7", 0x10030700, 0x00FF003F, none, none, 1, 0, kBusy},
+        {"orrin", 0x10040101, 0x00FF007F, none, none, 1, 1, kBusy},
+        {"pell", 0x10060000, 0x00FF007F, none, none, 1, 1, kBusy},
+        {"quen", 0x10050000, 0x00FF00FF, none, none, 1, 1, kBusy},
+        {"velk", 0x10090000, none, 0x000200FF, 0x000000FF, 1, 1, kBusy},
+        {"dorna,sector=128K", 0x901A0000, none, 0x000701FF, 0x000003FF, 1, 1, kBusy},
+        {"ravik,id=B0000,sector=2K", 0x000B0000, none, 0x0001001F, 0x0000001F, 1, 0, none},
+    };
+    for (const auto& c : cases) {
+        Rig rig(c.options);
+        const auto read = [&rig](std::uint32_t address) {
+            try {
+                return rig.Word(address);
+            } catch (const target::TargetError&) {
+                return none;
+            }
+        };
+        const std::vector<std::uint32_t> expected = {
+            c.identification, c.capabilities, c.flashSize, c.ramSize, c.rom, c.buffer, c.user0};
+        const std::vector<std::uint32_t> actual = {
+            read(0x400FE000), read(0x400FE008), read(0x400FDFC0), read(0x400FDFC4),
+            read(0x400FE0F0), read(0x400FE1A0), read(kUser0)};
+        EXPECT_EQ(actual, expected) << c.options;
+    }
+}
+
+TEST(Registers, ResetRestoresThem) {
+    Rig rig;
+    const std::uint32_t clockConfiguration = rig.Word(0x400FE060);
+    rig.SetWord(0x400FE060, ~clockConfiguration);
+    rig.SetWord(0x400FE0F0, rig.Word(0x400FE0F0));  // written back: the ROM alias goes
+    EXPECT_EQ(rig.Word(0x400FE060), ~clockConfiguration);
+    EXPECT_EQ(rig.Word(0x400FE0F0), 0U);
+    rig.device.Reset(false);
+    EXPECT_EQ(rig.Word(0x400FE060), clockConfiguration);
+    EXPECT_EQ(rig.Word(0x400FE0F0), 1U);
+}
+
+TEST(WriteKey, WrongOneDoesNothing) {
+    const struct {
+        const char* options;
+        std::uint32_t right, wrong;
+    } cases[] = {{"tolva,keyconfig=FFFFFFEF", 0xA442, 0x71D5},
+                 {"pell,keyconfig=FFFFFFEF", 0xA442, 0x71D5},
+                 {"quen", 0xA442, 0x71D5},
+                 {"quen,keyconfig=0", 0xA442, 0x71D5},
+                 {"quen,keyconfig=FFFFFFEF", 0x71D5, 0xA442},
+                 {"velk", 0x71D5, 0xA442},
+                 {"dorna,keyconfig=0x10", 0xA442, 0x71D5},
+                 {"dorna", 0x71D5, 0}};
+    for (const auto& [options, right, wrong] : cases) {
+        Rig rig(options);
+        rig.device.Flash().Preset(0x4000, Bytes{0});
+        for (const std::uint32_t key : {wrong, right}) {
+            for (const std::uint32_t command : {2U, 4U, 8U}) {
+                rig.SetWord(kUser0, command);
+                rig.Command(command == 8 ? 0x80000000 : 0x4000, key << 16 | command);
+                EXPECT_EQ(rig.Word(kFlashCommand), key == right ? command : 0) << options;
+                rig.device.Pause(100);
+                EXPECT_EQ(rig.Word(kFlashCommand), 0U) << options;
+            }
+            EXPECT_EQ(rig.Flash(0x4000, 1)[0], key == right ? 0xFF : 0) << options;
+            EXPECT_EQ(rig.device.CommittedUserRegisters()[0], key == right ? 8 : kBusy) << options;
+        }
+        EXPECT_EQ(rig.device.Violations().size(), 3U);
+    }
+}
+
+TEST(Erase, TakesPollsAndKeepsToItsSector) {
+    Rig rig("velk,sector=2K");
+    rig.device.Flash().Preset(0, Bytes(0x3000, 0));
+    const auto polls = [&rig](std::uint32_t address, std::uint32_t command, std::uint32_t pauseMs) {
+        rig.Command(address, command);
+        int busy = 0;
+        for (rig.device.Pause(pauseMs); rig.Word(kFlashCommand) != 0; ++busy) {
+            rig.device.Pause(pauseMs);
+        }
+        return busy;
+    };
+    EXPECT_EQ(polls(0x800, 0x71D50002, 5), 1);
+    Bytes expected(0x3000, 0);
+    std::fill_n(expected.begin() + 0x800, 0x800, std::uint8_t{0xFF});
+    EXPECT_EQ(rig.Flash(0, 0x3000), expected);
+    EXPECT_EQ(polls(0, 0x71D50004, 10), 5);
+    EXPECT_EQ(rig.device.FlashContents(), Bytes(0x80000, 0xFF));
+}
+
+TEST(Erase, ResetLeavesItHalfDone) {
+    Rig rig("dorna,sector=4K");
+    rig.device.Flash().Preset(0, Bytes(0x1000, 0));
+    rig.Command(0, 0x71D50002);
+    rig.device.Reset(false);
+    EXPECT_EQ(rig.Word(kFlashCommand), 0U);
+    Bytes expected(0x1000, 0);
+    std::fill_n(expected.begin(), 0x800, std::uint8_t{0xFF});
+    EXPECT_EQ(rig.Flash(0, 0x1000), expected);
+}
+
+TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
+    const struct {
+        const char* flash;
+        std::uint32_t blocks[4];
+        bool erases;
+    } cases[] = {{"32K", {0xFFFF, 0, 0, 0}, true},
+                 {"32K", {0x1FFFF, 0, 0, 0}, false},
+                 {"64K", {kBusy, 0, 0, 0}, true},
+                 {"64K", {kBusy, 1, 0, 0}, false},
+                 {"96K", {kBusy, 0xFFFF, 0, 0}, true},
+                 {"96K", {kBusy, kBusy, 0, 0}, false},
+                 {"128K", {kBusy, kBusy, 0, 0}, true},
+                 {"128K", {0, 0, 0, 0x80000000}, false},
+                 {"256K", {kBusy, kBusy, kBusy, kBusy}, true}};
+    for (const auto& c : cases) {
+        Rig rig(std::string("mesk,flash=") + c.flash);
+        for (std::uint32_t i = 0; i < 4; ++i)
+            rig.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
+        rig.Command(0, 0xA4420004);
+        EXPECT_EQ(rig.Word(kFlashCommand) == 4, c.erases) << c.flash;
+        EXPECT_EQ(rig.device.Violations().empty(), c.erases);
+    }
+}
+
+TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
+    Rig rig;
+    const Bytes image = Pattern(5 * 2048 + 128);
+    rig.StartLoader();
+    EXPECT_EQ(rig.Word(kStatus[1]), 0U);
+    int block = 0;
+    for (std::uint32_t offset = 0; offset < image.size(); offset += 2048, block ^= 1) {
+        const auto end = std::min<std::ptrdiff_t>(offset + 2048, std::ssize(image));
+        rig.HandOver(block, 0x1000 + offset, Bytes(image.begin() + offset, image.begin() + end));
+        EXPECT_EQ(rig.Word(kStatus[block]), kBusy);
+        EXPECT_EQ(rig.Word(kStatus[block ^ 1]), 0U) << "a poll found a default loader busy";
+    }
+    rig.device.Pause(1);
+    EXPECT_EQ(rig.Flash(0x1000, image.size()), image);
+    EXPECT_EQ(rig.device.LoaderBusyTime(), 6 * 200us);
+    EXPECT_TRUE(rig.device.Violations().empty());
+}
+
+TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
+    Rig rig("tolva,chunk-time=10ms,latency=0,bandwidth=0");
+    rig.StartLoader();
+    rig.HandOver(1, 0x800, Pattern(128));  // must wait for block 0
+    rig.clock.Advance(1s);
+    rig.HandOver(0, 0, Pattern(128));
+    std::vector<std::array<std::uint32_t, 2>> seen;
+    for (const auto step : {0us, 9999us, 1us, 9999us, 1us}) {
+        rig.clock.Advance(step);
+        seen.push_back({rig.Word(kStatus[0]), rig.Word(kStatus[1])});
+    }
+    EXPECT_EQ(seen,
+              (decltype(seen){{kBusy, kBusy}, {kBusy, kBusy}, {0, kBusy}, {0, kBusy}, {0, 0}}));
+}
+
+TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
+    for (const bool reset : {false, true}) {
+        Rig rig;
+        rig.StartLoader();
+        rig.HandOver(0, 0, Bytes(256, 0));
+        if (reset) {
+            rig.device.Reset(false);
+        } else {
+            rig.device.Halt();
+        }
+        rig.device.Pause(1000);
+        Bytes expected(256, 0xFF);
+        std::fill_n(expected.begin(), 128, std::uint8_t{0});
+        EXPECT_EQ(rig.Flash(0, 256), expected);
+        EXPECT_EQ(rig.Word(kStatus[0]), kBusy);
+    }
+}
+
+TEST(Loader, SaysWhatItCannotTellTheDebugger) {
+    const struct {
+        std::uint32_t address, size;
+        const char* rule;
+    } cases[] = {{0x40, 128, "[loader-parameters]"},
+                 {0, 64, "[loader-parameters]"},
+                 {0, 0, "[loader-parameters]"},
+                 {0x3FF80, 256, "[loader-parameters]"},
+                 {kBusy - 127, 128, "[loader-parameters]"},
+                 {0x400, 128, "[erased-cells]"}};
+    for (const auto& [address, size, rule] : cases) {
+        Rig rig;
+        rig.device.Flash().Preset(0x410, Bytes{0xF0});
+        rig.StartLoader();
+        rig.HandOver(0, address, Bytes(size, 0x3C));
+        rig.device.Pause(1);
+        EXPECT_NE(rig.Word(kStatus[0]), kBusy);
+        ASSERT_EQ(rig.device.Violations().size(), 1U);
+        EXPECT_TRUE(rig.device.Violations()[0].ends_with(rule)) << rig.device.Violations()[0];
+        EXPECT_EQ(rig.Flash(0x410, 1)[0], address == 0x400 ? 0x30 : 0xF0);
+    }
+}
+
+TEST(UserRegisters, AreVolatileUntilCommitted) {
+    Rig rig;
+    const auto values = [&rig] { return std::array{rig.Word(kUser0), rig.Word(kUser0 + 4)}; };
+    rig.SetWord(kUser0, 0x11);
+    rig.SetWord(kUser0 + 4, 0x22);
+    rig.Command(0x80000001, 0xA4420008);
+    rig.device.Pause(1);
+    EXPECT_EQ(values(), (std::array{0x11U, 0x22U}));
+    rig.device.Reset(true);
+    EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
+    rig.Command(0x80000000, 0xA4420008);
+    rig.SetWord(kUser0 + 4, 0x33);
+    rig.device.PowerCycle();
+    EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
+}
+
+TEST(Faults, ComeAsAsked) {
+    Rig once("tolva,fail-access=3");  // the rig's halt is the first
+    EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
+    EXPECT_EQ(ErrorOf([&] { once.Word(0x400FE000); }),
+              "Reading 1 x 4 bytes at 0x400FE000 on page 1: the connection to the target failed at "
+              "access 3 [fail-access]");
+    EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
+
+    Rig fromThen("tolva,fail-from=2");
+    for (int i = 0; i < 3; ++i)
+        EXPECT_THROW(fromThen.device.Run(), target::TargetError);
+
+    Rig never("tolva,erase=never,commit=never");
+    for (const auto& [address, command] : {std::pair{0U, 2U}, {0U, 4U}, {0x80000000U, 8U}}) {
+        never.Command(address, 0xA4420000 | command);
+        never.device.Pause(0xFFFFFFFF);
+        EXPECT_EQ(never.Word(kFlashCommand), command);
+        never.device.Reset(false);
+    }
+
+    Rig stuck("tolva,stuck-cell=0x1003:0x5A");
+    EXPECT_EQ(stuck.Flash(0x1002, 3), (Bytes{0xFF, 0x5A, 0xFF}));
+
+    Rig ones("tolva,registers=ones"), zeros("tolva,registers=zeros");
+    ones.SetWord(kFlashCommand, 0xA4420004);
+    EXPECT_EQ(ones.Word(kFlashCommand), kBusy);
+    EXPECT_EQ(zeros.Word(0x400FDFC0), 0U);
+
+    for (const auto& [options, idle] :
+         {std::pair{"tolva,loader=hangs", 0U}, {"tolva,loader=dead", kBusy}}) {
+        Rig rig(options);
+        rig.StartLoader();
+        EXPECT_EQ(rig.Word(kStatus[1]), idle);
+        rig.HandOver(0, 0, Pattern(128));
+        rig.device.Pause(60'000);
+        EXPECT_EQ(rig.Word(kStatus[0]), kBusy);
+    }
+}
+
+TEST(Time, CannotBeWaitedIntoAnOverflow) {
+    Rig rig;
+    for (int i = 0; i < 5000; ++i)
+        rig.device.Pause(0xFFFFFFFF);
+    rig.Command(0, 0xA4420002);
+    rig.clock.Advance(1s);
+    EXPECT_EQ(rig.Word(kFlashCommand), 0U);
+}
+
+TEST(Options, BadOnesAreNamed) {
+    const struct {
+        const char* text;
+        const char* error;
+    } cases[] = {
+        {"", "Device class \"\" of the simulated device: use one of ravik, tolva"},
+        {"Tolva", "Device class \"Tolva\""},
+        {"tolva,color=red", "Option \"color=red\" of the simulated device: the form is NAME=VALUE"},
+        {"tolva,flash", "Option \"flash\""},
+        {"tolva,flash=3K", "Option \"flash=3K\" of the simulated device: accepted is a multiple"},
+        {"tolva,flash=129M", "Option \"flash=129M\""},
+        {"tolva,flash=99999999999999999M", "Option \"flash="},
+        {"tolva,flash=4K,flash=4K", "Option \"flash=4K\" of the simulated device: the option is"},
+        {"tolva,sector=2K", "Option \"sector=2K\" of the simulated device: a tolva has sectors"},
+        {"dorna,sector=3K", "Option \"sector=3K\""},
+        {"velk,revision=256", "Option \"revision=256\""},
+        {"velk,id=1,revision=A", "Option \"id=0x00000001\""},
+        {"quen,keyconfig=100000000", "Option \"keyconfig=100000000\""},
+        {"quen,erase-time=5", "Option \"erase-time=5\""},
+        {"quen,erase-time=2h", "Option \"erase-time=2h\""},
+        {"quen,fail-access=0", "Option \"fail-access=0\""},
+        {"quen,erase=maybe", "Option \"erase=maybe\""},
+        {"quen,stuck-cell=512K", "Option \"stuck-cell=512K\""},
+        {"quen,stuck-cell=0x80000", "the flash ends at 0x80000."},
+    };
+    for (const auto& [text, expected] : cases) {
+        const std::string error = ErrorOf([&, &t = text] { target::ParseDeviceOptions(t); });
+        EXPECT_NE(error.find(expected), std::string::npos) << error;
+    }
+}
+
+class ContentsFile : public testing::Test {
+  protected:
+    void TearDown() override { std::filesystem::remove_all(directory_); }
+
+    std::unique_ptr<target::SimulatedDevice> Open(const std::string& options) {
+        return target::OpenContents(path_, target::ParseDeviceOptions(options));
+    }
+    std::string Stored() {
+        std::ifstream file(path_, std::ios::binary);
+        return {std::istreambuf_iterator<char>(file), {}};
+    }
+    void Store(const std::string& bytes) {
+        std::filesystem::remove(path_);  // some file systems flush a file that is overwritten
+        std::ofstream(path_, std::ios::binary) << bytes;
+    }
+
+    const std::string directory_ = testing::TempDir() + "contents-" + std::to_string(getpid());
+    const std::string path_ = directory_ + "/device";
+
+  private:
+    const bool made_ = std::filesystem::create_directory(directory_);
+};
+
+TEST_F(ContentsFile, KeepsTheDevice) {
+    {
+        auto device = Open("dorna,flash=128M,sector=1K,revision=2,erase-time=1us");
+        device->Flash().Preset(0x7FFFF80, Pattern(128));
+        device->PresetCommittedUserRegisters({0x00B61A00, 0x00030201});
+        SaveContents(path_, *device);
+        SaveContents(path_, *device);
+    }
+    EXPECT_LT(std::filesystem::file_size(path_), 2048U);
+    auto device = target::OpenContents(path_, target::DefaultDeviceOptions());
+    EXPECT_EQ(DefinitionText(device->Options()),
+              "dorna,id=0x901A0200,flash=128M,ram=256K,sector=1K,keyconfig=0xFFFFFFEF");
+    EXPECT_EQ(device->Options().timings.sectorErase, 8ms);
+    EXPECT_EQ(device->CommittedUserRegisters(), (std::array{0x00B61A00U, 0x00030201U}));
+    Bytes expected(0x8000000, 0xFF);
+    std::copy_n(Pattern(128).begin(), 128, expected.end() - 128);
+    EXPECT_TRUE(device->FlashContents() == expected);
+
+    // All its sectors, one by one: the work per access must not grow with the flash.
+    device->Halt();
+    for (std::uint32_t address = 0; address < 0x8000000; address += 0x400) {
+        const std::uint32_t command = 0x71D50002;
+        device->Write(&address, 1, kFlashAddress, 1, 4);
+        device->Write(&command, 1, kFlashCommand, 1, 4);
+        device->Pause(8);
+    }
+    EXPECT_TRUE(device->FlashContents() == Bytes(0x8000000, 0xFF));
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory_), {}), 1);
+}
+
+TEST_F(ContentsFile, RefusesWhatItDidNotWrite) {
+    auto device = Open("tolva");
+    device->Flash().Preset(0, Bytes{0});
+    SaveContents(path_, *device);
+    const std::string good = Stored();
+    const auto refused = [&](const std::string& bytes, const char* why) {
+        Store(bytes);
+        const std::string error = ErrorOf([&] { Open("tolva"); });
+        EXPECT_TRUE(error.starts_with("The contents file " + path_ + " can't be used: ")) << error;
+        EXPECT_NE(error.find(why), std::string::npos) << error;
+    };
+    for (std::size_t size = 0; size < good.size(); ++size)
+        refused(good.substr(0, size), "");
+    for (std::size_t i = 0; i < good.size(); ++i) {
+        std::string flipped = good;
+        flipped[i] = static_cast<char>(flipped[i] ^ 0x10);
+        refused(flipped, i < 8 ? "no simulated device" : i < 12 ? "version" : "checksum");
+    }
+    refused(good + "x", "checksum");
+    Store(good);
+    EXPECT_EQ(Open("tolva")->FlashContents(), device->FlashContents());
+}
+
+TEST_F(ContentsFile, OptionsMustAgree) {
+    SaveContents(path_, *Open("velk,flash=512K,revision=B"));
+    const struct {
+        const char* options;
+        const char* error;
+    } cases[] = {
+        {"velk,flash=0x80000,sector=4096,fail-access=7", "no error"},
+        {"dorna",
+         "Option \"class\" of the simulated device: dorna is asked for, but the kept device has "
+         "velk;"},
+        {"velk,flash=256K",
+         "Option \"flash\" of the simulated device: 256K is asked for, but the kept device has "
+         "512K;"},
+        {"velk,revision=A",
+         "Option \"revision\" of the simulated device: 0 is asked for, but the kept device has 1;"},
+    };
+    for (const auto& [options, expected] : cases) {
+        const std::string error = ErrorOf([&, &o = options] { Open(o); });
+        EXPECT_TRUE(error.starts_with(expected)) << error;
+    }
+}
+
+TEST_F(ContentsFile, SystemErrorsNameThePath) {
+    const auto device = Open("tolva");
+    const std::string noDirectory = directory_ + "/none/device";
+    EXPECT_EQ(ErrorOf([&] { SaveContents(noDirectory, *device); }),
+              "Creating the contents file " + noDirectory +
+                  " failed: No such file or directory; check the path and its permissions.");
+    EXPECT_NE(ErrorOf([&] { target::OpenContents(directory_, {}); }).find("Is a directory"),
+              std::string::npos);
+}
+
+}  // namespace
