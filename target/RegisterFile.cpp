@@ -47,9 +47,9 @@ struct RegisterFile::Row {
 // Reset values of 0 in read-only rows and in the key configuration come from the options. The
 // clock registers wake up with the bits set that a driver has to clear.
 const RegisterFile::Row RegisterFile::kRows[] = {
-    {0x400AE2C0, Kind::ReadWrite, "flash prefetch control", kQuen, 0x00000001},
+    {0x400AE2C0, Kind::ReadWrite, "system control 0x400AE2C0", kQuen, 0x00000001},
     {reg::kFlashAddress, Kind::ReadWrite, "flash address", kAll, 0},
-    {0x400FD0FC, Kind::ReadWrite, "flash test control", kQuen, 0},
+    {0x400FD0FC, Kind::ReadWrite, "flash control 0x400FD0FC", kQuen, 0},
     {reg::kFlashSize, Kind::ReadOnly, "flash size", kTwoSizeRegisters, 0},
     {reg::kRamSize, Kind::ReadOnly, "SRAM size", kTwoSizeRegisters, 0},
     {reg::kIdentification, Kind::ReadOnly, "device identification 0", kAll, 0},
@@ -57,7 +57,7 @@ const RegisterFile::Row RegisterFile::kRows[] = {
     {0x400FE040, Kind::ReadWrite, "software reset control 0", kAll, 0},
     {0x400FE044, Kind::ReadWrite, "software reset control 1", kAll, 0},
     {0x400FE048, Kind::ReadWrite, "software reset control 2", kAll, 0},
-    {0x400FE058, Kind::ReadWrite, "interrupt clear", kOldest, 0},
+    {0x400FE058, Kind::ReadWrite, "system control 0x400FE058", kOldest, 0},
     {0x400FE060, Kind::ReadWrite, "clock configuration", kAll, 0x01C03FF3},
     {0x400FE070, Kind::ReadWrite, "clock configuration 2", kOrrin, 0x80007810},
     {0x400FE0F0, Kind::WriteOneToClear, "ROM control", kRom, 0x00000001},

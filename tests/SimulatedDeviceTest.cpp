@@ -321,12 +321,11 @@ TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
     rig.clock.Advance(1s);
     rig.HandOver(0, 0, Pattern(128));
     std::vector<std::array<std::uint32_t, 2>> seen;
-    for (const auto step : {0us, 9999us, 1us, 9999us, 1us}) {
+    for (const auto step : {0us, 9999us, 2us, 9999us}) {
         rig.clock.Advance(step);
         seen.push_back({rig.Word(kStatus[0]), rig.Word(kStatus[1])});
     }
-    EXPECT_EQ(seen,
-              (decltype(seen){{kBusy, kBusy}, {kBusy, kBusy}, {0, kBusy}, {0, kBusy}, {0, 0}}));
+    EXPECT_EQ(seen, (decltype(seen){{kBusy, kBusy}, {kBusy, kBusy}, {0, kBusy}, {0, 0}}));
 }
 
 TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
@@ -410,9 +409,12 @@ TEST(Faults, ComeAsAsked) {
     EXPECT_EQ(stuck.Flash(0x1002, 3), (Bytes{0xFF, 0x5A, 0xFF}));
 
     Rig ones("tolva,registers=ones"), zeros("tolva,registers=zeros");
-    ones.SetWord(kFlashCommand, 0xA4420004);
     EXPECT_EQ(ones.Word(kFlashCommand), kBusy);
     EXPECT_EQ(zeros.Word(0x400FDFC0), 0U);
+    ones.device.Flash().Preset(0, Bytes{0});
+    ones.SetWord(kFlashCommand, 0xA4420004);
+    ones.device.Pause(1000);
+    EXPECT_EQ(ones.Flash(0, 1), Bytes{0}) << "a write came through";
 
     for (const auto& [options, idle] :
          {std::pair{"tolva,loader=hangs", 0U}, {"tolva,loader=dead", kBusy}}) {
@@ -569,6 +571,10 @@ TEST_F(ContentsFile, SystemErrorsNameThePath) {
     EXPECT_EQ(ErrorOf([&] { SaveContents(noDirectory, *device); }),
               "Creating the contents file " + noDirectory +
                   " failed: No such file or directory; check the path and its permissions.");
+    EXPECT_EQ(ErrorOf([&] { SaveContents(directory_, *device); }),
+              "Replacing the contents file " + directory_ +
+                  " failed: Is a directory; check the path and its permissions.");
+    EXPECT_FALSE(std::filesystem::exists(directory_ + ".tmp-" + std::to_string(getpid())));
     EXPECT_NE(ErrorOf([&] { target::OpenContents(directory_, {}); }).find("Is a directory"),
               std::string::npos);
 }
