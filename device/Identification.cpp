@@ -8,7 +8,7 @@
 
 namespace {
 
-constexpr std::uint32_t AnyRevision = 0xFFFFFFFF;
+constexpr std::uint32_t kAnyRevision = 0xFFFFFFFF;
 
 struct ClassRow {
     std::uint32_t classField;
@@ -17,16 +17,16 @@ struct ClassRow {
     const char* name;
 };
 
-constexpr ClassRow ClassRows[] = {
-    {1, 0, DeviceClass::TolvaRevA, "Tolva Rev.A"},  {1, 1, DeviceClass::TolvaRevB, "Tolva Rev.B"},
-    {3, 0, DeviceClass::MeskRevA, "Mesk Rev.A"},    {3, 1, DeviceClass::MeskRevB, "Mesk Rev.B"},
-    {4, AnyRevision, DeviceClass::Orrin, "Orrin"},  {5, AnyRevision, DeviceClass::Quen, "Quen"},
-    {6, AnyRevision, DeviceClass::Pell, "Pell"},    {9, AnyRevision, DeviceClass::Velk, "Velk"},
-    {10, AnyRevision, DeviceClass::Dorna, "Dorna"},
+constexpr ClassRow kClassRows[] = {
+    {1, 0, DeviceClass::TolvaRevA, "Tolva Rev.A"},   {1, 1, DeviceClass::TolvaRevB, "Tolva Rev.B"},
+    {3, 0, DeviceClass::MeskRevA, "Mesk Rev.A"},     {3, 1, DeviceClass::MeskRevB, "Mesk Rev.B"},
+    {4, kAnyRevision, DeviceClass::Orrin, "Orrin"},  {5, kAnyRevision, DeviceClass::Quen, "Quen"},
+    {6, kAnyRevision, DeviceClass::Pell, "Pell"},    {9, kAnyRevision, DeviceClass::Velk, "Velk"},
+    {10, kAnyRevision, DeviceClass::Dorna, "Dorna"},
 };
 
-constexpr ClassRow RavikRow = {0, AnyRevision, DeviceClass::Ravik, "Ravik"};
-constexpr ClassRow UnknownRow = {0, AnyRevision, DeviceClass::Unknown, ""};
+constexpr ClassRow kRavikRow = {0, kAnyRevision, DeviceClass::Ravik, "Ravik"};
+constexpr ClassRow kUnknownRow = {0, kAnyRevision, DeviceClass::Unknown, ""};
 
 std::uint32_t ClassField(std::uint32_t identification) {
     return (identification >> 16) & 0xFF;
@@ -36,12 +36,12 @@ std::uint32_t ClassField(std::uint32_t identification) {
 // for nothing is known of how that revision wants to be handled.
 const ClassRow& FindClass(std::uint32_t classField, std::uint32_t majorRevision) {
     bool classKnown = false;
-    for (const ClassRow& row : ClassRows) {
+    for (const ClassRow& row : kClassRows) {
         if (row.classField != classField) continue;
         classKnown = true;
-        if (row.majorRevision == AnyRevision || row.majorRevision == majorRevision) return row;
+        if (row.majorRevision == kAnyRevision || row.majorRevision == majorRevision) return row;
     }
-    return classKnown ? UnknownRow : RavikRow;
+    return classKnown ? kUnknownRow : kRavikRow;
 }
 
 }  // namespace

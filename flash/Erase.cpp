@@ -14,12 +14,12 @@
 namespace {
 
 // The flash address register must point into the upper bank when a larger device is erased whole.
-constexpr std::uint32_t UpperBank = 0x20000;
+constexpr std::uint32_t kUpperBank = 0x20000;
 
-constexpr int MassErasePolls = 500;
-constexpr std::uint32_t MassErasePauseMs = 10;
-constexpr int SectorErasePolls = 200;
-constexpr std::uint32_t SectorErasePauseMs = 5;
+constexpr int kMassErasePolls = 500;
+constexpr std::uint32_t kMassErasePauseMs = 10;
+constexpr int kSectorErasePolls = 200;
+constexpr std::uint32_t kSectorErasePauseMs = 5;
 
 // Mesk devices erase whole only when the block registers beyond the end of flash are clear. Where
 // the flash ends inside a register's blocks, the lower half of block register 0 is written there.
@@ -29,7 +29,7 @@ struct FlashBlockRow {
     std::uint32_t halved;         ///< receives the lower half; 0 for none
 };
 
-constexpr FlashBlockRow FlashBlockRows[] = {
+constexpr FlashBlockRow kFlashBlockRows[] = {
     {0x08000, Register::FlashBlock1, Register::FlashBlock0},
     {0x10000, Register::FlashBlock1, 0},
     {0x18000, Register::FlashBlock2, Register::FlashBlock1},
@@ -65,7 +65,7 @@ bool FlashCorvane::EraseAsSelected() {
         if (VerboseMode() != 0) {
             Host().ShowMessageText("Performing Mass Erase on Flash memory");
         }
-        if (p_mFlashSize > UpperBank) Host().WriteWord(Register::FlashAddress, UpperBank);
+        if (p_mFlashSize > kUpperBank) Host().WriteWord(Register::FlashAddress, kUpperBank);
         return MassErase();
     }
     if (type == Choice::ByAddressRange) {
@@ -87,8 +87,8 @@ bool FlashCorvane::MassErase() {
     }
 
     Host().WriteWord(Register::FlashCommand, KeyedCommand(FlashCommand::EraseAll));
-    ThrowOnError(p_mHost->Sleep(MassErasePauseMs));
-    if (!EraseFinished(FlashCommand::EraseAll, MassErasePolls, MassErasePauseMs)) {
+    ThrowOnError(p_mHost->Sleep(kMassErasePauseMs));
+    if (!EraseFinished(FlashCommand::EraseAll, kMassErasePolls, kMassErasePauseMs)) {
         Host().ShowErrorText("Flash Programmer: Erasing all of the flash contents failed!");
         TRACE(Result, "FlashCorvane::MassErase() = false");
         return false;
@@ -100,12 +100,12 @@ bool FlashCorvane::MassErase() {
 }
 
 bool FlashCorvane::PrepareFlashBlocks() {
-    const auto row = std::ranges::find(FlashBlockRows, p_mFlashSize, &FlashBlockRow::flashSize);
-    if (row == std::end(FlashBlockRows)) return false;
+    const auto row = std::ranges::find(kFlashBlockRows, p_mFlashSize, &FlashBlockRow::flashSize);
+    if (row == std::end(kFlashBlockRows)) return false;
 
     const auto writeAndPause = [this](std::uint32_t address, std::uint32_t value) {
         Host().WriteWord(address, value);
-        ThrowOnError(p_mHost->Sleep(MassErasePauseMs));
+        ThrowOnError(p_mHost->Sleep(kMassErasePauseMs));
     };
     for (std::uint32_t address = Register::FlashBlock3; address >= row->lowestCleared;
          address -= 4) {
@@ -161,12 +161,12 @@ bool FlashCorvane::EraseSector(std::uint32_t sector, std::uint32_t keyedCommand)
         TRACE_TEXT(Information, text);
         Host().ShowMessageText(text);
     }
-    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
+    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
     Host().WriteWord(Register::FlashAddress, address);
-    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
+    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
     Host().WriteWord(Register::FlashCommand, keyedCommand);
-    ThrowOnError(p_mHost->Sleep(SectorErasePauseMs));
-    return EraseFinished(FlashCommand::EraseSector, SectorErasePolls, SectorErasePauseMs);
+    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
+    return EraseFinished(FlashCommand::EraseSector, kSectorErasePolls, kSectorErasePauseMs);
 }
 
 bool FlashCorvane::EraseFinished(std::uint32_t command, int polls, std::uint32_t pollIntervalMs) {

@@ -19,12 +19,12 @@
 namespace {
 
 // The loader programs whole blocks of this size.
-constexpr std::uint32_t BlockSize = 128;
-constexpr std::int32_t PollIntervalMs = 100;
+constexpr std::uint32_t kBlockSize = 128;
+constexpr std::int32_t kPollIntervalMs = 100;
 
 // Two levels up from the host's directory; the loader's host side runs on one kind of system.
-constexpr auto LoaderSubdirectory = R"(..\..\merrow\)";
-constexpr auto LoaderFile = "FlashLoaderMerrow.out";
+constexpr auto kLoaderSubdirectory = R"(..\..\merrow\)";
+constexpr auto kLoaderFile = "FlashLoaderMerrow.out";
 
 std::int32_t BudgetMs(std::int32_t seconds) {
     using Limits = std::numeric_limits<std::int32_t>;
@@ -40,7 +40,7 @@ std::uint32_t ParameterBlock(std::uint32_t index) {
 // The loader needs no host call to go on, so this wait is a local one.
 void SleepForPollInterval() {
     using Clock = std::chrono::steady_clock;
-    const auto deadline = Clock::now() + std::chrono::milliseconds(PollIntervalMs);
+    const auto deadline = Clock::now() + std::chrono::milliseconds(kPollIntervalMs);
     while (Clock::now() < deadline)
         std::this_thread::sleep_until(deadline);
 }
@@ -76,10 +76,10 @@ bool FlashCorvane::Program(const std::uint8_t* data, std::uint32_t address, std:
 
 FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::uint32_t address,
                                                std::uint32_t length, std::int16_t page) {
-    const std::uint32_t head = address % BlockSize;
+    const std::uint32_t head = address % kBlockSize;
     const std::uint32_t start = address - head;
     const std::uint64_t total = std::uint64_t{length} + head;
-    const std::uint64_t size = (total + BlockSize - 1) / BlockSize * BlockSize;
+    const std::uint64_t size = (total + kBlockSize - 1) / kBlockSize * kBlockSize;
     const std::size_t pad = size - total;
 
     WidenedImage image{start, std::vector<std::uint8_t>(size)};
@@ -95,8 +95,8 @@ FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::ui
 
 void FlashCorvane::StartLoader() {
     ThrowOnError(p_mHost->HaltTarget());
-    const std::string directory = Host().Directory() + LoaderSubdirectory;
-    ThrowOnError(p_mHost->LoadProgram(LoaderFile, "", directory.c_str()));
+    const std::string directory = Host().Directory() + kLoaderSubdirectory;
+    ThrowOnError(p_mHost->LoadProgram(kLoaderFile, "", directory.c_str()));
     ThrowOnError(p_mHost->RunTarget());
 }
 
@@ -134,7 +134,7 @@ void FlashCorvane::WaitForLoader(std::uint32_t index, std::int32_t& budgetMs) {
     const std::uint32_t status = ParameterBlock(index) + LoaderMemory::StatusOffset;
     while (budgetMs > 0) {
         if (Host().ReadWord(status) != LoaderMemory::ChunkPending) return;
-        budgetMs -= PollIntervalMs;
+        budgetMs -= kPollIntervalMs;
         SleepForPollInterval();
     }
     throw std::runtime_error("Flash programming timed out.");

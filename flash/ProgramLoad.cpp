@@ -9,7 +9,7 @@
 namespace {
 
 // After an erase the controller settles; after programming the loader finishes its last chunk.
-constexpr std::uint32_t SettlingMs = 50;
+constexpr std::uint32_t kSettlingMs = 50;
 
 }  // namespace
 
@@ -27,7 +27,7 @@ bool FlashCorvane::WriteDataToFlash(const std::uint8_t* data, std::uint32_t addr
     const std::uint32_t last = address + length - 1;
     if (!p_mFlashErased) {
         EraseForSection(address, last);
-        ThrowOnError(p_mHost->Sleep(SettlingMs));
+        ThrowOnError(p_mHost->Sleep(kSettlingMs));
     }
     const bool checkFirst = ParseBoolean(Host().GetSetting(Setting::FlashProgramBlankCheckOption));
     if (checkFirst && !BlankCheckByAddress(address, last)) {
@@ -37,7 +37,7 @@ bool FlashCorvane::WriteDataToFlash(const std::uint8_t* data, std::uint32_t addr
     }
 
     const bool programmed = Program(data, address, length, page);
-    ThrowOnError(p_mHost->Sleep(SettlingMs));
+    ThrowOnError(p_mHost->Sleep(kSettlingMs));
     TRACE(Result, "FlashCorvane::WriteDataToFlash() = %u", static_cast<unsigned>(programmed));
     return programmed;
 }

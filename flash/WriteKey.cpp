@@ -6,14 +6,14 @@
 
 namespace {
 
-constexpr std::uint32_t PrimaryWriteKey = 0xA442;
-constexpr std::uint32_t AlternateWriteKey = 0x71D5;
+constexpr std::uint32_t kPrimaryWriteKey = 0xA442;
+constexpr std::uint32_t kAlternateWriteKey = 0x71D5;
 
 // A register that reads as all zeros is not there, so it cannot select the alternate key.
 std::uint32_t WriteKey(std::uint32_t keyConfiguration, std::int32_t classRev) {
     const bool alternate =
         (keyConfiguration & 0x10) == 0 && classRev >= DeviceClass::Quen && keyConfiguration != 0;
-    return alternate ? AlternateWriteKey : PrimaryWriteKey;
+    return alternate ? kAlternateWriteKey : kPrimaryWriteKey;
 }
 
 }  // namespace

@@ -11,7 +11,7 @@
 namespace {
 
 // Six pairs and the five characters between them, whatever these are.
-constexpr std::size_t TextLength = 17;
+constexpr std::size_t kTextLength = 17;
 
 }  // namespace
 
@@ -48,7 +48,7 @@ bool FlashCorvane::ProgramMACAddress(CommitRequests& requests) {
 bool FlashCorvane::ParseMACAddressString(const std::string& text, std::uint32_t& register0,
                                          std::uint32_t& register1) {
     TRACE(Entry, "FlashCorvane::ParseMACAddressString(%s)", text.c_str());
-    if (text.size() != TextLength) {
+    if (text.size() != kTextLength) {
         TRACE(Result, "FlashCorvane::ParseMACAddressString() = false");
         return false;
     }

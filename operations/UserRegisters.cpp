@@ -13,11 +13,11 @@
 
 namespace {
 
-constexpr std::uint32_t RegisterAddresses[] = {Register::UserRegister0, Register::UserRegister1};
+constexpr std::uint32_t kRegisterAddresses[] = {Register::UserRegister0, Register::UserRegister1};
 
 // Selects a user register, and which one, instead of a flash sector.
-constexpr std::uint32_t CommitAddress = 0x80000000;
-constexpr auto CommitTimeLimit = std::chrono::seconds(5);
+constexpr std::uint32_t kCommitAddress = 0x80000000;
+constexpr auto kCommitTimeLimit = std::chrono::seconds(5);
 
 std::string Key(std::uint32_t index, const char* ending) {
     return Setting::FlashUserRegister + ToDecimalText(index) + ending;
@@ -95,17 +95,17 @@ void FlashCorvane::ReadUserRegister(std::uint32_t index, const RegisterValues& v
 
 void FlashCorvane::ProgramUserRegister(std::uint32_t index, CommitRequests& requests) {
     const std::uint32_t value = ParseHex(Host().GetSetting(Key(index, Setting::Input)));
-    Host().WriteWord(RegisterAddresses[index], value);
+    Host().WriteWord(kRegisterAddresses[index], value);
     Host().ShowMessageText("Writing 0x" + ToHexText(value) + " to User Register " +
                            ToDecimalText(index));
     requests[index] = ParseHex(Host().GetSetting(Key(index, Setting::Commit))) == 1;
 }
 
 void FlashCorvane::CommitUserRegister(std::uint32_t index) {
-    Host().WriteWord(Register::FlashAddress, CommitAddress + index);
+    Host().WriteWord(Register::FlashAddress, kCommitAddress + index);
     Host().WriteWord(Register::FlashCommand, KeyedCommand(FlashCommand::CommitUserRegister));
 
-    const auto deadline = std::chrono::steady_clock::now() + CommitTimeLimit;
+    const auto deadline = std::chrono::steady_clock::now() + kCommitTimeLimit;
     while ((Host().ReadWord(Register::FlashCommand) & FlashCommand::CommitUserRegister) != 0) {
         if (std::chrono::steady_clock::now() >= deadline) {
             throw std::runtime_error("User Register commit timed out.");

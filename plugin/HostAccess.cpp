@@ -10,7 +10,7 @@ static_assert(std::endian::native == std::endian::little);
 
 namespace {
 
-constexpr std::int16_t RegisterPage = 1;
+constexpr std::int16_t kRegisterPage = 1;
 
 }  // namespace
 
@@ -29,12 +29,12 @@ void HostAccess::SetSetting(const std::string& name, const std::string& value) c
 
 std::uint32_t HostAccess::ReadWord(std::uint64_t address) const {
     std::uint32_t value = 0;
-    ThrowOnError(p_mHost->ReadMemory(&value, 1, address, RegisterPage, sizeof value));
+    ThrowOnError(p_mHost->ReadMemory(&value, 1, address, kRegisterPage, sizeof value));
     return value;
 }
 
 void HostAccess::WriteWord(std::uint64_t address, std::uint32_t value) const {
-    ThrowOnError(p_mHost->WriteMemory(&value, 1, address, RegisterPage, sizeof value));
+    ThrowOnError(p_mHost->WriteMemory(&value, 1, address, kRegisterPage, sizeof value));
 }
 
 ProgressHandle HostAccess::OpenProgress(const std::string& title) const {

@@ -11,24 +11,24 @@ enum TraceLevel : int {
 };
 
 // The numbers that every line of this library carries before its level.
-inline constexpr int TraceFacility = 11;
-inline constexpr int TraceModule = 3;
+inline constexpr int kTraceFacility = 11;
+inline constexpr int kTraceModule = 3;
 
 // Writes a line for the device object whose member function it stands in. A macro, so that the
 // values are not even computed when nobody is listening, and the compiler checks each format.
-#define TRACE(level, ...)                                                                      \
-    do {                                                                                       \
-        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                              \
-            Logging::LoggerFactory::Instance().Line(p_mInstanceId, TraceFacility, TraceModule, \
-                                                    level, __VA_ARGS__);                       \
-        }                                                                                      \
+#define TRACE(level, ...)                                                                        \
+    do {                                                                                         \
+        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                                \
+            Logging::LoggerFactory::Instance().Line(p_mInstanceId, kTraceFacility, kTraceModule, \
+                                                    level, __VA_ARGS__);                         \
+        }                                                                                        \
     } while (false)
 
 // The same for a finished text, whatever percent signs it has.
-#define TRACE_TEXT(level, text)                                                               \
-    do {                                                                                      \
-        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                             \
-            Logging::LoggerFactory::Instance().PlainLine(p_mInstanceId, TraceFacility,        \
-                                                         TraceModule, level, (text).c_str()); \
-        }                                                                                     \
+#define TRACE_TEXT(level, text)                                                                \
+    do {                                                                                       \
+        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                              \
+            Logging::LoggerFactory::Instance().PlainLine(p_mInstanceId, kTraceFacility,        \
+                                                         kTraceModule, level, (text).c_str()); \
+        }                                                                                      \
     } while (false)

@@ -11,14 +11,14 @@
 
 namespace {
 
-constexpr std::uint8_t ErasedByte = 0xFF;
+constexpr std::uint8_t kErasedByte = 0xFF;
 
 // The offset of the first byte that is not erased, or count. A chunk whose first byte is erased
 // and that equals itself one byte further on is erased throughout, which memcmp tells fastest.
 std::uint32_t FirstNotErased(const std::uint8_t* bytes, std::uint32_t count) {
-    if (bytes[0] == ErasedByte && std::memcmp(bytes, bytes + 1, count - 1) == 0) return count;
+    if (bytes[0] == kErasedByte && std::memcmp(bytes, bytes + 1, count - 1) == 0) return count;
     const auto* found =
-        std::find_if(bytes, bytes + count, [](std::uint8_t byte) { return byte != ErasedByte; });
+        std::find_if(bytes, bytes + count, [](std::uint8_t byte) { return byte != kErasedByte; });
     return static_cast<std::uint32_t>(found - bytes);
 }
 

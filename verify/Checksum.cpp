@@ -10,7 +10,7 @@
 
 namespace {
 
-constexpr std::uint32_t Polynomial = 0x04C11DB7;
+constexpr std::uint32_t kPolynomial = 0x04C11DB7;
 
 constexpr std::uint32_t ReverseBits(std::uint32_t value) {
     std::uint32_t reversed = 0;
@@ -77,8 +77,8 @@ bool FlashCorvane::CalculateChecksumByAddress(std::uint32_t start, std::uint32_t
 }
 
 void FlashCorvane::InitCRC32LUT() {
-    TRACE(Entry, "FlashCorvane::InitCRC32LUT(0x%08X)", Polynomial);
-    constexpr std::uint32_t reversed = ReverseBits(Polynomial);
+    TRACE(Entry, "FlashCorvane::InitCRC32LUT(0x%08X)", kPolynomial);
+    constexpr std::uint32_t reversed = ReverseBits(kPolynomial);
     for (std::uint32_t i = 0; i < p_mCRC32LUT.size(); ++i) {
         std::uint32_t entry = i;
         for (int bit = 0; bit < 8; ++bit) {

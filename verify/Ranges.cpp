@@ -12,9 +12,9 @@
 namespace {
 
 // What one host read may ask for, a little short of 32 KiB, and the buffer that hosts expect it in.
-constexpr std::uint32_t ChunkSize = 32752;
-constexpr std::size_t ReadBufferSize = 131008;
-constexpr std::int16_t FlashPage = 0;
+constexpr std::uint32_t kChunkSize = 32752;
+constexpr std::size_t kReadBufferSize = 131008;
+constexpr std::int16_t kFlashPage = 0;
 
 }  // namespace
 
@@ -38,15 +38,15 @@ bool FlashCorvane::RunOnSelectedRange(const std::string& operationName,
 bool FlashCorvane::ReadRangeInChunks(ProgressHandle& /*progress*/, const std::string& text,
                                      std::uint32_t start, std::uint32_t end,
                                      const ChunkConsumer& consumer) {
-    std::vector<std::uint8_t> buffer(ReadBufferSize);
+    std::vector<std::uint8_t> buffer(kReadBufferSize);
     const std::uint32_t total = end - start + 1;
     std::uint32_t address = start;
     for (std::uint32_t remaining = total; remaining > 0;) {
         // In 32 bits, as hosts know it: above 40 MiB the product wraps and the percentage jumps.
         const std::uint32_t percent = (total - remaining) * 100 / total;
         ThrowOnError(p_mHost->UpdateProgress(percent, text.c_str()));
-        const std::uint32_t count = std::min(remaining, ChunkSize);
-        ThrowOnError(p_mHost->ReadMemory(buffer.data(), count, address, FlashPage, 1));
+        const std::uint32_t count = std::min(remaining, kChunkSize);
+        ThrowOnError(p_mHost->ReadMemory(buffer.data(), count, address, kFlashPage, 1));
         if (!consumer(buffer, count, address)) return false;
         address += count;
         remaining -= count;
