@@ -11,8 +11,8 @@
 namespace {
 
 namespace ResetMode {
-constexpr std::int32_t TargetWillRun = 1;
-constexpr std::int32_t LoadComplete = 2;
+constexpr std::int32_t ResetWatchdogs = 1;
+constexpr std::int32_t Checksum = 2;
 constexpr std::int32_t KeepErased = 4;
 }  // namespace ResetMode
 
@@ -27,13 +27,13 @@ void FlashCorvane::ResetSettings(std::int32_t mode) {
     p_mErasedSectors.clear();
 
     const bool resetTarget = ParseBoolean(Host().GetSetting(Setting::FlashResetSetting));
-    if (resetTarget && mode != ResetMode::TargetWillRun) SystemResetAndHalt();
+    if (resetTarget && mode != ResetMode::ResetWatchdogs) SystemResetAndHalt();
 
-    if (mode == ResetMode::LoadComplete) {
+    if (mode == ResetMode::Checksum) {
         if (ParseBoolean(Host().GetSetting(Setting::FlashProgramCRCOption))) {
             CalculateChecksumByAddress(0, p_mFlashSize - 1);
         }
-    } else if (mode == ResetMode::TargetWillRun) {
+    } else if (mode == ResetMode::ResetWatchdogs) {
         ResetWatchdogs();
         Host().SetSetting(Setting::FlashChecksumValue, "--");
     }

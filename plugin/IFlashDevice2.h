@@ -65,11 +65,11 @@ class IFlashDevice2 {
     // erasing and blank-checking first as the host's settings say. page is the host's number of
     // the target's memory space and is passed through to its memory slots. data belongs to the
     // caller and is not used after the call; it may be null when length is 0, which loads and
-    // starts the flash loader but writes nothing. The 128-byte blocks that the section begins and
-    // ends in are completed with what the target holds. The range is not compared with the size of
-    // the flash. Call ResetSettings before the first section of each image. Success of the call
-    // does not tell that the section was written: a failure that was shown to the user through
-    // IFlashHost::ShowError returns null here.
+    // starts the flash loader and at most rewrites the block at address with what it holds. The
+    // 128-byte blocks that the section begins and ends in are completed with what the target
+    // holds. The range is not compared with the size of the flash. Call ResetSettings before the
+    // first section of each image. Success of the call does not tell that the section was written:
+    // a failure that was shown to the user through IFlashHost::ShowError returns null here.
     // [device implements; any time after creation]
     //
     //     WriteDataToFlash(const unsigned char* data, uint64_t address, uint32_t length,
@@ -100,16 +100,16 @@ class IFlashDevice2 {
     // [device implements; any time after creation]
     virtual const char* PerformOperation(const char* operation) = 0;
 
-    // Slot 6. Starts a new program load: forgets what has been erased, allows one target reset,
-    // and resets the target when the setting "FlashResetSetting" is on. mode says at which event
-    // of the host this happens:
-    //     0   a new load or operation
-    //     1   the target is about to run: no target reset; the watchdogs are reset and
-    //         "FlashChecksumValue" becomes "--"
-    //     2   the load is complete: calculates the CRC-32 of the whole flash when
-    //         "FlashProgramCRCOption" is on
-    //     4   as 0, but an erase already done for this load counts as done
-    // Any other mode is as 0. When the call fails, the load has been reset all the same.
+    // Slot 6. Resets the state of a program load: one target reset is allowed again, no sector
+    // counts as erased, and the load's erase is to be done again. Resets the target at once when
+    // the setting "FlashResetSetting" is on. mode changes that, or adds to it:
+    //     0   nothing more; for the start of a load
+    //     1   no target reset; the watchdogs are reset and "FlashChecksumValue" becomes "--"
+    //     2   calculates the CRC-32 of the whole flash when "FlashProgramCRCOption" is on; for
+    //         the end of a load
+    //     4   a load's erase that has been done still counts as done
+    // Any other mode is as 0. When the call fails, the state of the load has been reset all the
+    // same.
     // [device implements; any time after creation]
     virtual const char* ResetSettings(int32_t mode) = 0;
 
