@@ -1,0 +1,141 @@
+// See CommandLine.h. The parsing itself is CLI11's, fed from the tables of commands and options.
+
+#include "host/CommandLine.h"
+
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+#include <memory>
+#include <type_traits>
+
+#include "host/Errors.h"
+#include "host/Help.h"
+#include "host/ManPage.h"
+#include "host/Words.h"
+
+namespace host {
+
+namespace {
+
+/// Texts are taken as they come, an empty one too, and the last of several counts.
+template <typename Text>
+CLI::Option* DefineText(CLI::App& app, const OptionSpec& spec, Text& target) {
+    CLI::Option* option = app.add_option_function<std::string>(
+        spec.names, [&target](const std::string& text) { target = text; });
+    return option->multi_option_policy(CLI::MultiOptionPolicy::TakeLast);
+}
+
+CLI::Option* DefineTexts(CLI::App& app, const OptionSpec& spec, std::vector<std::string>& target) {
+    return app.add_option(spec.names, target)->allow_extra_args(spec.IsArgument());
+}
+
+CLI::Option* DefineMember(CLI::App& app, const OptionSpec& spec, Options& options) {
+    return std::visit(
+        [&](auto member) -> CLI::Option* {
+            auto& target = options.*member;
+            using Target = std::remove_reference_t<decltype(target)>;
+            if constexpr (std::is_same_v<Target, bool> || std::is_same_v<Target, int>)
+                return app.add_flag(spec.names, target);
+            else if constexpr (std::is_same_v<Target, std::vector<std::string>>)
+                return DefineTexts(app, spec, target);
+            else
+                return DefineText(app, spec, target);
+        },
+        spec.member);
+}
+
+void Define(CLI::App& app, const OptionSpec& spec, Options& options) {
+    CLI::Option* option = DefineMember(app, spec, options);
+    option->required(spec.required);
+    if (!spec.choices.empty()) option->check(CLI::IsMember(spec.choices));
+    if (*spec.environment != '\0') option->envname(spec.environment);
+}
+
+/// The app of a command; for one of two words, below the app of the first word.
+CLI::App* AddCommand(CLI::App& app, const CommandSpec& spec) {
+    const std::string name = spec.name;
+    const auto blank = name.find(' ');
+    CLI::App* parent = &app;
+    if (blank != std::string::npos) {
+        const std::string word = name.substr(0, blank);
+        const auto known =
+            app.get_subcommands([&](CLI::App* group) { return group->get_name() == word; });
+        parent = known.empty() ? app.add_subcommand(word) : known.front();
+        parent->fallthrough()->require_subcommand(1);
+    }
+    return parent->add_subcommand(name.substr(blank + 1))->fallthrough();
+}
+
+/// The words of the command that the parser has come to.
+std::string CommandWords(const CLI::App& app) {
+    const auto chosen = app.get_subcommands();
+    if (chosen.empty()) return "";
+    const std::string rest = CommandWords(*chosen.front());
+    return chosen.front()->get_name() + (rest.empty() ? "" : " ") + rest;
+}
+
+struct Parser {
+    CLI::App app;
+    Options options;
+    const CommandSpec* chosen = nullptr;
+    bool man = false;
+
+    Parser() {
+        app.set_version_flag("--version", std::string("corvane-flash " CORVANE_FLASH_VERSION));
+        app.add_flag("--man", man);
+        app.require_subcommand(0, 1);
+        for (const OptionSpec& spec : GlobalOptions())
+            Define(app, spec, options);
+        for (const CommandSpec& spec : AllCommands()) {
+            CLI::App* command = AddCommand(app, spec);
+            for (const OptionSpec& option : spec.options)
+                Define(*command, option, options);
+            command->callback([this, &spec] { chosen = &spec; });
+        }
+    }
+};
+
+/// CLI11 speaks in several lines and of subcommands; people want one line and commands.
+std::string OneLine(const CLI::ParseError& error, const std::string& command) {
+    const bool surplus = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+    const auto below = SecondWords(command);
+    if (!below.empty()) return fmt::format("{} what? {}", command, fmt::join(below, " or "));
+    std::string text = error.what();
+    std::replace(text.begin(), text.end(), '\n', ' ');
+    if (surplus && command.empty())
+        return "unknown command or option" + text.substr(text.find(':'));
+    return text;
+}
+
+[[noreturn]] void Refuse(const CLI::ParseError& error, const std::string& command) {
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("{}; 'corvane-flash {}{}--help' shows what there is",
+                              OneLine(error, command), command, command.empty() ? "" : " "));
+}
+
+}  // namespace
+
+ParsedLine ParseCommandLine(std::vector<std::string> words) {
+    Parser parser;
+    std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
+    try {
+        parser.app.parse(words);
+    } catch (const CLI::CallForHelp&) {
+        return {{}, nullptr, HelpText(CommandWords(parser.app))};
+    } catch (const CLI::CallForVersion& version) {
+        return {{}, nullptr, std::string(version.what()) + "\n"};
+    } catch (const CLI::ParseError& error) {
+        Refuse(error, CommandWords(parser.app));
+    }
+    if (parser.man) return {{}, nullptr, ManPage()};
+    if (parser.chosen == nullptr)
+        throw Failure(ExitStatus::WrongUsage,
+                      "which command? 'corvane-flash --help' lists them, for example "
+                      "'corvane-flash program firmware.elf'");
+    parser.options.command = parser.chosen->name;
+    return {parser.options, parser.chosen, ""};
+}
+
+}  // namespace host

@@ -1,0 +1,21 @@
+// From the words of a command line to a plain Options value.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "host/CommandTable.h"
+
+namespace host {
+
+struct ParsedLine {
+    Options options;
+    const CommandSpec* command = nullptr;  ///< null: `text` is all that was asked for
+    std::string text;                      ///< help, version or man page
+};
+
+/// `words` without the program's name. Failure (WrongUsage) for a line that makes no sense.
+ParsedLine ParseCommandLine(std::vector<std::string> words);
+
+}  // namespace host

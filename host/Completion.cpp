@@ -1,0 +1,217 @@
+// See Completion.h. bash and zsh share the part that finds out what may stand at the cursor: it is
+// written in what both understand. fish has one line for each word that it offers.
+
+#include "host/Completion.h"
+
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+
+#include <string_view>
+#include <vector>
+
+#include "host/CommandTable.h"
+#include "host/SettingCatalogue.h"
+#include "host/Words.h"
+#include "target/DeviceOptions.h"
+
+namespace host {
+
+namespace {
+
+/// What a shell offers for a value: words, and whether files as well.
+struct Offer {
+    std::vector<std::string> words;
+    bool files = false;
+};
+
+Offer OfferFor(const OptionSpec& spec) {
+    Offer offer{spec.choices, spec.offers == Offers::Files};
+    if (spec.offers == Offers::Devices) offer.words = target::DeviceClassNames();
+    const bool assignments = spec.offers == Offers::SettingAssignments;
+    if (assignments || spec.offers == Offers::Settings)
+        for (const SettingInfo& info : SettingCatalogue())
+            if (!assignments || info.form != SettingForm::Published)
+                offer.words.push_back(info.key + std::string(assignments ? "=" : ""));
+    return offer;
+}
+
+/// All options of the tool, each once: several commands share some of them.
+std::vector<OptionSpec> OptionsWithValue() {
+    std::vector<OptionSpec> all;
+    const auto add = [&](const std::vector<OptionSpec>& specs) {
+        for (const OptionSpec& spec : specs) {
+            bool known = spec.IsArgument() || spec.IsSwitch();
+            for (const OptionSpec& other : all)
+                known = known || std::string_view(other.names) == spec.names;
+            if (!known) all.push_back(spec);
+        }
+    };
+    add(GlobalOptions());
+    for (const CommandSpec& command : AllCommands())
+        add(command.options);
+    return all;
+}
+
+std::string Assignments(const Offer& offer) {
+    return fmt::format("values='{}'{}", fmt::join(offer.words, " "),
+                       offer.files ? "; files=1" : "");
+}
+
+/// What may follow a command: its options, and what its arguments take.
+Offer OfferAfter(const CommandSpec& command) {
+    Offer offer;
+    for (const OptionSpec& spec : command.options) {
+        const Offer argument = spec.IsArgument() ? OfferFor(spec) : Offer{SplitNames(spec), false};
+        offer.words.insert(offer.words.end(), argument.words.begin(), argument.words.end());
+        offer.files = offer.files || argument.files;
+    }
+    offer.words.emplace_back("--help");
+    return offer;
+}
+
+/// The words before the cursor that name the command, in shell patterns: 'mac read' and its like.
+std::string CommandPatterns() {
+    std::vector<std::string> patterns;
+    for (const std::string& word : FirstWords())
+        patterns.push_back("' " + word + "'");
+    for (const CommandSpec& command : AllCommands())
+        if (std::string_view(command.name).find(' ') != std::string_view::npos)
+            patterns.push_back(fmt::format("'{}'", command.name));
+    return fmt::format("{}", fmt::join(patterns, "|"));
+}
+
+std::string SharedBody() {
+    std::vector<std::string> valued;
+    std::string values;
+    for (const OptionSpec& spec : OptionsWithValue()) {
+        valued.emplace_back(spec.names);
+        values += fmt::format("    {}) {} ;;\n", spec.names, Assignments(OfferFor(spec)));
+    }
+    Offer first{FirstWords(), false};
+    for (const OptionSpec& spec : GlobalOptions())
+        for (const std::string& name : SplitNames(spec))
+            first.words.push_back(name);
+    std::string commands = fmt::format("      '') {} ;;\n", Assignments(first));
+    for (const std::string& word : FirstWords())
+        if (const auto second = SecondWords(word); !second.empty())
+            commands += fmt::format("      '{}') {} ;;\n", word, Assignments({second, false}));
+    for (const CommandSpec& command : AllCommands())
+        commands +=
+            fmt::format("      '{}') {} ;;\n", command.name, Assignments(OfferAfter(command)));
+    return fmt::format(
+        "  local word='' skip='' command='' values='' files='' option=''\n"
+        "  for word in \"${{preceding[@]}}\"; do\n"
+        "    if [ -n \"$skip\" ]; then skip=''; continue; fi\n"
+        "    case \"$word\" in\n"
+        "      {0}) skip=1 ;;\n"
+        "      -*) ;;\n"
+        "      *) case \"$command $word\" in {1}) command=\"${{command:+$command }}$word\" ;; esac "
+        ";;\n"
+        "    esac\n"
+        "  done\n"
+        "  case \"$previous\" in\n{2}"
+        "    *) case \"$command\" in\n{3}      esac ;;\n"
+        "  esac\n"
+        "  case \"$previous:$current\" in\n"
+        "    --sim:*,*) values=''\n"
+        "      for option in {4}; do values=\"$values ${{current%,*}},$option=\"; done ;;\n"
+        "  esac\n",
+        fmt::join(valued, "|"), CommandPatterns(), values, commands,
+        fmt::join(target::DeviceOptionNames(), " "));
+}
+
+std::string BashScript() {
+    return "# bash completion for corvane-flash; generated by 'corvane-flash completion bash'\n"
+           "_corvane_flash() {\n"
+           "  local current=\"${COMP_WORDS[COMP_CWORD]}\" "
+           "previous=\"${COMP_WORDS[COMP_CWORD-1]}\"\n"
+           "  local preceding=(\"${COMP_WORDS[@]:1:COMP_CWORD-1}\")\n" +
+           SharedBody() +
+           "  mapfile -t COMPREPLY < <(compgen -W \"$values\" -- \"$current\")\n"
+           "  if [ -n \"$files\" ]; then\n"
+           "    compopt -o filenames\n"
+           "    mapfile -t -O \"${#COMPREPLY[@]}\" COMPREPLY < <(compgen -f -- \"$current\")\n"
+           "  fi\n"
+           "  case \"${COMPREPLY[0]}\" in *=) compopt -o nospace ;; esac\n"
+           "}\n"
+           "complete -F _corvane_flash corvane-flash\n";
+}
+
+std::string ZshScript() {
+    return "#compdef corvane-flash\n"
+           "# zsh completion for corvane-flash; generated by 'corvane-flash completion zsh'\n"
+           "_corvane_flash() {\n"
+           "  local current=\"$words[CURRENT]\" previous=\"$words[CURRENT-1]\"\n"
+           "  local -a preceding=(\"${(@)words[2,CURRENT-1]}\") all=()\n" +
+           SharedBody() +
+           "  all=(${=values})\n"
+           "  compadd -- ${all:#*=}\n"
+           "  compadd -S '' -- ${(M)all:#*=}\n"
+           "  [ -n \"$files\" ] && _files\n"
+           "  return 0\n"
+           "}\n"
+           "if [ \"$funcstack[1]\" = _corvane_flash ]; then _corvane_flash \"$@\"\n"
+           "else compdef _corvane_flash corvane-flash; fi\n";
+}
+
+std::string FishQuoted(std::string_view text) {
+    std::string quoted;
+    for (const char c : text)
+        quoted += c == '\'' || c == '\\' ? std::string{'\\', c} : std::string{c};
+    return "'" + quoted + "'";
+}
+
+/// When a line of fish's applies: behind the words of this command, and no other's.
+std::string FishCondition(const CommandSpec& command) {
+    const std::string name = command.name;
+    const auto blank = name.find(' ');
+    const std::string seen = "__fish_seen_subcommand_from ";
+    if (blank == std::string::npos) return seen + name + "; and not " + seen + "mac register";
+    return seen + name.substr(0, blank) + "; and " + seen + name.substr(blank + 1);
+}
+
+std::string FishLine(const std::string& condition, const OptionSpec& spec) {
+    const Offer offer = OfferFor(spec);
+    std::string line = "complete -c corvane-flash";
+    if (!condition.empty()) line += " -n " + FishQuoted(condition);
+    if (!spec.IsArgument())
+        for (const std::string& name : SplitNames(spec))
+            line += name.starts_with("--") ? " -l " + name.substr(2) : " -s " + name.substr(1);
+    if (offer.files)
+        line += spec.IsArgument() ? " -F" : " -r -F";
+    else if (!spec.IsArgument() && !spec.IsSwitch())
+        line += " -x";
+    if (!offer.words.empty())
+        line += fmt::format(" -a {}", FishQuoted(fmt::format("{}", fmt::join(offer.words, " "))));
+    return line + " -d " + FishQuoted(spec.help) + "\n";
+}
+
+std::string FishScript() {
+    std::string script =
+        "# fish completion for corvane-flash; generated by 'corvane-flash completion fish'\n"
+        "complete -c corvane-flash -f\n";
+    for (const OptionSpec& spec : GlobalOptions())
+        script += FishLine("", spec);
+    for (const std::string& word : FirstWords()) {
+        script += fmt::format("complete -c corvane-flash -n __fish_use_subcommand -a {} -d {}\n",
+                              word, FishQuoted(FirstWordHelp(word)));
+        if (const auto second = SecondWords(word); !second.empty())
+            script += fmt::format(
+                "complete -c corvane-flash -n '__fish_seen_subcommand_from {}; and not "
+                "__fish_seen_subcommand_from {}' -a '{}'\n",
+                word, fmt::join(second, " "), fmt::join(second, " "));
+    }
+    for (const CommandSpec& command : AllCommands())
+        for (const OptionSpec& spec : command.options)
+            script += FishLine(FishCondition(command), spec);
+    return script;
+}
+
+}  // namespace
+
+std::string CompletionScript(const std::string& shell) {
+    if (shell == "bash") return BashScript();
+    return shell == "zsh" ? ZshScript() : FishScript();
+}
+
+}  // namespace host

@@ -1,0 +1,148 @@
+// See Help.h.
+
+#include "host/Help.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <sstream>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "host/CommandTable.h"
+#include "host/Words.h"
+#include "target/DeviceOptions.h"
+
+namespace host {
+
+namespace {
+
+constexpr std::size_t kLineColumns = 79;
+constexpr std::size_t kTermColumns = 24;
+
+constexpr char kNotes[] =
+    "Addresses are hexadecimal, with or without 0x; ranges include both ends.\n"
+    "\n"
+    "Exit status: 0 done; 1 the device or the plug-in reported a failure; 2 wrong\n"
+    "command line; 3 a file is missing, unreadable or wrong; 4 the plug-in or the\n"
+    "target can't be reached; 5 the flash differs or isn't blank; 130 interrupted.\n";
+
+/// Words from `text`, wrapped so that all lines but the first are indented.
+std::string Wrap(std::string_view text, std::size_t column, std::size_t indent) {
+    std::string lines;
+    while (!text.empty()) {
+        const std::string_view word = text.substr(0, text.find(' '));
+        const bool first = column <= indent;
+        if (!first && column + 1 + word.size() > kLineColumns) {
+            lines += "\n" + std::string(indent, ' ');
+            column = indent;
+        } else if (!first) {
+            lines += ' ';
+            ++column;
+        }
+        lines += word;
+        column += word.size();
+        text.remove_prefix(std::min(text.size(), word.size() + 1));
+    }
+    return lines + "\n";
+}
+
+/// A term and what it means: beside it, or below one that is too long.
+std::string Entry(const std::string& term, std::string_view text) {
+    std::string line = "  " + term;
+    if (line.size() + 1 < kTermColumns)
+        line.append(kTermColumns - line.size(), ' ');
+    else
+        line += "\n" + std::string(kTermColumns, ' ');
+    return line + Wrap(text, kTermColumns, kTermColumns);
+}
+
+std::string OptionEntry(const OptionSpec& spec) {
+    const std::vector<std::string> names = SplitNames(spec);
+    std::string term = names.front();
+    if (names.size() > 1)
+        term += ", " + names.back();
+    else if (!spec.IsArgument())
+        term.insert(0, 4, ' ');
+    std::string help = spec.help;
+    if (*spec.value != '\0') term += fmt::format(" {}", spec.value);
+    if (*spec.environment != '\0') help += fmt::format(" [environment: {}]", spec.environment);
+    return Entry(term, help);
+}
+
+std::string CommandHelp(const CommandSpec& command) {
+    std::string usage = fmt::format("Usage: corvane-flash {}", command.name);
+    std::string arguments;
+    std::string options;
+    for (const OptionSpec& spec : command.options) {
+        (spec.IsArgument() ? arguments : options) += OptionEntry(spec);
+        if (!spec.IsArgument()) continue;
+        const bool several =
+            std::holds_alternative<std::vector<std::string> Options::*>(spec.member);
+        usage += fmt::format(fmt::runtime(spec.required ? " {}{}" : " [{}{}]"), spec.names,
+                             several ? "..." : "");
+    }
+    if (!options.empty()) usage += " [OPTION]...";
+    std::string text = fmt::format("{}.\n\n{}\n", command.help, usage);
+    if (*command.details != '\0') text += "\n" + Wrap(command.details, 0, 0);
+    if (!arguments.empty()) text += "\nArguments:\n" + arguments;
+    if (!options.empty()) text += "\nOptions:\n" + options;
+    return text + fmt::format("\nExample:\n{}\n\nOptions of every command: corvane-flash --help\n",
+                              command.example);
+}
+
+std::string GroupText(const std::string& word) {
+    std::string text =
+        fmt::format("{}.\n\nUsage: corvane-flash {} COMMAND\n\nCommands:\n", GroupHelp(word), word);
+    for (const CommandSpec& command : AllCommands())
+        if (std::string_view(command.name).starts_with(word + " "))
+            text += Entry(command.name, command.help);
+    return text + fmt::format("\n'corvane-flash {} COMMAND --help' tells more.\n", word);
+}
+
+/// The target's own help, wrapped like the rest: headings, and lines of a name and a text.
+std::string DevicesHelp() {
+    std::istringstream lines(target::DeviceOptionsHelp());
+    std::string text;
+    for (std::string line; std::getline(lines, line);) {
+        const std::size_t name = line.find_first_not_of(' ');
+        const std::size_t blanks = name == 0 ? std::string::npos : line.find("  ", name);
+        if (blanks == std::string::npos)
+            text += "\n" + line + "\n";
+        else
+            text += Entry(line.substr(name, blanks - name),
+                          std::string_view(line).substr(line.find_first_not_of(' ', blanks)));
+    }
+    return text;
+}
+
+std::string ToolHelp() {
+    std::string text =
+        "Programs, verifies and erases the flash of Corvane microcontrollers.\n\n"
+        "Usage: corvane-flash [OPTION]... COMMAND [ARGUMENT]...\n\nCommands:\n";
+    for (const std::string& word : FirstWords())
+        text += Entry(word, FirstWordHelp(word));
+    text += "\nOptions, before or behind the command:\n";
+    for (const OptionSpec& spec : GlobalOptions())
+        text += OptionEntry(spec);
+    text += Entry("-h, --help", "Show this help, or that of the command");
+    text += Entry("    --version", "Show the version");
+    return text +
+           "\nExamples:\n"
+           "  corvane-flash program firmware.elf\n"
+           "  corvane-flash --sim quen,flash=256K --sim-file board.sim program app.hex\n"
+           "  corvane-flash program --help\n\n" +
+           kNotes + DevicesHelp();
+}
+
+}  // namespace
+
+std::string HelpText(const std::string& word) {
+    if (word.empty()) return ToolHelp();
+    for (const CommandSpec& command : AllCommands())
+        if (word == command.name) return CommandHelp(command);
+    return GroupText(word);
+}
+
+}  // namespace host

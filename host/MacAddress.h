@@ -1,0 +1,32 @@
+// A device's MAC address: its texts in all the forms that people write, and the two user registers
+// that hold it, three bytes each, the first byte lowest.
+
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace host {
+
+struct MacAddress {
+    std::array<std::uint8_t, 6> bytes{};
+
+    bool operator==(const MacAddress&) const = default;
+
+    /// "00-1a-b6-01-02-03": the only form that the plug-in programs.
+    std::string Text() const;
+
+    /// What user register 0 or 1 holds for this address.
+    std::uint32_t Register(unsigned index) const;
+
+    /// Why no device should have this address, or an empty text.
+    std::string Objection() const;
+};
+
+/// Six bytes separated by '-' or ':', each of one or two hexadecimal digits, or twelve digits
+/// without separators. Nothing for any other text.
+std::optional<MacAddress> ParseMacAddress(const std::string& text);
+
+}  // namespace host

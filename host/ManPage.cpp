@@ -1,0 +1,97 @@
+// See ManPage.h.
+
+#include "host/ManPage.h"
+
+#include <fmt/format.h>
+
+#include <string_view>
+
+#include "host/CommandTable.h"
+#include "host/Words.h"
+#include "target/DeviceOptions.h"
+
+namespace host {
+
+namespace {
+
+/// Text as roff prints it: a hyphen stays a hyphen, and no line is taken for a request.
+std::string Roff(std::string_view text) {
+    std::string escaped;
+    bool lineStarts = true;
+    for (const char c : text) {
+        if (lineStarts && (c == '.' || c == '\'')) escaped += "\\&";
+        if (c == '-') escaped += '\\';
+        escaped += c == '\\' ? std::string("\\e") : std::string{c};
+        lineStarts = c == '\n';
+    }
+    return escaped;
+}
+
+std::string Option(const OptionSpec& spec) {
+    std::string line;
+    for (const std::string& name : SplitNames(spec))
+        line += fmt::format("{}\\fB{}\\fR", line.empty() ? "" : ", ", Roff(name));
+    if (*spec.value != '\0') line += fmt::format(" \\fI{}\\fR", Roff(spec.value));
+    const std::string environment =
+        *spec.environment == '\0' ? "" : fmt::format(" Environment: {}.", spec.environment);
+    return fmt::format(".TP\n{}\n{}.{}\n", line, Roff(spec.help), environment);
+}
+
+std::string Synopsis(const CommandSpec& command) {
+    std::string line = fmt::format("\\fBcorvane\\-flash {}\\fR", Roff(command.name));
+    for (const OptionSpec& spec : command.options)
+        if (spec.IsArgument()) line += fmt::format(" \\fI{}\\fR", Roff(spec.names));
+    return line;
+}
+
+std::string Command(const CommandSpec& command) {
+    std::string text = fmt::format(".SS {}\n{}.\n", Synopsis(command), Roff(command.help));
+    if (*command.details != '\0') text += Roff(command.details) + "\n";
+    for (const OptionSpec& spec : command.options)
+        text += Option(spec);
+    return text + fmt::format(".PP\nExample:\n.PP\n.nf\n{}\n.fi\n", Roff(command.example));
+}
+
+constexpr char kHead[] =
+    ".TH CORVANE\\-FLASH 1 \"\" \"corvane\\-flash " CORVANE_FLASH_VERSION
+    "\" \"User Commands\"\n"
+    ".SH NAME\ncorvane\\-flash \\- program the flash of Corvane microcontrollers\n"
+    ".SH SYNOPSIS\n\\fBcorvane\\-flash\\fR [\\fIOPTION\\fR]... \\fICOMMAND\\fR "
+    "[\\fIARGUMENT\\fR]...\n"
+    ".SH DESCRIPTION\nPrograms, verifies and erases flash through the flash plug\\-in, which it "
+    "loads as a debugger does. Addresses are hexadecimal, with or without 0x; a range A\\-B "
+    "includes both ends. Nothing is ever erased whole unless asked for.\n";
+
+constexpr char kTail[] =
+    ".SH EXIT STATUS\n"
+    ".TP\n0\nDone.\n.TP\n1\nThe device or the plug\\-in reported a failure.\n"
+    ".TP\n2\nThe command line is wrong.\n"
+    ".TP\n3\nAn image or settings file is missing, unreadable or wrong, or can't be written.\n"
+    ".TP\n4\nThe plug\\-in or the target can't be loaded or reached.\n"
+    ".TP\n5\nThe flash differs from what was expected, or isn't blank.\n"
+    ".TP\n130\nInterrupted.\n"
+    ".SH FILES\n"
+    ".TP\n\\fI~/.config/corvane\\-flash/settings.toml\\fR\nYour settings, as lines of the form "
+    "KEY = \"TEXT\". The tool only reads them. XDG_CONFIG_HOME is respected.\n"
+    ".TP\n\\fI~/.config/corvane\\-flash/settings.kept.toml\\fR\nWhat the tool and the plug\\-in "
+    "keep themselves.\n"
+    ".SH ENVIRONMENT\n"
+    ".TP\nCORVANE_SET_\\fIKEY\\fR\nA setting's value, for example "
+    "CORVANE_SET_FlashTimeoutValue.\n"
+    ".TP\nNO_COLOR\nWhen set, nothing is coloured.\n";
+
+}  // namespace
+
+std::string ManPage() {
+    std::string page = kHead;
+    page += ".SH OPTIONS\nEvery command takes them, before or behind its own.\n";
+    for (const OptionSpec& spec : GlobalOptions())
+        page += Option(spec);
+    page += ".SH COMMANDS\n";
+    for (const CommandSpec& command : AllCommands())
+        page += Command(command);
+    page += ".SH SIMULATED DEVICES\n.nf\n" + Roff(target::DeviceOptionsHelp()) + "\n.fi\n";
+    return page + kTail;
+}
+
+}  // namespace host

@@ -1,0 +1,35 @@
+// The settings that the plug-in asks its host for or leaves with it: one table with the key, the
+// meaning, the texts that are accepted and the default.
+
+#pragma once
+
+#include <span>
+#include <string>
+#include <vector>
+
+namespace host {
+
+enum class SettingForm { Switch, Integer, Hex, Seconds, Mac, Choice, Published };
+
+struct SettingInfo {
+    const char* key;
+    SettingForm form;
+    const char* defaultText;
+    const char* meaning;
+    std::vector<const char*> choices = {};  ///< of a Choice
+};
+
+std::span<const SettingInfo> SettingCatalogue();
+
+/// The row of a key, or null.
+const SettingInfo* FindSetting(const std::string& key);
+
+/// The accepted texts, for people: "0 or 1", "hexadecimal, up to ffffffff".
+std::string AcceptedTexts(const SettingInfo& info);
+
+/// The text as the plug-in takes it, a MAC address brought into the one form that it accepts.
+/// Throws std::invalid_argument, with the accepted texts, for a text that the plug-in would refuse
+/// or silently read as something else, and for every text of a setting that only it writes.
+std::string CheckedText(const SettingInfo& info, const std::string& text);
+
+}  // namespace host

@@ -1,0 +1,30 @@
+// The two TOML files of settings: the user's, which people edit and the tool only reads, and the
+// kept one beside it, which the tool writes.
+
+#pragma once
+
+#include <map>
+#include <string>
+
+namespace host {
+
+using SettingTexts = std::map<std::string, std::string>;
+
+struct SettingPaths {
+    std::string user;  ///< empty: no place is known
+    std::string kept;
+    bool userMustExist = false;
+};
+
+/// `chosen` is the file that the command line names. Without one, the user's file lies in
+/// corvane-flash/settings.toml below XDG_CONFIG_HOME or ~/.config.
+SettingPaths FindSettingPaths(const std::string& chosen);
+
+/// Reads and checks a settings file. A missing one is empty unless `mustExist`. Failure (BadFile)
+/// names the file, the line and what to do. The kept file may hold what only the plug-in writes.
+SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept);
+
+/// Writes the kept file, and makes its directory when that is missing. Failure (BadFile).
+void WriteKeptSettings(const std::string& path, const SettingTexts& texts);
+
+}  // namespace host

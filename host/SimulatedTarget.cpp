@@ -1,0 +1,45 @@
+// See SimulatedTarget.h.
+
+#include "host/SimulatedTarget.h"
+
+#include <fmt/format.h>
+
+#include <filesystem>
+#include <system_error>
+
+#include "host/Errors.h"
+#include "target/ContentsFile.h"
+#include "target/DeviceOptions.h"
+
+namespace host {
+
+namespace {
+
+std::unique_ptr<target::SimulatedDevice> Open(const Options& options) {
+    const target::DeviceOptions device =
+        options.sim ? target::ParseDeviceOptions(*options.sim) : target::DefaultDeviceOptions();
+    if (options.simFile) return target::OpenContents(*options.simFile, device);
+    return std::make_unique<target::SimulatedDevice>(device);
+}
+
+}  // namespace
+
+SimulatedTarget::SimulatedTarget(const Options& options) : path_(options.simFile.value_or("")) {
+    try {
+        device_ = Open(options);
+    } catch (const target::OptionError& error) {
+        throw Failure(ExitStatus::WrongUsage, fmt::format("--sim: {}", error.what()));
+    } catch (const target::ContentsError& error) {
+        throw Failure(ExitStatus::Unreachable, error.what());
+    }
+}
+
+void SimulatedTarget::Save(bool changed) const try {
+    std::error_code ignored;
+    if (!path_.empty() && (changed || !std::filesystem::exists(path_, ignored)))
+        target::SaveContents(path_, *device_);
+} catch (const target::ContentsError& error) {
+    throw Failure(ExitStatus::Unreachable, error.what());
+}
+
+}  // namespace host

@@ -1,0 +1,104 @@
+// See Tool.h.
+
+#include "host/Tool.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <exception>
+#include <system_error>
+
+#include "host/CommandLine.h"
+#include "host/FlashDevice.h"
+#include "host/SettingKeys.h"
+
+namespace host {
+
+namespace {
+
+Reporter::Options ReporterOptions(const Options& options) {
+    const int talk = options.quiet ? 0 : std::min(options.verbose, 2) + 1;
+    // A trace on the same stream and a bar would spoil each other.
+    const bool traced = options.trace == "-" && options.progress == "auto";
+    return {static_cast<Talk>(talk), options.json, traced ? "none" : options.progress};
+}
+
+/// What was kept on the way is worth keeping after a failure as well; that it can't be kept is no
+/// reason for a command to fail.
+void SaveSettings(Reporter& reporter, SettingStore& settings) try {
+    settings.Save();
+} catch (const Failure& failure) {
+    reporter.Say(Talk::Normal, failure.what());
+}
+
+Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
+    SettingStore settings;
+    if (line.command->readsSettings)
+        settings = LoadSettings(line.options.settingsFile.value_or(""), line.options.set);
+    if (line.options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
+    Context context{line.options, reporter, settings};
+    try {
+        Outcome outcome = line.command->run(context);
+        SaveSettings(reporter, settings);
+        return outcome;
+    } catch (const Failure&) {
+        SaveSettings(reporter, settings);
+        throw;
+    }
+}
+
+/// Runs something and shows how it failed, if it did.
+template <typename Action>
+Outcome Guarded(Reporter& reporter, Action&& action) try {
+    Outcome outcome = action();
+    if (!outcome.error.empty()) reporter.Error(outcome.error);
+    return outcome;
+} catch (const ShownFailure& failure) {
+    reporter.Error(failure.Remark());
+    return {failure.Status(), failure.what(), failure.Result()};
+} catch (const Failure& failure) {
+    reporter.Error(failure.what());
+    return {failure.Status(), failure.what()};
+} catch (const std::exception& error) {
+    const std::string text = fmt::format("the host ran into {}; please report it", error.what());
+    reporter.Error(text);
+    return {ExitStatus::DeviceFailed, text};
+}
+
+/// Results that nobody could receive are no success; a reader that has had enough is.
+Outcome CheckOutput(Outcome outcome, Reporter& reporter) {
+    const int error = reporter.OutputError();
+    if (error == 0 || error == EPIPE || outcome.status != ExitStatus::Done) return outcome;
+    const std::string text = "can't write to standard output: " +
+                             std::error_code(error, std::generic_category()).message();
+    reporter.Error(text);
+    return {ExitStatus::BadFile, text, outcome.result};
+}
+
+}  // namespace
+
+int RunTool(const std::vector<std::string>& words) {
+    // Whoever asked for JSON gets the end line of a command line that can't be read, too.
+    const bool json = std::find(words.begin(), words.end(), "--json") != words.end();
+    ParsedLine line;
+    Reporter early({Talk::Normal, json, "none"});
+    Outcome outcome = Guarded(early, [&] {
+        line = ParseCommandLine(words);
+        return Outcome{};
+    });
+    if (line.command == nullptr) {
+        std::fputs(line.text.c_str(), stdout);
+        if (outcome.status != ExitStatus::Done) early.End(outcome);
+        return static_cast<int>(outcome.status);
+    }
+    Reporter reporter(ReporterOptions(line.options));
+    reporter.Begin(line.options.command);
+    outcome = Guarded(reporter, [&] { return RunCommand(reporter, line); });
+    outcome = CheckOutput(std::move(outcome), reporter);
+    reporter.End(outcome);
+    return static_cast<int>(outcome.status);
+}
+
+}  // namespace host

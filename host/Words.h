@@ -1,0 +1,24 @@
+// The words of a command line, as the tables of commands and options have them.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "host/CommandTable.h"
+
+namespace host {
+
+/// "-q,--quiet" as {"-q", "--quiet"}.
+std::vector<std::string> SplitNames(const OptionSpec& spec);
+
+/// The words that a command line can begin with, each once.
+std::vector<std::string> FirstWords();
+
+/// What can follow such a word to make a command of two words.
+std::vector<std::string> SecondWords(const std::string& first);
+
+/// One line on a first word.
+std::string FirstWordHelp(const std::string& word);
+
+}  // namespace host

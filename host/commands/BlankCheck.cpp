@@ -1,0 +1,36 @@
+// corvane-flash blank-check: is the flash, or a range of it, erased?
+
+#include <fmt/format.h>
+
+#include "host/FlashDevice.h"
+#include "host/commands/Commands.h"
+#include "host/commands/UserOperation.h"
+
+namespace host::commands {
+
+namespace {
+
+Outcome RunOn(Context& context, FlashDevice& device) {
+    const AddressRange range = SelectRange(context, device, kBlankCheckKeys, context.options.range);
+    Outcome outcome = RunOperation(context, device, "BlankCheck");
+    outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
+    context.reporter.Result(RangeText(range) + " is blank");
+    return outcome;
+}
+
+Outcome Run(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device); });
+}
+
+}  // namespace
+
+CommandSpec BlankCheck() {
+    return {"blank-check",
+            "Check that the flash, or a range of it, is erased",
+            "The exit status is 5 when a byte isn't 0xFF.",
+            "  corvane-flash blank-check --range 0x8000-0x8fff",
+            {RangeOption("The addresses to check; default: the whole flash")},
+            Run};
+}
+
+}  // namespace host::commands

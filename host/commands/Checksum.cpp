@@ -1,0 +1,97 @@
+// corvane-flash checksum: the CRC-32 of flash by the plug-in, or of an image by the host.
+
+#include <fmt/format.h>
+#include <zlib.h>
+
+#include <algorithm>
+#include <vector>
+
+#include "host/FlashDevice.h"
+#include "host/SettingKeys.h"
+#include "host/commands/Commands.h"
+#include "host/commands/Images.h"
+#include "host/commands/UserOperation.h"
+
+namespace host::commands {
+
+namespace {
+
+/// The CRC-32 of the range as flash would hold the image, erased where the image says nothing.
+std::uint32_t ImageChecksum(const image::Image& image, const AddressRange& range) {
+    uLong crc = crc32(0, nullptr, 0);
+    std::uint64_t next = range.first;
+    const std::vector<std::uint8_t> erased(64 * 1024, 0xFF);
+    const auto fill = [&](std::uint64_t end) {
+        while (next < end) {
+            const std::uint64_t count = std::min<std::uint64_t>(erased.size(), end - next);
+            crc = crc32(crc, erased.data(), static_cast<uInt>(count));
+            next += count;
+        }
+    };
+    for (const image::Section& section : image.Sections()) {
+        const std::uint64_t first = std::max(section.address, range.first);
+        const std::uint64_t end = std::uint64_t{std::min(section.Last(), range.last)} + 1;
+        if (first >= end) continue;
+        fill(first);
+        crc = crc32(crc, section.bytes.data() + (first - section.address),
+                    static_cast<uInt>(end - first));
+        next = end;
+    }
+    fill(std::uint64_t{range.last} + 1);
+    return static_cast<std::uint32_t>(crc);
+}
+
+Outcome Answer(Context& context, const AddressRange& range, const std::string& checksum) {
+    context.reporter.Result(checksum);
+    return {.result = {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}}};
+}
+
+Outcome OfImage(Context& context) {
+    const LoadedImages images = [&] {
+        LoadedImages loaded;
+        loaded.image = ReadImage(*context.options.imageOf, context.options);
+        for (const image::Section& section : loaded.image.Sections())
+            loaded.origins.push_back({*context.options.imageOf, {section.address, section.Last()}});
+        return loaded;
+    }();
+    return WithDevice(context, [&](FlashDevice& device) {
+        RequireFit(device, images);
+        const AddressRange range = device.RangeInFlash(context.options.range);
+        return Answer(context, range, HexText(ImageChecksum(images.image, range)));
+    });
+}
+
+Outcome OfFlash(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) {
+        const AddressRange range =
+            SelectRange(context, device, kChecksumKeys, context.options.range);
+        const Outcome operation = RunOperation(context, device, "CalculateChecksum");
+        Outcome outcome =
+            Answer(context, range, "0x" + context.settings.Kept(keys::kChecksumValue));
+        outcome.result.update(operation.result);
+        return outcome;
+    });
+}
+
+Outcome Run(Context& context) {
+    return context.options.imageOf ? OfImage(context) : OfFlash(context);
+}
+
+}  // namespace
+
+CommandSpec Checksum() {
+    return {
+        "checksum",
+        "Calculate the CRC-32 of the flash, of a range, or of an image",
+        "With --of, the host computes what the device would answer if its flash held the "
+        "image and nothing else.",
+        "  corvane-flash checksum\n"
+        "  corvane-flash checksum --of firmware.elf",
+        {RangeOption("The addresses to cover; default: the whole flash"),
+         {"--of", "FILE", "Of this image file, not of the flash", &Options::imageOf, Offers::Files},
+         FormatOption(),
+         BaseOption()},
+        Run};
+}
+
+}  // namespace host::commands

@@ -1,0 +1,56 @@
+// corvane-flash erase: the whole flash or the sectors of a range, never either unasked.
+
+#include <fmt/format.h>
+
+#include "host/FlashDevice.h"
+#include "host/ProgramPlan.h"
+#include "host/commands/Commands.h"
+#include "host/commands/UserOperation.h"
+
+namespace host::commands {
+
+namespace {
+
+Outcome RunOn(Context& context, FlashDevice& device) {
+    const AddressRange range = SelectRange(context, device, kEraseKeys, context.options.range);
+    const DeviceInfo& info = device.Info();
+    const AddressRange covered = SectorsCovering(range, info.sectorBytes);
+    const std::uint64_t sectors = covered.Size() / info.sectorBytes;
+    Json members{{"address", covered.first}, {"bytes", covered.Size()}, {"sectors", sectors}};
+    if (context.options.dryRun) {
+        context.reporter.Result(
+            fmt::format("would erase {}: {}, {}; {} of flash are left as they are",
+                        RangeText(covered), CountText(sectors, "sector"), SizeText(covered.Size()),
+                        SizeText(info.flashBytes - covered.Size())));
+        return {.result = members};
+    }
+    Outcome outcome = RunOperation(context, device, "Erase");
+    outcome.result.update(members);
+    return outcome;
+}
+
+Outcome Run(Context& context) {
+    if (context.options.all == context.options.range.has_value())
+        throw Failure(ExitStatus::WrongUsage,
+                      context.options.all
+                          ? "erase takes --all or --range A-B, not both"
+                          : "erase what? --all for the whole flash, or --range A-B for the sectors "
+                            "that hold these addresses");
+    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device); });
+}
+
+}  // namespace
+
+CommandSpec Erase() {
+    return {"erase",
+            "Erase the whole flash, or the sectors of a range",
+            "A sector is erased whole: what it holds outside of the range is lost as well.",
+            "  corvane-flash erase --range 0x8000-0x8fff\n"
+            "  corvane-flash erase --all --dry-run",
+            {{"--all", "", "Erase the whole flash", &Options::all},
+             RangeOption("Erase the sectors that hold these addresses"),
+             DryRunOption()},
+            Run};
+}
+
+}  // namespace host::commands

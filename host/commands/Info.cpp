@@ -1,0 +1,56 @@
+// corvane-flash info: what the plug-in has found out about the device.
+
+#include <fmt/format.h>
+
+#include "host/FlashDevice.h"
+#include "host/commands/Commands.h"
+
+namespace host::commands {
+
+namespace {
+
+Json OperationNames(const std::string& joined) {
+    Json names = Json::array();
+    constexpr std::string_view separator = " | ";
+    for (std::size_t start = 0; start <= joined.size();) {
+        const std::size_t end = std::min(joined.find(separator, start), joined.size());
+        names.push_back(joined.substr(start, end - start));
+        start = end + separator.size();
+    }
+    return names;
+}
+
+Outcome Show(Context& context, FlashDevice& device) {
+    const DeviceInfo& info = device.Info();
+    Reporter& reporter = context.reporter;
+    const std::string flash =
+        info.hasFlash ? fmt::format("{} ({})", SizeText(info.flashBytes), RangeText(info.Flash()))
+                      : "none that the plug-in can work on";
+    reporter.Result("Family      " + (info.family.empty() ? "not recognized" : info.family));
+    reporter.Result("Flash       " + flash);
+    reporter.Result("Sector      " + SizeText(info.sectorBytes));
+    reporter.Result("RAM         " + SizeText(info.ramBytes));
+    reporter.Result("Operations  " + info.operations);
+    reporter.Result("Plug-in     " + device.LibraryPath());
+    return {.result = {{"family", info.family},
+                       {"hasFlash", info.hasFlash},
+                       {"flashBytes", info.flashBytes},
+                       {"sectorBytes", info.sectorBytes},
+                       {"ramBytes", info.ramBytes},
+                       {"operations", OperationNames(info.operations)},
+                       {"plugin", device.LibraryPath()}}};
+}
+
+Outcome Run(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+}
+
+}  // namespace
+
+CommandSpec Info() {
+    return {"info", "Show what the plug-in found: family, flash, sectors, RAM, operations",
+            "",     "  corvane-flash --sim quen,flash=512K info",
+            {},     Run};
+}
+
+}  // namespace host::commands

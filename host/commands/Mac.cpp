@@ -1,0 +1,91 @@
+// corvane-flash mac: the MAC address that the two user registers hold.
+
+#include <fmt/format.h>
+
+#include "host/FlashDevice.h"
+#include "host/MacAddress.h"
+#include "host/SettingKeys.h"
+#include "host/commands/Commands.h"
+#include "host/commands/UserRegisters.h"
+
+namespace host::commands {
+
+namespace {
+
+/// Read through the plug-in; the host has padded it to two digits a byte.
+std::string ReadMac(Context& context, FlashDevice& device) {
+    device.Perform("ReadMACAddress", Talk::Verbose);
+    return context.settings.Kept(keys::kMacInput);
+}
+
+Outcome Show(Context& context, FlashDevice& device) {
+    const std::string mac = ReadMac(context, device);
+    context.reporter.Result(mac);
+    return {.result = {{"mac", mac}}};
+}
+
+Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
+    const std::string old = ReadMac(context, device);
+    context.settings.Set(Origin::CommandLine, keys::kMacInput, mac.Text());
+    context.settings.Set(Origin::CommandLine, keys::kMacCommit, context.options.commit ? "1" : "0");
+    device.Perform("ProgramMACAddress");
+    const std::string now = ReadMac(context, device);
+    context.reporter.Result(fmt::format("MAC address: was {}, is {}", old, now));
+    Outcome outcome{.result = {{"old", old}, {"mac", now}, {"committed", context.options.commit}}};
+    for (const unsigned index : {1U, 0U})
+        RequireRegister(outcome, index, mac.Register(index), ReadRegister(context, device, index));
+    SayWhetherCommitted(context);
+    return outcome;
+}
+
+MacAddress RequireMac(const Options& options) {
+    const std::string& text = *options.argument;
+    const auto mac = ParseMacAddress(text);
+    if (!mac)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("'{}' is no MAC address; write six hexadecimal bytes, as in "
+                                  "00-1a-b6-01-02-03, 0:1a:b6:1:2:3 or 001ab6010203",
+                                  text));
+    const std::string objection = mac->Objection();
+    if (!objection.empty() && !options.force)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{} {}; no device should have it; --force programs it all the "
+                                  "same",
+                                  text, objection));
+    return *mac;
+}
+
+Outcome RunRead(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+}
+
+Outcome RunProgram(Context& context) {
+    const MacAddress mac = RequireMac(context.options);
+    return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, mac); });
+}
+
+}  // namespace
+
+CommandSpec MacRead() {
+    return {"mac read", "Read the MAC address", "", "  corvane-flash mac read", {}, RunRead};
+}
+
+CommandSpec MacProgram() {
+    return {
+        "mac program",
+        "Program the MAC address",
+        "Without --commit the address is gone after the next reset of the device.",
+        "  corvane-flash mac program 00-1a-b6-01-02-03 --commit",
+        {{"ADDRESS",
+          "",
+          "Six hexadecimal bytes, separated by - or : or not at all",
+          &Options::argument,
+          Offers::Nothing,
+          {},
+          true},
+         CommitOption(),
+         {"--force", "", "Program a multicast, all-zeros or all-ones address", &Options::force}},
+        RunProgram};
+}
+
+}  // namespace host::commands

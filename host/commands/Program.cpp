@@ -1,0 +1,164 @@
+// corvane-flash program: plan, then erase, program and compare.
+
+#include <fmt/format.h>
+
+#include "host/Comparison.h"
+#include "host/FlashDevice.h"
+#include "host/ProgramPlan.h"
+#include "host/SettingKeys.h"
+#include "host/commands/Commands.h"
+#include "host/commands/Images.h"
+#include "host/commands/Summary.h"
+
+namespace host::commands {
+
+namespace {
+
+// The plug-in's names for the events at which its host resets the settings.
+constexpr int kLoadBegins = 0;
+constexpr int kLoadComplete = 2;
+
+void Choose(Context& context, const char* key, const std::string& text) {
+    context.settings.Set(Origin::CommandLine, key, text);
+}
+
+/// --erase necessary|none|all|A-B, as the plug-in's settings say it.
+void ChooseErase(Context& context, FlashDevice& device, const std::string& choice) {
+    if (choice == "necessary") return Choose(context, keys::kProgramOption, keys::kNecessaryPages);
+    if (choice == "none") return Choose(context, keys::kProgramOption, keys::kNoErase);
+    Choose(context, keys::kProgramOption, keys::kEraseOptions);
+    if (choice == "all") return Choose(context, keys::kEraseType, keys::kEntireFlash);
+    const AddressRange range = device.RangeInFlash(choice);
+    Choose(context, keys::kEraseType, keys::kByAddressRange);
+    Choose(context, keys::kEraseStart, HexText(range.first));
+    Choose(context, keys::kEraseEnd, HexText(range.last));
+}
+
+void ApplyOptions(Context& context, FlashDevice& device) {
+    const Options& options = context.options;
+    if (options.erase) ChooseErase(context, device, *options.erase);
+    if (options.crc) Choose(context, keys::kProgramCrc, "1");
+    if (options.blankCheck) Choose(context, keys::kProgramBlankCheck, "1");
+}
+
+bool IsOn(const Context& context, const char* key) {
+    return context.settings.Text(key).ends_with('1');
+}
+
+Json PlanJson(const ProgramPlan& plan) {
+    Json sections = Json::array();
+    for (const image::Section& section : plan.sections)
+        sections.push_back({{"address", section.address}, {"bytes", section.bytes.size()}});
+    Json erased = Json::array();
+    for (const AddressRange& run : plan.erased)
+        erased.push_back({{"address", run.first}, {"bytes", run.Size()}});
+    return {{"sections", sections},
+            {"erased", erased},
+            {"sectors", plan.sectorCount},
+            {"imageBytes", plan.imageBytes},
+            {"clearedBytes", plan.clearedBytes}};
+}
+
+void Expect(Context& context, WorkMeter& meter, const ProgramPlan& plan, std::uint64_t flashBytes) {
+    meter.Expect(Phase::Erase, plan.erasedBytes);
+    meter.Expect(Phase::Program, plan.transferBytes);
+    if (IsOn(context, keys::kProgramBlankCheck))
+        for (const image::Section& section : plan.sections)
+            meter.Expect(Phase::BlankCheck,
+                         SectorsCovering({section.address, section.Last()}, 4).Size());
+    if (IsOn(context, keys::kProgramCrc)) meter.Expect(Phase::Checksum, flashBytes);
+    if (!context.options.noVerify) meter.Expect(Phase::Verify, plan.imageBytes);
+}
+
+void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
+    device.ResetSettings(kLoadBegins);
+    for (const image::Section& section : plan.sections)
+        device.WriteSection(section);
+    const std::uint64_t erased = device.Meter().Of(Phase::Erase).doneBytes;
+    if (erased < plan.erasedBytes)
+        throw Failure(ExitStatus::DeviceFailed,
+                      fmt::format("the plug-in erased {} of {} and gave no reason; the image was "
+                                  "programmed over what was there; try --erase necessary",
+                                  SizeText(erased), SizeText(plan.erasedBytes)));
+    if (IsOn(context, keys::kProgramCrc)) device.ResetSettings(kLoadComplete);
+}
+
+Outcome LoadAndCompare(Context& context, FlashDevice& device, const image::Image& image,
+                       const ProgramPlan& plan) {
+    Expect(context, device.Meter(), plan, device.Info().flashBytes);
+    Load(context, device, plan);
+    Outcome outcome{.result = PlanJson(plan)};
+    if (IsOn(context, keys::kProgramCrc))
+        outcome.result["checksum"] = context.settings.Kept(keys::kChecksumValue);
+    if (!context.options.noVerify) {
+        if (const auto difference = CompareWithFlash(device, image)) {
+            outcome.status = ExitStatus::ContentsDiffer;
+            outcome.error = Describe(*difference);
+            outcome.result["difference"] = ToJson(*difference);
+        }
+    }
+    outcome.result["phases"] = PhasesJson(device.Meter());
+    ShowSummary(context.reporter, device.Meter());
+    return outcome;
+}
+
+Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
+    RequireFit(device, images);
+    ApplyOptions(context, device);
+    const DeviceInfo& info = device.Info();
+    const FlashGeometry flash{info.flashBytes, info.sectorBytes};
+    const ProgramPlan plan = PlanProgram(images.image, flash, ChosenErase(context.settings));
+    context.reporter.Say(Talk::Normal,
+                         fmt::format("{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
+                                     CountText(plan.sections.size(), "section"), info.family,
+                                     SizeText(info.flashBytes)));
+    for (const std::string& line : Describe(plan, flash)) {
+        if (context.options.dryRun)
+            context.reporter.Result(line);
+        else
+            context.reporter.Say(Talk::Verbose, line);
+    }
+    if (context.options.dryRun) return {.result = PlanJson(plan)};
+    return LoadAndCompare(context, device, images.image, plan);
+}
+
+void CheckEraseOption(const Options& options) {
+    if (!options.erase || options.erase->find('-') != std::string::npos) return;
+    for (const char* word : {"necessary", "none", "all"})
+        if (*options.erase == word) return;
+    throw Failure(
+        ExitStatus::WrongUsage,
+        fmt::format("--erase takes necessary, none, all or a range A-B, not '{}'", *options.erase));
+}
+
+Outcome Run(Context& context) {
+    CheckEraseOption(context.options);
+    const LoadedImages images = ReadImages(context.options);
+    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
+}
+
+}  // namespace
+
+CommandSpec Program() {
+    return {"program",
+            "Program image files into flash and compare the result",
+            "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors that the "
+            "image touches are erased whole, so what else they hold is lost.",
+            "  corvane-flash program firmware.elf\n"
+            "  corvane-flash program boot.hex app.srec --crc\n"
+            "  corvane-flash program data.bin --base 0x8000 --erase none",
+            {ImagesArgument(),
+             FormatOption(),
+             BaseOption(),
+             {"--erase", "WHAT",
+              "What is erased first: necessary (the image's sectors), none, all, or a range A-B",
+              &Options::erase},
+             {"--blank-check", "", "Check that the flash is blank before programming it",
+              &Options::blankCheck},
+             {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},
+             {"--no-verify", "", "Leave out the read-back and comparison", &Options::noVerify},
+             DryRunOption()},
+            Run};
+}
+
+}  // namespace host::commands

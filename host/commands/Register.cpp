@@ -1,0 +1,82 @@
+// corvane-flash register: the two non-volatile user registers.
+
+#include <fmt/format.h>
+
+#include "host/FlashDevice.h"
+#include "host/commands/Commands.h"
+#include "host/commands/UserRegisters.h"
+
+namespace host::commands {
+
+namespace {
+
+unsigned Index(const Context& context) {
+    return context.options.index == "1" ? 1 : 0;
+}
+
+OptionSpec IndexArgument() {
+    return {"INDEX", "", "0 or 1", &Options::index, Offers::Nothing, {"0", "1"}, true};
+}
+
+Outcome Show(Context& context, FlashDevice& device) {
+    const unsigned index = Index(context);
+    const std::uint32_t value = ReadRegister(context, device, index);
+    context.reporter.Result(fmt::format("{:#010x}", value));
+    return {.result = {{"register", index}, {"value", value}}};
+}
+
+Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
+    const unsigned index = Index(context);
+    const std::uint32_t old = ReadRegister(context, device, index);
+    const auto choose = [&](const char* what, const std::string& text) {
+        context.settings.Set(Origin::CommandLine, fmt::format("FlashUserRegister{}{}", index, what),
+                             text);
+    };
+    choose("Input", HexText(value));
+    choose("Commit", context.options.commit ? "1" : "0");
+    device.Perform(fmt::format("ProgramUserRegister{}", index));
+    const std::uint32_t now = ReadRegister(context, device, index);
+    context.reporter.Result(
+        fmt::format("User register {}: was {:#010x}, is {:#010x}", index, old, now));
+    Outcome outcome{.result = {{"register", index},
+                               {"old", old},
+                               {"value", now},
+                               {"committed", context.options.commit}}};
+    RequireRegister(outcome, index, value, now);
+    SayWhetherCommitted(context);
+    return outcome;
+}
+
+Outcome RunRead(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+}
+
+Outcome RunProgram(Context& context) {
+    const std::uint32_t value = ParseHexArgument(*context.options.value, "the value");
+    return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, value); });
+}
+
+}  // namespace
+
+CommandSpec RegisterRead() {
+    return {"register read",
+            "Read a user register",
+            "",
+            "  corvane-flash register read 0",
+            {IndexArgument()},
+            RunRead};
+}
+
+CommandSpec RegisterProgram() {
+    return {
+        "register program",
+        "Program a user register",
+        "Without --commit the value is gone after the next reset of the device.",
+        "  corvane-flash register program 0 0x12ab --commit",
+        {IndexArgument(),
+         {"VALUE", "", "Hexadecimal, up to 32 bits", &Options::value, Offers::Nothing, {}, true},
+         CommitOption()},
+        RunProgram};
+}
+
+}  // namespace host::commands

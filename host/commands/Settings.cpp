@@ -1,0 +1,93 @@
+// corvane-flash settings: list them, show one, keep one. It needs neither plug-in nor target.
+
+#include <fmt/format.h>
+
+#include "host/commands/Commands.h"
+
+namespace host::commands {
+
+namespace {
+
+Json ToJson(const Context& context, const SettingInfo& info) {
+    const auto [text, origin] = context.settings.Get(info.key);
+    return {{"key", info.key},
+            {"value", text},
+            {"origin", OriginText(origin, context.settings.Paths())},
+            {"meaning", info.meaning},
+            {"accepts", AcceptedTexts(info)}};
+}
+
+void ShowOne(Context& context, const SettingInfo& info) {
+    const auto [text, origin] = context.settings.Get(info.key);
+    if (!context.reporter.Hears(Talk::Normal)) return context.reporter.Result(text);
+    context.reporter.Result(fmt::format("{} = \"{}\"  ({})", info.key, text,
+                                        OriginText(origin, context.settings.Paths())));
+    context.reporter.Result(fmt::format("    {}; takes {}", info.meaning, AcceptedTexts(info)));
+}
+
+Outcome List(Context& context) {
+    Json all = Json::array();
+    for (const SettingInfo& info : SettingCatalogue()) {
+        if (context.reporter.Hears(Talk::Normal))
+            ShowOne(context, info);
+        else
+            context.reporter.Result(
+                fmt::format("{} = \"{}\"", info.key, context.settings.Text(info.key)));
+        all.push_back(ToJson(context, info));
+    }
+    const SettingPaths& paths = context.settings.Paths();
+    context.reporter.Say(Talk::Verbose,
+                         fmt::format("Your file: {}\nKept values: {}", paths.user, paths.kept));
+    return {.result = {{"settings", all}}};
+}
+
+Outcome Keep(Context& context, const SettingInfo& info, const std::string& text) {
+    const std::string checked = RequireText(info, text, "settings");
+    context.settings.Keep(info.key, checked);
+    context.settings.Save();
+    const auto [now, origin] = context.settings.Get(info.key);
+    ShowOne(context, info);
+    if (origin < Origin::Kept)
+        context.reporter.Say(Talk::Normal,
+                             fmt::format("Kept \"{}\", but the value of the {} goes before it",
+                                         checked, OriginText(origin, context.settings.Paths())));
+    return {.result = ToJson(context, info)};
+}
+
+Outcome Forget(Context& context, const std::string& key) {
+    const SettingInfo& info = RequireSetting(key, "settings");
+    context.settings.Forget(key);
+    context.settings.Save();
+    ShowOne(context, info);
+    return {.result = ToJson(context, info)};
+}
+
+Outcome Run(Context& context) {
+    if (context.options.forget) return Forget(context, *context.options.forget);
+    if (!context.options.argument) return List(context);
+    const std::string& argument = *context.options.argument;
+    const auto equals = argument.find('=');
+    const SettingInfo& info = RequireSetting(argument.substr(0, equals), "settings");
+    if (equals != std::string::npos) return Keep(context, info, argument.substr(equals + 1));
+    ShowOne(context, info);
+    return {.result = ToJson(context, info)};
+}
+
+}  // namespace
+
+CommandSpec Settings() {
+    return {"settings",
+            "List the settings with meaning, accepted texts and origin; show or keep one",
+            "A value comes from the first of: command line, environment variable CORVANE_SET_KEY, "
+            "your settings file, kept value (KEY=TEXT here, and what the plug-in publishes), "
+            "default. With -q, only the values are shown.",
+            "  corvane-flash settings FlashTimeoutValue\n"
+            "  corvane-flash settings FlashCrystalFreq=10",
+            {{"KEY", "", "The setting to show; as KEY=TEXT, the setting to keep with this text",
+              &Options::argument, Offers::Settings},
+             {"--forget", "KEY", "Drop the kept value of a setting", &Options::forget,
+              Offers::Settings}},
+            Run};
+}
+
+}  // namespace host::commands

@@ -1,0 +1,45 @@
+// corvane-flash verify: compare flash with image files.
+
+#include "host/Comparison.h"
+#include "host/FlashDevice.h"
+#include "host/commands/Commands.h"
+#include "host/commands/Images.h"
+#include "host/commands/Summary.h"
+
+namespace host::commands {
+
+namespace {
+
+Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
+    RequireFit(device, images);
+    device.Meter().Expect(Phase::Verify, images.image.ByteCount());
+    const auto difference = CompareWithFlash(device, images.image);
+    Outcome outcome{.result = {{"equal", !difference}, {"phases", PhasesJson(device.Meter())}}};
+    ShowSummary(context.reporter, device.Meter());
+    if (!difference) {
+        context.reporter.Result("The flash holds the image");
+        return outcome;
+    }
+    outcome.status = ExitStatus::ContentsDiffer;
+    outcome.error = Describe(*difference);
+    outcome.result["difference"] = ToJson(*difference);
+    return outcome;
+}
+
+Outcome Run(Context& context) {
+    const LoadedImages images = ReadImages(context.options);
+    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
+}
+
+}  // namespace
+
+CommandSpec Verify() {
+    return {"verify",
+            "Compare flash with image files",
+            "The exit status is 5 when a byte differs.",
+            "  corvane-flash verify firmware.elf",
+            {ImagesArgument(), FormatOption(), BaseOption()},
+            Run};
+}
+
+}  // namespace host::commands
