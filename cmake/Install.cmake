@@ -1,0 +1,62 @@
+# What `cmake --install` puts where. The libraries, headers and CMake package are the kit for makers
+# of debuggers; the man page and the completions come out of the tool itself, so that they can't
+# drift from its help.
+
+include(CMakePackageConfigHelpers)
+include(cmake/Package.cmake)
+
+set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
+
+# The headers as a target of their own: a host sees the plug-in through them and dlopen alone.
+add_library(corvane_headers INTERFACE)
+set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
+target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+
+install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h logger/ostrel_logger.h
+        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
+install(TARGETS flash_corvane ostrel_logger corvane_headers EXPORT FlashCorvane
+        LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+
+install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake
+        DESTINATION ${package_directory})
+configure_package_config_file(cmake/FlashCorvaneConfig.cmake.in
+        ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake INSTALL_DESTINATION ${package_directory})
+write_basic_package_version_file(
+        ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake COMPATIBILITY SameMajorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake
+              ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake
+        DESTINATION ${package_directory})
+
+# corvane_generate(FILE ARGUMENT...): writes what the tool prints to generated/FILE.
+set(generated ${PROJECT_BINARY_DIR}/generated)
+file(MAKE_DIRECTORY ${generated})
+function(corvane_generate file)
+  add_custom_command(
+    OUTPUT ${generated}/${file} DEPENDS corvane-flash VERBATIM
+    COMMAND sh -ec "\"$@\" > \"$0.new\"; mv \"$0.new\" \"$0\""
+            ${generated}/${file} $<TARGET_FILE:corvane-flash> ${ARGN})
+endfunction()
+
+foreach(shell bash zsh fish)
+  corvane_generate(corvane-flash.${shell} completion ${shell})
+endforeach()
+corvane_generate(corvane-flash.1 --man)
+add_custom_command(
+  OUTPUT ${generated}/corvane-flash.1.gz DEPENDS ${generated}/corvane-flash.1
+  COMMAND gzip -9nfk ${generated}/corvane-flash.1)
+
+set(data ${CMAKE_INSTALL_DATADIR})
+install(FILES ${generated}/corvane-flash.bash RENAME corvane-flash
+        DESTINATION ${data}/bash-completion/completions)
+install(FILES ${generated}/corvane-flash.zsh RENAME _corvane-flash
+        DESTINATION ${data}/zsh/vendor-completions)
+install(FILES ${generated}/corvane-flash.fish DESTINATION ${data}/fish/vendor_completions.d)
+install(FILES ${generated}/corvane-flash.1.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
+install(DIRECTORY docs/ DESTINATION ${data}/doc/corvane-flash FILES_MATCHING PATTERN *.md)
+install(DIRECTORY examples/minimal-host DESTINATION ${data}/doc/corvane-flash/examples)
+
+# All that `cmake --install` needs, without the tests.
+add_custom_target(kit ALL DEPENDS flash_corvane ostrel_logger corvane-flash
+  ${generated}/corvane-flash.bash ${generated}/corvane-flash.zsh ${generated}/corvane-flash.fish
+  ${generated}/corvane-flash.1.gz)

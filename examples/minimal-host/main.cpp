@@ -1,0 +1,166 @@
+// A complete host for the flash plug-in: loads it, creates a device, prints what it found,
+// programs a few bytes, reads them back, and unloads it. To make a host of your own, put your debug
+// probe in the place of PretendDevice and your user interface in the place of printf.
+
+#include <dlfcn.h>
+#include <flash_corvane/IFlashDevice2.h>
+#include <flash_corvane/IFlashHost.h>
+
+#include <chrono>
+#include <cstdio>
+#include <map>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <thread>
+
+#include "PretendDevice.h"
+
+// Every slot answers null for success or an error text. Exceptions must not leave a slot.
+class MinimalHost final : public IFlashHost {
+  public:
+    // The plug-in asks twice for every value and wants the same answer both times.
+    const char* GetProperty(const char* name) override {
+        const auto found = settings_.find(name);
+        return found == settings_.end() ? nullptr : found->second.c_str();
+    }
+    const char* SetProperty(const char* name, const char* value) override {
+        settings_[name] = value;
+        return nullptr;
+    }
+
+    // A real host loads directory + fileName into the target here, and starts it in RunTarget.
+    const char* LoadProgram(const char*, const char*, const char*) override { return nullptr; }
+    const char* RunTarget() override {
+        device_.Run();
+        return nullptr;
+    }
+    const char* HaltTarget() override {
+        device_.Halt();
+        return nullptr;
+    }
+    const char* ResetTarget(bool) override { return HaltTarget(); }
+
+    const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t,
+                           size_t width) override {
+        const bool done = device_.Read(buffer, static_cast<uint32_t>(address), count * width);
+        return done ? nullptr : "can't read target memory: nothing at that address";
+    }
+    const char* WriteMemory(const void* buffer, size_t count, uint64_t address, int16_t,
+                            size_t width) override {
+        const bool done = device_.Write(buffer, static_cast<uint32_t>(address), count * width);
+        return done ? nullptr : "can't write target memory: nothing to write at that address";
+    }
+
+    // An error text from UpdateProgress, "cancelled" for example, stops what is going on.
+    const char* BeginProgress(const char* title) override { return Print("progress", title); }
+    const char* UpdateProgress(uint32_t, const char*) override { return nullptr; }
+    const char* EndProgress() override { return nullptr; }
+    const char* ShowMessage(const char* text) override { return Print("message", text); }
+    // A user operation or a section that failed says so here and nowhere else: remember it.
+    const char* ShowError(const char* text) override {
+        failed_ = true;
+        return Print("error", text);
+    }
+
+    // The loader is looked for at this text + "..\..\merrow\".
+    const char* GetDirectory() override { return "./"; }
+    const char* Sleep(uint32_t milliseconds) override {
+        std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
+        return nullptr;
+    }
+
+    const char* Reserved3() override { return nullptr; }
+    const char* Reserved5() override { return nullptr; }
+    const char* Reserved8() override { return nullptr; }
+    const char* Reserved9() override { return nullptr; }
+    const char* Reserved12() override { return nullptr; }
+    const char* Reserved13() override { return nullptr; }
+    const char* Reserved14() override { return nullptr; }
+    const char* Reserved15() override { return nullptr; }
+
+    bool Failed() const { return failed_; }
+    const std::string& Setting(const std::string& name) const { return settings_.at(name); }
+
+  private:
+    static const char* Print(const char* kind, const char* text) {
+        std::printf("%s: %s\n", kind, text);
+        return nullptr;
+    }
+
+    PretendDevice device_;
+    bool failed_ = false;
+    // The plug-in has no defaults: what it reads and the host doesn't know is a failure.
+    std::map<std::string, std::string> settings_ = {
+        {"FlashProgramOption", "Necessary Pages Only"},
+        {"FlashProgramBlankCheckOption", "1"},
+        {"FlashProgramCRCOption", "1"},
+        {"FlashResetSetting", "0"},
+        {"FlashTimeoutValue", "5"},
+        {"FlashVerboseMode", "0"},
+    };
+};
+
+// The error text belongs to the plug-in and lives until its next failing call: copy it at once.
+static void Check(const char* what, const char* errorText) {
+    if (errorText != nullptr) throw std::runtime_error(std::string(what) + ": " + errorText);
+}
+
+static void ProgramAndReadBack(MinimalHost& host, IFlashDevice2& device) {
+    const std::string data = "Hello, flash";
+    const uint32_t address = 0x1004;
+    const auto* bytes = reinterpret_cast<const unsigned char*>(data.data());
+    const auto length = static_cast<uint32_t>(data.size());
+
+    // Not the overload with a size: its upper bound is one too strict.
+    bool first = false, last = false;
+    Check("address", device.AddressWithinFlash(address, &first));
+    Check("address", device.AddressWithinFlash(address + length - 1, &last));
+    if (!first || !last) throw std::runtime_error("the data doesn't fit into flash");
+
+    Check("start of the load", device.ResetSettings(0));
+    Check("programming", device.WriteDataToFlash(bytes, address, length, 1));
+    Check("end of the load", device.ResetSettings(2));
+    if (host.Failed()) throw std::runtime_error("the plug-in has shown an error, see above");
+
+    std::string readBack(data.size(), '\0');
+    Check("reading back", host.ReadMemory(&readBack[0], readBack.size(), address, 0, 1));
+    std::printf("read back: %s\n", readBack.c_str());
+    if (readBack != data) throw std::runtime_error("flash differs from what was programmed");
+}
+
+static void UseDevice(MinimalHost& host, IFlashDevice2& device) {
+    bool flashAvailable = false;
+    const char* operations = nullptr;
+    Check("initialising", device.Initialize(&flashAvailable, &operations));
+    for (const char* name : {"DeviceInfoFamily", "DeviceInfoFlashSize", "DeviceInfoSectorSize"})
+        std::printf("%s: %s\n", name, host.Setting(name).c_str());
+    std::printf("operations: %s\n", operations);
+    if (flashAvailable) ProgramAndReadBack(host, device);
+}
+
+// Only Destroy ends a device, and it must have run before the library is unloaded.
+struct Destroyer {
+    void operator()(IFlashDevice2* device) const { device->Destroy(); }
+};
+using Device = std::unique_ptr<IFlashDevice2, Destroyer>;
+
+static Device CreateDevice(void* library, MinimalHost& host) {
+    const auto create =
+        reinterpret_cast<CreateFlashDevice2Function>(dlsym(library, "CreateFlashDevice2"));
+    if (create == nullptr) throw std::runtime_error(dlerror());
+    IFlashDevice2* device = nullptr;
+    Check("creating the device", create("", "", "", &host, &device));
+    return Device(device);
+}
+
+int main(int argc, char** argv) try {
+    void* library = dlopen(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
+    if (library == nullptr) throw std::runtime_error(dlerror());
+    MinimalHost host;
+    UseDevice(host, *CreateDevice(library, host));
+    dlclose(library);
+} catch (const std::exception& error) {
+    std::fprintf(stderr, "minimal-host: %s\n", error.what());
+    return 1;
+}

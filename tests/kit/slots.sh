@@ -1,0 +1,39 @@
+#!/usr/bin/env bash
+# Compares the slots that compilers of both C++ ABIs give the interfaces, and the numbers and tags
+# that the headers tell of them, with slots.txt: what has been released and never changes.
+# Only the compiler's own headers are at hand, so the interfaces can't come to need others.
+set -euo pipefail
+here=$(cd "$(dirname "$0")" && pwd)
+root=$here/../..
+
+slots_of() {
+    clang++ --target="$1" -ffreestanding -nostdlibinc -std=c++11 -I"$root" \
+        -Xclang -fdump-vtable-layouts -S -o /dev/null "$here/Slots.cpp" >"$dump"
+    for class in IFlashHost IFlashDevice2 Logging::ILogger; do
+        sed -nE "/^VF?Table indices for '$class'/,/^\$/s/^ *([0-9]+) \| /slot \1: /p" "$dump"
+    done
+}
+
+# "NUMBER KIND" for each slot: once from slots.txt, once from the tags in a header.
+expected_tags() {
+    sed -nE "/$1::Reserved/s/slot ([0-9]+):.*/\1 reserved; never called/p
+             t; /$1::/s/slot ([0-9]+):.*/\1 $2 implements/p" "$here/slots.txt"
+}
+tags_in() {
+    sed -nE 's,^ *// Slots? ([0-9]+)\. .*,\1,p
+             s,^ *// \[([a-z]+ implements); .+\]$,\1,p
+             s,^ *// \[(reserved; never called)\]$,\1,p' "$1" | paste -d ' ' - -
+}
+
+dump=$(mktemp)
+trap 'rm -f "$dump"' EXIT
+failed=0
+for target in {x86_64,i686}-pc-{linux-gnu,windows-msvc}; do
+    diff -u --label released --label "$target" "$here/slots.txt" <(slots_of $target) || failed=1
+done
+for pair in "IFlashHost host" "IFlashDevice2 device"; do
+    read -r class side <<<"$pair"
+    diff -u --label "slots of $class" --label "tags in its header" \
+        <(expected_tags "$class" "$side") <(tags_in "$root/plugin/$class.h") || failed=1
+done
+exit $failed
