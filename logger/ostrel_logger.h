@@ -24,14 +24,20 @@ class ILogger {
     // Slot 0. Writes one line, formatted as printf does. instanceId tells the lines of several
     // sources apart; the two numbers behind it are fixed by the caller and mean nothing here.
     // Levels: 1 information, 2 entry into an operation, 3 its result.
+    // [logger implements; any time while IsCurrentInstanceEnabled is true]
     virtual void Line(uint64_t instanceId, int, int, int level, const char* format, ...)
         OSTREL_LOGGER_PRINTF(6, 7) = 0;
 
-    // Slots 1 and 2. Reserved; never called.
+    // Slot 1. Keeps its place; takes nothing and does nothing.
+    // [reserved; never called]
     virtual void Reserved1() = 0;
+
+    // Slot 2. Keeps its place; takes nothing and does nothing.
+    // [reserved; never called]
     virtual void Reserved2() = 0;
 
     // Slot 3. Writes one line of finished text; percent signs in it mean nothing.
+    // [logger implements; any time while IsCurrentInstanceEnabled is true]
     virtual void PlainLine(uint64_t instanceId, int, int, int level, const char* text) = 0;
 
   protected:

@@ -31,9 +31,10 @@ failed=0
 for target in {x86_64,i686}-pc-{linux-gnu,windows-msvc}; do
     diff -u --label released --label "$target" "$here/slots.txt" <(slots_of $target) || failed=1
 done
-for pair in "IFlashHost host" "IFlashDevice2 device"; do
-    read -r class side <<<"$pair"
+for row in "plugin/IFlashHost.h IFlashHost host" "plugin/IFlashDevice2.h IFlashDevice2 device" \
+    "logger/ostrel_logger.h ILogger logger"; do
+    read -r header class side <<<"$row"
     diff -u --label "slots of $class" --label "tags in its header" \
-        <(expected_tags "$class" "$side") <(tags_in "$root/plugin/$class.h") || failed=1
+        <(expected_tags "$class" "$side") <(tags_in "$root/$header") || failed=1
 done
 exit $failed
