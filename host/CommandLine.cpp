@@ -21,41 +21,41 @@ namespace {
 
 /// Texts are taken as they come, an empty one too, and the last of several counts.
 template <typename Text>
-CLI::Option* DefineText(CLI::App& app, const OptionSpec& spec, Text& target) {
+CLI::Option* DefineText(CLI::App& app, const OptionRow& row, Text& target) {
     CLI::Option* option = app.add_option_function<std::string>(
-        spec.names, [&target](const std::string& text) { target = text; });
+        row.names, [&target](const std::string& text) { target = text; });
     return option->multi_option_policy(CLI::MultiOptionPolicy::TakeLast);
 }
 
-CLI::Option* DefineTexts(CLI::App& app, const OptionSpec& spec, std::vector<std::string>& target) {
-    return app.add_option(spec.names, target)->allow_extra_args(spec.IsArgument());
+CLI::Option* DefineTexts(CLI::App& app, const OptionRow& row, std::vector<std::string>& target) {
+    return app.add_option(row.names, target)->allow_extra_args(row.IsArgument());
 }
 
-CLI::Option* DefineMember(CLI::App& app, const OptionSpec& spec, Options& options) {
+CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options) {
     return std::visit(
         [&](auto member) -> CLI::Option* {
             auto& target = options.*member;
             using Target = std::remove_reference_t<decltype(target)>;
             if constexpr (std::is_same_v<Target, bool> || std::is_same_v<Target, int>)
-                return app.add_flag(spec.names, target);
+                return app.add_flag(row.names, target);
             else if constexpr (std::is_same_v<Target, std::vector<std::string>>)
-                return DefineTexts(app, spec, target);
+                return DefineTexts(app, row, target);
             else
-                return DefineText(app, spec, target);
+                return DefineText(app, row, target);
         },
-        spec.member);
+        row.member);
 }
 
-void Define(CLI::App& app, const OptionSpec& spec, Options& options) {
-    CLI::Option* option = DefineMember(app, spec, options);
-    option->required(spec.required);
-    if (!spec.choices.empty()) option->check(CLI::IsMember(spec.choices));
-    if (*spec.environment != '\0') option->envname(spec.environment);
+void Define(CLI::App& app, const OptionRow& row, Options& options) {
+    CLI::Option* option = DefineMember(app, row, options);
+    option->required(row.required);
+    if (!row.choices.empty()) option->check(CLI::IsMember(row.choices));
+    if (*row.environment != '\0') option->envname(row.environment);
 }
 
 /// The app of a command; for one of two words, below the app of the first word.
-CLI::App* AddCommand(CLI::App& app, const CommandSpec& spec) {
-    const std::string name = spec.name;
+CLI::App* AddCommand(CLI::App& app, const CommandRow& row) {
+    const std::string name = row.name;
     const auto blank = name.find(' ');
     CLI::App* parent = &app;
     if (blank != std::string::npos) {
@@ -79,20 +79,20 @@ std::string CommandWords(const CLI::App& app) {
 struct Parser {
     CLI::App app;
     Options options;
-    const CommandSpec* chosen = nullptr;
+    const CommandRow* chosen = nullptr;
     bool man = false;
 
     Parser() {
         app.set_version_flag("--version", std::string("corvane-flash " CORVANE_FLASH_VERSION));
         app.add_flag("--man", man);
         app.require_subcommand(0, 1);
-        for (const OptionSpec& spec : GlobalOptions())
-            Define(app, spec, options);
-        for (const CommandSpec& spec : AllCommands()) {
-            CLI::App* command = AddCommand(app, spec);
-            for (const OptionSpec& option : spec.options)
+        for (const OptionRow& row : GlobalOptions())
+            Define(app, row, options);
+        for (const CommandRow& row : AllCommands()) {
+            CLI::App* command = AddCommand(app, row);
+            for (const OptionRow& option : row.options)
                 Define(*command, option, options);
-            command->callback([this, &spec] { chosen = &spec; });
+            command->callback([this, &row] { chosen = &row; });
         }
     }
 };

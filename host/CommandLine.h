@@ -11,8 +11,8 @@ namespace host {
 
 struct ParsedLine {
     Options options;
-    const CommandSpec* command = nullptr;  ///< null: `text` is all that was asked for
-    std::string text;                      ///< help, version or man page
+    const CommandRow* command = nullptr;  ///< null: `text` is all that was asked for
+    std::string text;                     ///< help, version or man page
 };
 
 /// `words` without the program's name. Failure (WrongUsage) for a line that makes no sense.

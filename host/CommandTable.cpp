@@ -8,8 +8,8 @@
 
 namespace host {
 
-const std::vector<OptionSpec>& GlobalOptions() {
-    static const std::vector<OptionSpec> options{
+const std::vector<OptionRow>& GlobalOptions() {
+    static const std::vector<OptionRow> options{
         {"--sim",
          "CLASS[,OPTION=VALUE...]",
          "The simulated device to work on (there is no other target yet); default: tolva, or what "
@@ -57,9 +57,9 @@ const std::vector<OptionSpec>& GlobalOptions() {
     return options;
 }
 
-const std::vector<CommandSpec>& AllCommands() {
+const std::vector<CommandRow>& AllCommands() {
     using namespace commands;
-    static const std::vector<CommandSpec> table{
+    static const std::vector<CommandRow> table{
         Info(),     Program(),      Verify(),          Read(),    Erase(),      BlankCheck(),
         Checksum(), RegisterRead(), RegisterProgram(), MacRead(), MacProgram(), Operation(),
         Settings(), Completion(),
@@ -74,15 +74,15 @@ const char* GroupHelp(const std::string& word) {
 
 namespace commands {
 
-OptionSpec RangeOption(const char* help) {
+OptionRow RangeOption(const char* help) {
     return {"--range", "A-B", help, &Options::range};
 }
 
-OptionSpec ImagesArgument() {
+OptionRow ImagesArgument() {
     return {"FILE", "", "Image files, joined before use", &Options::files, Offers::Files, {}, true};
 }
 
-OptionSpec FormatOption() {
+OptionRow FormatOption() {
     return {"--format",
             "FORMAT",
             "Read the files as elf, ihex, srec or bin, whatever they look like",
@@ -91,15 +91,15 @@ OptionSpec FormatOption() {
             {"elf", "ihex", "srec", "bin"}};
 }
 
-OptionSpec BaseOption() {
+OptionRow BaseOption() {
     return {"--base", "ADDRESS", "Where a raw binary goes (hexadecimal)", &Options::base};
 }
 
-OptionSpec DryRunOption() {
+OptionRow DryRunOption() {
     return {"--dry-run", "", "Show what would be done, and touch nothing", &Options::dryRun};
 }
 
-OptionSpec CommitOption() {
+OptionRow CommitOption() {
     return {"--commit", "", "Make the value survive a reset", &Options::commit};
 }
 

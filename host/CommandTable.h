@@ -27,7 +27,7 @@ using OptionMember =
     std::variant<bool Options::*, int Options::*, std::string Options::*,
                  std::optional<std::string> Options::*, std::vector<std::string> Options::*>;
 
-struct OptionSpec {
+struct OptionRow {
     const char* names;  ///< "-q,--quiet"; of an argument, its name in the help: "FILE"
     const char* value;  ///< the value's name in the help, "" for a switch or an argument
     const char* help;
@@ -44,20 +44,20 @@ struct OptionSpec {
     }
 };
 
-struct CommandSpec {
+struct CommandRow {
     const char* name;  ///< "erase", or two words: "mac read"
     const char* help;
     const char* details;  ///< more sentences for the command's own help, or ""
     const char* example;  ///< one or more command lines
-    std::vector<OptionSpec> options;
+    std::vector<OptionRow> options;
     Outcome (*run)(Context&);
     bool readsSettings = true;
 };
 
 /// The options that every command takes.
-const std::vector<OptionSpec>& GlobalOptions();
+const std::vector<OptionRow>& GlobalOptions();
 
-const std::vector<CommandSpec>& AllCommands();
+const std::vector<CommandRow>& AllCommands();
 
 /// What a first word stands for that has commands below it: "mac".
 const char* GroupHelp(const std::string& word);

@@ -13,7 +13,7 @@ namespace host {
 namespace {
 
 /// So much is read before it is compared; an image can be as large as the flash.
-constexpr std::size_t kPieceBytes = 1024 * 1024;
+constexpr std::size_t kPieceBytes = std::size_t{1024} * 1024;
 
 }  // namespace
 

@@ -24,11 +24,11 @@ struct Offer {
     bool files = false;
 };
 
-Offer OfferFor(const OptionSpec& spec) {
-    Offer offer{spec.choices, spec.offers == Offers::Files};
-    if (spec.offers == Offers::Devices) offer.words = target::DeviceClassNames();
-    const bool assignments = spec.offers == Offers::SettingAssignments;
-    if (assignments || spec.offers == Offers::Settings)
+Offer OfferFor(const OptionRow& row) {
+    Offer offer{row.choices, row.offers == Offers::Files};
+    if (row.offers == Offers::Devices) offer.words = target::DeviceClassNames();
+    const bool assignments = row.offers == Offers::SettingAssignments;
+    if (assignments || row.offers == Offers::Settings)
         for (const SettingInfo& info : SettingCatalogue())
             if (!assignments || info.form != SettingForm::Published)
                 offer.words.push_back(info.key + std::string(assignments ? "=" : ""));
@@ -36,18 +36,18 @@ Offer OfferFor(const OptionSpec& spec) {
 }
 
 /// All options of the tool, each once: several commands share some of them.
-std::vector<OptionSpec> OptionsWithValue() {
-    std::vector<OptionSpec> all;
-    const auto add = [&](const std::vector<OptionSpec>& specs) {
-        for (const OptionSpec& spec : specs) {
-            bool known = spec.IsArgument() || spec.IsSwitch();
-            for (const OptionSpec& other : all)
-                known = known || std::string_view(other.names) == spec.names;
-            if (!known) all.push_back(spec);
+std::vector<OptionRow> OptionsWithValue() {
+    std::vector<OptionRow> all;
+    const auto add = [&](const std::vector<OptionRow>& rows) {
+        for (const OptionRow& row : rows) {
+            bool known = row.IsArgument() || row.IsSwitch();
+            for (const OptionRow& other : all)
+                known = known || std::string_view(other.names) == row.names;
+            if (!known) all.push_back(row);
         }
     };
     add(GlobalOptions());
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         add(command.options);
     return all;
 }
@@ -58,10 +58,10 @@ std::string Assignments(const Offer& offer) {
 }
 
 /// What may follow a command: its options, and what its arguments take.
-Offer OfferAfter(const CommandSpec& command) {
+Offer OfferAfter(const CommandRow& command) {
     Offer offer;
-    for (const OptionSpec& spec : command.options) {
-        const Offer argument = spec.IsArgument() ? OfferFor(spec) : Offer{SplitNames(spec), false};
+    for (const OptionRow& row : command.options) {
+        const Offer argument = row.IsArgument() ? OfferFor(row) : Offer{SplitNames(row), false};
         offer.words.insert(offer.words.end(), argument.words.begin(), argument.words.end());
         offer.files = offer.files || argument.files;
     }
@@ -74,7 +74,7 @@ std::string CommandPatterns() {
     std::vector<std::string> patterns;
     for (const std::string& word : FirstWords())
         patterns.push_back("' " + word + "'");
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         if (std::string_view(command.name).find(' ') != std::string_view::npos)
             patterns.push_back(fmt::format("'{}'", command.name));
     return fmt::format("{}", fmt::join(patterns, "|"));
@@ -83,19 +83,19 @@ std::string CommandPatterns() {
 std::string SharedBody() {
     std::vector<std::string> valued;
     std::string values;
-    for (const OptionSpec& spec : OptionsWithValue()) {
-        valued.emplace_back(spec.names);
-        values += fmt::format("    {}) {} ;;\n", spec.names, Assignments(OfferFor(spec)));
+    for (const OptionRow& row : OptionsWithValue()) {
+        valued.emplace_back(row.names);
+        values += fmt::format("    {}) {} ;;\n", row.names, Assignments(OfferFor(row)));
     }
     Offer first{FirstWords(), false};
-    for (const OptionSpec& spec : GlobalOptions())
-        for (const std::string& name : SplitNames(spec))
+    for (const OptionRow& row : GlobalOptions())
+        for (const std::string& name : SplitNames(row))
             first.words.push_back(name);
     std::string commands = fmt::format("      '') {} ;;\n", Assignments(first));
     for (const std::string& word : FirstWords())
         if (const auto second = SecondWords(word); !second.empty())
             commands += fmt::format("      '{}') {} ;;\n", word, Assignments({second, false}));
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         commands +=
             fmt::format("      '{}') {} ;;\n", command.name, Assignments(OfferAfter(command)));
     return fmt::format(
@@ -162,7 +162,7 @@ std::string FishQuoted(std::string_view text) {
 }
 
 /// When a line of fish's applies: behind the words of this command, and no other's.
-std::string FishCondition(const CommandSpec& command) {
+std::string FishCondition(const CommandRow& command) {
     const std::string name = command.name;
     const auto blank = name.find(' ');
     const std::string seen = "__fish_seen_subcommand_from ";
@@ -170,28 +170,28 @@ std::string FishCondition(const CommandSpec& command) {
     return seen + name.substr(0, blank) + "; and " + seen + name.substr(blank + 1);
 }
 
-std::string FishLine(const std::string& condition, const OptionSpec& spec) {
-    const Offer offer = OfferFor(spec);
+std::string FishLine(const std::string& condition, const OptionRow& row) {
+    const Offer offer = OfferFor(row);
     std::string line = "complete -c corvane-flash";
     if (!condition.empty()) line += " -n " + FishQuoted(condition);
-    if (!spec.IsArgument())
-        for (const std::string& name : SplitNames(spec))
+    if (!row.IsArgument())
+        for (const std::string& name : SplitNames(row))
             line += name.starts_with("--") ? " -l " + name.substr(2) : " -s " + name.substr(1);
     if (offer.files)
-        line += spec.IsArgument() ? " -F" : " -r -F";
-    else if (!spec.IsArgument() && !spec.IsSwitch())
+        line += row.IsArgument() ? " -F" : " -r -F";
+    else if (!row.IsArgument() && !row.IsSwitch())
         line += " -x";
     if (!offer.words.empty())
         line += fmt::format(" -a {}", FishQuoted(fmt::format("{}", fmt::join(offer.words, " "))));
-    return line + " -d " + FishQuoted(spec.help) + "\n";
+    return line + " -d " + FishQuoted(row.help) + "\n";
 }
 
 std::string FishScript() {
     std::string script =
         "# fish completion for corvane-flash; generated by 'corvane-flash completion fish'\n"
         "complete -c corvane-flash -f\n";
-    for (const OptionSpec& spec : GlobalOptions())
-        script += FishLine("", spec);
+    for (const OptionRow& row : GlobalOptions())
+        script += FishLine("", row);
     for (const std::string& word : FirstWords()) {
         script += fmt::format("complete -c corvane-flash -n __fish_use_subcommand -a {} -d {}\n",
                               word, FishQuoted(FirstWordHelp(word)));
@@ -201,9 +201,9 @@ std::string FishScript() {
                 "__fish_seen_subcommand_from {}' -a '{}'\n",
                 word, fmt::join(second, " "), fmt::join(second, " "));
     }
-    for (const CommandSpec& command : AllCommands())
-        for (const OptionSpec& spec : command.options)
-            script += FishLine(FishCondition(command), spec);
+    for (const CommandRow& command : AllCommands())
+        for (const OptionRow& row : command.options)
+            script += FishLine(FishCondition(command), row);
     return script;
 }
 

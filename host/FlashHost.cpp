@@ -58,8 +58,12 @@ const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
 }
 
 const char* FlashHost::GetProperty(const char* name) {
-    const char* error = Slot(AfterInterrupt::GoOn, [&] { property_ = settings_.Text(name); });
-    return error == nullptr && FindSetting(name) != nullptr ? property_.c_str() : nullptr;
+    bool known = false;
+    const char* error = Slot(AfterInterrupt::GoOn, [&] {
+        property_ = settings_.Text(name);
+        known = FindSetting(name) != nullptr || !settings_.Kept(name).empty();
+    });
+    return error == nullptr && known ? property_.c_str() : nullptr;
 }
 
 const char* FlashHost::SetProperty(const char* name, const char* value) {

@@ -58,29 +58,29 @@ std::string Entry(const std::string& term, std::string_view text) {
     return line + Wrap(text, kTermColumns, kTermColumns);
 }
 
-std::string OptionEntry(const OptionSpec& spec) {
-    const std::vector<std::string> names = SplitNames(spec);
+std::string OptionEntry(const OptionRow& row) {
+    const std::vector<std::string> names = SplitNames(row);
     std::string term = names.front();
     if (names.size() > 1)
         term += ", " + names.back();
-    else if (!spec.IsArgument())
+    else if (!row.IsArgument())
         term.insert(0, 4, ' ');
-    std::string help = spec.help;
-    if (*spec.value != '\0') term += fmt::format(" {}", spec.value);
-    if (*spec.environment != '\0') help += fmt::format(" [environment: {}]", spec.environment);
+    std::string help = row.help;
+    if (*row.value != '\0') term += fmt::format(" {}", row.value);
+    if (*row.environment != '\0') help += fmt::format(" [environment: {}]", row.environment);
     return Entry(term, help);
 }
 
-std::string CommandHelp(const CommandSpec& command) {
+std::string CommandHelp(const CommandRow& command) {
     std::string usage = fmt::format("Usage: corvane-flash {}", command.name);
     std::string arguments;
     std::string options;
-    for (const OptionSpec& spec : command.options) {
-        (spec.IsArgument() ? arguments : options) += OptionEntry(spec);
-        if (!spec.IsArgument()) continue;
+    for (const OptionRow& row : command.options) {
+        (row.IsArgument() ? arguments : options) += OptionEntry(row);
+        if (!row.IsArgument()) continue;
         const bool several =
-            std::holds_alternative<std::vector<std::string> Options::*>(spec.member);
-        usage += fmt::format(fmt::runtime(spec.required ? " {}{}" : " [{}{}]"), spec.names,
+            std::holds_alternative<std::vector<std::string> Options::*>(row.member);
+        usage += fmt::format(fmt::runtime(row.required ? " {}{}" : " [{}{}]"), row.names,
                              several ? "..." : "");
     }
     if (!options.empty()) usage += " [OPTION]...";
@@ -95,7 +95,7 @@ std::string CommandHelp(const CommandSpec& command) {
 std::string GroupText(const std::string& word) {
     std::string text =
         fmt::format("{}.\n\nUsage: corvane-flash {} COMMAND\n\nCommands:\n", GroupHelp(word), word);
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         if (std::string_view(command.name).starts_with(word + " "))
             text += Entry(command.name, command.help);
     return text + fmt::format("\n'corvane-flash {} COMMAND --help' tells more.\n", word);
@@ -124,8 +124,8 @@ std::string ToolHelp() {
     for (const std::string& word : FirstWords())
         text += Entry(word, FirstWordHelp(word));
     text += "\nOptions, before or behind the command:\n";
-    for (const OptionSpec& spec : GlobalOptions())
-        text += OptionEntry(spec);
+    for (const OptionRow& row : GlobalOptions())
+        text += OptionEntry(row);
     text += Entry("-h, --help", "Show this help, or that of the command");
     text += Entry("    --version", "Show the version");
     return text +
@@ -140,7 +140,7 @@ std::string ToolHelp() {
 
 std::string HelpText(const std::string& word) {
     if (word.empty()) return ToolHelp();
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         if (word == command.name) return CommandHelp(command);
     return GroupText(word);
 }

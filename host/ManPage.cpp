@@ -27,28 +27,28 @@ std::string Roff(std::string_view text) {
     return escaped;
 }
 
-std::string Option(const OptionSpec& spec) {
+std::string Option(const OptionRow& row) {
     std::string line;
-    for (const std::string& name : SplitNames(spec))
-        line += fmt::format("{}\\fB{}\\fR", line.empty() ? "" : ", ", Roff(name));
-    if (*spec.value != '\0') line += fmt::format(" \\fI{}\\fR", Roff(spec.value));
+    for (const std::string& name : SplitNames(row))
+        line += fmt::format(R"({}\fB{}\fR)", line.empty() ? "" : ", ", Roff(name));
+    if (*row.value != '\0') line += fmt::format(" \\fI{}\\fR", Roff(row.value));
     const std::string environment =
-        *spec.environment == '\0' ? "" : fmt::format(" Environment: {}.", spec.environment);
-    return fmt::format(".TP\n{}\n{}.{}\n", line, Roff(spec.help), environment);
+        *row.environment == '\0' ? "" : fmt::format(" Environment: {}.", row.environment);
+    return fmt::format(".TP\n{}\n{}.{}\n", line, Roff(row.help), environment);
 }
 
-std::string Synopsis(const CommandSpec& command) {
+std::string Synopsis(const CommandRow& command) {
     std::string line = fmt::format("\\fBcorvane\\-flash {}\\fR", Roff(command.name));
-    for (const OptionSpec& spec : command.options)
-        if (spec.IsArgument()) line += fmt::format(" \\fI{}\\fR", Roff(spec.names));
+    for (const OptionRow& row : command.options)
+        if (row.IsArgument()) line += fmt::format(" \\fI{}\\fR", Roff(row.names));
     return line;
 }
 
-std::string Command(const CommandSpec& command) {
+std::string Command(const CommandRow& command) {
     std::string text = fmt::format(".SS {}\n{}.\n", Synopsis(command), Roff(command.help));
     if (*command.details != '\0') text += Roff(command.details) + "\n";
-    for (const OptionSpec& spec : command.options)
-        text += Option(spec);
+    for (const OptionRow& row : command.options)
+        text += Option(row);
     return text + fmt::format(".PP\nExample:\n.PP\n.nf\n{}\n.fi\n", Roff(command.example));
 }
 
@@ -85,10 +85,10 @@ constexpr char kTail[] =
 std::string ManPage() {
     std::string page = kHead;
     page += ".SH OPTIONS\nEvery command takes them, before or behind its own.\n";
-    for (const OptionSpec& spec : GlobalOptions())
-        page += Option(spec);
+    for (const OptionRow& row : GlobalOptions())
+        page += Option(row);
     page += ".SH COMMANDS\n";
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         page += Command(command);
     page += ".SH SIMULATED DEVICES\n.nf\n" + Roff(target::DeviceOptionsHelp()) + "\n.fi\n";
     return page + kTail;

@@ -86,7 +86,7 @@ void Reporter::End(const Outcome& outcome) {
                      {"seconds", SecondsJson(elapsed.count())}});
 }
 
-void Reporter::JsonLine(const char* event, Json members) {
+void Reporter::JsonLine(const char* event, const Json& members) {
     if (!options_.json) return;
     Json line{{"version", kJsonVersion}, {"event", event}};
     line.update(members);

@@ -53,7 +53,7 @@ class Reporter {
     bool Hears(Talk level) const { return options_.talk >= level; }
 
   private:
-    void JsonLine(const char* event, Json members);
+    void JsonLine(const char* event, const Json& members);
     void Line(std::FILE* stream, const std::string& text);
 
     Options options_;

@@ -8,8 +8,8 @@
 
 #include <algorithm>
 #include <charconv>
-#include <regex>
 #include <stdexcept>
+#include <string_view>
 #include <system_error>
 
 #include "host/MacAddress.h"
@@ -68,9 +68,12 @@ bool StartsWithNumber(std::string text, bool whole) {
     return error == std::errc() && (!whole || end == text.data() + text.size());
 }
 
-bool IsSwitch(const std::string& text) {
-    static const std::regex form("\\+?0*[01]|-0+");
-    return std::regex_match(text, form);
+/// Zeros and a last digit, which may be 1 except behind a minus sign.
+bool IsSwitch(std::string_view text) {
+    const bool negative = text.starts_with('-');
+    if (negative || text.starts_with('+')) text.remove_prefix(1);
+    if (!text.ends_with('0') && (negative || !text.ends_with('1'))) return false;
+    return text.find_first_not_of('0') >= text.size() - 1;
 }
 
 bool Accepts(const SettingInfo& info, const std::string& text) {

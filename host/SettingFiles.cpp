@@ -30,7 +30,7 @@ std::string Variable(const char* name) {
 
 std::string ConfigurationDirectory() {
     // Only an absolute path counts, by the rule of the XDG base directories.
-    if (const std::string xdg = Variable("XDG_CONFIG_HOME"); xdg.starts_with('/')) return xdg;
+    if (std::string xdg = Variable("XDG_CONFIG_HOME"); xdg.starts_with('/')) return xdg;
     if (const std::string home = Variable("HOME"); !home.empty()) return home + "/.config";
     return {};
 }
@@ -67,6 +67,8 @@ std::optional<std::string> TextOf(const toml::node& node, SettingForm form) {
 
 std::string ReadEntry(const std::string& key, const toml::node& node, bool kept) {
     const SettingInfo* info = FindSetting(key);
+    // The plug-in may keep what this host knows nothing of.
+    if (info == nullptr && kept) return node.value_or(std::string());
     if (info == nullptr)
         throw std::invalid_argument(
             fmt::format("unknown setting '{}'; 'corvane-flash settings' lists all keys", key));

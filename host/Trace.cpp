@@ -15,7 +15,7 @@ namespace host {
 
 namespace {
 
-constexpr std::size_t kBufferBytes = 64 * 1024;
+constexpr std::size_t kBufferBytes = std::size_t{64} * 1024;
 
 void ReceiveLine(void* context, int level, const char* text) {
     static_cast<Trace*>(context)->Line("plug-in", fmt::format("{} {}", level, text));

@@ -44,7 +44,7 @@ const char* TracingHost::SetProperty(const char* name, const char* value) {
 
 const char* TracingHost::LoadProgram(const char* fileName, const char* second,
                                      const char* directory) {
-    return Answer(fmt::format("LoadProgram \"{}\", \"{}\", \"{}\"", fileName, second, directory),
+    return Answer(fmt::format(R"(LoadProgram "{}", "{}", "{}")", fileName, second, directory),
                   next_.LoadProgram(fileName, second, directory));
 }
 

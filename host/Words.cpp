@@ -6,8 +6,8 @@
 
 namespace host {
 
-std::vector<std::string> SplitNames(const OptionSpec& spec) {
-    const std::string names = spec.names;
+std::vector<std::string> SplitNames(const OptionRow& row) {
+    const std::string names = row.names;
     const auto comma = names.find(',');
     if (comma == std::string::npos) return {names};
     return {names.substr(0, comma), names.substr(comma + 1)};
@@ -15,7 +15,7 @@ std::vector<std::string> SplitNames(const OptionSpec& spec) {
 
 std::vector<std::string> FirstWords() {
     std::vector<std::string> words;
-    for (const CommandSpec& command : AllCommands()) {
+    for (const CommandRow& command : AllCommands()) {
         const std::string name = command.name;
         const std::string word = name.substr(0, name.find(' '));
         if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
@@ -25,14 +25,14 @@ std::vector<std::string> FirstWords() {
 
 std::vector<std::string> SecondWords(const std::string& first) {
     std::vector<std::string> words;
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         if (const std::string name = command.name; name.starts_with(first + " "))
             words.push_back(name.substr(first.size() + 1));
     return words;
 }
 
 std::string FirstWordHelp(const std::string& word) {
-    for (const CommandSpec& command : AllCommands())
+    for (const CommandRow& command : AllCommands())
         if (word == command.name) return command.help;
     return GroupHelp(word);
 }

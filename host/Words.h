@@ -10,7 +10,7 @@
 namespace host {
 
 /// "-q,--quiet" as {"-q", "--quiet"}.
-std::vector<std::string> SplitNames(const OptionSpec& spec);
+std::vector<std::string> SplitNames(const OptionRow& row);
 
 /// The words that a command line can begin with, each once.
 std::vector<std::string> FirstWords();

@@ -24,7 +24,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec BlankCheck() {
+CommandRow BlankCheck() {
     return {"blank-check",
             "Check that the flash, or a range of it, is erased",
             "The exit status is 5 when a byte isn't 0xFF.",

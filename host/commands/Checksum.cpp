@@ -20,7 +20,7 @@ namespace {
 std::uint32_t ImageChecksum(const image::Image& image, const AddressRange& range) {
     uLong crc = crc32(0, nullptr, 0);
     std::uint64_t next = range.first;
-    const std::vector<std::uint8_t> erased(64 * 1024, 0xFF);
+    const std::vector<std::uint8_t> erased(0x10000, 0xFF);
     const auto fill = [&](std::uint64_t end) {
         while (next < end) {
             const std::uint64_t count = std::min<std::uint64_t>(erased.size(), end - next);
@@ -79,7 +79,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Checksum() {
+CommandRow Checksum() {
     return {
         "checksum",
         "Calculate the CRC-32 of the flash, of a range, or of an image",

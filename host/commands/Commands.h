@@ -7,27 +7,27 @@
 
 namespace host::commands {
 
-CommandSpec Info();
-CommandSpec Program();
-CommandSpec Verify();
-CommandSpec Read();
-CommandSpec Erase();
-CommandSpec BlankCheck();
-CommandSpec Checksum();
-CommandSpec RegisterRead();
-CommandSpec RegisterProgram();
-CommandSpec MacRead();
-CommandSpec MacProgram();
-CommandSpec Operation();
-CommandSpec Settings();
-CommandSpec Completion();
+CommandRow Info();
+CommandRow Program();
+CommandRow Verify();
+CommandRow Read();
+CommandRow Erase();
+CommandRow BlankCheck();
+CommandRow Checksum();
+CommandRow RegisterRead();
+CommandRow RegisterProgram();
+CommandRow MacRead();
+CommandRow MacProgram();
+CommandRow Operation();
+CommandRow Settings();
+CommandRow Completion();
 
 // Options that several commands share.
-OptionSpec RangeOption(const char* help);
-OptionSpec ImagesArgument();
-OptionSpec FormatOption();
-OptionSpec BaseOption();
-OptionSpec DryRunOption();
-OptionSpec CommitOption();
+OptionRow RangeOption(const char* help);
+OptionRow ImagesArgument();
+OptionRow FormatOption();
+OptionRow BaseOption();
+OptionRow DryRunOption();
+OptionRow CommitOption();
 
 }  // namespace host::commands

@@ -17,7 +17,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Completion() {
+CommandRow Completion() {
     return {"completion",
             "Print the shell completion script for bash, zsh or fish",
             "",

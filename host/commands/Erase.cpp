@@ -41,7 +41,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Erase() {
+CommandRow Erase() {
     return {"erase",
             "Erase the whole flash, or the sectors of a range",
             "A sector is erased whole: what it holds outside of the range is lost as well.",

@@ -47,7 +47,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Info() {
+CommandRow Info() {
     return {"info", "Show what the plug-in found: family, flash, sectors, RAM, operations",
             "",     "  corvane-flash --sim quen,flash=512K info",
             {},     Run};

@@ -66,11 +66,11 @@ Outcome RunProgram(Context& context) {
 
 }  // namespace
 
-CommandSpec MacRead() {
+CommandRow MacRead() {
     return {"mac read", "Read the MAC address", "", "  corvane-flash mac read", {}, RunRead};
 }
 
-CommandSpec MacProgram() {
+CommandRow MacProgram() {
     return {
         "mac program",
         "Program the MAC address",

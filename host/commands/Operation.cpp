@@ -46,7 +46,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Operation() {
+CommandRow Operation() {
     return {
         "operation",
         "Run one of the plug-in's operations by its name, with the settings as they are",

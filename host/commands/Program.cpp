@@ -139,7 +139,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Program() {
+CommandRow Program() {
     return {"program",
             "Program image files into flash and compare the result",
             "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors that the "

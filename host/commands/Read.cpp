@@ -55,7 +55,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Read() {
+CommandRow Read() {
     return {"read",
             "Read flash back into a file",
             "The extension chooses the format: .hex, .ihex for Intel HEX, .srec, .s19 and the like "

@@ -14,7 +14,7 @@ unsigned Index(const Context& context) {
     return context.options.index == "1" ? 1 : 0;
 }
 
-OptionSpec IndexArgument() {
+OptionRow IndexArgument() {
     return {"INDEX", "", "0 or 1", &Options::index, Offers::Nothing, {"0", "1"}, true};
 }
 
@@ -58,7 +58,7 @@ Outcome RunProgram(Context& context) {
 
 }  // namespace
 
-CommandSpec RegisterRead() {
+CommandRow RegisterRead() {
     return {"register read",
             "Read a user register",
             "",
@@ -67,7 +67,7 @@ CommandSpec RegisterRead() {
             RunRead};
 }
 
-CommandSpec RegisterProgram() {
+CommandRow RegisterProgram() {
     return {
         "register program",
         "Program a user register",

@@ -75,7 +75,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Settings() {
+CommandRow Settings() {
     return {"settings",
             "List the settings with meaning, accepted texts and origin; show or keep one",
             "A value comes from the first of: command line, environment variable CORVANE_SET_KEY, "

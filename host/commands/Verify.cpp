@@ -33,7 +33,7 @@ Outcome Run(Context& context) {
 
 }  // namespace
 
-CommandSpec Verify() {
+CommandRow Verify() {
     return {"verify",
             "Compare flash with image files",
             "The exit status is 5 when a byte differs.",

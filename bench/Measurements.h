@@ -1,0 +1,24 @@
+// The tables that script/bench prints.
+
+#pragma once
+
+#include "bench/Table.h"
+
+namespace bench {
+
+/// Host calls by kind beside the least that the device's protocol allows.
+Table CountsTable();
+
+/// A program load on one virtual clock, by link and by the loader's speed.
+Table ModelledTimeTable();
+
+/// The plug-in's processor time beside that of its host calls alone.
+Table OwnWorkTable();
+
+/// The same by size, up to the largest flash.
+Table GrowthTable();
+
+/// Bytes a second of the reading operations beside the library functions that do the same.
+Table ThroughputTable();
+
+}  // namespace bench

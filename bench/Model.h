@@ -1,0 +1,32 @@
+// Work on the simulated device, and where its time goes.
+
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+
+#include "bench/Workloads.h"
+
+namespace bench {
+
+struct Link {
+    std::uint32_t latencyUs;
+    std::uint32_t bandwidthKB;  ///< thousands of bytes a second
+    std::uint32_t chunkMs;      ///< flash time of a loader chunk
+};
+
+struct ModelledTime {
+    using Seconds = std::chrono::duration<double>;
+    Seconds link;
+    Seconds pauses;
+    Seconds waiting;  ///< for the loader, in the plug-in's own waits
+    Seconds loader;   ///< at work
+
+    Seconds Total() const { return link + pauses + waiting; }
+};
+
+constexpr Link kFastestLink = {0, 1000, 5};
+
+ModelledTime Model(const Workload& work, const Link& link);
+
+}  // namespace bench

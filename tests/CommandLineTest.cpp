@@ -1,0 +1,339 @@
+// corvane-flash as its users meet it: the built tool, run with the built plug-in on simulated
+// devices. Every row is one command line or a few; what counts is the exit status and what stands
+// on which stream. The same rows are run once more for their JSON lines.
+
+#include <gtest/gtest.h>
+#include <stdlib.h>
+#include <sys/wait.h>
+
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <nlohmann/json.hpp>
+#include <ostream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace {
+
+namespace fs = std::filesystem;
+using nlohmann::json;
+
+struct Result {
+    int status = -1;
+    std::string out;
+    std::string err;
+};
+
+std::string Contents(const fs::path& path) {
+    std::ostringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
+}
+
+/// The place where a test's commands run: empty but for a few images, with settings of its own.
+class Workplace {
+  public:
+    Workplace() {
+        std::string name = fs::temp_directory_path() / "command-line-test-XXXXXX";
+        path_ = mkdtemp(name.data());
+        Write("small.hex", ":0400100001020304E2\n:00000001FF\n");  // 01 02 03 04 at 0x10
+        Write("other.srec", "S1070010010203FFE3\nS9030000FC\n");   // contradicts small.hex
+        Write("far.srec",
+              "S30900040000AABB0000"
+              "8D\nS70500000000FA\n");  // at 0x40000
+        Write("bad.hex", ":0400100001020304E3\n:00000001FF\n");
+        Write("data.bin", std::string(300, '\x42'));
+        Write("wrong.toml", "FlashTimeoutValue = \"soon\"\n");
+        Write("mine.toml", "");
+        Write("broken.so", "no library");
+    }
+    ~Workplace() { fs::remove_all(path_); }
+    Workplace(const Workplace&) = delete;
+    Workplace& operator=(const Workplace&) = delete;
+
+    fs::path File(const std::string& name) const { return path_ / name; }
+    void Write(const std::string& name, const std::string& contents) const {
+        std::ofstream(path_ / name, std::ios::binary) << contents;
+    }
+
+    /// Runs shell commands in which `tool` is the tool and $ELF, $HEX and $BIN a real firmware.
+    Result Run(const std::string& commands) const {
+        const std::string script =
+            "cd '" + path_.string() +
+            "' && exec >.out 2>.err </dev/null\n"
+            "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
+            "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_PLUGIN\n"
+            "ELF=/usr/lib/firmware-tomu/toboot.elf HEX=/usr/lib/firmware-tomu/toboot.ihex\n"
+            "BIN=/usr/lib/firmware-tomu/toboot.bin\n"
+            "tool() { \"" CORVANE_FLASH_TOOL "\" \"$@\"; }\n" +
+            commands + "\n";
+        const int status = std::system(script.c_str());
+        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, Contents(File(".out")),
+                Contents(File(".err"))};
+    }
+
+  private:
+    fs::path path_;
+};
+
+struct Row {
+    const char* commands;
+    int status;
+    const char* out;  ///< a part of standard output; "" if it must be empty, null if it may be all
+    const char* err;  ///< the same of standard error
+};
+
+void PrintTo(const Row& row, std::ostream* stream) {
+    *stream << row.commands;
+}
+
+// Commands that succeed.
+const Row kDone[] = {
+    {"tool info", 0,
+     "Family      Tolva Rev.B\nFlash       256 KiB (0x0-0x3ffff)\nSector      1 KiB\n"
+     "RAM         64 KiB\nOperations  Erase | BlankCheck | ",
+     ""},
+    {"tool --sim dorna,flash=2M,sector=8K info", 0,
+     "Family      Dorna\nFlash       2 MiB (0x0-0x1fffff)\nSector      8 KiB\n", ""},
+    {"tool info --sim velk", 0, "Flash       none", ""},
+    {"CORVANE_SIM=quen tool info", 0, "Family      Quen", ""},
+    {"tool program $ELF", 0, "Erased        6 KiB", "5.5 KiB in 1 section for Tolva Rev.B"},
+    {"tool -q program $ELF", 0, "", ""},
+    {"tool -v program $ELF", 0, nullptr, "erase    0x0-0x17ff"},
+    {"tool -vv program $ELF", 0, nullptr, "Erasing Flash Page @ address 0x1400 of size 0x400"},
+    {"tool program $ELF --crc", 0, "Checksummed   256 KiB", "CRC-32 value: 0xfe9214a8"},
+    {"tool program $ELF --blank-check", 0, "Blank-checked 5.5 KiB", "in 1 section"},
+    {"tool program $ELF --no-verify", 0, "Written", nullptr},
+    {"tool program data.bin --base 800 --erase all", 0, "Erased        256 KiB", nullptr},
+    {"tool program data.bin --base 800 --erase 800-fff", 0, "Erased        2 KiB", nullptr},
+    {"tool program small.hex --format ihex --sim mesk", 0, "Written       128 bytes", nullptr},
+    {"tool program small.hex --progress plain", 0, "Compared",
+     "Programming: 0 % (0 bytes of 128 bytes)\nProgramming: 100 % (128 bytes of 128 bytes)\n"},
+    {"tool program small.hex --progress bar", 0, nullptr, "\r\033[KProgramming "},
+    {"tool program small.hex --trace -", 0, nullptr, "plug-in  3 FlashCorvane::WriteDataToFlash()"},
+    {"tool -q program small.hex --trace t && cat t", 0, "host     LoadProgram \"FlashLoader", ""},
+    {"tool program small.hex data.bin --base 400 --dry-run --sim-file d && test ! -e d", 0,
+     "erase    0x0-0x7ff               2 sectors\nprogram  0x10-0x52b              1.3 KiB\n"
+     "304 bytes of the image; 1.7 KiB more are cleared with its sectors; 254 KiB of flash are not "
+     "erased\n",
+     "in 1 section"},
+    {"tool erase --all", 0, "Erased        256 KiB", "Erase covers 0x0-0x3ffff: 256 sectors"},
+    {"tool erase --range 3ff-400", 0, "Erased        2 KiB", "Erase covers 0x0-0x7ff: 2 sectors"},
+    {"tool erase --range 0-0 --dry-run", 0, "would erase 0x0-0x3ff: 1 sector, 1 KiB; 255 KiB", ""},
+    {"tool -q blank-check --range 5-5", 0, "0x5-0x5 is blank\n", nullptr},
+    {"tool -q checksum", 0, "0xb7094978\n", ""},
+    {"tool checksum --range 0-3", 0, "0xffffffff\n", "CRC-32 value: 0xffffffff"},
+    {"tool checksum --of $ELF", 0, "0xfe9214a8\n", ""},
+    {"tool checksum --of small.hex --range 10-13", 0, "0xb63cfbcd\n", ""},
+    {"tool register read 1", 0, "0xffffffff\n", ""},
+    {"tool register program 1 12ab", 0, "User register 1: was 0xffffffff, is 0x000012ab\n",
+     "gone after the next reset"},
+    {"tool mac program 0:1a:b6:1:2:3", 0,
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n", "gone after the next reset"},
+    {"tool mac program 01-00-5e-00-00-01 --force", 0, "is 01-00-5e-00-00-01", nullptr},
+    {"tool operation BlankCheck", 0, "Blank-checked 256 KiB", "Operation completed successfully."},
+    {"tool operation ReadMACAddress", 0, "", "MAC address value: ff-ff-ff-ff-ff-ff"},
+    {"tool operation Test", 0, "", ""},
+    {"tool settings", 0, "FlashTimeoutValue = \"30\"  (default)\n    longest wait", ""},
+    {"tool -q settings FlashCrystalFreq", 0, "8\n", ""},
+    {"tool --settings mine.toml settings FlashCrystalFreq=10", 0, "\"10\"  (kept value)", ""},
+    {"CORVANE_SET_FlashCrystalFreq=c tool settings FlashCrystalFreq=10", 0, "\"c\"  (environment)",
+     "the value of the environment goes before it"},
+    {"tool --settings wrong.toml completion bash | bash -n", 0, "", ""},
+    {"tool --help", 0, "Usage: corvane-flash [OPTION]... COMMAND", ""},
+    {"tool mac program --help", 0, "Usage: corvane-flash mac program ADDRESS [OPTION]...", ""},
+    {"tool --version", 0, "corvane-flash 1.", ""},
+};
+
+// Commands that fail: each with its status and one clear line.
+const Row kFailing[] = {
+    // The device or the plug-in.
+    {"tool program small.hex --sim tolva,erase=never", 1, nullptr, "Erasing flash contents timed"},
+    {"tool program small.hex --sim tolva,fail-access=30", 1, "",
+     "corvane-flash: programming 0x10-0x13: "},
+    {"tool program small.hex --sim tolva,loader=dead --set FlashTimeoutValue=1", 1, "",
+     "Flash programming timed out.\n"},
+    {"tool program small.hex --sim mesk,flash=256K --erase all", 1, "",
+     "erased 0 bytes of 256 KiB and gave no reason"},
+    {"tool erase --all --sim mesk,flash=256K", 1, "", "Error erasing flash..\n"},
+    {"tool erase --all --sim velk", 1, "", "the device (Velk) has no flash"},
+    {"tool register read 0 --sim ravik", 1, "", "does not have user reigsters"},
+    {"tool operation Nonsense", 1, "", "'Nonsense' is none of the plug-in's operations: Erase |"},
+    // The command line.
+    {"tool", 2, "", "which command?"},
+    {"tool nonsense", 2, "", "unknown command or option: nonsense"},
+    {"tool mac", 2, "", "mac what? read or program"},
+    {"tool info --nonsense", 2, "", "--nonsense; 'corvane-flash info --help'"},
+    {"tool program", 2, "", "FILE is required"},
+    {"tool program small.hex --erase some", 2, "", "necessary, none, all or a range A-B"},
+    {"tool program small.hex --base xyz", 2, "", "--base 'xyz' is no hexadecimal number"},
+    {"tool info --progress fast", 2, "", "--progress: fast not in"},
+    {"tool info --sim nonsense", 2, "", "nonsense"},
+    {"tool info --sim tolva,colour=red", 2, "", "colour"},
+    {"tool info --set FlashNonsense=1", 2, "", "--set: unknown setting 'FlashNonsense'"},
+    {"tool info --set FlashEraseEndAddr=xyz", 2, "", "FlashEraseEndAddr can't be 'xyz'"},
+    {"tool info --set FlashEraseEndAddr", 2, "", "write KEY=TEXT"},
+    {"CORVANE_SET_FlashTimeoutValue=x tool info", 2, "", "variable CORVANE_SET_FlashTimeoutValue:"},
+    {"tool settings FlashChecksumValue=1", 2, "", "only the plug-in writes it"},
+    {"tool erase", 2, "", "erase what? --all"},
+    {"tool erase --all --range 0-1", 2, "", "not both"},
+    {"tool erase --range ''", 2, "", "'' is no address range"},
+    {"tool blank-check --range 0-40000", 2, "", "doesn't lie in the device's flash, 0x0-0x3ffff"},
+    {"tool read small.hex", 2, "", "small.hex exists; overwrite it with --force"},
+    {"tool read flash.elf", 2, "", "name a .bin, .hex or .srec file"},
+    {"tool register program 0 xyz", 2, "", "the value 'xyz' is no hexadecimal number"},
+    {"tool register read 2", 2, "", "INDEX: 2 not in"},
+    {"tool mac program 00-1a-b6-01-02", 2, "", "is no MAC address"},
+    {"tool mac program 01-00-5e-00-00-01", 2, "", "is a multicast address"},
+    {"tool operation ProgramMACAddress", 2, "", "is all ones"},
+    // Files.
+    {"tool program none.elf", 3, "", "none.elf"},
+    {"tool program data.bin", 3, "", "--base"},
+    {"tool program bad.hex", 3, "", "bad.hex"},
+    {"head -c 3000 $ELF > cut.elf; tool program cut.elf", 3, "", "cut.elf"},
+    {"tool program small.hex other.srec", 3, "", "other.srec"},
+    {"tool program small.hex far.srec", 3, "", "far.srec: the section 0x40000-0x40003 doesn't"},
+    {"tool program small.hex --sim velk", 3, "", "the device has none to program"},
+    {"tool info --settings wrong.toml", 3, "", "wrong.toml: line 1: FlashTimeoutValue can't be"},
+    {"tool info --settings none.toml", 3, "", "none.toml: can't be read"},
+    {"tool read none/flash.bin", 3, "", "can't write the flash contents to none/flash.bin"},
+    {"tool info --trace none/t", 3, "", "can't write the trace to none/t"},
+    // Plug-in and target.
+    {"tool info --plugin none.so", 4, "", "none.so: cannot open shared object file"},
+    {"tool info --plugin broken.so", 4, "", "broken.so"},
+    {"tool info --plugin $(ldconfig -p | sed -n 's/.* //; /libz\\.so\\.1$/p' | head -1)", 4, "",
+     "is no flash plug-in: it exports no CreateFlashDevice2"},
+    {"tool info --sim-file data.bin", 4, "", "data.bin"},
+    {"tool info --sim tolva,fail-access=2", 4, "",
+     "can't reach the target: identifying the device"},
+    // Flash that isn't as it should be.
+    {"tool verify small.hex", 5, "Compared      4 bytes",
+     "first at 0x10, expected 0x01, actual 0xff; 4 bytes differ; no bit needs an erase"},
+    {"tool program small.hex --sim tolva,stuck-cell=0x12", 5, "Written",
+     "first at 0x12, expected 0x03, actual 0x00; 1 byte differs; some bits were not erased"},
+    {"tool program small.hex --blank-check --sim tolva,stuck-cell=0x12", 5, "",
+     "the flash isn't blank: 0x12 holds 0x00, not 0xff"},
+    {"tool blank-check --sim tolva,stuck-cell=0x1234", 5, "", "0x1234 holds 0x00"},
+    // Ctrl-C.
+    {"timeout --preserve-status -s INT 1 " CORVANE_FLASH_TOOL
+     " program /usr/lib/firmware-tomu/toboot.elf --sim tolva,loader=hangs",
+     130, "", "interrupted; the flash is incomplete: 6 KiB erased"},
+};
+
+/// That a stream holds a part; that it is empty for ""; nothing for null.
+void ExpectPart(const std::string& stream, const char* part) {
+    if (part == nullptr) return;
+    const bool held = *part == '\0' ? stream.empty() : stream.find(part) != std::string::npos;
+    EXPECT_TRUE(held) << "not as expected:\n" << stream << "but:\n" << part;
+}
+
+class CommandLine : public testing::TestWithParam<Row> {};
+
+TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
+    const Row& row = GetParam();
+    const Result result = Workplace().Run(row.commands);
+    EXPECT_EQ(result.status, row.status) << result.err;
+    ExpectPart(result.out, row.out);
+    ExpectPart(result.err, row.err);
+    const bool explained = ("\n" + result.err).find("\ncorvane-flash: ") != std::string::npos;
+    EXPECT_EQ(explained, row.status != 0) << result.err;
+}
+
+/// The first "tool" of the commands, or the tool's path, with --json behind it.
+std::string WithJson(std::string commands) {
+    const std::string name = commands.find("timeout") == 0 ? CORVANE_FLASH_TOOL : "tool";
+    return commands.insert(commands.find(name) + name.size(), " --json");
+}
+
+TEST_P(CommandLine, TellsTheSameInJsonLines) {
+    const Row& row = GetParam();
+    const std::string commands = row.commands;
+    for (const char* other : {"|", "&", "--help", "--version"})
+        if (commands.find(other) != std::string::npos) return;  // it's not all JSON
+    const Result result = Workplace().Run(WithJson(commands));
+    EXPECT_EQ(result.status, row.status);
+    std::vector<json> lines;
+    std::map<std::string, std::uint64_t> done;
+    for (std::istringstream stream(result.out); stream.peek() != EOF;) {
+        std::string line;
+        std::getline(stream, line);
+        lines.push_back(json::parse(line));
+        EXPECT_EQ(lines.back()["version"], 1);
+        if (lines.back()["event"] != "progress") continue;
+        std::uint64_t& before = done[lines.back()["phase"]];
+        EXPECT_GE(lines.back()["done"], before);
+        EXPECT_LE(lines.back()["done"], lines.back()["total"]);
+        before = lines.back()["done"];
+    }
+    ASSERT_FALSE(lines.empty());
+    EXPECT_EQ(lines.front()["event"], lines.size() == 1 ? "end" : "begin");
+    const json& end = lines.back();
+    EXPECT_EQ(end["event"], "end");
+    EXPECT_EQ(end["status"], row.status);
+    EXPECT_EQ(end["ok"], row.status == 0);
+    EXPECT_EQ(end["error"].is_null(), row.status == 0);
+}
+
+INSTANTIATE_TEST_SUITE_P(Done, CommandLine, testing::ValuesIn(kDone));
+INSTANTIATE_TEST_SUITE_P(Failing, CommandLine, testing::ValuesIn(kFailing));
+
+// Several runs on one device.
+const Row kStories[] = {
+    {"for f in $ELF $HEX '--base 0 '$BIN; do rm -f d; tool -q --sim-file d program $f;\n"
+     "tool -q --sim-file d checksum; done",
+     0, "0xfe9214a8\n0xfe9214a8\n0xfe9214a8\n", ""},
+    {"export CORVANE_SIM_FILE=d; tool -q program $ELF\n"
+     "for f in a.bin a.hex a.srec; do tool -q read $f && tool -q verify $f --base 0; done\n"
+     "tool -q read p.bin --range 10-1f && cmp -n 16 -i 0:16 p.bin a.bin && wc -c < p.bin",
+     0, "The flash holds the image\nThe flash holds the image\nThe flash holds the image\n16\n",
+     ""},
+    {"export CORVANE_SIM_FILE=d; tool -q program small.hex; tool -q program data.bin --base 400\n"
+     "tool -q verify small.hex; tool -q erase --range 400-7ff; tool -q blank-check --range "
+     "400-7ff\n"
+     "tool -q program data.bin --base 10 --erase none",
+     5, "The flash holds the image\n0x400-0x7ff is blank\n", "bits were not erased"},
+    {"export CORVANE_SIM_FILE=d; tool -q mac program 0-1a-b6-1-2-3; tool mac read\n"
+     "tool -q mac program 0-1a-b6-1-2-3 --commit; tool mac read; tool register read 0",
+     0,
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\nff-ff-ff-ff-ff-ff\n"
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n00-1a-b6-01-02-03\n0x00b61a00\n",
+     ""},
+    {"tool -q --sim quen,flash=512K --sim-file d program small.hex; tool -q --sim-file d info | "
+     "head -1; tool --sim-file d --sim quen,flash=256K info",
+     2, "Family      Quen\n", "flash"},
+    {"export CORVANE_SIM_FILE=d; tool -q program small.hex --sim tolva; tool -q erase --all "
+     "--sim tolva,fail-from=40; tool -q blank-check",
+     5, "", "isn't blank: 0x10 holds 0x01"},
+    {"export CORVANE_SIM_FILE=d; tool -q program small.hex; tool -q program data.bin --base 10 "
+     "--sim "
+     "tolva,fail-access=50; tool -q blank-check --range 0-3ff",
+     0, "0x0-0x3ff is blank", "the flash is incomplete: 1 KiB erased"},
+    {"tool settings FlashVerboseMode=1 >/dev/null; tool -q settings FlashVerboseMode; tool -q "
+     "checksum; tool -q settings FlashChecksumValue; tool -q settings --forget FlashVerboseMode",
+     0, "1\n0xb7094978\nb7094978\n0\n", ""},
+    {"XDG_CONFIG_HOME=/proc/none tool -q blank-check && XDG_CONFIG_HOME=/proc/none tool settings "
+     "FlashVerboseMode=1",
+     3, "is blank", "can't write settings to /proc/none"},
+    {"tool read a.bin; ln a.bin old; tool -q read a.bin --force --range 0-f && wc -c < a.bin; wc "
+     "-c "
+     "< old",
+     0, "16\n262144\n", nullptr},
+    {"tool info > /dev/full", 3, "", "can't write to standard output: No space left on device"},
+    {"tool settings | head -1", 0, "FlashProgramOption", ""},
+};
+
+class CommandLineStory : public testing::TestWithParam<Row> {};
+
+TEST_P(CommandLineStory, EndsAsItShould) {
+    const Row& row = GetParam();
+    const Result result = Workplace().Run(row.commands);
+    EXPECT_EQ(result.status, row.status);
+    ExpectPart(result.out, row.out);
+    ExpectPart(result.err, row.err);
+}
+
+INSTANTIATE_TEST_SUITE_P(Runs, CommandLineStory, testing::ValuesIn(kStories));
+
+}  // namespace
