@@ -55,7 +55,8 @@ std::string Describe(const Difference& difference) {
         difference.count == 1 ? "1 byte" : fmt::format("{} bytes", difference.count),
         difference.count == 1 ? "s" : "",
         difference.notErased
-            ? "some bits were not erased: program with --erase necessary, or erase the range first"
+            ? "some bits were not erased: program with --erase necessary, or erase the range "
+              "first; a cell that stays so is damaged"
             : "no bit needs an erase: the bytes were not programmed, or not from this image");
 }
 

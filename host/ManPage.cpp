@@ -31,14 +31,14 @@ std::string Option(const OptionRow& row) {
     std::string line;
     for (const std::string& name : SplitNames(row))
         line += fmt::format(R"({}\fB{}\fR)", line.empty() ? "" : ", ", Roff(name));
-    if (*row.value != '\0') line += fmt::format(" \\fI{}\\fR", Roff(row.value));
+    if (*row.value != '\0') line += fmt::format(R"( \fI{}\fR)", Roff(row.value));
     const std::string environment =
         *row.environment == '\0' ? "" : fmt::format(" Environment: {}.", row.environment);
     return fmt::format(".TP\n{}\n{}.{}\n", line, Roff(row.help), environment);
 }
 
 std::string Synopsis(const CommandRow& command) {
-    std::string line = fmt::format("\\fBcorvane\\-flash {}\\fR", Roff(command.name));
+    std::string line = fmt::format(R"(\fBcorvane\-flash {}\fR)", Roff(command.name));
     for (const OptionRow& row : command.options)
         if (row.IsArgument()) line += fmt::format(" \\fI{}\\fR", Roff(row.names));
     return line;

@@ -337,7 +337,7 @@ TEST(Comparison, SaysWhereAndWhetherAnEraseIsMissing) {
     EXPECT_EQ(Describe(*difference),
               "the flash differs from the image: first at 0x101, expected 0x0f, actual 0xff; 3 "
               "bytes differ; some bits were not erased: program with --erase necessary, or erase "
-              "the range first");
+              "the range first; a cell that stays so is damaged");
 }
 
 TEST(Progress, FitsEveryTerminal) {

@@ -2,6 +2,8 @@
 
 #include <fmt/format.h>
 
+#include <string>
+
 #include "host/Comparison.h"
 #include "host/FlashDevice.h"
 #include "host/ProgramPlan.h"
@@ -70,7 +72,20 @@ void Expect(Context& context, WorkMeter& meter, const ProgramPlan& plan, std::ui
     if (!context.options.noVerify) meter.Expect(Phase::Verify, plan.imageBytes);
 }
 
+/// The wait for the loader is one budget for a whole section, so a fixed default would fail large
+/// images on slow flash. Each chunk may cost two polls more, unless the user has set a limit.
+void AllowTime(Context& context, const ProgramPlan& plan) {
+    constexpr std::uint64_t kChunkBytes = 2048;
+    constexpr std::uint64_t kChunksPerSecond = 5;
+    const SettingValue limit = context.settings.Get(keys::kTimeout);
+    if (limit.origin != Origin::Default) return;
+    const auto seconds =
+        std::stoul(limit.text) + plan.transferBytes / (kChunkBytes * kChunksPerSecond);
+    Choose(context, keys::kTimeout, std::to_string(seconds));
+}
+
 void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
+    AllowTime(context, plan);
     device.ResetSettings(kLoadBegins);
     for (const image::Section& section : plan.sections)
         device.WriteSection(section);
