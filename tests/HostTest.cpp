@@ -102,15 +102,6 @@ TEST(Text, ReadsRangesAndNamesWhatIsWrong) {
         EXPECT_TRUE(FailureOf([&] { ParseRange(text); }).starts_with(expected)) << text;
 }
 
-TEST(Text, ShowsAmountsAsPeopleDo) {
-    EXPECT_EQ(SizeText(0) + "|" + SizeText(1) + "|" + SizeText(1023) + "|" + SizeText(1024) + "|" +
-                  SizeText(5664) + "|" + SizeText(std::uint64_t{3} << 29),
-              "0 bytes|1 byte|1023 bytes|1 KiB|5.5 KiB|1.5 GiB");
-    EXPECT_EQ(DurationText(0) + "|" + DurationText(0.0421) + "|" + DurationText(4.24) + "|" +
-                  DurationText(125.9),
-              "under 1 ms|42 ms|4.2 s|2:05");
-}
-
 TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {
     const std::pair<const char*, const char*> cases[] = {
         {"00-1A-B6-01-02-03", "00-1a-b6-01-02-03"},

@@ -270,13 +270,6 @@ TEST(ImageFile, WritesRecordsThatEndAtMultiplesOfTheirLength) {
               FormatImage(image, Format::Binary));
 }
 
-TEST(ImageFile, CountsMoreRecordsThanACountRecordCanHold) {
-    const Image image = MakeImage({{0, Bytes(0x100000, 1)}});
-    std::string text = FormatImage(image, Format::SRecord);
-    text.replace(text.find("S604010000FA"), 12, "S5030000FC");
-    EXPECT_TRUE(image == ParseImage(text, "f", {}));
-}
-
 TEST(ImageFile, RefusesToWriteElfAndHugeGaps) {
     const Image far = MakeImage({{0, {1}}, {0x10000000, {2}}});
     EXPECT_EQ(
@@ -285,16 +278,6 @@ TEST(ImageFile, RefusesToWriteElfAndHugeGaps) {
         FailureOf([&] { FormatImage(far, Format::Binary); }, ExitStatus::WrongUsage));
     EXPECT_EQ("ELF can't be made from memory contents",
               FailureOf([&] { FormatImage(far, Format::Elf); }, ExitStatus::WrongUsage));
-}
-
-TEST(ImageFile, TellsFormatsByNameAndExtension) {
-    for (const char* name : {"elf", "ihex", "srec", "bin"}) {
-        EXPECT_STREQ(name, FormatName(FormatFromName(name).value()));
-    }
-    EXPECT_EQ(std::nullopt, FormatFromName("hexx"));
-    EXPECT_EQ(Format::Binary, FormatForWriting("a.hex/dump"));
-    EXPECT_EQ(Format::IntelHex, FormatForWriting("dump.HEX"));
-    EXPECT_EQ(Format::SRecord, FormatForWriting("dump.hex.s19"));
 }
 
 // --- Files and other tools

@@ -165,53 +165,6 @@ TEST(Rules, RefusedAccessNamesTheRule) {
     }
 }
 
-TEST(Registers, EachClassHasItsOwn) {
-    constexpr std::uint32_t none = 0xDEAD0000;
-    const struct {
-        const char* options;
-        std::uint32_t identification, capabilities, flashSize, ramSize, rom, buffer, user0;
-    } cases[] = {
-        {"ravik", 0x00000202, 0x001F001F, none, none, none, 0, none},
-        {"tolva,revision=A,flash=2K", 0x10010000, 0x00FF0000, none, none, none, 0, kBusy},
-        {"tolva,flash=128M,ram=16M", 0x10010100, 0xFFFFFFFF, none, none, 1, 0, kBusy},
-        {"mesk,revision=7", 0x10030700, 0x00FF003F, none, none, 1, 0, kBusy},
-        {"orrin", 0x10040101, 0x00FF007F, none, none, 1, 1, kBusy},
-        {"pell", 0x10060000, 0x00FF007F, none, none, 1, 1, kBusy},
-        {"quen", 0x10050000, 0x00FF00FF, none, none, 1, 1, kBusy},
-        {"velk", 0x10090000, none, 0x000200FF, 0x000000FF, 1, 1, kBusy},
-        {"dorna,sector=128K", 0x901A0000, none, 0x000701FF, 0x000003FF, 1, 1, kBusy},
-        {"ravik,id=B0000,sector=2K", 0x000B0000, none, 0x0001001F, 0x0000001F, 1, 0, none},
-    };
-    for (const auto& c : cases) {
-        Rig rig(c.options);
-        const auto read = [&rig](std::uint32_t address) {
-            try {
-                return rig.Word(address);
-            } catch (const target::TargetError&) {
-                return none;
-            }
-        };
-        const std::vector<std::uint32_t> expected = {
-            c.identification, c.capabilities, c.flashSize, c.ramSize, c.rom, c.buffer, c.user0};
-        const std::vector<std::uint32_t> actual = {
-            read(0x400FE000), read(0x400FE008), read(0x400FDFC0), read(0x400FDFC4),
-            read(0x400FE0F0), read(0x400FE1A0), read(kUser0)};
-        EXPECT_EQ(actual, expected) << c.options;
-    }
-}
-
-TEST(Registers, ResetRestoresThem) {
-    Rig rig;
-    const std::uint32_t clockConfiguration = rig.Word(0x400FE060);
-    rig.SetWord(0x400FE060, ~clockConfiguration);
-    rig.SetWord(0x400FE0F0, rig.Word(0x400FE0F0));  // written back: the ROM alias goes
-    EXPECT_EQ(rig.Word(0x400FE060), ~clockConfiguration);
-    EXPECT_EQ(rig.Word(0x400FE0F0), 0U);
-    rig.device.Reset(false);
-    EXPECT_EQ(rig.Word(0x400FE060), clockConfiguration);
-    EXPECT_EQ(rig.Word(0x400FE0F0), 1U);
-}
-
 TEST(WriteKey, WrongOneDoesNothing) {
     const struct {
         const char* options;
@@ -259,17 +212,6 @@ TEST(Erase, TakesPollsAndKeepsToItsSector) {
     EXPECT_EQ(rig.Flash(0, 0x3000), expected);
     EXPECT_EQ(polls(0, 0x71D50004, 10), 5);
     EXPECT_EQ(rig.device.FlashContents(), Bytes(0x80000, 0xFF));
-}
-
-TEST(Erase, ResetLeavesItHalfDone) {
-    Rig rig("dorna,sector=4K");
-    rig.device.Flash().Preset(0, Bytes(0x1000, 0));
-    rig.Command(0, 0x71D50002);
-    rig.device.Reset(false);
-    EXPECT_EQ(rig.Word(kFlashCommand), 0U);
-    Bytes expected(0x1000, 0);
-    std::fill_n(expected.begin(), 0x800, std::uint8_t{0xFF});
-    EXPECT_EQ(rig.Flash(0, 0x1000), expected);
 }
 
 TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
