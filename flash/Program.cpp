@@ -82,13 +82,17 @@ FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::ui
     const std::uint64_t size = (total + kBlockSize - 1) / kBlockSize * kBlockSize;
     const std::size_t pad = size - total;
 
-    WidenedImage image{start, std::vector<std::uint8_t>(size)};
-    std::uint8_t* const bytes = image.bytes.data();
-    if (head > 0) ThrowOnError(p_mHost->ReadMemory(bytes, head, start, page, 1));
-    std::copy_n(data, length, bytes + head);
+    // Had whole before the target is touched, and filled without writing any byte twice.
+    WidenedImage image{start, {}};
+    std::vector<std::uint8_t>& bytes = image.bytes;
+    bytes.reserve(size);
+    bytes.resize(head);
+    if (head > 0) ThrowOnError(p_mHost->ReadMemory(bytes.data(), head, start, page, 1));
+    bytes.insert(bytes.end(), data, data + length);
+    bytes.resize(size);
     if (pad > 0) {
         const auto behind = static_cast<std::uint32_t>(start + total);
-        ThrowOnError(p_mHost->ReadMemory(bytes + total, pad, behind, page, 1));
+        ThrowOnError(p_mHost->ReadMemory(bytes.data() + total, pad, behind, page, 1));
     }
     return image;
 }
