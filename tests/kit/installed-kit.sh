@@ -11,7 +11,7 @@ cmake --install "$1" --prefix "$trial/installed" >/dev/null
 kit=$trial/moved
 mv "$trial/installed" "$kit"
 
-cmake -S "$kit/share/doc/corvane-flash/examples/minimal-host" -B "$trial/build" \
+cmake -G Ninja -S "$kit/share/doc/corvane-flash/examples/minimal-host" -B "$trial/build" \
     -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_CXX_FLAGS="-Wall -Wextra -Werror ${2:+-fsanitize=$2}" >/dev/null
 cmake --build "$trial/build" >/dev/null
 diff "$here/minimal-host.txt" <("$trial/build/minimal-host")
