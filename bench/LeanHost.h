@@ -9,9 +9,9 @@
 #include <string>
 #include <vector>
 
-#include "plugin/IFlashHost.h"
 #include "target/Target.h"
 #include "tests/support/RecordingHost.h"
+#include "tests/support/StrictHost.h"
 
 namespace bench {
 
@@ -51,7 +51,7 @@ class NullTarget final : public target::Target {
     void Pause(std::uint32_t) override {}
 };
 
-class LeanHost final : public IFlashHost {
+class LeanHost final : public test::StrictHost {
   public:
     explicit LeanHost(target::Target& target);
 
@@ -80,14 +80,6 @@ class LeanHost final : public IFlashHost {
     const char* ShowMessage(const char* text) override;
     const char* GetDirectory() override { return "/"; }
     const char* Sleep(uint32_t milliseconds) override;
-    const char* Reserved3() override { return nullptr; }
-    const char* Reserved5() override { return nullptr; }
-    const char* Reserved8() override { return nullptr; }
-    const char* Reserved9() override { return nullptr; }
-    const char* Reserved12() override { return nullptr; }
-    const char* Reserved13() override { return nullptr; }
-    const char* Reserved14() override { return nullptr; }
-    const char* Reserved15() override { return nullptr; }
 
   private:
     void Note(Kind kind, std::uint8_t slot, const char* text = nullptr, std::uint64_t address = 0,

@@ -170,8 +170,3 @@ const char* FuzzHost::ShowError(const char* text) {
     ++errorsShown;
     return Answer(text);
 }
-
-const char* FuzzHost::Reserved() {
-    Require(false, "no reserved slot is called");
-    return nullptr;
-}

@@ -8,8 +8,8 @@
 #include <string>
 
 #include "fuzz/Require.h"
-#include "plugin/IFlashHost.h"
 #include "tests/support/RecordingHost.h"
+#include "tests/support/StrictHost.h"
 
 /// Takes numbers and texts from a byte string; from its end on, zeros and empty texts.
 class ByteSource {
@@ -29,7 +29,7 @@ class ByteSource {
     const std::uint8_t* end_;
 };
 
-class FuzzHost final : public IFlashHost {
+class FuzzHost final : public test::StrictHost {
   public:
     /// After so much work, in calls and kilobytes, the connection is lost: every call fails. Each
     /// call into the plug-in may then make so many more.
@@ -65,19 +65,10 @@ class FuzzHost final : public IFlashHost {
     const char* ShowMessage(const char* text) override { return Answer(text); }
     const char* GetDirectory() override { return Kept("C:\\host\\"); }
     const char* Sleep(uint32_t) override { return Answer(); }
-    const char* Reserved3() override { return Reserved(); }
-    const char* Reserved5() override { return Reserved(); }
-    const char* Reserved8() override { return Reserved(); }
-    const char* Reserved9() override { return Reserved(); }
-    const char* Reserved12() override { return Reserved(); }
-    const char* Reserved13() override { return Reserved(); }
-    const char* Reserved14() override { return Reserved(); }
-    const char* Reserved15() override { return Reserved(); }
 
   private:
     const char* Answer(const char* text = "");
     const char* Kept(std::string text);
-    const char* Reserved();
     bool IsLost(std::size_t work = 1);
 
     ByteSource answers_;

@@ -235,11 +235,6 @@ const char* RecordingHost::Sleep(uint32_t milliseconds) {
     });
 }
 
-const char* RecordingHost::Reserved() {
-    std::fputs("a reserved slot was called\n", stderr);
-    std::abort();
-}
-
 CreateFlashDevice2Function Factory() {
     static const auto factory = [] {
         void* library = dlopen(FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);

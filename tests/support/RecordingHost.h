@@ -11,8 +11,8 @@
 #include <vector>
 
 #include "plugin/IFlashDevice2.h"
-#include "plugin/IFlashHost.h"
 #include "target/SimulatedDevice.h"
+#include "tests/support/StrictHost.h"
 #include "tests/support/VirtualTime.h"
 
 namespace test {
@@ -27,7 +27,7 @@ struct Fault {
     std::string text = "injected failure";
 };
 
-class RecordingHost final : public IFlashHost {
+class RecordingHost final : public StrictHost {
   public:
     /// A device as ParseDeviceOptions takes it. The settings are those of an ordinary user, with
     /// the given ones on top.
@@ -73,17 +73,8 @@ class RecordingHost final : public IFlashHost {
     const char* ShowMessage(const char* text) override;
     const char* GetDirectory() override;
     const char* Sleep(uint32_t milliseconds) override;
-    const char* Reserved3() override { return Reserved(); }
-    const char* Reserved5() override { return Reserved(); }
-    const char* Reserved8() override { return Reserved(); }
-    const char* Reserved9() override { return Reserved(); }
-    const char* Reserved12() override { return Reserved(); }
-    const char* Reserved13() override { return Reserved(); }
-    const char* Reserved14() override { return Reserved(); }
-    const char* Reserved15() override { return Reserved(); }
 
   private:
-    const char* Reserved();
     bool Fails(const std::string& line);
     void Note(const std::string& line);
     void NoteTrace(int level, std::string text);
