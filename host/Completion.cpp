@@ -12,7 +12,7 @@
 #include "host/CommandTable.h"
 #include "host/SettingCatalogue.h"
 #include "host/Words.h"
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace host {
 

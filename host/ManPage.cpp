@@ -8,7 +8,7 @@
 
 #include "host/CommandTable.h"
 #include "host/Words.h"
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace host {
 

@@ -8,8 +8,8 @@
 #include <system_error>
 
 #include "host/Errors.h"
-#include "target/ContentsFile.h"
-#include "target/DeviceOptions.h"
+#include "target/simulated/ContentsFile.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace host {
 

@@ -6,7 +6,7 @@
 #include <string>
 
 #include "host/Options.h"
-#include "target/SimulatedDevice.h"
+#include "target/simulated/SimulatedDevice.h"
 
 namespace host {
 

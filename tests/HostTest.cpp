@@ -22,7 +22,7 @@
 #include "host/ProgramPlan.h"
 #include "host/SettingKeys.h"
 #include "host/Words.h"
-#include "target/SimulatedDevice.h"
+#include "target/simulated/SimulatedDevice.h"
 
 namespace host {
 namespace {

@@ -1,6 +1,6 @@
 // The simulated device's own tests: it has to be strict before it can catch anybody else.
 
-#include "target/SimulatedDevice.h"
+#include "target/simulated/SimulatedDevice.h"
 
 #include <gtest/gtest.h>
 #include <unistd.h>
@@ -12,7 +12,7 @@
 #include <memory>
 #include <numeric>
 
-#include "target/ContentsFile.h"
+#include "target/simulated/ContentsFile.h"
 
 namespace {
 

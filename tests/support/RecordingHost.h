@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "plugin/IFlashDevice2.h"
-#include "target/SimulatedDevice.h"
+#include "target/simulated/SimulatedDevice.h"
 #include "tests/support/StrictHost.h"
 #include "tests/support/VirtualTime.h"
 

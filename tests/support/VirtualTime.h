@@ -6,7 +6,7 @@
 
 #include <chrono>
 
-#include "target/Clock.h"
+#include "target/simulated/Clock.h"
 
 namespace test {
 

@@ -8,7 +8,7 @@
 #include <string>
 #include <unordered_map>
 
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace target {
 

@@ -1,6 +1,6 @@
 // The loader's life: start, take a chunk, program it, report it, take the next; or be stopped.
 
-#include "target/Loader.h"
+#include "target/simulated/Loader.h"
 
 #include <fmt/format.h>
 

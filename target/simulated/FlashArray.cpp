@@ -1,6 +1,6 @@
 // Flash cells in lazily allocated pages.
 
-#include "target/FlashArray.h"
+#include "target/simulated/FlashArray.h"
 
 #include <algorithm>
 

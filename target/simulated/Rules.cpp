@@ -1,6 +1,6 @@
 // The form of the texts about broken rules, and the bounded log of them.
 
-#include "target/Rules.h"
+#include "target/simulated/Rules.h"
 
 #include <fmt/format.h>
 

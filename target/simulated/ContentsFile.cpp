@@ -1,7 +1,7 @@
 // The contents file: a header, the device's definition as option text, the user registers, the
 // flash pages that aren't erased, and a checksum over all of it. Numbers are little-endian.
 
-#include "target/ContentsFile.h"
+#include "target/simulated/ContentsFile.h"
 
 #include <fcntl.h>
 #include <fmt/format.h>
@@ -20,7 +20,7 @@
 #include <utility>
 #include <vector>
 
-#include "target/Ram.h"
+#include "target/simulated/Ram.h"
 
 namespace target {
 

@@ -14,17 +14,17 @@
 #include <string>
 #include <vector>
 
-#include "target/Clock.h"
-#include "target/DeviceOptions.h"
-#include "target/FlashArray.h"
-#include "target/FlashController.h"
-#include "target/Loader.h"
-#include "target/MemoryMap.h"
-#include "target/Ram.h"
-#include "target/RegisterFile.h"
-#include "target/Rules.h"
-#include "target/SimulatedTime.h"
 #include "target/Target.h"
+#include "target/simulated/Clock.h"
+#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/FlashArray.h"
+#include "target/simulated/FlashController.h"
+#include "target/simulated/Loader.h"
+#include "target/simulated/MemoryMap.h"
+#include "target/simulated/Ram.h"
+#include "target/simulated/RegisterFile.h"
+#include "target/simulated/Rules.h"
+#include "target/simulated/SimulatedTime.h"
 
 namespace target {
 

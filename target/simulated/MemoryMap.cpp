@@ -1,12 +1,12 @@
 // Address decoding: every transfer is checked as a whole, then reaches flash, RAM or registers.
 
-#include "target/MemoryMap.h"
+#include "target/simulated/MemoryMap.h"
 
 #include <fmt/format.h>
 
 #include <algorithm>
 
-#include "target/Rules.h"
+#include "target/simulated/Rules.h"
 
 namespace target {
 

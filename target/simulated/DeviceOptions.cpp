@@ -1,6 +1,6 @@
 // What is done with the option table: parse, check, write, compare, explain.
 
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 #include <fmt/format.h>
 #include <fmt/ranges.h>
@@ -8,9 +8,9 @@
 #include <algorithm>
 #include <string_view>
 
-#include "target/DeviceClass.h"
-#include "target/OptionTable.h"
-#include "target/OptionValues.h"
+#include "target/simulated/DeviceClass.h"
+#include "target/simulated/OptionTable.h"
+#include "target/simulated/OptionValues.h"
 
 namespace target {
 

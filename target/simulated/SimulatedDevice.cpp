@@ -1,7 +1,7 @@
 // The debug port of the simulated device: every access pays its time, brings the device up to now,
 // may fail on request, and is then carried out or refused.
 
-#include "target/SimulatedDevice.h"
+#include "target/simulated/SimulatedDevice.h"
 
 #include <fmt/format.h>
 

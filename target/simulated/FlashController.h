@@ -8,10 +8,10 @@
 #include <optional>
 #include <string>
 
-#include "target/DeviceOptions.h"
-#include "target/FlashArray.h"
-#include "target/RegisterFile.h"
-#include "target/Rules.h"
+#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/FlashArray.h"
+#include "target/simulated/RegisterFile.h"
+#include "target/simulated/Rules.h"
 
 namespace target {
 

@@ -11,7 +11,7 @@
 #include <span>
 #include <vector>
 
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace target {
 

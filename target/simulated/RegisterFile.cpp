@@ -1,13 +1,13 @@
 // The register table of the family and the rules of plain register access.
 
-#include "target/RegisterFile.h"
+#include "target/simulated/RegisterFile.h"
 
 #include <fmt/format.h>
 
 #include <bit>
 
-#include "target/DeviceClass.h"
-#include "target/Rules.h"
+#include "target/simulated/DeviceClass.h"
+#include "target/simulated/Rules.h"
 
 namespace target {
 

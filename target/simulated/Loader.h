@@ -7,11 +7,11 @@
 #include <cstdint>
 #include <optional>
 
-#include "target/DeviceOptions.h"
-#include "target/FlashArray.h"
-#include "target/FlashController.h"
-#include "target/Ram.h"
-#include "target/Rules.h"
+#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/FlashArray.h"
+#include "target/simulated/FlashController.h"
+#include "target/simulated/Ram.h"
+#include "target/simulated/Rules.h"
 
 namespace target {
 

@@ -1,12 +1,12 @@
 // The commands of the flash controller, in the order: key, command, operand, work, end.
 
-#include "target/FlashController.h"
+#include "target/simulated/FlashController.h"
 
 #include <fmt/format.h>
 
 #include <algorithm>
 
-#include "target/DeviceClass.h"
+#include "target/simulated/DeviceClass.h"
 
 namespace target {
 

@@ -1,7 +1,7 @@
 // How simulated time moves: link, pauses, injected clock. Everything is clamped, so that no client
 // can wait it into an overflow.
 
-#include "target/SimulatedTime.h"
+#include "target/simulated/SimulatedTime.h"
 
 #include <algorithm>
 

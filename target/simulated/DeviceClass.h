@@ -6,7 +6,7 @@
 #include <string_view>
 #include <vector>
 
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace target {
 

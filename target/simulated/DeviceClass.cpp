@@ -1,6 +1,6 @@
 // The table of the device classes and what follows from an identification value.
 
-#include "target/DeviceClass.h"
+#include "target/simulated/DeviceClass.h"
 
 #include <algorithm>
 

@@ -7,9 +7,9 @@
 #include <stdexcept>
 #include <string>
 
-#include "target/Clock.h"
-#include "target/DeviceOptions.h"
-#include "target/SimulatedDevice.h"
+#include "target/simulated/Clock.h"
+#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/SimulatedDevice.h"
 
 namespace target {
 

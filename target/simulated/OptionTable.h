@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-#include "target/DeviceOptions.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace target {
 

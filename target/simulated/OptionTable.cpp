@@ -1,13 +1,13 @@
 // The rows of the option table and how each value is taken in.
 
-#include "target/OptionTable.h"
+#include "target/simulated/OptionTable.h"
 
 #include <fmt/format.h>
 
 #include <bit>
 #include <limits>
 
-#include "target/OptionValues.h"
+#include "target/simulated/OptionValues.h"
 
 namespace target {
 

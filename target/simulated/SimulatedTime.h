@@ -6,8 +6,8 @@
 #include <chrono>
 #include <cstdint>
 
-#include "target/Clock.h"
-#include "target/DeviceOptions.h"
+#include "target/simulated/Clock.h"
+#include "target/simulated/DeviceOptions.h"
 
 namespace target {
 

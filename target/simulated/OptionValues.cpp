@@ -1,6 +1,6 @@
 // Reading and writing the values of device options.
 
-#include "target/OptionValues.h"
+#include "target/simulated/OptionValues.h"
 
 #include <fmt/format.h>
 
