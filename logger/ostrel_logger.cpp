@@ -55,13 +55,14 @@ class Logger final : public Logging::ILogger {
     }
 
   private:
+    // The sink is called without the lock: it may log, or set another sink.
     void Write(int level, const std::string& text) {
-        const std::lock_guard lock(mutex_);
-        if (sink_ != nullptr) {
-            sink_(context_, level, text.c_str());
-        } else {
-            file_.Write(level, text);
-        }
+        std::unique_lock lock(mutex_);
+        const OstrelLoggerSink sink = sink_;
+        void* const context = context_;
+        if (sink == nullptr) return file_.Write(level, text);
+        lock.unlock();
+        sink(context, level, text.c_str());
     }
 
     std::mutex mutex_;

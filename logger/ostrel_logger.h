@@ -64,8 +64,11 @@ extern "C" {
 typedef void (*OstrelLoggerSink)(void* context, int level, const char* text);
 
 // Hands every line from now on to sink, together with context, instead of writing it. A null sink
-// ends that and switches back to what the environment asked for. Neither is called while a line
-// is being written by another thread.
+// ends that and switches back to what the environment asked for.
+// A sink is called on the thread that logs, and by several threads at once when several log. It may
+// itself log, which calls it again, and may set another sink or none. A line that another thread is
+// logging while the sink is replaced may still reach the old one: keep that and its context alive
+// until no such line is under way.
 OSTREL_LOGGER_API void OstrelLoggerSetSink(OstrelLoggerSink sink, void* context);
 }
 

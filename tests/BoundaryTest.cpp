@@ -261,4 +261,18 @@ TEST(Logging, CanBeSwitchedOffAtAnyTime) {
     EXPECT_EQ(host.transcript, std::vector<std::string>());
 }
 
+TEST(Logging, SinkMayLogAndTakeItselfAway) {
+    static int lines = 0;
+    static const auto log = [] { Logging::LoggerFactory::Instance().PlainLine(0, 0, 0, 1, ""); };
+    OstrelLoggerSetSink(
+        [](void*, int, const char*) {
+            if (++lines < 3) log();
+            OstrelLoggerSetSink(nullptr, nullptr);
+        },
+        nullptr);
+    log();
+    log();
+    EXPECT_EQ(lines, 3);
+}
+
 }  // namespace
