@@ -4,18 +4,16 @@
 
 #include <cstdint>
 
-namespace DeviceClass {
-
-inline constexpr std::int32_t Unknown = -1;
-inline constexpr std::int32_t Ravik = 0;
-inline constexpr std::int32_t TolvaRevA = 1;
-inline constexpr std::int32_t TolvaRevB = 2;
-inline constexpr std::int32_t MeskRevA = 3;
-inline constexpr std::int32_t MeskRevB = 4;
-inline constexpr std::int32_t Orrin = 5;
-inline constexpr std::int32_t Pell = 6;
-inline constexpr std::int32_t Quen = 7;
-inline constexpr std::int32_t Velk = 9;
-inline constexpr std::int32_t Dorna = 10;
-
-}  // namespace DeviceClass
+enum class DeviceClass : std::int32_t {
+    Unknown = -1,
+    Ravik = 0,
+    TolvaRevA = 1,
+    TolvaRevB = 2,
+    MeskRevA = 3,
+    MeskRevB = 4,
+    Orrin = 5,
+    Pell = 6,
+    Quen = 7,
+    Velk = 9,
+    Dorna = 10,
+};

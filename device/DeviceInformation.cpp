@@ -17,19 +17,19 @@ std::string KibibyteText(std::uint32_t sizeBytes) {
 void FlashCorvane::Initialize() {
     TRACE(Entry, "FlashCorvane::Initialize()");
     const std::string flashSize = KibibyteText(p_mFlashSize);
-    Host().SetSetting(Setting::DeviceInfoFlashSize, flashSize);
+    p_mHost.SetSetting(Setting::DeviceInfoFlashSize, flashSize);
     TRACE(Entry, "FlashCorvane::Initialize(), Flash size = %s", flashSize.c_str());
     const std::string ramSize = KibibyteText(p_mRAMSize);
-    Host().SetSetting(Setting::DeviceInfoRAMSize, ramSize);
+    p_mHost.SetSetting(Setting::DeviceInfoRAMSize, ramSize);
     TRACE(Entry, "FlashCorvane::Initialize(), RAM size = %s", ramSize.c_str());
     const std::string sectorSize = KibibyteText(p_mSectorSize);
-    Host().SetSetting(Setting::DeviceInfoSectorSize, sectorSize);
+    p_mHost.SetSetting(Setting::DeviceInfoSectorSize, sectorSize);
     TRACE(Entry, "FlashCorvane::Initialize(), Sector size = %s", sectorSize.c_str());
-    Host().SetSetting(Setting::DeviceInfoFamily, p_mFamily);
+    p_mHost.SetSetting(Setting::DeviceInfoFamily, p_mFamily);
     TRACE(Entry, "FlashCorvane::Initialize(), Device Family = %s", p_mFamily.c_str());
     TRACE(Result, "FlashCorvane::Initialize()");
 }
 
 std::int32_t FlashCorvane::VerboseMode() const {
-    return ParseInteger(Host().GetSetting(Setting::FlashVerboseMode));
+    return ParseInteger(p_mHost.GetSetting(Setting::FlashVerboseMode));
 }

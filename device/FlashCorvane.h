@@ -11,9 +11,13 @@
 #include <cstdint>
 #include <functional>
 #include <string>
+#include <string_view>
 #include <vector>
 
+#include "device/DeviceClass.h"
 #include "plugin/HostAccess.h"
+
+enum class RegisterChoice : std::uint8_t;
 
 class FlashCorvane {
   public:
@@ -42,15 +46,14 @@ class FlashCorvane {
     bool PerformOperation(const char* operationName);
 
   private:
-    using RangeOperation = std::function<bool(std::uint32_t start, std::uint32_t end)>;
-    using ChunkConsumer = std::function<bool(std::vector<std::uint8_t>& buffer, std::uint32_t count,
-                                             std::uint32_t address)>;
+    using RangeOperation = bool (FlashCorvane::*)(std::uint32_t start, std::uint32_t end);
+    using ChunkConsumer = std::function<bool(const std::vector<std::uint8_t>& buffer,
+                                             std::uint32_t count, std::uint32_t address)>;
     using RegisterValues = std::array<std::uint32_t, 2>;
     using CommitRequests = std::array<bool, 2>;
     struct WidenedImage;
     struct NamedOperation;
-
-    HostAccess Host() const { return HostAccess(p_mHost); }
+    struct Operations;
 
     // device/Identification.cpp
     void IdentifyClass(std::uint32_t identification);
@@ -102,9 +105,9 @@ class FlashCorvane {
     bool RangeWithinFlash(std::uint32_t start, std::uint32_t end) const;
     bool RunOnSelectedRange(const std::string& operationName, const std::string& selectionKey,
                             const std::string& startKey, const std::string& endKey,
-                            const RangeOperation& operation);
-    bool ReadRangeInChunks(ProgressHandle& progress, const std::string& text, std::uint32_t start,
-                           std::uint32_t end, const ChunkConsumer& consumer);
+                            RangeOperation operation);
+    bool ReadRangeInChunks(const ProgressHandle& progress, const std::string& text,
+                           std::uint32_t start, std::uint32_t end, const ChunkConsumer& consumer);
 
     // verify/BlankCheck.cpp
     bool BlankCheck();
@@ -119,19 +122,19 @@ class FlashCorvane {
     void UpdateCRC32(std::uint32_t& crc, const std::uint8_t* bytes, std::uint32_t count) const;
 
     // operations/PerformOperation.cpp
-    void RunOperation(const std::string& operationName);
-    void RunOperationStep(const std::string& statusText, const std::string& errorText,
-                          const std::function<bool()>& step);
-    void RunErase(const std::string& operationName);
-    void RunBlankCheck(const std::string& operationName);
-    void RunCalculateChecksum(const std::string& operationName);
-    void RunUserRegisterOperation(const std::string& operationName);
-    void RunTest(const std::string& operationName);
+    void RunOperation(std::string_view operationName);
+    template <typename Step>
+    void RunOperationStep(const std::string& statusText, const std::string& errorText, Step step);
+    void RunErase(const NamedOperation&);
+    void RunBlankCheck(const NamedOperation&);
+    void RunCalculateChecksum(const NamedOperation&);
+    void RunUserRegisterOperation(const NamedOperation& operation);
+    void RunTest(const NamedOperation&);
 
     // operations/UserRegisters.cpp
-    bool UserRegisterOperation(const std::string& operationName);
-    void ReadUserRegisters(const std::string& operationName);
-    bool ProgramUserRegisters(const std::string& operationName);
+    bool UserRegisterOperation(const NamedOperation& operation);
+    void ReadUserRegisters(RegisterChoice choice);
+    bool ProgramUserRegisters(RegisterChoice choice);
     void ReadUserRegister(std::uint32_t index, const RegisterValues& values);
     void ProgramUserRegister(std::uint32_t index, CommitRequests& requests);
     void CommitUserRegister(std::uint32_t index);
@@ -143,14 +146,14 @@ class FlashCorvane {
                                std::uint32_t& register1);
 
     std::uint64_t p_mInstanceId = 0;  ///< goes out with every trace line
-    IFlashHost* p_mHost;              ///< not owned
+    HostAccess p_mHost;               ///< the host is not owned
     std::string p_mVariant;
     std::vector<std::uint32_t> p_mErasedSectors;  ///< in this load; in ascending order
     std::array<std::uint32_t, 256> p_mCRC32LUT{};
     std::uint32_t p_mFlashSize = 0;   ///< bytes; 0 without usable flash
     std::uint32_t p_mRAMSize = 0;     ///< bytes
     std::uint32_t p_mSectorSize = 0;  ///< bytes
-    std::int32_t p_mClassRev = -1;    ///< see DeviceClass
+    DeviceClass p_mClassRev = DeviceClass::Unknown;
     std::string p_mFamily;
     bool p_mFlashErased = false;  ///< this load's erase is done
     bool p_mUseFlashBuffer = false;

@@ -1,9 +1,7 @@
 // Building the device record: which class is connected, and how much flash and RAM it has.
 
-#include "device/DeviceClass.h"
 #include "device/FlashCorvane.h"
 #include "device/RegisterMap.h"
-#include "plugin/ErrorText.h"
 #include "plugin/Trace.h"
 
 namespace {
@@ -13,7 +11,7 @@ constexpr std::uint32_t kAnyRevision = 0xFFFFFFFF;
 struct ClassRow {
     std::uint32_t classField;
     std::uint32_t majorRevision;
-    std::int32_t code;
+    DeviceClass code;
     const char* name;
 };
 
@@ -50,18 +48,18 @@ FlashCorvane::FlashCorvane(std::string variant, const std::string& /*text2*/,
                            const std::string& /*text3*/, IFlashHost* host)
     : p_mHost(host), p_mVariant(std::move(variant)) {
     TRACE(Entry, "FlashCorvane Constructor, variant = %s", p_mVariant.c_str());
-    IdentifyClass(Host().ReadWord(Register::DeviceIdentification0));
-    TRACE(Information, "FlashCorvane Constructor, Part = %d", p_mClassRev);
+    IdentifyClass(p_mHost.ReadWord(Register::DeviceIdentification0));
+    TRACE(Information, "FlashCorvane Constructor, Part = %d", static_cast<int>(p_mClassRev));
 
-    ThrowOnError(p_mHost->HaltTarget());
-    Host().ReadWord(Register::ClockConfiguration);
+    p_mHost.HaltTarget();
+    p_mHost.ReadWord(Register::ClockConfiguration);
     ReadSizes();
     if (p_mClassRev == DeviceClass::Velk) p_mFlashSize = 0;
     TRACE(Information, "FlashCorvane Constructor, Flash size = 0x%08X", p_mFlashSize);
     TRACE(Information, "FlashCorvane Constructor, Flash sector = 0x%08X", p_mSectorSize);
     TRACE(Information, "FlashCorvane Constructor, RAM size = 0x%08X", p_mRAMSize);
 
-    p_mUseFlashBuffer = (Host().ReadWord(Register::FlashBufferCapability) & 1) != 0;
+    p_mUseFlashBuffer = (p_mHost.ReadWord(Register::FlashBufferCapability) & 1) != 0;
     TRACE(Information, "FlashCorvane Constructor, Use Flash Buffer = %u",
           static_cast<unsigned>(p_mUseFlashBuffer));
     TRACE(Result, "FlashCorvane Constructor");
@@ -78,18 +76,18 @@ void FlashCorvane::IdentifyClass(std::uint32_t identification) {
 // The sizes go by the class field as the register has it, bits 23 to 20 included, unlike the class.
 void FlashCorvane::ReadSizes() {
     const std::uint32_t rawClassField =
-        ClassField(Host().ReadWord(Register::DeviceIdentification0));
+        ClassField(p_mHost.ReadWord(Register::DeviceIdentification0));
     std::uint32_t flashField = 0;
     std::uint32_t sramField = 0;
     if (rawClassField < 8) {
-        const std::uint32_t capabilities = Host().ReadWord(Register::DeviceCapabilities0);
+        const std::uint32_t capabilities = p_mHost.ReadWord(Register::DeviceCapabilities0);
         flashField = capabilities & 0xFFFF;
         sramField = capabilities >> 16;
         p_mSectorSize = 1024;
     } else {
-        const std::uint32_t flashSize = Host().ReadWord(Register::FlashSize);
+        const std::uint32_t flashSize = p_mHost.ReadWord(Register::FlashSize);
         flashField = flashSize & 0xFFFF;
-        sramField = Host().ReadWord(Register::SramSize);
+        sramField = p_mHost.ReadWord(Register::SramSize);
         p_mSectorSize = 1024u << ((flashSize >> 16) & 7);
     }
     p_mFlashSize = (flashField + 1) * 2048;

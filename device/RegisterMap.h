@@ -44,13 +44,13 @@ inline constexpr std::uint32_t UserRegister1 = 0x400FE1E4;
 }  // namespace Register
 
 /// The command bits of the flash command register. The controller clears a bit when it is done.
-namespace FlashCommand {
+namespace FlashCommandBit {
 
 inline constexpr std::uint32_t EraseSector = 0x2;
 inline constexpr std::uint32_t EraseAll = 0x4;
 inline constexpr std::uint32_t CommitUserRegister = 0x8;
 
-}  // namespace FlashCommand
+}  // namespace FlashCommandBit
 
 /// Target RAM that the host shares with the flash loader: two buffers, each with its parameter
 /// block. A block's words are: reserved, flash address, byte count, status.

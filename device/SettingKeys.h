@@ -35,10 +35,11 @@ inline constexpr auto FlashChecksumSelection = "FlashChecksumSelection";
 inline constexpr auto FlashChecksumStartAddr = "FlashChecksumStartAddr";
 inline constexpr auto FlashChecksumEndAddr = "FlashChecksumEndAddr";
 
-// User registers: the prefix, then the index, then one of the two endings.
-inline constexpr auto FlashUserRegister = "FlashUserRegister";
-inline constexpr auto Input = "Input";
-inline constexpr auto Commit = "Commit";
+// User registers, by their index.
+inline constexpr const char* FlashUserRegisterInput[] = {"FlashUserRegister0Input",
+                                                         "FlashUserRegister1Input"};
+inline constexpr const char* FlashUserRegisterCommit[] = {"FlashUserRegister0Commit",
+                                                          "FlashUserRegister1Commit"};
 inline constexpr auto FlashMACAddrInput = "FlashMACAddrInput";
 inline constexpr auto FlashMACAddrCommit = "FlashMACAddrCommit";
 

@@ -1,7 +1,6 @@
 // The start of a program load: the per-load state goes back to its beginning, and the target with
 // it as far as the host's settings ask.
 
-#include "device/DeviceClass.h"
 #include "device/FlashCorvane.h"
 #include "device/RegisterMap.h"
 #include "device/SettingKeys.h"
@@ -26,16 +25,16 @@ void FlashCorvane::ResetSettings(std::int32_t mode) {
     p_mResetPending = true;
     p_mErasedSectors.clear();
 
-    const bool resetTarget = ParseBoolean(Host().GetSetting(Setting::FlashResetSetting));
+    const bool resetTarget = ParseBoolean(p_mHost.GetSetting(Setting::FlashResetSetting));
     if (resetTarget && mode != ResetMode::ResetWatchdogs) SystemResetAndHalt();
 
     if (mode == ResetMode::Checksum) {
-        if (ParseBoolean(Host().GetSetting(Setting::FlashProgramCRCOption))) {
+        if (ParseBoolean(p_mHost.GetSetting(Setting::FlashProgramCRCOption))) {
             CalculateChecksumByAddress(0, p_mFlashSize - 1);
         }
     } else if (mode == ResetMode::ResetWatchdogs) {
         ResetWatchdogs();
-        Host().SetSetting(Setting::FlashChecksumValue, "--");
+        p_mHost.SetSetting(Setting::FlashChecksumValue, "--");
     }
     TRACE(Result, "FlashCorvane::ResetSettings()");
 }
@@ -45,7 +44,7 @@ bool FlashCorvane::ResetWatchdogs() {
     const std::uint32_t address = newer ? Register::WatchdogReset : Register::SoftwareReset0;
     const std::uint32_t watchdogs = newer ? 0x3 : 0x10000008;
 
-    Host().WriteWord(address, Host().ReadWord(address) | watchdogs);
-    Host().WriteWord(address, Host().ReadWord(address) & ~watchdogs);
+    p_mHost.WriteWord(address, p_mHost.ReadWord(address) | watchdogs);
+    p_mHost.WriteWord(address, p_mHost.ReadWord(address) & ~watchdogs);
     return true;
 }

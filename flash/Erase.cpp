@@ -3,12 +3,10 @@
 #include <algorithm>
 #include <exception>
 
-#include "device/DeviceClass.h"
 #include "device/FlashCorvane.h"
 #include "device/RegisterMap.h"
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
-#include "plugin/ErrorText.h"
 #include "plugin/Trace.h"
 
 namespace {
@@ -40,13 +38,13 @@ constexpr FlashBlockRow kFlashBlockRows[] = {
 
 bool FlashCorvane::Erase() {
     TRACE(Entry, "FlashCorvane::Erase()");
-    ProgressHandle progress = Host().OpenProgress("Erasing Flash.");
+    ProgressHandle progress = p_mHost.OpenProgress("Erasing Flash.");
     bool erased = false;
     try {
         erased = EraseAsSelected();
-        HostAccess::CloseProgress(progress);
+        progress.CloseProgress();
     } catch (const std::exception& error) {
-        Host().ShowErrorText(
+        p_mHost.ShowErrorText(
             std::string("Flash Programmer: Current erase option is not valid; please try changing "
                         "option to erase Entire Flash or By Address Range. ") +
             error.what());
@@ -59,18 +57,18 @@ bool FlashCorvane::Erase() {
 }
 
 bool FlashCorvane::EraseAsSelected() {
-    const std::string type = Host().GetSetting(Setting::FlashEraseType);
+    const std::string type = p_mHost.GetSetting(Setting::FlashEraseType);
     if (type == Choice::EntireFlash) {
-        Host().WriteWord(Register::FlashAddress, 0);
+        p_mHost.WriteWord(Register::FlashAddress, 0);
         if (VerboseMode() != 0) {
-            Host().ShowMessageText("Performing Mass Erase on Flash memory");
+            p_mHost.ShowMessageText("Performing Mass Erase on Flash memory");
         }
-        if (p_mFlashSize > kUpperBank) Host().WriteWord(Register::FlashAddress, kUpperBank);
+        if (p_mFlashSize > kUpperBank) p_mHost.WriteWord(Register::FlashAddress, kUpperBank);
         return MassErase();
     }
     if (type == Choice::ByAddressRange) {
-        const std::uint32_t end = ParseHex(Host().GetSetting(Setting::FlashEraseEndAddr));
-        const std::uint32_t start = ParseHex(Host().GetSetting(Setting::FlashEraseStartAddr));
+        const std::uint32_t end = ParseHex(p_mHost.GetSetting(Setting::FlashEraseEndAddr));
+        const std::uint32_t start = ParseHex(p_mHost.GetSetting(Setting::FlashEraseStartAddr));
         return PageErase(start, end);
     }
     return false;
@@ -78,7 +76,7 @@ bool FlashCorvane::EraseAsSelected() {
 
 bool FlashCorvane::MassErase() {
     TRACE(Entry, "FlashCorvane::MassErase()");
-    ThrowOnError(p_mHost->HaltTarget());
+    p_mHost.HaltTarget();
     const bool mesk = p_mClassRev == DeviceClass::MeskRevA || p_mClassRev == DeviceClass::MeskRevB;
     if (mesk && !PrepareFlashBlocks()) {
         TRACE(Result, "FlashCorvane::MassErase() = false, p_mFlashSize %u unsupported.",
@@ -86,14 +84,14 @@ bool FlashCorvane::MassErase() {
         return false;
     }
 
-    Host().WriteWord(Register::FlashCommand, KeyedCommand(FlashCommand::EraseAll));
-    ThrowOnError(p_mHost->Sleep(kMassErasePauseMs));
-    if (!EraseFinished(FlashCommand::EraseAll, kMassErasePolls, kMassErasePauseMs)) {
-        Host().ShowErrorText("Flash Programmer: Erasing all of the flash contents failed!");
+    p_mHost.WriteWord(Register::FlashCommand, KeyedCommand(FlashCommandBit::EraseAll));
+    p_mHost.Sleep(kMassErasePauseMs);
+    if (!EraseFinished(FlashCommandBit::EraseAll, kMassErasePolls, kMassErasePauseMs)) {
+        p_mHost.ShowErrorText("Flash Programmer: Erasing all of the flash contents failed!");
         TRACE(Result, "FlashCorvane::MassErase() = false");
         return false;
     }
-    ThrowOnError(p_mHost->ResetTarget(false));
+    p_mHost.ResetTarget(false);
     ROMAliasClear();
     TRACE(Result, "FlashCorvane::MassErase() = true");
     return true;
@@ -104,37 +102,37 @@ bool FlashCorvane::PrepareFlashBlocks() {
     if (row == std::end(kFlashBlockRows)) return false;
 
     const auto writeAndPause = [this](std::uint32_t address, std::uint32_t value) {
-        Host().WriteWord(address, value);
-        ThrowOnError(p_mHost->Sleep(kMassErasePauseMs));
+        p_mHost.WriteWord(address, value);
+        p_mHost.Sleep(kMassErasePauseMs);
     };
     for (std::uint32_t address = Register::FlashBlock3; address >= row->lowestCleared;
          address -= 4) {
         writeAndPause(address, 0);
     }
     if (row->halved != 0) {
-        writeAndPause(row->halved, Host().ReadWord(Register::FlashBlock0) & 0xFFFF);
+        writeAndPause(row->halved, p_mHost.ReadWord(Register::FlashBlock0) & 0xFFFF);
     }
     return true;
 }
 
 bool FlashCorvane::PageErase(std::uint32_t start, std::uint32_t end) {
     TRACE(Entry, "FlashCorvane::PageErase(0x%08X, 0x%08X)", start, end);
-    ThrowOnError(p_mHost->HaltTarget());
+    p_mHost.HaltTarget();
     if (start >= p_mFlashSize || end >= p_mFlashSize) {
-        Host().ShowErrorText("Flash Programmer: Invalid Address Range for erase operation!");
+        p_mHost.ShowErrorText("Flash Programmer: Invalid Address Range for erase operation!");
         TRACE(Result, "FlashCorvane::PageErase() = false");
         return false;
     }
 
-    const std::uint32_t command = KeyedCommand(FlashCommand::EraseSector);
+    const std::uint32_t command = KeyedCommand(FlashCommandBit::EraseSector);
     // A range that ends before it starts is an empty one, even when both ends share a sector.
     const bool empty = start > end;
     if (!empty && !EraseSectors(start / p_mSectorSize, end / p_mSectorSize, command)) {
-        Host().ShowErrorText("Flash Programmer: Erasing flash contents timed out!");
+        p_mHost.ShowErrorText("Flash Programmer: Erasing flash contents timed out!");
         TRACE(Result, "FlashCorvane::PageErase() = false");
         return false;
     }
-    ThrowOnError(p_mHost->ResetTarget(false));
+    p_mHost.ResetTarget(false);
     ROMAliasClear();
     TRACE(Result, "FlashCorvane::PageErase() = true");
     return true;
@@ -159,20 +157,20 @@ bool FlashCorvane::EraseSector(std::uint32_t sector, std::uint32_t keyedCommand)
         const std::string text = "Erasing Flash Page @ address 0x" + ToHexText(address) +
                                  " of size 0x" + ToHexText(p_mSectorSize);
         TRACE_TEXT(Information, text);
-        Host().ShowMessageText(text);
+        p_mHost.ShowMessageText(text);
     }
-    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
-    Host().WriteWord(Register::FlashAddress, address);
-    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
-    Host().WriteWord(Register::FlashCommand, keyedCommand);
-    ThrowOnError(p_mHost->Sleep(kSectorErasePauseMs));
-    return EraseFinished(FlashCommand::EraseSector, kSectorErasePolls, kSectorErasePauseMs);
+    p_mHost.Sleep(kSectorErasePauseMs);
+    p_mHost.WriteWord(Register::FlashAddress, address);
+    p_mHost.Sleep(kSectorErasePauseMs);
+    p_mHost.WriteWord(Register::FlashCommand, keyedCommand);
+    p_mHost.Sleep(kSectorErasePauseMs);
+    return EraseFinished(FlashCommandBit::EraseSector, kSectorErasePolls, kSectorErasePauseMs);
 }
 
 bool FlashCorvane::EraseFinished(std::uint32_t command, int polls, std::uint32_t pollIntervalMs) {
     for (int poll = 0; poll < polls; ++poll) {
-        if ((Host().ReadWord(Register::FlashCommand) & command) == 0) return true;
-        ThrowOnError(p_mHost->Sleep(pollIntervalMs));
+        if ((p_mHost.ReadWord(Register::FlashCommand) & command) == 0) return true;
+        p_mHost.Sleep(pollIntervalMs);
     }
     return false;
 }

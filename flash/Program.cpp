@@ -13,7 +13,6 @@
 #include "device/RegisterMap.h"
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
-#include "plugin/ErrorText.h"
 #include "plugin/Trace.h"
 
 namespace {
@@ -62,11 +61,11 @@ bool FlashCorvane::Program(const std::uint8_t* data, std::uint32_t address, std:
     const WidenedImage image = Widen(data, address, length, page);
     StartLoader();
     const std::int32_t budgetMs =
-        BudgetMs(ParseDecimal(Host().GetSetting(Setting::FlashTimeoutValue)));
+        BudgetMs(ParseDecimal(p_mHost.GetSetting(Setting::FlashTimeoutValue)));
     try {
         StreamToLoader(image, budgetMs, page);
     } catch (const std::exception& error) {
-        Host().ShowErrorText(std::string("Flash Programmer: ") + error.what());
+        p_mHost.ShowErrorText(std::string("Flash Programmer: ") + error.what());
         TRACE(Result, "FlashCorvane::Program() = false %s", error.what());
         return false;
     }
@@ -87,21 +86,21 @@ FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::ui
     std::vector<std::uint8_t>& bytes = image.bytes;
     bytes.reserve(size);
     bytes.resize(head);
-    if (head > 0) ThrowOnError(p_mHost->ReadMemory(bytes.data(), head, start, page, 1));
+    if (head > 0) p_mHost.ReadBytes(bytes.data(), head, start, page);
     bytes.insert(bytes.end(), data, data + length);
     bytes.resize(size);
     if (pad > 0) {
         const auto behind = static_cast<std::uint32_t>(start + total);
-        ThrowOnError(p_mHost->ReadMemory(bytes.data() + total, pad, behind, page, 1));
+        p_mHost.ReadBytes(bytes.data() + total, pad, behind, page);
     }
     return image;
 }
 
 void FlashCorvane::StartLoader() {
-    ThrowOnError(p_mHost->HaltTarget());
-    const std::string directory = Host().Directory() + kLoaderSubdirectory;
-    ThrowOnError(p_mHost->LoadProgram(kLoaderFile, "", directory.c_str()));
-    ThrowOnError(p_mHost->RunTarget());
+    p_mHost.HaltTarget();
+    const std::string directory = p_mHost.Directory() + kLoaderSubdirectory;
+    p_mHost.LoadProgram(kLoaderFile, directory);
+    p_mHost.RunTarget();
 }
 
 // While the loader works on one chunk, the next one goes into the other buffer. Each wait is for
@@ -127,17 +126,17 @@ void FlashCorvane::ProgramChunk(const std::uint8_t* chunk, std::uint32_t count,
                                 std::uint32_t flashAddress, std::uint32_t index,
                                 std::int16_t page) {
     const std::uint32_t buffer = LoaderMemory::Buffers + index * LoaderMemory::BufferSize;
-    ThrowOnError(p_mHost->WriteMemory(chunk, count, buffer, page, 1));
+    p_mHost.WriteBytes(chunk, count, buffer, page);
     const std::array<std::uint32_t, 3> parameters = {flashAddress, count,
                                                      LoaderMemory::ChunkPending};
-    ThrowOnError(p_mHost->WriteMemory(parameters.data(), sizeof parameters,
-                                      ParameterBlock(index) + LoaderMemory::ChunkOffset, page, 1));
+    p_mHost.WriteBytes(parameters.data(), sizeof parameters,
+                       ParameterBlock(index) + LoaderMemory::ChunkOffset, page);
 }
 
 void FlashCorvane::WaitForLoader(std::uint32_t index, std::int32_t& budgetMs) {
     const std::uint32_t status = ParameterBlock(index) + LoaderMemory::StatusOffset;
     while (budgetMs > 0) {
-        if (Host().ReadWord(status) != LoaderMemory::ChunkPending) return;
+        if (p_mHost.ReadWord(status) != LoaderMemory::ChunkPending) return;
         budgetMs -= kPollIntervalMs;
         SleepForPollInterval();
     }

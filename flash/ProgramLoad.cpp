@@ -3,7 +3,6 @@
 #include "device/FlashCorvane.h"
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
-#include "plugin/ErrorText.h"
 #include "plugin/Trace.h"
 
 namespace {
@@ -18,7 +17,7 @@ bool FlashCorvane::WriteDataToFlash(const std::uint8_t* data, std::uint32_t addr
     TRACE(Entry, "FlashCorvane::WriteDataToFlash(%p,0x%08X,0x%08X,%d)",
           static_cast<const void*>(data), address, length, page);
     if (!InitializeDevice()) {
-        Host().ShowErrorText("Flash Programmer: Error initializing device.");
+        p_mHost.ShowErrorText("Flash Programmer: Error initializing device.");
         TRACE(Result, "FlashCorvane::WriteDataToFlash() failed");
         return false;
     }
@@ -27,24 +26,24 @@ bool FlashCorvane::WriteDataToFlash(const std::uint8_t* data, std::uint32_t addr
     const std::uint32_t last = address + length - 1;
     if (!p_mFlashErased) {
         EraseForSection(address, last);
-        ThrowOnError(p_mHost->Sleep(kSettlingMs));
+        p_mHost.Sleep(kSettlingMs);
     }
-    const bool checkFirst = ParseBoolean(Host().GetSetting(Setting::FlashProgramBlankCheckOption));
+    const bool checkFirst = ParseBoolean(p_mHost.GetSetting(Setting::FlashProgramBlankCheckOption));
     if (checkFirst && !BlankCheckByAddress(address, last)) {
-        Host().ShowErrorText("Flash Programmer: Blank Check failed during program load.");
+        p_mHost.ShowErrorText("Flash Programmer: Blank Check failed during program load.");
         TRACE(Result, "FlashCorvane::WriteDataToFlash() failed");
         return false;
     }
 
     const bool programmed = Program(data, address, length, page);
-    ThrowOnError(p_mHost->Sleep(kSettlingMs));
+    p_mHost.Sleep(kSettlingMs);
     TRACE(Result, "FlashCorvane::WriteDataToFlash() = %u", static_cast<unsigned>(programmed));
     return programmed;
 }
 
 // A failed erase has been shown and does not end the load: programming tells whether it mattered.
 void FlashCorvane::EraseForSection(std::uint32_t address, std::uint32_t last) {
-    const std::string option = Host().GetSetting(Setting::FlashProgramOption);
+    const std::string option = p_mHost.GetSetting(Setting::FlashProgramOption);
     if (option == Choice::NecessaryPagesOnly) {
         PageErase(address, last);
     } else if (option == Choice::DoNotErase) {

@@ -23,25 +23,25 @@ void FlashCorvane::ReadMACAddress(const RegisterValues& values) {
             text += ToHexText(value >> shift & 0xFF);
         }
     }
-    Host().SetSetting(Setting::FlashMACAddrInput, text);
-    Host().ShowMessageText("MAC address value: " + text);
+    p_mHost.SetSetting(Setting::FlashMACAddrInput, text);
+    p_mHost.ShowMessageText("MAC address value: " + text);
 }
 
 bool FlashCorvane::ProgramMACAddress(CommitRequests& requests) {
     std::uint32_t register0 = 0;
     std::uint32_t register1 = 0;
-    if (!ParseMACAddressString(Host().GetSetting(Setting::FlashMACAddrInput), register0,
+    if (!ParseMACAddressString(p_mHost.GetSetting(Setting::FlashMACAddrInput), register0,
                                register1)) {
-        Host().ShowErrorText(
+        p_mHost.ShowErrorText(
             "The given MAC address is not valid. Please check it is in the following format "
             "XX-XX-XX-XX-XX-XX.");
         TRACE(Result, "FlashCorvane::UserRegisterOperation() = false");
         return false;
     }
-    Host().WriteWord(Register::UserRegister0, register0);
-    Host().WriteWord(Register::UserRegister1, register1);
+    p_mHost.WriteWord(Register::UserRegister0, register0);
+    p_mHost.WriteWord(Register::UserRegister1, register1);
     // Half an address is worth nothing: both registers are committed, or neither.
-    requests.fill(ParseHex(Host().GetSetting(Setting::FlashMACAddrCommit)) == 1);
+    requests.fill(ParseHex(p_mHost.GetSetting(Setting::FlashMACAddrCommit)) == 1);
     return true;
 }
 
@@ -58,9 +58,9 @@ bool FlashCorvane::ParseMACAddressString(const std::string& text, std::uint32_t&
     // A pair can be larger than a byte: "-1" is one below zero.
     register0 = (pairs[2] * 256 + pairs[1]) * 256 + pairs[0];
     register1 = (pairs[5] * 256 + pairs[4]) * 256 + pairs[3];
-    Host().ShowMessageText("Writing the following value to Register0 (" + ToHexText(register0) +
-                           ") and Register1 (" + ToHexText(register1) +
-                           ") translated from the given MAC address");
+    p_mHost.ShowMessageText("Writing the following value to Register0 (" + ToHexText(register0) +
+                            ") and Register1 (" + ToHexText(register1) +
+                            ") translated from the given MAC address");
     TRACE(Result,
           "FlashCorvane::ParseMACAddressString() = true, register0 = 0x%08X, register1 = 0x%08X",
           register0, register1);

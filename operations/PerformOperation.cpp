@@ -1,22 +1,59 @@
 // The operations that a user can choose by name.
 
 #include <algorithm>
+#include <array>
 #include <stdexcept>
 #include <string_view>
 
 #include "device/FlashCorvane.h"
-#include "plugin/ErrorText.h"
+#include "operations/NamedOperation.h"
 #include "plugin/Trace.h"
 
-struct FlashCorvane::NamedOperation {
-    std::string_view name;
-    void (FlashCorvane::*run)(const std::string& operationName);
+namespace {
+
+constexpr bool kListed = true;
+constexpr bool kUnlisted = false;  // for those who bring up a new host
+
+// Joined by the compiler: hosts keep the pointer for as long as the library is loaded.
+template <typename Operations>
+consteval auto JoinListed(const Operations& operations) {
+    std::array<char, 256> text{};
+    std::size_t end = 0;
+    for (const auto& operation : operations) {
+        if (!operation.listed) continue;
+        for (const char* part : {end == 0 ? "" : " | ", operation.name}) {
+            for (; *part != '\0'; ++part)
+                text.at(end++) = *part;
+        }
+    }
+    return text;
+}
+
+}  // namespace
+
+struct FlashCorvane::Operations {
+    using enum RegisterAccess;
+    using enum RegisterChoice;
+
+    static constexpr auto runOnUserRegisters = &FlashCorvane::RunUserRegisterOperation;
+    static constexpr NamedOperation table[] = {
+        {"Erase", kListed, &FlashCorvane::RunErase, {}, {}},
+        {"BlankCheck", kListed, &FlashCorvane::RunBlankCheck, {}, {}},
+        {"CalculateChecksum", kListed, &FlashCorvane::RunCalculateChecksum, {}, {}},
+        {"ProgramUserRegister0", kListed, runOnUserRegisters, Program, Register0},
+        {"ReadUserRegister0", kListed, runOnUserRegisters, Read, Register0},
+        {"ProgramUserRegister1", kListed, runOnUserRegisters, Program, Register1},
+        {"ReadUserRegister1", kListed, runOnUserRegisters, Read, Register1},
+        {"ProgramMACAddress", kListed, runOnUserRegisters, Program, MACAddress},
+        {"ReadMACAddress", kListed, runOnUserRegisters, Read, MACAddress},
+        {"Test", kUnlisted, &FlashCorvane::RunTest, {}, {}},
+    };
 };
 
 const char* FlashCorvane::ListSupportedOperations() const {
     TRACE(Entry, "FlashCorvane::ListSupportedOperations()");
-    return "Erase | BlankCheck | CalculateChecksum | ProgramUserRegister0 | ReadUserRegister0 | "
-           "ProgramUserRegister1 | ReadUserRegister1 | ProgramMACAddress | ReadMACAddress";
+    static constexpr auto text = JoinListed(Operations::table);
+    return text.data();
 }
 
 // Runtime errors are shown to the user. Whatever else leaves an operation is the host's to handle.
@@ -27,7 +64,7 @@ bool FlashCorvane::PerformOperation(const char* operationName) {
         RunOperation(name);
     } catch (const std::runtime_error& error) {
         const std::string text = error.what();
-        Host().ShowErrorText(text.empty() ? "Unknown exception" : text);
+        p_mHost.ShowErrorText(text.empty() ? "Unknown exception" : text);
         TRACE(Result, "FlashCorvane::PerformOperation() = false");
         return false;
     }
@@ -35,57 +72,46 @@ bool FlashCorvane::PerformOperation(const char* operationName) {
     return true;
 }
 
-void FlashCorvane::RunOperation(const std::string& operationName) {
-    static constexpr NamedOperation operations[] = {
-        {"Erase", &FlashCorvane::RunErase},
-        {"BlankCheck", &FlashCorvane::RunBlankCheck},
-        {"CalculateChecksum", &FlashCorvane::RunCalculateChecksum},
-        {"ProgramUserRegister0", &FlashCorvane::RunUserRegisterOperation},
-        {"ProgramUserRegister1", &FlashCorvane::RunUserRegisterOperation},
-        {"ReadUserRegister0", &FlashCorvane::RunUserRegisterOperation},
-        {"ReadUserRegister1", &FlashCorvane::RunUserRegisterOperation},
-        {"ProgramMACAddress", &FlashCorvane::RunUserRegisterOperation},
-        {"ReadMACAddress", &FlashCorvane::RunUserRegisterOperation},
-        {"Test", &FlashCorvane::RunTest},  // not listed: for those who bring up a new host
-    };
-    const auto operation = std::ranges::find(operations, operationName, &NamedOperation::name);
-    if (operation == std::end(operations)) {
+void FlashCorvane::RunOperation(std::string_view operationName) {
+    const auto operation = std::ranges::find_if(
+        Operations::table, [&](const auto& row) { return row.name == operationName; });
+    if (operation == std::end(Operations::table)) {
         throw std::runtime_error("Flash Programmer: Unsupported Operation Code.");
     }
-    (this->*operation->run)(operationName);
+    (this->*operation->run)(*operation);
 }
 
 // The error texts end in a full stop, and users know the message with the second one.
+template <typename Step>
 void FlashCorvane::RunOperationStep(const std::string& statusText, const std::string& errorText,
-                                    const std::function<bool()>& step) {
-    Host().ShowMessageText(statusText);
+                                    Step step) {
+    p_mHost.ShowMessageText(statusText);
     if (!step()) throw std::runtime_error("Flash Programmer: " + errorText + ".");
-    Host().ShowMessageText("Operation completed successfully.");
+    p_mHost.ShowMessageText("Operation completed successfully.");
 }
 
-void FlashCorvane::RunErase(const std::string&) {
+void FlashCorvane::RunErase(const NamedOperation&) {
     RunOperationStep("Initializing device...", "Error initializing device.",
                      [this] { return InitializeDevice(); });
     ResetSettings(0);
     RunOperationStep("Erasing device...", "Error erasing flash.", [this] { return Erase(); });
 }
 
-void FlashCorvane::RunBlankCheck(const std::string&) {
+void FlashCorvane::RunBlankCheck(const NamedOperation&) {
     RunOperationStep("Performing Blank Check...", "Error performing Blank Check.",
                      [this] { return BlankCheck(); });
 }
 
-void FlashCorvane::RunCalculateChecksum(const std::string&) {
+void FlashCorvane::RunCalculateChecksum(const NamedOperation&) {
     RunOperationStep("Calculating CRC-32...", "Error calculating CRC.",
                      [this] { return CalculateChecksum(); });
 }
 
-void FlashCorvane::RunUserRegisterOperation(const std::string& operationName) {
+void FlashCorvane::RunUserRegisterOperation(const NamedOperation& operation) {
     RunOperationStep("User Register operation...", "Error accessing User Register operation.",
-                     [this, operationName] { return UserRegisterOperation(operationName); });
+                     [&] { return UserRegisterOperation(operation); });
 }
 
-void FlashCorvane::RunTest(const std::string&) {
-    const std::uint16_t pattern = 0x1234;
-    ThrowOnError(p_mHost->WriteMemory(&pattern, 1, 0x20000000, 1, sizeof pattern));
+void FlashCorvane::RunTest(const NamedOperation&) {
+    p_mHost.WriteHalfword(0x20000000, 0x1234);
 }

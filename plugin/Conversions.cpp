@@ -24,10 +24,6 @@ std::string ToHexText(std::uint32_t value) {
     return std::string(digits.begin(), end);
 }
 
-std::string ToDecimalText(std::int32_t value) {
-    return std::to_string(value);
-}
-
 std::string ToDecimalText(std::uint32_t value) {
     return std::to_string(value);
 }

@@ -14,7 +14,6 @@ std::uint32_t ParseHex(const std::string& text);
 /// Lower-case hexadecimal digits without prefix and leading zeros.
 std::string ToHexText(std::uint32_t value);
 
-std::string ToDecimalText(std::int32_t value);
 std::string ToDecimalText(std::uint32_t value);
 
 /// "1" is true, "0" is false, each also behind zeros and a sign that changes nothing ("+1",

@@ -1,4 +1,4 @@
-// The roof of the library: the one place that sees both the boundary and the device behind it.
+// The exported function: the one place that sees both the boundary and the device behind it.
 
 #include "device/FlashCorvane.h"
 #include "plugin/ExceptionSafeFlashDevice.h"

@@ -14,7 +14,7 @@ inline void ThrowOnError(const char* errorText) {
 
 /// Keeps a text where the caller of the library can read it for a while, and returns it. When
 /// there is no memory left to keep it, a static text stands in: nothing may be thrown out here.
-inline const char* KeepErrorText(std::string& kept, const char* text) noexcept {
+[[nodiscard]] inline const char* KeepErrorText(std::string& kept, const char* text) noexcept {
     try {
         kept.assign(text);
         return kept.c_str();

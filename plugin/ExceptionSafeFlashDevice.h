@@ -1,5 +1,5 @@
-// The object behind IFlashDevice2: owns the device, narrows addresses, and turns every exception
-// into an error text, so that none leaves the library.
+// The object behind IFlashDevice2: owns the device, narrows addresses, and turns exceptions into
+// error texts. It catches what derives from std::exception; the device throws nothing else.
 
 #pragma once
 
@@ -97,7 +97,7 @@ class ExceptionSafeFlashDevice : public virtual IFlashDevice2 {
 
   private:
     template <typename Body>
-    const char* Guarded(Body body) {
+    [[nodiscard]] const char* Guarded(Body body) {
         try {
             body();
             return nullptr;

@@ -4,7 +4,7 @@
 
 #include "logger/ostrel_logger.h"
 
-enum TraceLevel : int {
+enum class TraceLevel : int {
     Information = 1,
     Entry = 2,
     Result = 3,
@@ -20,15 +20,17 @@ inline constexpr int kTraceModule = 3;
     do {                                                                                         \
         if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                                \
             Logging::LoggerFactory::Instance().Line(p_mInstanceId, kTraceFacility, kTraceModule, \
-                                                    level, __VA_ARGS__);                         \
+                                                    static_cast<int>(TraceLevel::level),         \
+                                                    __VA_ARGS__);                                \
         }                                                                                        \
     } while (false)
 
 // The same for a finished text, whatever percent signs it has.
-#define TRACE_TEXT(level, text)                                                                \
-    do {                                                                                       \
-        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                              \
-            Logging::LoggerFactory::Instance().PlainLine(p_mInstanceId, kTraceFacility,        \
-                                                         kTraceModule, level, (text).c_str()); \
-        }                                                                                      \
+#define TRACE_TEXT(level, text)                                                                   \
+    do {                                                                                          \
+        if (Logging::LoggerFactory::IsCurrentInstanceEnabled()) {                                 \
+            Logging::LoggerFactory::Instance().PlainLine(                                         \
+                p_mInstanceId, kTraceFacility, kTraceModule, static_cast<int>(TraceLevel::level), \
+                (text).c_str());                                                                  \
+        }                                                                                         \
     } while (false)

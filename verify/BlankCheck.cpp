@@ -29,13 +29,11 @@ bool FlashCorvane::BlankCheck() {
     try {
         const bool blank = RunOnSelectedRange(
             "BlankCheck", Setting::FlashBlankCheckSelection, Setting::FlashBlankCheckStartAddr,
-            Setting::FlashBlankCheckEndAddr, [this](std::uint32_t start, std::uint32_t end) {
-                return BlankCheckByAddress(start, end);
-            });
+            Setting::FlashBlankCheckEndAddr, &FlashCorvane::BlankCheckByAddress);
         TRACE(Result, "FlashCorvane::BlankCheck() = %u", static_cast<unsigned>(blank));
         return blank;
     } catch (const std::exception& error) {
-        Host().ShowErrorText("Flash Programmer: Missing Blank Check option. Operation cancelled.");
+        p_mHost.ShowErrorText("Flash Programmer: Missing Blank Check option. Operation cancelled.");
         TRACE(Result, "FlashCorvane::BlankCheck() = false %s", error.what());
         return false;
     }
@@ -44,7 +42,7 @@ bool FlashCorvane::BlankCheck() {
 bool FlashCorvane::BlankCheckByAddress(std::uint32_t start, std::uint32_t end) {
     TRACE(Entry, "FlashCorvane::BlankCheckByAddress(0x%08X, 0x%08X)", start, end);
     if (!RangeWithinFlash(start, end)) {
-        Host().ShowErrorText(
+        p_mHost.ShowErrorText(
             "Flash Programmer: Invalid range given for Blank Check. Operation cancelled.");
         TRACE(Result, "FlashCorvane::BlankCheckByAddress() = false");
         return false;
@@ -53,12 +51,12 @@ bool FlashCorvane::BlankCheckByAddress(std::uint32_t start, std::uint32_t end) {
     const std::uint32_t alignedStart = start & ~3u;
     const std::uint32_t alignedEnd = end | 3u;
     if (VerboseMode() != 0) {
-        Host().ShowMessageText(
+        p_mHost.ShowMessageText(
             "Performing Blank Check on the following (aligned) memory range: 0x" +
             ToHexText(alignedStart) + " - 0x" + ToHexText(alignedEnd));
     }
 
-    ProgressHandle progress = Host().OpenProgress("Performing Blank Check");
+    ProgressHandle progress = p_mHost.OpenProgress("Performing Blank Check");
     bool blank = false;
     try {
         blank = ReadRangeInChunks(
@@ -66,13 +64,13 @@ bool FlashCorvane::BlankCheckByAddress(std::uint32_t start, std::uint32_t end) {
             [this](const std::vector<std::uint8_t>& buffer, std::uint32_t count,
                    std::uint32_t address) { return ChunkIsBlank(buffer, count, address); });
     } catch (const std::exception& error) {
-        Host().ShowErrorText(
+        p_mHost.ShowErrorText(
             "Flash Programmer: Error during Blank Check; memory allocation error.");
-        HostAccess::CloseProgress(progress);
+        progress.CloseProgress();
         TRACE(Result, "FlashCorvane::BlankCheckByAddress() = false %s", error.what());
         return false;
     }
-    HostAccess::CloseProgress(progress);
+    progress.CloseProgress();
     if (blank) TRACE(Result, "FlashCorvane::BlankCheckByAddress() = true");
     return blank;
 }
@@ -82,9 +80,9 @@ bool FlashCorvane::ChunkIsBlank(const std::vector<std::uint8_t>& buffer, std::ui
                                 std::uint32_t address) {
     const std::uint32_t offset = FirstNotErased(buffer.data(), count);
     if (offset == count) return true;
-    Host().ShowErrorText("Flash Programmer: Error during Blank Check @ address 0x" +
-                         ToHexText(address + offset) + "; expected 0xFF, actual 0x" +
-                         ToHexText(buffer[offset]));
+    p_mHost.ShowErrorText("Flash Programmer: Error during Blank Check @ address 0x" +
+                          ToHexText(address + offset) + "; expected 0xFF, actual 0x" +
+                          ToHexText(buffer[offset]));
     TRACE(Result, "FlashCorvane::BlankCheckByAddress() = false");
     return false;
 }

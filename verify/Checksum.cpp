@@ -29,11 +29,9 @@ bool FlashCorvane::CalculateChecksum() {
     try {
         return RunOnSelectedRange("CalculateChecksum", Setting::FlashChecksumSelection,
                                   Setting::FlashChecksumStartAddr, Setting::FlashChecksumEndAddr,
-                                  [this](std::uint32_t start, std::uint32_t end) {
-                                      return CalculateChecksumByAddress(start, end);
-                                  });
+                                  &FlashCorvane::CalculateChecksumByAddress);
     } catch (const std::runtime_error& error) {
-        Host().ShowErrorText("Flash Programmer: Missing CRC option. Operation cancelled.");
+        p_mHost.ShowErrorText("Flash Programmer: Missing CRC option. Operation cancelled.");
         TRACE(Result, "FlashCorvane::CalculateChecksum() = false %s", error.what());
         return false;
     }
@@ -42,18 +40,18 @@ bool FlashCorvane::CalculateChecksum() {
 bool FlashCorvane::CalculateChecksumByAddress(std::uint32_t start, std::uint32_t end) {
     TRACE(Entry, "FlashCorvane::CalculateChecksumByAddress(0x%08X, 0x%08X)", start, end);
     if (!RangeWithinFlash(start, end)) {
-        Host().ShowErrorText(
+        p_mHost.ShowErrorText(
             "Flash Programmer: Invalid range given for CRC calculation. Operation cancelled.");
         TRACE(Result, "FlashCorvane::CalculateChecksumByAddress() = false");
         return false;
     }
     if (VerboseMode() != 0) {
-        Host().ShowMessageText("The following range was selected: 0x" + ToHexText(start) + " - 0x" +
-                               ToHexText(end));
+        p_mHost.ShowMessageText("The following range was selected: 0x" + ToHexText(start) +
+                                " - 0x" + ToHexText(end));
     }
     InitCRC32LUT();
     std::uint32_t crc = 0xFFFFFFFF;
-    ProgressHandle progress = Host().OpenProgress("CRC Calculation");
+    ProgressHandle progress = p_mHost.OpenProgress("CRC Calculation");
     try {
         ReadRangeInChunks(progress, "Calculating...", start, end,
                           [this, &crc](const std::vector<std::uint8_t>& buffer, std::uint32_t count,
@@ -62,16 +60,16 @@ bool FlashCorvane::CalculateChecksumByAddress(std::uint32_t start, std::uint32_t
                               return true;
                           });
     } catch (const std::runtime_error& error) {
-        Host().ShowErrorText("Flash Programmer: Error calculating CRC; memory allocation error.");
-        HostAccess::CloseProgress(progress);
+        p_mHost.ShowErrorText("Flash Programmer: Error calculating CRC; memory allocation error.");
+        progress.CloseProgress();
         TRACE(Result, "FlashCorvane::CalculateChecksumByAddress() = false %s", error.what());
         return false;
     }
     // Published first, so that whoever reacts to the message finds the value.
     const std::string text = ToHexText(~crc);
-    Host().SetSetting(Setting::FlashChecksumValue, text);
-    Host().ShowMessageText("The calculated CRC-32 value: 0x" + text);
-    HostAccess::CloseProgress(progress);
+    p_mHost.SetSetting(Setting::FlashChecksumValue, text);
+    p_mHost.ShowMessageText("The calculated CRC-32 value: 0x" + text);
+    progress.CloseProgress();
     TRACE(Result, "FlashCorvane::CalculateChecksumByAddress() = true");
     return true;
 }

@@ -7,13 +7,13 @@
 #include "device/FlashCorvane.h"
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
-#include "plugin/ErrorText.h"
 
 namespace {
 
-// What one host read may ask for, a little short of 32 KiB, and the buffer that hosts expect it in.
+// What one host read may ask for, a little short of 32 KiB. The buffer has room for four times as
+// much: a host that rounds a read up to its own transfer size must not write past it.
 constexpr std::uint32_t kChunkSize = 32752;
-constexpr std::size_t kReadBufferSize = 131008;
+constexpr std::size_t kReadBufferSize = 4 * kChunkSize;
 constexpr std::int16_t kFlashPage = 0;
 
 }  // namespace
@@ -24,18 +24,18 @@ bool FlashCorvane::RangeWithinFlash(std::uint32_t start, std::uint32_t end) cons
 
 bool FlashCorvane::RunOnSelectedRange(const std::string& operationName,
                                       const std::string& selectionKey, const std::string& startKey,
-                                      const std::string& endKey, const RangeOperation& operation) {
-    const std::string selection = Host().GetSetting(selectionKey);
-    if (selection == Choice::EntireFlash) return operation(0, p_mFlashSize - 1);
+                                      const std::string& endKey, RangeOperation operation) {
+    const std::string selection = p_mHost.GetSetting(selectionKey);
+    if (selection == Choice::EntireFlash) return (this->*operation)(0, p_mFlashSize - 1);
     if (selection == Choice::ByAddressRange) {
-        const std::uint32_t start = ParseHex(Host().GetSetting(startKey));
-        const std::uint32_t end = ParseHex(Host().GetSetting(endKey));
-        return operation(start, end);
+        const std::uint32_t start = ParseHex(p_mHost.GetSetting(startKey));
+        const std::uint32_t end = ParseHex(p_mHost.GetSetting(endKey));
+        return (this->*operation)(start, end);
     }
     throw std::runtime_error(operationName + " range selection not set.");
 }
 
-bool FlashCorvane::ReadRangeInChunks(ProgressHandle& /*progress*/, const std::string& text,
+bool FlashCorvane::ReadRangeInChunks(const ProgressHandle& progress, const std::string& text,
                                      std::uint32_t start, std::uint32_t end,
                                      const ChunkConsumer& consumer) {
     std::vector<std::uint8_t> buffer(kReadBufferSize);
@@ -44,9 +44,9 @@ bool FlashCorvane::ReadRangeInChunks(ProgressHandle& /*progress*/, const std::st
     for (std::uint32_t remaining = total; remaining > 0;) {
         // In 32 bits, as hosts know it: above 40 MiB the product wraps and the percentage jumps.
         const std::uint32_t percent = (total - remaining) * 100 / total;
-        ThrowOnError(p_mHost->UpdateProgress(percent, text.c_str()));
+        progress.UpdateProgress(percent, text);
         const std::uint32_t count = std::min(remaining, kChunkSize);
-        ThrowOnError(p_mHost->ReadMemory(buffer.data(), count, address, kFlashPage, 1));
+        p_mHost.ReadBytes(buffer.data(), count, address, kFlashPage);
         if (!consumer(buffer, count, address)) return false;
         address += count;
         remaining -= count;

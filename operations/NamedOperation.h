@@ -1,0 +1,19 @@
+// One row of the table of operations: all that tells an operation from the others.
+
+#pragma once
+
+#include <cstdint>
+
+#include "device/FlashCorvane.h"
+
+/// What an operation on the user registers does, and with which of them.
+enum class RegisterAccess : std::uint8_t { Read, Program };
+enum class RegisterChoice : std::uint8_t { Register0 = 0, Register1 = 1, MACAddress };
+
+struct FlashCorvane::NamedOperation {
+    const char* name;
+    bool listed;  ///< in the text that hosts show to their users
+    void (FlashCorvane::*run)(const NamedOperation& operation);
+    RegisterAccess access;  ///< of an operation on the user registers
+    RegisterChoice choice;
+};
