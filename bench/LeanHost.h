@@ -37,8 +37,8 @@ struct Call {
     const char* text;
 };
 
-/// A target that does nothing and is always ready: registers hold what was written, commands and
-/// chunks are done at once, memory is erased. A Tolva with as much flash as one can have.
+/// A target that keeps nothing and is always ready: registers read 0, so that commands and chunks
+/// are done at once, and memory reads as erased. A Tolva with as much flash as one can have.
 class NullTarget final : public target::Target {
   public:
     void Read(void* buffer, std::size_t count, std::uint32_t address, int page,

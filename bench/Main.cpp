@@ -4,6 +4,7 @@
 
 #include <CLI/CLI.hpp>
 #include <fstream>
+#include <set>
 
 #include "bench/Measurements.h"
 #include "bench/Workloads.h"
@@ -50,8 +51,11 @@ int main(int argc, char** argv) {
     std::string jsonFile;
     std::vector<std::string> names;
     app.add_option("--json", jsonFile, "Write the tables to this file as well");
-    app.add_option("tables", names, "counts, model, own, growth, throughput; all if none is named")
-        ->check(CLI::IsMember({"counts", "model", "own", "growth", "throughput"}));
+    std::set<std::string> known;
+    for (const NamedTable& table : kTables)
+        known.insert(table.name);
+    app.add_option("tables", names, "The tables to make; all of them if none is named")
+        ->check(CLI::IsMember(known));
     CLI11_PARSE(app, argc, argv);
 
     nlohmann::json results;
