@@ -4,7 +4,7 @@
 #include <algorithm>
 
 #include "fuzz/Require.h"
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 #include "host/image/Image.h"
 
 using namespace host::image;

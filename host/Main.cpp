@@ -1,7 +1,7 @@
 // corvane-flash: programs the flash of Corvane microcontrollers through the flash plug-in.
 
-#include "host/Interrupt.h"
 #include "host/Tool.h"
+#include "host/base/Interrupt.h"
 
 int main(int argc, char** argv) {
     host::CatchInterrupts();

@@ -1,4 +1,4 @@
-// See Tool.h.
+// One run of the tool: words parsed, settings loaded, the command run, every failure shown.
 
 #include "host/Tool.h"
 
@@ -10,9 +10,9 @@
 #include <exception>
 #include <system_error>
 
-#include "host/CommandLine.h"
-#include "host/FlashDevice.h"
-#include "host/SettingKeys.h"
+#include "host/cli/CommandLine.h"
+#include "host/commands/Commands.h"
+#include "host/settings/SettingKeys.h"
 
 namespace host {
 
@@ -85,7 +85,7 @@ int RunTool(const std::vector<std::string>& words) {
     ParsedLine line;
     Reporter early({Talk::Normal, json, "none"});
     Outcome outcome = Guarded(early, [&] {
-        line = ParseCommandLine(words);
+        line = ParseCommandLine(AllCommands(), words);
         return Outcome{};
     });
     if (line.command == nullptr) {

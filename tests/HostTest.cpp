@@ -11,17 +11,18 @@
 #include <sstream>
 #include <stdexcept>
 
-#include "host/CommandLine.h"
-#include "host/Comparison.h"
-#include "host/Completion.h"
-#include "host/Errors.h"
-#include "host/FlashHost.h"
-#include "host/Help.h"
-#include "host/MacAddress.h"
-#include "host/ManPage.h"
-#include "host/ProgramPlan.h"
-#include "host/SettingKeys.h"
-#include "host/Words.h"
+#include "host/base/Errors.h"
+#include "host/base/MacAddress.h"
+#include "host/cli/CommandLine.h"
+#include "host/cli/Completion.h"
+#include "host/cli/Help.h"
+#include "host/cli/ManPage.h"
+#include "host/cli/Words.h"
+#include "host/commands/Commands.h"
+#include "host/driver/FlashHost.h"
+#include "host/flashing/Comparison.h"
+#include "host/flashing/ProgramPlan.h"
+#include "host/settings/SettingKeys.h"
 #include "target/simulated/SimulatedDevice.h"
 
 namespace host {
@@ -371,7 +372,8 @@ struct HostUnderTest {
     SettingStore settings;
     Reporter reporter{Reporter::Options{Talk::Quiet, false, "none"}};
     WorkMeter meter{reporter};
-    FlashHost host{target, settings, reporter, meter, "dir/"};
+    FlashWatch watch{meter};
+    FlashHost host{target, settings, reporter, watch, "dir/"};
 };
 
 TEST(FlashHost, HoldsThePluginToTheProgressProtocol) {
@@ -418,40 +420,40 @@ TEST(FlashHost, AnswersInsteadOfThrowing) {
     EXPECT_EQ(test.host.SetProperty("Something new", "x"), nullptr);
 }
 
-TEST(WorkMeter, CountsAnEraseWhenTheDeviceSaysItIsDone) {
+TEST(FlashWatch, CountsAnEraseWhenTheDeviceSaysItIsDone) {
     HostUnderTest test;
-    test.meter.SetGeometry(0x40000, 0x400);
+    test.watch.SetGeometry(0x40000, 0x400);
     const std::uint32_t erase = 0xA4420002;
     const std::uint8_t busy[4] = {2};
     const std::uint8_t idle[4] = {0};
-    test.meter.Wrote(0x400FD008, 4, erase);
-    test.meter.Read(0x400FD008, 4, busy);
+    test.watch.Wrote(0x400FD008, 4, erase);
+    test.watch.Read(0x400FD008, 4, busy);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0U);
-    test.meter.Read(0x400FD008, 4, idle);
-    test.meter.Read(0x400FD008, 4, idle);
+    test.watch.Read(0x400FD008, 4, idle);
+    test.watch.Read(0x400FD008, 4, idle);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x400U);
-    test.meter.Wrote(0x400FD008, 4, 0xA4420004);
-    test.meter.Read(0x400FD008, 4, idle);
+    test.watch.Wrote(0x400FD008, 4, 0xA4420004);
+    test.watch.Read(0x400FD008, 4, idle);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x40400U);
 }
 
 TEST(CommandLine, EveryCommandAndOptionIsInHelpManPageAndCompletions) {
-    std::vector<std::string> words = FirstWords();
+    std::vector<std::string> words = FirstWords(AllCommands());
     std::vector<std::string> options;
     const auto add = [&](const std::vector<OptionRow>& rows) {
         for (const OptionRow& row : rows)
             if (!row.IsArgument()) options.push_back(SplitNames(row).back());
     };
     add(GlobalOptions());
-    std::string help = HelpText("");
-    std::string man = ManPage();
+    std::string help = HelpText(AllCommands(), "");
+    std::string man = ManPage(AllCommands());
     man.erase(std::remove(man.begin(), man.end(), '\\'), man.end());
     for (const CommandRow& command : AllCommands()) {
         add(command.options);
-        help += HelpText(command.name);
+        help += HelpText(AllCommands(), command.name);
         EXPECT_NE(man.find(std::string("corvane-flash ") + command.name), std::string::npos);
         EXPECT_NE(std::string(command.example).find(command.name), std::string::npos);
-        for (std::istringstream lines(HelpText(command.name)); !lines.eof();) {
+        for (std::istringstream lines(HelpText(AllCommands(), command.name)); !lines.eof();) {
             std::string line;
             std::getline(lines, line);
             EXPECT_TRUE(line.size() < 80 || line.starts_with("  corvane-flash")) << line;
@@ -460,9 +462,11 @@ TEST(CommandLine, EveryCommandAndOptionIsInHelpManPageAndCompletions) {
     for (const std::string& option : options) {
         EXPECT_NE(help.find(option), std::string::npos) << option;
         EXPECT_NE(man.find(option), std::string::npos) << option;
-        EXPECT_NE(CompletionScript("bash").find(option), std::string::npos) << option;
-        EXPECT_NE(CompletionScript("zsh").find(option), std::string::npos) << option;
-        EXPECT_NE(CompletionScript("fish").find(" -l " + option.substr(2)), std::string::npos);
+        EXPECT_NE(CompletionScript(AllCommands(), "bash").find(option), std::string::npos)
+            << option;
+        EXPECT_NE(CompletionScript(AllCommands(), "zsh").find(option), std::string::npos) << option;
+        EXPECT_NE(CompletionScript(AllCommands(), "fish").find(" -l " + option.substr(2)),
+                  std::string::npos);
     }
 }
 
@@ -473,7 +477,7 @@ TEST(CommandLine, OptionsMayStandAnywhere) {
          "--sim", "quen"},
     };
     for (const auto& line : lines) {
-        const Options options = ParseCommandLine(line).options;
+        const Options options = ParseCommandLine(AllCommands(), line).options;
         EXPECT_EQ(options.command, "program");
         EXPECT_EQ(options.sim, "quen");
         EXPECT_EQ(options.verbose, 2);

@@ -13,7 +13,7 @@
 #include <map>
 #include <random>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 
 namespace host::image {
 

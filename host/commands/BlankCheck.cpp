@@ -2,17 +2,17 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
 #include "host/commands/Commands.h"
-#include "host/commands/UserOperation.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/RangeOperation.h"
 
 namespace host::commands {
 
 namespace {
 
 Outcome RunOn(Context& context, FlashDevice& device) {
-    const AddressRange range = SelectRange(context, device, kBlankCheckKeys, context.options.range);
-    Outcome outcome = RunOperation(context, device, "BlankCheck");
+    const AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
+    Outcome outcome = RunOperation(device, plugin::kBlankCheck);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
     context.reporter.Result(RangeText(range) + " is blank");
     return outcome;

@@ -6,11 +6,11 @@
 #include <algorithm>
 #include <vector>
 
-#include "host/FlashDevice.h"
-#include "host/SettingKeys.h"
 #include "host/commands/Commands.h"
-#include "host/commands/Images.h"
-#include "host/commands/UserOperation.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/ImageSet.h"
+#include "host/flashing/RangeOperation.h"
+#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
@@ -47,13 +47,8 @@ Outcome Answer(Context& context, const AddressRange& range, const std::string& c
 }
 
 Outcome OfImage(Context& context) {
-    const LoadedImages images = [&] {
-        LoadedImages loaded;
-        loaded.image = ReadImage(*context.options.imageOf, context.options);
-        for (const image::Section& section : loaded.image.Sections())
-            loaded.origins.push_back({*context.options.imageOf, {section.address, section.Last()}});
-        return loaded;
-    }();
+    const LoadedImages images =
+        ReadImages({*context.options.imageOf}, ImageOptions(context.options));
     return WithDevice(context, [&](FlashDevice& device) {
         RequireFit(device, images);
         const AddressRange range = device.RangeInFlash(context.options.range);
@@ -63,9 +58,8 @@ Outcome OfImage(Context& context) {
 
 Outcome OfFlash(Context& context) {
     return WithDevice(context, [&](FlashDevice& device) {
-        const AddressRange range =
-            SelectRange(context, device, kChecksumKeys, context.options.range);
-        const Outcome operation = RunOperation(context, device, "CalculateChecksum");
+        const AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
+        const Outcome operation = RunOperation(device, plugin::kCalculateChecksum);
         Outcome outcome =
             Answer(context, range, "0x" + context.settings.Kept(keys::kChecksumValue));
         outcome.result.update(operation.result);

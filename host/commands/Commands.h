@@ -3,7 +3,14 @@
 
 #pragma once
 
-#include "host/CommandTable.h"
+#include "host/cli/CommandTable.h"
+#include "host/commands/Context.h"
+
+namespace host {
+
+const CommandRows& AllCommands();
+
+}  // namespace host
 
 namespace host::commands {
 

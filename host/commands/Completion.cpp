@@ -1,6 +1,6 @@
 // corvane-flash completion: prints a script that completes the tool's command lines in a shell.
 
-#include "host/Completion.h"
+#include "host/cli/Completion.h"
 #include "host/commands/Commands.h"
 
 namespace host::commands {
@@ -9,7 +9,7 @@ namespace {
 
 Outcome Run(Context& context) {
     const std::string& shell = *context.options.argument;
-    std::string script = CompletionScript(shell);
+    std::string script = CompletionScript(AllCommands(), shell);
     script.pop_back();  // the last line break comes with the result
     context.reporter.Result(script);
     return {.result = {{"shell", shell}, {"script", script}}};

@@ -2,17 +2,17 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
-#include "host/ProgramPlan.h"
 #include "host/commands/Commands.h"
-#include "host/commands/UserOperation.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/ProgramPlan.h"
+#include "host/flashing/RangeOperation.h"
 
 namespace host::commands {
 
 namespace {
 
 Outcome RunOn(Context& context, FlashDevice& device) {
-    const AddressRange range = SelectRange(context, device, kEraseKeys, context.options.range);
+    const AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
     const DeviceInfo& info = device.Info();
     const AddressRange covered = SectorsCovering(range, info.sectorBytes);
     const std::uint64_t sectors = covered.Size() / info.sectorBytes;
@@ -24,7 +24,7 @@ Outcome RunOn(Context& context, FlashDevice& device) {
                         SizeText(info.flashBytes - covered.Size())));
         return {.result = members};
     }
-    Outcome outcome = RunOperation(context, device, "Erase");
+    Outcome outcome = RunOperation(device, plugin::kErase);
     outcome.result.update(members);
     return outcome;
 }

@@ -2,8 +2,8 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
 #include "host/commands/Commands.h"
+#include "host/driver/FlashDevice.h"
 
 namespace host::commands {
 
@@ -11,7 +11,7 @@ namespace {
 
 Json OperationNames(const std::string& joined) {
     Json names = Json::array();
-    constexpr std::string_view separator = " | ";
+    constexpr std::string_view separator = plugin::kOperationSeparator;
     for (std::size_t start = 0; start <= joined.size();) {
         const std::size_t end = std::min(joined.find(separator, start), joined.size());
         names.push_back(joined.substr(start, end - start));

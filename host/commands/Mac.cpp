@@ -2,39 +2,39 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
-#include "host/MacAddress.h"
-#include "host/SettingKeys.h"
+#include "host/base/MacAddress.h"
 #include "host/commands/Commands.h"
-#include "host/commands/UserRegisters.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/UserRegisters.h"
+#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
 namespace {
 
 /// Read through the plug-in; the host has padded it to two digits a byte.
-std::string ReadMac(Context& context, FlashDevice& device) {
-    device.Perform("ReadMACAddress", Talk::Verbose);
-    return context.settings.Kept(keys::kMacInput);
+std::string ReadMac(FlashDevice& device) {
+    device.Perform(plugin::kReadMac, Talk::Verbose);
+    return device.Settings().Kept(keys::kMacInput);
 }
 
 Outcome Show(Context& context, FlashDevice& device) {
-    const std::string mac = ReadMac(context, device);
+    const std::string mac = ReadMac(device);
     context.reporter.Result(mac);
     return {.result = {{"mac", mac}}};
 }
 
 Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
-    const std::string old = ReadMac(context, device);
+    const std::string old = ReadMac(device);
     context.settings.Set(Origin::CommandLine, keys::kMacInput, mac.Text());
     context.settings.Set(Origin::CommandLine, keys::kMacCommit, context.options.commit ? "1" : "0");
-    device.Perform("ProgramMACAddress");
-    const std::string now = ReadMac(context, device);
+    device.Perform(plugin::kProgramMac);
+    const std::string now = ReadMac(device);
     context.reporter.Result(fmt::format("MAC address: was {}, is {}", old, now));
     Outcome outcome{.result = {{"old", old}, {"mac", now}, {"committed", context.options.commit}}};
     for (const unsigned index : {1U, 0U})
-        RequireRegister(outcome, index, mac.Register(index), ReadRegister(context, device, index));
-    SayWhetherCommitted(context);
+        RequireRegister(outcome, index, mac.Register(index), ReadRegister(device, index));
+    SayWhetherCommitted(context.reporter, context.options.commit);
     return outcome;
 }
 

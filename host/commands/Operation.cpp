@@ -3,11 +3,11 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
-#include "host/MacAddress.h"
-#include "host/SettingKeys.h"
+#include "host/base/MacAddress.h"
 #include "host/commands/Commands.h"
-#include "host/commands/UserOperation.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/RangeOperation.h"
+#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
@@ -25,15 +25,17 @@ void RequireMacSetting(const Context& context) {
 }
 
 bool IsListed(const std::string& operations, const std::string& name) {
-    return (" | " + operations + " | ").find(" | " + name + " | ") != std::string::npos;
+    const std::string separator = plugin::kOperationSeparator;
+    return (separator + operations + separator).find(separator + name + separator) !=
+           std::string::npos;
 }
 
 Outcome Run(Context& context) {
     const std::string& name = *context.options.argument;
-    if (name == "ProgramMACAddress") RequireMacSetting(context);
+    if (name == plugin::kProgramMac) RequireMacSetting(context);
     return WithDevice(context, [&](FlashDevice& device) {
         try {
-            return RunOperation(context, device, name);
+            return RunOperation(device, name);
         } catch (const ShownFailure& failure) {
             if (IsListed(device.Info().operations, name)) throw;
             throw ShownFailure(failure.Status(), failure.what(),

@@ -4,21 +4,19 @@
 
 #include <string>
 
-#include "host/Comparison.h"
-#include "host/FlashDevice.h"
-#include "host/ProgramPlan.h"
-#include "host/SettingKeys.h"
 #include "host/commands/Commands.h"
-#include "host/commands/Images.h"
-#include "host/commands/Summary.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/Comparison.h"
+#include "host/flashing/ImageSet.h"
+#include "host/flashing/ProgramPlan.h"
+#include "host/output/Summary.h"
+#include "host/settings/RangeSettings.h"
 
 namespace host::commands {
 
 namespace {
 
-// The plug-in's names for the events at which its host resets the settings.
-constexpr int kLoadBegins = 0;
-constexpr int kLoadComplete = 2;
+using plugin::ResetMode;
 
 void Choose(Context& context, const char* key, const std::string& text) {
     context.settings.Set(Origin::CommandLine, key, text);
@@ -29,11 +27,8 @@ void ChooseErase(Context& context, FlashDevice& device, const std::string& choic
     if (choice == "necessary") return Choose(context, keys::kProgramOption, keys::kNecessaryPages);
     if (choice == "none") return Choose(context, keys::kProgramOption, keys::kNoErase);
     Choose(context, keys::kProgramOption, keys::kEraseOptions);
-    if (choice == "all") return Choose(context, keys::kEraseType, keys::kEntireFlash);
-    const AddressRange range = device.RangeInFlash(choice);
-    Choose(context, keys::kEraseType, keys::kByAddressRange);
-    Choose(context, keys::kEraseStart, HexText(range.first));
-    Choose(context, keys::kEraseEnd, HexText(range.last));
+    const auto range = choice == "all" ? std::nullopt : std::optional(device.RangeInFlash(choice));
+    SelectRange(context.settings, kEraseKeys, range);
 }
 
 void ApplyOptions(Context& context, FlashDevice& device) {
@@ -75,18 +70,17 @@ void Expect(Context& context, WorkMeter& meter, const ProgramPlan& plan, std::ui
 /// The wait for the loader is one budget for a whole section, so a fixed default would fail large
 /// images on slow flash. Each chunk may cost two polls more, unless the user has set a limit.
 void AllowTime(Context& context, const ProgramPlan& plan) {
-    constexpr std::uint64_t kChunkBytes = 2048;
     constexpr std::uint64_t kChunksPerSecond = 5;
     const SettingValue limit = context.settings.Get(keys::kTimeout);
     if (limit.origin != Origin::Default) return;
     const auto seconds =
-        std::stoul(limit.text) + plan.transferBytes / (kChunkBytes * kChunksPerSecond);
+        std::stoul(limit.text) + plan.transferBytes / (plugin::kChunkBytes * kChunksPerSecond);
     Choose(context, keys::kTimeout, std::to_string(seconds));
 }
 
 void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
     AllowTime(context, plan);
-    device.ResetSettings(kLoadBegins);
+    device.ResetSettings(ResetMode::LoadBegins);
     for (const image::Section& section : plan.sections)
         device.WriteSection(section);
     const std::uint64_t erased = device.Meter().Of(Phase::Erase).doneBytes;
@@ -95,7 +89,7 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
                       fmt::format("the plug-in erased {} of {} and gave no reason; the image was "
                                   "programmed over what was there; try --erase necessary",
                                   SizeText(erased), SizeText(plan.erasedBytes)));
-    if (IsOn(context, keys::kProgramCrc)) device.ResetSettings(kLoadComplete);
+    if (IsOn(context, keys::kProgramCrc)) device.ResetSettings(ResetMode::LoadComplete);
 }
 
 Outcome LoadAndCompare(Context& context, FlashDevice& device, const image::Image& image,
@@ -148,7 +142,7 @@ void CheckEraseOption(const Options& options) {
 
 Outcome Run(Context& context) {
     CheckEraseOption(context.options);
-    const LoadedImages images = ReadImages(context.options);
+    const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
     return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
 }
 

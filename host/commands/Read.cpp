@@ -4,10 +4,10 @@
 
 #include <filesystem>
 
-#include "host/Files.h"
-#include "host/FlashDevice.h"
+#include "host/base/Files.h"
 #include "host/commands/Commands.h"
-#include "host/commands/Summary.h"
+#include "host/driver/FlashDevice.h"
+#include "host/output/Summary.h"
 
 namespace host::commands {
 

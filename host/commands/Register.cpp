@@ -2,9 +2,10 @@
 
 #include <fmt/format.h>
 
-#include "host/FlashDevice.h"
 #include "host/commands/Commands.h"
-#include "host/commands/UserRegisters.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/UserRegisters.h"
+#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
@@ -20,22 +21,19 @@ OptionRow IndexArgument() {
 
 Outcome Show(Context& context, FlashDevice& device) {
     const unsigned index = Index(context);
-    const std::uint32_t value = ReadRegister(context, device, index);
+    const std::uint32_t value = ReadRegister(device, index);
     context.reporter.Result(fmt::format("{:#010x}", value));
     return {.result = {{"register", index}, {"value", value}}};
 }
 
 Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     const unsigned index = Index(context);
-    const std::uint32_t old = ReadRegister(context, device, index);
-    const auto choose = [&](const char* what, const std::string& text) {
-        context.settings.Set(Origin::CommandLine, fmt::format("FlashUserRegister{}{}", index, what),
-                             text);
-    };
-    choose("Input", HexText(value));
-    choose("Commit", context.options.commit ? "1" : "0");
-    device.Perform(fmt::format("ProgramUserRegister{}", index));
-    const std::uint32_t now = ReadRegister(context, device, index);
+    const std::uint32_t old = ReadRegister(device, index);
+    context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], HexText(value));
+    context.settings.Set(Origin::CommandLine, keys::kRegisterCommits[index],
+                         context.options.commit ? "1" : "0");
+    device.Perform(plugin::ProgramRegisterOperation(index));
+    const std::uint32_t now = ReadRegister(device, index);
     context.reporter.Result(
         fmt::format("User register {}: was {:#010x}, is {:#010x}", index, old, now));
     Outcome outcome{.result = {{"register", index},
@@ -43,7 +41,7 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
                                {"value", now},
                                {"committed", context.options.commit}}};
     RequireRegister(outcome, index, value, now);
-    SayWhetherCommitted(context);
+    SayWhetherCommitted(context.reporter, context.options.commit);
     return outcome;
 }
 

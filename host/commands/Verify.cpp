@@ -1,10 +1,10 @@
 // corvane-flash verify: compare flash with image files.
 
-#include "host/Comparison.h"
-#include "host/FlashDevice.h"
 #include "host/commands/Commands.h"
-#include "host/commands/Images.h"
-#include "host/commands/Summary.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/Comparison.h"
+#include "host/flashing/ImageSet.h"
+#include "host/output/Summary.h"
 
 namespace host::commands {
 
@@ -27,7 +27,7 @@ Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images)
 }
 
 Outcome Run(Context& context) {
-    const LoadedImages images = ReadImages(context.options);
+    const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
     return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
 }
 

@@ -2,7 +2,7 @@
 
 #include <fmt/format.h>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 #include "host/image/Formats.h"
 
 namespace host::image {

@@ -10,7 +10,7 @@
 #include <limits>
 #include <memory>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 #include "host/image/Formats.h"
 
 namespace host::image {

@@ -8,7 +8,7 @@
 #include <string_view>
 #include <utility>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 
 namespace host::image {
 namespace {

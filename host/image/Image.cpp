@@ -10,7 +10,7 @@
 #include <span>
 #include <utility>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
 
 namespace host::image {
 namespace {

@@ -9,9 +9,9 @@
 #include <string_view>
 #include <system_error>
 
-#include "host/Errors.h"
+#include "host/base/Errors.h"
+#include "host/base/HexDigits.h"
 #include "host/image/Formats.h"
-#include "host/image/HexDigits.h"
 
 namespace host::image {
 namespace {

@@ -1,0 +1,64 @@
+// What a host knows of this plug-in and its devices beyond the two interface headers: names of
+// operations, modes of a settings reset, titles of displays, pages, and the memory that programming
+// and erasing go through. It is told once, here; docs/host-guide.md explains it.
+
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <string>
+
+namespace host::plugin {
+
+// The operations, by the names that Initialize lists.
+inline constexpr char kErase[] = "Erase";
+inline constexpr char kBlankCheck[] = "BlankCheck";
+inline constexpr char kCalculateChecksum[] = "CalculateChecksum";
+inline constexpr char kReadMac[] = "ReadMACAddress";
+inline constexpr char kProgramMac[] = "ProgramMACAddress";
+
+inline std::string ReadRegisterOperation(unsigned index) {
+    return "ReadUserRegister" + std::to_string(index);
+}
+
+inline std::string ProgramRegisterOperation(unsigned index) {
+    return "ProgramUserRegister" + std::to_string(index);
+}
+
+/// What stands between the names in the list of operations.
+inline constexpr char kOperationSeparator[] = " | ";
+
+/// The events at which a host resets the settings.
+enum class ResetMode : int { LoadBegins = 0, TargetWillRun = 1, LoadComplete = 2 };
+
+// The titles of the progress displays.
+inline constexpr char kEraseTitle[] = "Erasing Flash.";
+inline constexpr char kBlankCheckTitle[] = "Performing Blank Check";
+inline constexpr char kChecksumTitle[] = "CRC Calculation";
+
+/// The page of the target's memory that holds flash contents, and the one for everything else.
+/// A section is written with the latter, because what the plug-in writes with it goes to RAM.
+inline constexpr std::int16_t kFlashPage = 0;
+inline constexpr std::int16_t kRamPage = 1;
+
+// The flash command register takes an erase command in its low bits, under a key in the high half,
+// and shows the same bit until the erase is done.
+inline constexpr std::uint32_t kFlashCommandRegister = 0x400FD008;
+inline constexpr std::uint32_t kEraseSectorBit = 0x2;
+inline constexpr std::uint32_t kEraseAllBit = 0x4;
+
+// The loader's two chunk buffers lie one behind the other, then its two parameter blocks. It
+// programs blocks of 128 bytes; the plug-in widens each section to whole ones.
+inline constexpr std::uint32_t kBlockBytes = 128;
+inline constexpr std::uint32_t kChunkBytes = 2048;
+inline constexpr std::uint32_t kLoaderBuffers = 0x20000000;
+inline constexpr std::uint32_t kLoaderBuffersEnd = kLoaderBuffers + 2 * kChunkBytes;
+inline constexpr std::array<std::uint32_t, 2> kParameterBlocks{0x20001000, 0x20001010};
+
+// The words of a parameter block, by their offset.
+inline constexpr std::uint32_t kChunkAddressOffset = 4;
+inline constexpr std::uint32_t kChunkSizeOffset = 8;
+inline constexpr std::uint32_t kStatusOffset = 12;
+inline constexpr std::uint32_t kStatusPending = 0xFFFFFFFF;
+
+}  // namespace host::plugin

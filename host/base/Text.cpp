@@ -1,0 +1,81 @@
+// Parsing with std::from_chars, formatting with fmt: neither knows the locale.
+
+#include "host/base/Text.h"
+
+#include <fmt/format.h>
+
+#include <array>
+#include <charconv>
+#include <system_error>
+
+#include "host/base/Errors.h"
+
+namespace host {
+
+std::optional<std::uint32_t> HexNumber(const std::string& text) {
+    const bool prefixed = text.starts_with("0x") || text.starts_with("0X");
+    const char* first = text.data() + (prefixed ? 2 : 0);
+    const char* last = text.data() + text.size();
+    std::uint32_t value = 0;
+    const auto [end, error] = std::from_chars(first, last, value, 16);
+    if (error != std::errc() || end != last) return std::nullopt;
+    return value;
+}
+
+std::uint32_t ParseHexArgument(const std::string& text, const std::string& what) {
+    if (const auto value = HexNumber(text)) return *value;
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("{} '{}' is no hexadecimal number of up to 32 bits; write it as in "
+                              "0x1f00 or 1f00",
+                              what, text));
+}
+
+AddressRange ParseRange(const std::string& text) {
+    const auto dash = text.find('-');
+    if (dash == std::string::npos)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("'{}' is no address range; write the first and the last address, "
+                                  "as in 0x1000-0x1fff",
+                                  text));
+    const AddressRange range{ParseHexArgument(text.substr(0, dash), "the range's first address"),
+                             ParseHexArgument(text.substr(dash + 1), "the range's last address")};
+    if (range.first > range.last)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("the range '{}' ends before it starts; the first address comes "
+                                  "first and the last one belongs to the range",
+                                  text));
+    return range;
+}
+
+std::string HexText(std::uint32_t value) {
+    return fmt::format("{:#x}", value);
+}
+
+std::string RangeText(const AddressRange& range) {
+    return fmt::format("{:#x}-{:#x}", range.first, range.last);
+}
+
+std::string SizeText(std::uint64_t bytes) {
+    if (bytes < 1024) return CountText(bytes, "byte");
+    constexpr std::array units{"KiB", "MiB", "GiB"};
+    double amount = static_cast<double>(bytes) / 1024;
+    std::size_t unit = 0;
+    for (; amount >= 1024 && unit + 1 < units.size(); ++unit)
+        amount /= 1024;
+    const bool whole = amount == static_cast<double>(static_cast<std::uint64_t>(amount));
+    return fmt::format("{:.{}f} {}", amount, whole ? 0 : 1, units[unit]);
+}
+
+std::string CountText(std::uint64_t count, const char* thing) {
+    return fmt::format("{} {}{}", count, thing, count == 1 ? "" : "s");
+}
+
+std::string DurationText(double seconds) {
+    if (seconds < 0.001) return "under 1 ms";
+    if (seconds < 1) return fmt::format("{:.0f} ms", seconds * 1000);
+    if (seconds < 60) return fmt::format("{:.1f} s", seconds);
+    const auto whole = static_cast<std::uint64_t>(seconds);
+    return fmt::format("{}:{:02}", whole / 60, whole % 60);
+}
+
+}  // namespace host

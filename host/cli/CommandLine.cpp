@@ -1,0 +1,144 @@
+// The parsing itself is CLI11's, fed from the tables of commands and options.
+
+#include "host/cli/CommandLine.h"
+
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+#include <memory>
+#include <type_traits>
+
+#include "host/base/Errors.h"
+#include "host/cli/Help.h"
+#include "host/cli/ManPage.h"
+#include "host/cli/Words.h"
+
+namespace host {
+
+namespace {
+
+/// Texts are taken as they come, an empty one too, and the last of several counts.
+template <typename Text>
+CLI::Option* DefineText(CLI::App& app, const OptionRow& row, Text& target) {
+    CLI::Option* option = app.add_option_function<std::string>(
+        row.names, [&target](const std::string& text) { target = text; });
+    return option->multi_option_policy(CLI::MultiOptionPolicy::TakeLast);
+}
+
+CLI::Option* DefineTexts(CLI::App& app, const OptionRow& row, std::vector<std::string>& target) {
+    return app.add_option(row.names, target)->allow_extra_args(row.IsArgument());
+}
+
+CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options) {
+    return std::visit(
+        [&](auto member) -> CLI::Option* {
+            auto& target = options.*member;
+            using Target = std::remove_reference_t<decltype(target)>;
+            if constexpr (std::is_same_v<Target, bool> || std::is_same_v<Target, int>)
+                return app.add_flag(row.names, target);
+            else if constexpr (std::is_same_v<Target, std::vector<std::string>>)
+                return DefineTexts(app, row, target);
+            else
+                return DefineText(app, row, target);
+        },
+        row.member);
+}
+
+void Define(CLI::App& app, const OptionRow& row, Options& options) {
+    CLI::Option* option = DefineMember(app, row, options);
+    option->required(row.required);
+    if (!row.choices.empty()) option->check(CLI::IsMember(row.choices));
+    if (*row.environment != '\0') option->envname(row.environment);
+}
+
+/// The app of a command; for one of two words, below the app of the first word.
+CLI::App* AddCommand(CLI::App& app, const CommandRow& row) {
+    const std::string name = row.name;
+    const auto blank = name.find(' ');
+    CLI::App* parent = &app;
+    if (blank != std::string::npos) {
+        const std::string word = name.substr(0, blank);
+        const auto known =
+            app.get_subcommands([&](CLI::App* group) { return group->get_name() == word; });
+        parent = known.empty() ? app.add_subcommand(word) : known.front();
+        parent->fallthrough()->require_subcommand(1);
+    }
+    return parent->add_subcommand(name.substr(blank + 1))->fallthrough();
+}
+
+/// The words of the command that the parser has come to.
+std::string CommandWords(const CLI::App& app) {
+    const auto chosen = app.get_subcommands();
+    if (chosen.empty()) return "";
+    const std::string rest = CommandWords(*chosen.front());
+    return chosen.front()->get_name() + (rest.empty() ? "" : " ") + rest;
+}
+
+struct Parser {
+    CLI::App app;
+    Options options;
+    const CommandRow* chosen = nullptr;
+    bool man = false;
+
+    explicit Parser(const CommandRows& commands) {
+        app.set_version_flag("--version", std::string("corvane-flash " CORVANE_FLASH_VERSION));
+        app.add_flag("--man", man);
+        app.require_subcommand(0, 1);
+        for (const OptionRow& row : GlobalOptions())
+            Define(app, row, options);
+        for (const CommandRow& row : commands) {
+            CLI::App* command = AddCommand(app, row);
+            for (const OptionRow& option : row.options)
+                Define(*command, option, options);
+            command->callback([this, &row] { chosen = &row; });
+        }
+    }
+};
+
+/// CLI11 speaks in several lines and of subcommands; people want one line and commands.
+std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
+                    const std::string& command) {
+    const bool surplus = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+    const auto below = SecondWords(commands, command);
+    if (!below.empty()) return fmt::format("{} what? {}", command, fmt::join(below, " or "));
+    std::string text = error.what();
+    std::replace(text.begin(), text.end(), '\n', ' ');
+    if (surplus && command.empty())
+        return "unknown command or option" + text.substr(text.find(':'));
+    return text;
+}
+
+[[noreturn]] void Refuse(const CommandRows& commands, const CLI::ParseError& error,
+                         const std::string& command) {
+    throw Failure(
+        ExitStatus::WrongUsage,
+        fmt::format("{}; 'corvane-flash {}{}--help' shows what there is",
+                    OneLine(commands, error, command), command, command.empty() ? "" : " "));
+}
+
+}  // namespace
+
+ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words) {
+    Parser parser(commands);
+    std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
+    try {
+        parser.app.parse(words);
+    } catch (const CLI::CallForHelp&) {
+        return {{}, nullptr, HelpText(commands, CommandWords(parser.app))};
+    } catch (const CLI::CallForVersion& version) {
+        return {{}, nullptr, std::string(version.what()) + "\n"};
+    } catch (const CLI::ParseError& error) {
+        Refuse(commands, error, CommandWords(parser.app));
+    }
+    if (parser.man) return {{}, nullptr, ManPage(commands)};
+    if (parser.chosen == nullptr)
+        throw Failure(ExitStatus::WrongUsage,
+                      "which command? 'corvane-flash --help' lists them, for example "
+                      "'corvane-flash program firmware.elf'");
+    parser.options.command = parser.chosen->name;
+    return {parser.options, parser.chosen, ""};
+}
+
+}  // namespace host

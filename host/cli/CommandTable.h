@@ -1,0 +1,60 @@
+// The commands and their options as tables. The parser, the help, the man page and the shell
+// completions are all made from them, so that none can drift from the others.
+
+#pragma once
+
+#include <string>
+#include <variant>
+#include <vector>
+
+#include "host/cli/Options.h"
+
+namespace host {
+
+struct Context;
+struct Outcome;
+
+/// What a shell offers to complete a value with, apart from the fixed choices.
+enum class Offers { Nothing, Files, Devices, Settings, SettingAssignments };
+
+using OptionMember =
+    std::variant<bool Options::*, int Options::*, std::string Options::*,
+                 std::optional<std::string> Options::*, std::vector<std::string> Options::*>;
+
+struct OptionRow {
+    const char* names;  ///< "-q,--quiet"; of an argument, its name in the help: "FILE"
+    const char* value;  ///< the value's name in the help, "" for a switch or an argument
+    const char* help;
+    OptionMember member;
+    Offers offers = Offers::Nothing;
+    std::vector<std::string> choices = {};
+    bool required = false;
+    const char* environment = "";
+
+    bool IsArgument() const { return names[0] != '-'; }
+    bool IsSwitch() const {
+        return std::holds_alternative<bool Options::*>(member) ||
+               std::holds_alternative<int Options::*>(member);
+    }
+};
+
+struct CommandRow {
+    const char* name;  ///< "erase", or two words: "mac read"
+    const char* help;
+    const char* details;  ///< more sentences for the command's own help, or ""
+    const char* example;  ///< one or more command lines
+    std::vector<OptionRow> options;
+    Outcome (*run)(Context&);
+    bool readsSettings = true;
+};
+
+/// All commands, in the order in which the help lists them.
+using CommandRows = std::vector<CommandRow>;
+
+/// The options that every command takes.
+const std::vector<OptionRow>& GlobalOptions();
+
+/// What a first word stands for that has commands below it: "mac".
+const char* GroupHelp(const std::string& word);
+
+}  // namespace host

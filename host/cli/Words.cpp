@@ -1,0 +1,40 @@
+// Picking words out of the tables of commands and options.
+
+#include "host/cli/Words.h"
+
+#include <algorithm>
+
+namespace host {
+
+std::vector<std::string> SplitNames(const OptionRow& row) {
+    const std::string names = row.names;
+    const auto comma = names.find(',');
+    if (comma == std::string::npos) return {names};
+    return {names.substr(0, comma), names.substr(comma + 1)};
+}
+
+std::vector<std::string> FirstWords(const CommandRows& commands) {
+    std::vector<std::string> words;
+    for (const CommandRow& command : commands) {
+        const std::string name = command.name;
+        const std::string word = name.substr(0, name.find(' '));
+        if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
+    }
+    return words;
+}
+
+std::vector<std::string> SecondWords(const CommandRows& commands, const std::string& first) {
+    std::vector<std::string> words;
+    for (const CommandRow& command : commands)
+        if (const std::string name = command.name; name.starts_with(first + " "))
+            words.push_back(name.substr(first.size() + 1));
+    return words;
+}
+
+std::string FirstWordHelp(const CommandRows& commands, const std::string& word) {
+    for (const CommandRow& command : commands)
+        if (word == command.name) return command.help;
+    return GroupHelp(word);
+}
+
+}  // namespace host

@@ -1,0 +1,28 @@
+// What a command works with, and how it gets at a device.
+
+#pragma once
+
+#include <functional>
+
+#include "host/cli/Options.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/ImageSet.h"
+#include "host/output/Reporter.h"
+#include "host/settings/SettingStore.h"
+
+namespace host {
+
+struct Context {
+    const Options& options;
+    Reporter& reporter;
+    SettingStore& settings;
+};
+
+/// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
+/// are kept, except after a mere look (`dryRun`).
+Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
+
+/// --format and --base.
+image::ReadOptions ImageOptions(const Options& options);
+
+}  // namespace host

@@ -1,0 +1,124 @@
+// A device that is ready to be worked on: the target, the loaded plug-in and the device object that
+// it made. Every call into the plug-in goes through here, so that a failure of any kind (an error
+// text, an error that was only shown, Ctrl-C) ends a command in the same way.
+
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "host/base/Errors.h"
+#include "host/base/PluginFacts.h"
+#include "host/base/Text.h"
+#include "host/driver/FlashHost.h"
+#include "host/driver/FlashWatch.h"
+#include "host/driver/PluginLibrary.h"
+#include "host/driver/Trace.h"
+#include "host/driver/TracingHost.h"
+#include "host/image/Image.h"
+#include "host/output/WorkMeter.h"
+#include "host/targets/SimulatedTarget.h"
+
+namespace host {
+
+/// What the plug-in has found out about the device.
+struct DeviceInfo {
+    std::string family;
+    std::uint64_t flashBytes = 0;
+    std::uint64_t ramBytes = 0;
+    std::uint32_t sectorBytes = 0;
+    bool hasFlash = false;
+    std::string operations;  ///< joined by " | "
+
+    AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
+};
+
+/// A failure that the user has already been shown; `Remark` is what is left to say,
+/// `Result` what is known for the JSON lines.
+class ShownFailure : public Failure {
+  public:
+    ShownFailure(ExitStatus status, const std::string& text, std::string remark,
+                 Json result = Json::object())
+        : Failure(status, text), remark_(std::move(remark)), result_(std::move(result)) {}
+
+    const std::string& Remark() const { return remark_; }
+    const Json& Result() const { return result_; }
+
+  private:
+    std::string remark_;
+    Json result_;
+};
+
+/// Which target, through which plug-in, and whether it is traced.
+struct DeviceOptions {
+    TargetOptions target;
+    std::optional<std::string> plugin;
+    std::optional<std::string> trace;
+};
+
+class FlashDevice {
+  public:
+    /// Failure (Unreachable) when plug-in or target can't be had.
+    FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter);
+
+    const DeviceInfo& Info() const { return info_; }
+    std::string LibraryPath() const { return library_.Path(); }
+    SettingStore& Settings() { return settings_; }
+    Reporter& Output() { return reporter_; }
+    WorkMeter& Meter() { return meter_; }
+
+    /// Whether the byte at an address lies in flash, by the plug-in's own answer.
+    bool Contains(std::uint32_t address);
+
+    /// The range of a command, the whole flash when none was given. Failure (WrongUsage) when it
+    /// doesn't lie in flash, Failure (DeviceFailed) when there is no flash.
+    AddressRange RangeInFlash(const std::optional<std::string>& text);
+
+    /// Failure (DeviceFailed) for a device whose flash the plug-in can't work on.
+    void RequireFlash() const;
+
+    void ResetSettings(plugin::ResetMode mode);
+    void WriteSection(const image::Section& section);
+
+    /// Runs a named operation, its messages shown at `level`.
+    void Perform(const std::string& operation, Talk level = Talk::Normal);
+
+    /// Reads flash of the halted target, counting the bytes for the running phase.
+    std::vector<std::uint8_t> ReadFlash(const AddressRange& range);
+    void Halt();
+
+    /// Keeps the simulated device's contents, where a file was named for them.
+    void Save() const { target_.Save(watch_.ContentsTouched()); }
+
+  private:
+    struct Destroyer {
+        void operator()(IFlashDevice2* device) const { device->Destroy(); }
+    };
+
+    IFlashHost& Host() { return tracingHost_ ? static_cast<IFlashHost&>(*tracingHost_) : host_; }
+    void Create();
+    void Initialize();
+    void Announce(const std::string& call);
+    void Finish(const char* error, const std::string& doing);
+    [[noreturn]] void FailAsShown(const std::string& text, const std::string& doing);
+    std::string StateOfFlash() const;
+    std::string Advice() const;
+
+    SettingStore& settings_;
+    Reporter& reporter_;
+    SimulatedTarget target_;
+    WorkMeter meter_;
+    FlashWatch watch_;
+    FlashHost host_;
+    std::optional<Trace> trace_;
+    std::optional<TracingHost> tracingHost_;
+    PluginLibrary library_;
+    std::optional<PluginTrace> pluginTrace_;
+    std::unique_ptr<IFlashDevice2, Destroyer> device_;
+    DeviceInfo info_;
+    std::size_t errorsSeen_ = 0;
+};
+
+}  // namespace host

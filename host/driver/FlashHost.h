@@ -1,0 +1,83 @@
+// The host's side of the plug-in interface: target access, settings, messages and progress, with a
+// memory of what was shown and a check that the plug-in keeps to the protocol.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "host/driver/FlashWatch.h"
+#include "host/output/Reporter.h"
+#include "host/settings/SettingStore.h"
+#include "plugin/IFlashHost.h"
+#include "target/Target.h"
+
+namespace host {
+
+class FlashHost final : public IFlashHost {
+  public:
+    FlashHost(target::Target& target, SettingStore& settings, Reporter& reporter, FlashWatch& watch,
+              std::string directory);
+
+    FlashHost(const FlashHost&) = delete;
+    FlashHost& operator=(const FlashHost&) = delete;
+
+    /// Errors that the plug-in has shown, or that it has made, since the object was created.
+    const std::vector<std::string>& Errors() const { return errors_; }
+
+    /// The level at which the plug-in's messages are shown; errors are always shown.
+    void SetMessageLevel(Talk level) { messageLevel_ = level; }
+
+    /// To be called when a call into the plug-in has returned: no display may be open then.
+    void CallReturned();
+
+    const char* GetProperty(const char* name) override;
+    const char* SetProperty(const char* name, const char* value) override;
+    const char* LoadProgram(const char* fileName, const char* second,
+                            const char* directory) override;
+    const char* RunTarget() override;
+    const char* HaltTarget() override;
+    const char* ResetTarget(bool flag) override;
+    const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
+                           size_t width) override;
+    const char* WriteMemory(const void* buffer, size_t count, uint64_t address, int16_t page,
+                            size_t width) override;
+    const char* BeginProgress(const char* title) override;
+    const char* UpdateProgress(uint32_t percent, const char* text) override;
+    const char* EndProgress() override;
+    const char* ShowError(const char* text) override;
+    const char* ShowMessage(const char* text) override;
+    const char* GetDirectory() override;
+    const char* Sleep(uint32_t milliseconds) override;
+
+    const char* Reserved3() override { return nullptr; }
+    const char* Reserved5() override { return nullptr; }
+    const char* Reserved8() override { return nullptr; }
+    const char* Reserved9() override { return nullptr; }
+    const char* Reserved12() override { return nullptr; }
+    const char* Reserved13() override { return nullptr; }
+    const char* Reserved14() override { return nullptr; }
+    const char* Reserved15() override { return nullptr; }
+
+  private:
+    /// When a slot still does its work after Ctrl-C: what ends the work in order goes on.
+    enum class AfterInterrupt { Refuse, GoOn };
+
+    template <typename Action>
+    const char* Slot(AfterInterrupt after, Action&& action) noexcept;
+    void BreachOfProtocol(const std::string& what);
+
+    target::Target& target_;
+    SettingStore& settings_;
+    Reporter& reporter_;
+    FlashWatch& watch_;
+    std::string directory_;
+    std::string property_;   ///< what GetProperty handed out last
+    std::string errorText_;  ///< what a failing slot returned last
+    std::string publishedMac_;
+    std::vector<std::string> errors_;
+    Talk messageLevel_ = Talk::Normal;
+    bool displayOpen_ = false;
+};
+
+}  // namespace host

@@ -1,0 +1,82 @@
+// Reading the plug-in's work off its register accesses, transfers and displays.
+
+#include "host/driver/FlashWatch.h"
+
+#include <algorithm>
+#include <string_view>
+
+#include "host/base/PluginFacts.h"
+
+namespace host {
+
+namespace {
+
+constexpr struct {
+    std::string_view title;
+    Phase phase;
+} kDisplays[] = {
+    {plugin::kEraseTitle, Phase::Erase},
+    {plugin::kBlankCheckTitle, Phase::BlankCheck},
+    {plugin::kChecksumTitle, Phase::Checksum},
+};
+
+}  // namespace
+
+void FlashWatch::SetGeometry(std::uint64_t flashBytes, std::uint32_t sectorBytes) {
+    flashBytes_ = flashBytes;
+    sectorBytes_ = sectorBytes;
+}
+
+void FlashWatch::ProgramLoaded() {
+    meter_.Begin(Phase::Program);
+    flashTouched_ = contentsTouched_ = true;
+}
+
+void FlashWatch::Wrote(std::uint32_t address, std::size_t bytes, std::uint32_t word) {
+    if (address == plugin::kFlashCommandRegister) {
+        contentsTouched_ = true;
+        BeginErase(word);
+    }
+    if (meter_.Running() == Phase::Program && address >= plugin::kLoaderBuffers &&
+        address < plugin::kLoaderBuffersEnd)
+        meter_.Advance(bytes);
+}
+
+void FlashWatch::Read(std::uint32_t address, std::size_t bytes, const std::uint8_t* data) {
+    if (address == plugin::kFlashCommandRegister && bytes == 4) FinishErase(data[0]);
+    const auto running = meter_.Running();
+    if (!displayOpen_ || (running != Phase::BlankCheck && running != Phase::Checksum)) return;
+    if (running == Phase::BlankCheck && !notBlank_) {
+        const auto* found =
+            std::find_if(data, data + bytes, [](std::uint8_t byte) { return byte != 0xFF; });
+        if (found != data + bytes)
+            notBlank_ = {address + static_cast<std::uint32_t>(found - data), *found};
+    }
+    meter_.Advance(bytes);
+}
+
+void FlashWatch::BeginErase(std::uint32_t command) {
+    pendingErase_ = command & (plugin::kEraseSectorBit | plugin::kEraseAllBit);
+    if (pendingErase_ == 0) return;
+    meter_.Begin(Phase::Erase);
+    flashTouched_ = true;
+}
+
+void FlashWatch::FinishErase(std::uint32_t commandRegister) {
+    if (pendingErase_ == 0 || (commandRegister & pendingErase_) != 0) return;
+    meter_.Advance(pendingErase_ == plugin::kEraseAllBit ? flashBytes_ : sectorBytes_);
+    pendingErase_ = 0;
+}
+
+void FlashWatch::DisplayBegan(const std::string& title) {
+    displayOpen_ = true;
+    for (const auto& display : kDisplays)
+        if (display.title == title) meter_.Begin(display.phase);
+}
+
+void FlashWatch::DisplayEnded() {
+    displayOpen_ = false;
+    meter_.End();
+}
+
+}  // namespace host

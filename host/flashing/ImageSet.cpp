@@ -1,0 +1,36 @@
+// Joining the files of a command, with a memory of what came from where.
+
+#include "host/flashing/ImageSet.h"
+
+#include <fmt/format.h>
+
+#include "host/base/Errors.h"
+#include "host/driver/FlashDevice.h"
+
+namespace host {
+
+LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
+    LoadedImages images;
+    for (const std::string& path : paths) {
+        const image::Image image = image::ReadImageFile(path, options);
+        for (const image::Section& section : image.Sections())
+            images.origins.push_back({path, {section.address, section.Last()}});
+        images.image.Add(image, path);
+    }
+    return images;
+}
+
+void RequireFit(FlashDevice& device, const LoadedImages& images) {
+    for (const auto& [file, range] : images.origins) {
+        if (device.Contains(range.first) && device.Contains(range.last)) continue;
+        const DeviceInfo& info = device.Info();
+        const std::string flash = info.hasFlash ? "the flash, " + RangeText(info.Flash())
+                                                : "flash: the device has none to program";
+        throw Failure(ExitStatus::BadFile,
+                      fmt::format("{}: the section {} doesn't lie in {}; nothing was touched; is "
+                                  "the image linked for this device ({})?",
+                                  file, RangeText(range), flash, info.family));
+    }
+}
+
+}  // namespace host

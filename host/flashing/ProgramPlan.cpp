@@ -1,0 +1,137 @@
+// From an image, a flash geometry and an erase choice to a plan; no device is needed.
+
+#include "host/flashing/ProgramPlan.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <iterator>
+
+#include "host/base/PluginFacts.h"
+#include "host/settings/RangeSettings.h"
+
+namespace host {
+
+namespace {
+
+using plugin::kBlockBytes;
+
+/// The longest gap that is cheaper to fill than to start the loader once more for: one chunk.
+constexpr std::uint64_t kGapBytesMax = plugin::kChunkBytes;
+
+/// Adds a run of sectors behind or over the last one of an ascending list.
+void AppendRun(std::vector<AddressRange>& runs, const AddressRange& run) {
+    if (!runs.empty() && run.first <= std::uint64_t{runs.back().last} + 1)
+        runs.back().last = std::max(runs.back().last, run.last);
+    else
+        runs.push_back(run);
+}
+
+std::vector<AddressRange> ErasedRuns(const image::Image& image, const FlashGeometry& flash,
+                                     const EraseChoice& erase) {
+    using Kind = EraseChoice::Kind;
+    std::vector<AddressRange> runs;
+    if (erase.kind == Kind::Everything)
+        runs.push_back({0, static_cast<std::uint32_t>(flash.flashBytes - 1)});
+    if (erase.kind == Kind::Range && erase.range.first <= erase.range.last)
+        runs.push_back(SectorsCovering(erase.range, flash.sectorBytes));
+    if (erase.kind == Kind::Necessary)
+        for (const image::Section& section : image.Sections())
+            AppendRun(runs, SectorsCovering({section.address, section.Last()}, flash.sectorBytes));
+    return runs;
+}
+
+/// How many bytes of a range are erased. The runs are either one, or whole sectors of which each
+/// section lies in one run, so that the last run that starts in or before the range is the one.
+std::uint64_t ErasedBytes(const AddressRange& range, const std::vector<AddressRange>& runs) {
+    const auto behind = std::upper_bound(
+        runs.begin(), runs.end(), range.last,
+        [](std::uint32_t last, const AddressRange& run) { return last < run.first; });
+    if (behind == runs.begin()) return 0;
+    const AddressRange& run = *std::prev(behind);
+    const std::uint64_t first = std::max(run.first, range.first);
+    const std::uint64_t end = std::uint64_t{std::min(run.last, range.last)} + 1;
+    return end > first ? end - first : 0;
+}
+
+/// Whether the bytes between two sections are few and hold 0xFF when the load begins. Writing 0xFF
+/// over them then leaves the same flash with one loader start less.
+bool CanFill(const image::Section& section, const image::Section& next,
+             const std::vector<AddressRange>& erased) {
+    const AddressRange gap{section.Last() + 1, next.address - 1};
+    return gap.Size() <= kGapBytesMax && ErasedBytes(gap, erased) == gap.Size();
+}
+
+std::vector<image::Section> Join(const image::Image& image,
+                                 const std::vector<AddressRange>& erased) {
+    std::vector<image::Section> joined;
+    for (const image::Section& section : image.Sections()) {
+        if (joined.empty() || !CanFill(joined.back(), section, erased)) {
+            joined.push_back(section);
+            continue;
+        }
+        std::vector<std::uint8_t>& bytes = joined.back().bytes;
+        bytes.resize(section.address - joined.back().address, 0xFF);
+        bytes.insert(bytes.end(), section.bytes.begin(), section.bytes.end());
+    }
+    return joined;
+}
+
+std::uint64_t WidenedBytes(const image::Section& section) {
+    const std::uint64_t first = section.address / kBlockBytes;
+    const std::uint64_t last = section.Last() / kBlockBytes;
+    return (last - first + 1) * kBlockBytes;
+}
+
+}  // namespace
+
+EraseChoice ChosenErase(const SettingStore& settings) {
+    using Kind = EraseChoice::Kind;
+    const std::string option = settings.Text(keys::kProgramOption);
+    if (option == keys::kNecessaryPages) return {Kind::Necessary, {}};
+    if (option == keys::kNoErase) return {Kind::Nothing, {}};
+    const auto range = SelectedRange(settings, kEraseKeys);
+    return range ? EraseChoice{Kind::Range, *range} : EraseChoice{Kind::Everything, {}};
+}
+
+AddressRange SectorsCovering(const AddressRange& range, std::uint32_t sectorBytes) {
+    return {range.first - range.first % sectorBytes,
+            range.last - range.last % sectorBytes + (sectorBytes - 1)};
+}
+
+ProgramPlan PlanProgram(const image::Image& image, const FlashGeometry& flash,
+                        const EraseChoice& erase) {
+    ProgramPlan plan;
+    plan.erased = ErasedRuns(image, flash, erase);
+    plan.sections = Join(image, plan.erased);
+    plan.imageBytes = image.ByteCount();
+    for (const image::Section& section : plan.sections)
+        plan.transferBytes += WidenedBytes(section);
+    for (const AddressRange& run : plan.erased)
+        plan.erasedBytes += run.Size();
+    plan.clearedBytes = plan.erasedBytes;
+    for (const image::Section& section : image.Sections())
+        plan.clearedBytes -= ErasedBytes({section.address, section.Last()}, plan.erased);
+    plan.sectorCount = plan.erasedBytes / flash.sectorBytes;
+    return plan;
+}
+
+std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& flash) {
+    std::vector<std::string> lines;
+    for (const AddressRange& run : plan.erased)
+        lines.push_back(fmt::format("erase    {:<23} {}", RangeText(run),
+                                    CountText(run.Size() / flash.sectorBytes, "sector")));
+    if (plan.erased.empty()) lines.emplace_back("erase    nothing");
+    for (const image::Section& section : plan.sections)
+        lines.push_back(fmt::format("program  {:<23} {}",
+                                    RangeText({section.address, section.Last()}),
+                                    SizeText(section.bytes.size())));
+    lines.push_back(
+        fmt::format("{} of the image; {} more are cleared with its sectors; {} of "
+                    "flash are not erased",
+                    SizeText(plan.imageBytes), SizeText(plan.clearedBytes),
+                    SizeText(flash.flashBytes - plan.erasedBytes)));
+    return lines;
+}
+
+}  // namespace host

@@ -1,0 +1,69 @@
+// The operations that take a range, and how each widens it.
+
+#include "host/flashing/RangeOperation.h"
+
+#include <fmt/format.h>
+
+#include "host/base/PluginFacts.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/ProgramPlan.h"
+#include "host/output/Summary.h"
+
+namespace host {
+
+namespace {
+
+/// What an operation works on, and the unit that it widens its range to (0: a sector).
+struct RangeOperation {
+    const char* name;
+    Phase phase;
+    const RangeKeys& keys;
+    std::uint32_t unitBytes;
+};
+
+const RangeOperation kRangeOperations[] = {
+    {plugin::kErase, Phase::Erase, kEraseKeys, 0},
+    {plugin::kBlankCheck, Phase::BlankCheck, kBlankCheckKeys, 4},
+    {plugin::kCalculateChecksum, Phase::Checksum, kChecksumKeys, 1},
+};
+
+/// What the operation will cover; nothing when the plug-in will refuse it or do nothing.
+std::optional<AddressRange> CoveredRange(FlashDevice& device, const RangeOperation& operation) {
+    const DeviceInfo& info = device.Info();
+    if (!info.hasFlash) return std::nullopt;
+    const AddressRange range =
+        SelectedRange(device.Settings(), operation.keys).value_or(info.Flash());
+    if (range.first > range.last || range.last >= info.flashBytes) return std::nullopt;
+    return SectorsCovering(range,
+                           operation.unitBytes == 0 ? info.sectorBytes : operation.unitBytes);
+}
+
+void Announce(FlashDevice& device, const RangeOperation& operation) {
+    const auto covered = CoveredRange(device, operation);
+    if (!covered) return;
+    device.Meter().Expect(operation.phase, covered->Size());
+    if (operation.phase == Phase::Erase)
+        device.Output().Say(
+            Talk::Normal,
+            fmt::format("Erase covers {}: {}", RangeText(*covered),
+                        CountText(covered->Size() / device.Info().sectorBytes, "sector")));
+}
+
+}  // namespace
+
+AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
+                         const std::optional<std::string>& text) {
+    const AddressRange range = device.RangeInFlash(text);
+    SelectRange(device.Settings(), keys, text ? std::optional(range) : std::nullopt);
+    return range;
+}
+
+Outcome RunOperation(FlashDevice& device, const std::string& name) {
+    for (const RangeOperation& operation : kRangeOperations)
+        if (name == operation.name) Announce(device, operation);
+    device.Perform(name);
+    ShowSummary(device.Output(), device.Meter());
+    return {.result = {{"operation", name}, {"phases", PhasesJson(device.Meter())}}};
+}
+
+}  // namespace host

@@ -1,0 +1,105 @@
+// The JSON lines are described in docs/command-line-json.md.
+
+#include "host/output/Reporter.h"
+
+#include <fmt/format.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <string_view>
+
+namespace host {
+
+namespace {
+
+constexpr int kJsonVersion = 1;
+
+bool WantsColour(std::FILE* stream) {
+    const char* refused = std::getenv("NO_COLOR");
+    const char* terminal = std::getenv("TERM");
+    return isatty(fileno(stream)) != 0 && (refused == nullptr || *refused == '\0') &&
+           terminal != nullptr && std::string_view(terminal) != "dumb";
+}
+
+ProgressStyle Style(const Reporter::Options& options) {
+    return options.talk == Talk::Quiet ? ProgressStyle::None
+                                       : ChooseStyle(options.progress, stderr);
+}
+
+}  // namespace
+
+Reporter::Reporter(const Options& options)
+    : options_(options),
+      out_(options.json ? stderr : stdout),
+      colour_(WantsColour(stderr)),
+      display_(Style(options), stderr) {}
+
+void Reporter::Begin(const std::string& command) {
+    JsonLine("begin", {{"tool", "corvane-flash " CORVANE_FLASH_VERSION}, {"command", command}});
+}
+
+void Reporter::Result(const std::string& text) {
+    Line(out_, text);
+}
+
+void Reporter::Say(Talk level, const std::string& text) {
+    if (!Hears(level)) return;
+    JsonLine("message", {{"from", "host"}, {"level", "info"}, {"text", text}});
+    Line(stderr, text);
+}
+
+void Reporter::PluginMessage(Talk level, const std::string& text) {
+    JsonLine("message", {{"from", "plug-in"}, {"level", "info"}, {"text", text}});
+    if (Hears(level)) Line(stderr, text);
+}
+
+void Reporter::PluginError(const std::string& text) {
+    JsonLine("message", {{"from", "plug-in"}, {"level", "error"}, {"text", text}});
+    Error(text);
+}
+
+void Reporter::Error(const std::string& text) {
+    const char* form = colour_ ? "\033[1;31mcorvane-flash:\033[0m {}" : "corvane-flash: {}";
+    Line(stderr, fmt::format(fmt::runtime(form), text));
+}
+
+void Reporter::Progress(Phase phase, const PhaseProgress& progress) {
+    if (progress.totalBytes == 0) return;
+    display_.DrawPlain(phase, progress);
+    if (!gate_.Passes(phase, progress, std::chrono::steady_clock::now())) return;
+    JsonLine("progress", {{"phase", Name(phase).id},
+                          {"done", progress.doneBytes},
+                          {"total", progress.totalBytes},
+                          {"percent", progress.Percent()}});
+    display_.DrawBar(phase, progress);
+}
+
+void Reporter::End(const Outcome& outcome) {
+    display_.Clear();
+    const std::chrono::duration<double> elapsed = std::chrono::steady_clock::now() - start_;
+    JsonLine("end", {{"status", static_cast<int>(outcome.status)},
+                     {"ok", outcome.status == ExitStatus::Done},
+                     {"error", outcome.error.empty() ? Json(nullptr) : Json(outcome.error)},
+                     {"result", outcome.result},
+                     {"seconds", SecondsJson(elapsed.count())}});
+}
+
+void Reporter::JsonLine(const char* event, const Json& members) {
+    if (!options_.json) return;
+    Json line{{"version", kJsonVersion}, {"event", event}};
+    line.update(members);
+    // File names need not be UTF-8; what isn't is replaced.
+    Line(stdout, line.dump(-1, ' ', false, Json::error_handler_t::replace));
+}
+
+void Reporter::Line(std::FILE* stream, const std::string& text) {
+    display_.Clear();
+    const std::string line = text + "\n";
+    const bool written =
+        std::fwrite(line.data(), 1, line.size(), stream) == line.size() && std::fflush(stream) == 0;
+    if (!written && stream == stdout && outputError_ == 0) outputError_ = errno;
+}
+
+}  // namespace host

@@ -1,0 +1,68 @@
+// Everything that the tool says: results on standard output, talk and progress on standard error,
+// or JSON lines on standard output and everything else on standard error.
+
+#pragma once
+
+#include <chrono>
+#include <string>
+
+#include "host/base/Errors.h"
+#include "host/base/Json.h"
+#include "host/output/Progress.h"
+
+namespace host {
+
+enum class Talk { Quiet, Normal, Verbose, Debug };
+
+/// How a command ended. A failure whose text has been shown already leaves `error` to the JSON.
+struct Outcome {
+    ExitStatus status = ExitStatus::Done;
+    std::string error = {};
+    Json result = Json::object();
+};
+
+class Reporter {
+  public:
+    struct Options {
+        Talk talk = Talk::Normal;
+        bool json = false;
+        std::string progress = "auto";
+    };
+
+    explicit Reporter(const Options& options);
+
+    void Begin(const std::string& command);
+
+    /// What the command was run for: shown whatever the level.
+    void Result(const std::string& text);
+
+    /// A line for those who want to hear this much.
+    void Say(Talk level, const std::string& text);
+
+    /// A message or an error that the plug-in shows its user.
+    void PluginMessage(Talk level, const std::string& text);
+    void PluginError(const std::string& text);
+
+    void Error(const std::string& text);
+    void Progress(Phase phase, const PhaseProgress& progress);
+    void End(const Outcome& outcome);
+
+    /// The error number of what couldn't be written to standard output, or 0.
+    int OutputError() const { return outputError_; }
+
+    bool Hears(Talk level) const { return options_.talk >= level; }
+
+  private:
+    void JsonLine(const char* event, const Json& members);
+    void Line(std::FILE* stream, const std::string& text);
+
+    Options options_;
+    std::FILE* out_;  ///< where results go that people read
+    bool colour_;
+    int outputError_ = 0;
+    UpdateGate gate_;
+    ProgressDisplay display_;
+    std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
+};
+
+}  // namespace host

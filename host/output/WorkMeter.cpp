@@ -1,0 +1,43 @@
+// Adding up the time and the bytes of each phase, and telling the reporter.
+
+#include "host/output/WorkMeter.h"
+
+#include <algorithm>
+
+namespace host {
+
+void WorkMeter::Expect(Phase phase, std::uint64_t bytes) {
+    At(phase).totalBytes += bytes;
+}
+
+void WorkMeter::Begin(Phase phase) {
+    TakeTime();
+    current_ = phase;
+    since_ = Clock::now();
+    reporter_.Progress(phase, At(phase));
+}
+
+void WorkMeter::Advance(std::uint64_t bytes) {
+    if (!current_) return;
+    TakeTime();
+    PhaseProgress& progress = At(*current_);
+    progress.doneBytes += bytes;
+    // More work than was announced: the total grows with it rather than be wrong.
+    if (progress.totalBytes != 0)
+        progress.totalBytes = std::max(progress.totalBytes, progress.doneBytes);
+    reporter_.Progress(*current_, progress);
+}
+
+void WorkMeter::End() {
+    TakeTime();
+    current_.reset();
+}
+
+void WorkMeter::TakeTime() {
+    if (!current_) return;
+    const auto now = Clock::now();
+    At(*current_).seconds += std::chrono::duration<double>(now - since_).count();
+    since_ = now;
+}
+
+}  // namespace host

@@ -1,0 +1,139 @@
+// The defaults let a program load work with no settings file at all, and
+// never erase more than the image needs.
+
+#include "host/settings/SettingCatalogue.h"
+
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+
+#include <algorithm>
+#include <charconv>
+#include <stdexcept>
+#include <string_view>
+#include <system_error>
+
+#include "host/base/MacAddress.h"
+#include "host/base/Text.h"
+#include "host/settings/SettingKeys.h"
+
+namespace host {
+
+namespace {
+
+using Form = SettingForm;
+
+const std::vector<const char*> kSelections{keys::kEntireFlash, keys::kByAddressRange};
+
+const SettingInfo kCatalogue[] = {
+    {keys::kProgramOption,
+     Form::Choice,
+     keys::kNecessaryPages,
+     "what a program load erases first",
+     {keys::kNecessaryPages, keys::kNoErase, keys::kEraseOptions}},
+    {keys::kProgramBlankCheck, Form::Switch, "0", "blank-check each section before programming it"},
+    {keys::kProgramCrc, Form::Switch, "0", "calculate the CRC-32 of the whole flash after a load"},
+    {keys::kEraseType, Form::Choice, keys::kByAddressRange, "what an erase covers", kSelections},
+    {keys::kEraseStart, Form::Hex, "0", "first address of a range erase"},
+    {keys::kEraseEnd, Form::Hex, "0", "last address of a range erase"},
+    {keys::kBlankCheckSelection, Form::Choice, keys::kEntireFlash, "what a blank check covers",
+     kSelections},
+    {keys::kBlankCheckStart, Form::Hex, "0", "first address of a range blank check"},
+    {keys::kBlankCheckEnd, Form::Hex, "0", "last address of a range blank check"},
+    {keys::kChecksumSelection, Form::Choice, keys::kEntireFlash, "what a checksum covers",
+     kSelections},
+    {keys::kChecksumStart, Form::Hex, "0", "first address of a range checksum"},
+    {keys::kChecksumEnd, Form::Hex, "0", "last address of a range checksum"},
+    {keys::kMacInput, Form::Mac, "ff-ff-ff-ff-ff-ff", "MAC address to program, or read back"},
+    {keys::kMacCommit, Form::Hex, "0", "1: commit both user registers with the MAC address"},
+    {keys::kRegisterInputs[0], Form::Hex, "ffffffff", "value for user register 0, or read back"},
+    {keys::kRegisterCommits[0], Form::Hex, "0", "1: commit user register 0 when it is programmed"},
+    {keys::kRegisterInputs[1], Form::Hex, "ffffffff", "value for user register 1, or read back"},
+    {keys::kRegisterCommits[1], Form::Hex, "0", "1: commit user register 1 when it is programmed"},
+    {keys::kCrystalFreq, Form::Hex, "8", "crystal frequency in MHz, in hexadecimal"},
+    {keys::kTimeout, Form::Seconds, "30",
+     "longest wait for the flash loader, in seconds; by default longer for a large image"},
+    {keys::kReset, Form::Switch, "1", "reset the target before a load or an erase"},
+    {keys::kVerbose, Form::Integer, "0", "anything but 0: messages about the ranges in work"},
+    {keys::kFlashSize, Form::Published, "", "flash size of the device"},
+    {keys::kRamSize, Form::Published, "", "RAM size of the device"},
+    {keys::kSectorSize, Form::Published, "", "size of the device's erase sectors"},
+    {keys::kFamily, Form::Published, "", "class of the device"},
+    {keys::kChecksumValue, Form::Published, "--", "the last CRC-32"},
+};
+
+template <typename Number>
+bool StartsWithNumber(std::string text, bool whole) {
+    if (text.starts_with('+')) text.erase(0, 1);
+    Number value = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
+    return error == std::errc() && (!whole || end == text.data() + text.size());
+}
+
+/// Zeros and a last digit, which may be 1 except behind a minus sign.
+bool IsSwitch(std::string_view text) {
+    const bool negative = text.starts_with('-');
+    if (negative || text.starts_with('+')) text.remove_prefix(1);
+    if (!text.ends_with('0') && (negative || !text.ends_with('1'))) return false;
+    return text.find_first_not_of('0') >= text.size() - 1;
+}
+
+bool Accepts(const SettingInfo& info, const std::string& text) {
+    switch (info.form) {
+        case Form::Switch:
+            return IsSwitch(text);
+        case Form::Integer:
+            return StartsWithNumber<std::int32_t>(text, true);
+        case Form::Seconds:
+            return StartsWithNumber<std::int32_t>(text, false);
+        case Form::Hex:
+            return HexNumber(text).has_value();
+        case Form::Mac:
+            return ParseMacAddress(text).has_value();
+        case Form::Choice:
+            return std::find(info.choices.begin(), info.choices.end(), text) != info.choices.end();
+        case Form::Published:
+            break;
+    }
+    return false;
+}
+
+}  // namespace
+
+std::span<const SettingInfo> SettingCatalogue() {
+    return kCatalogue;
+}
+
+const SettingInfo* FindSetting(const std::string& key) {
+    const auto found = std::find_if(std::begin(kCatalogue), std::end(kCatalogue),
+                                    [&](const SettingInfo& info) { return key == info.key; });
+    return found == std::end(kCatalogue) ? nullptr : found;
+}
+
+std::string AcceptedTexts(const SettingInfo& info) {
+    switch (info.form) {
+        case Form::Switch:
+            return "0 or 1";
+        case Form::Integer:
+            return "a whole decimal number";
+        case Form::Seconds:
+            return "a whole decimal number of seconds";
+        case Form::Hex:
+            return "a hexadecimal number up to ffffffff";
+        case Form::Mac:
+            return "six hexadecimal bytes, as in 00-1a-b6-01-02-03";
+        case Form::Choice:
+            return fmt::format("\"{}\"", fmt::join(info.choices, "\", \""));
+        case Form::Published:
+            break;
+    }
+    return "nothing: only the plug-in writes it";
+}
+
+std::string CheckedText(const SettingInfo& info, const std::string& text) {
+    if (!Accepts(info, text))
+        throw std::invalid_argument(
+            fmt::format("{} can't be '{}'; it takes {}", info.key, text, AcceptedTexts(info)));
+    return info.form == Form::Mac ? ParseMacAddress(text)->Text() : text;
+}
+
+}  // namespace host

@@ -1,0 +1,132 @@
+// The layers of settings, and how the store of a run is filled.
+
+#include "host/settings/SettingStore.h"
+
+#include <fmt/format.h>
+#include <unistd.h>
+
+#include <stdexcept>
+#include <string_view>
+
+#include "host/base/Errors.h"
+#include "host/base/MacAddress.h"
+#include "host/settings/SettingKeys.h"
+
+namespace host {
+
+namespace {
+
+constexpr std::string_view kEnvironmentPrefix = "CORVANE_SET_";
+
+}  // namespace
+
+void SettingStore::Set(Origin origin, const std::string& key, const std::string& text) {
+    Layer(origin)[key] = text;
+}
+
+void SettingStore::SetUnlessChosen(const std::string& key, const std::string& text) {
+    if (Get(key).origin >= Origin::Kept) Set(Origin::CommandLine, key, text);
+}
+
+void SettingStore::Keep(const std::string& key, const std::string& text) {
+    const auto mac = key == keys::kMacInput ? ParseMacAddress(text) : std::nullopt;
+    const std::string padded = mac ? mac->Text() : text;
+    if (Kept(key) == padded) return;
+    Layer(Origin::Kept)[key] = padded;
+    changed_[key] = true;
+}
+
+SettingValue SettingStore::Get(const std::string& key) const {
+    for (std::size_t layer = 0; layer < layers_.size(); ++layer)
+        if (const auto found = layers_[layer].find(key); found != layers_[layer].end())
+            return {found->second, static_cast<Origin>(layer)};
+    const SettingInfo* info = FindSetting(key);
+    return {info == nullptr ? "" : info->defaultText, Origin::Default};
+}
+
+std::string SettingStore::Kept(const std::string& key) const {
+    const SettingTexts& kept = layers_[static_cast<std::size_t>(Origin::Kept)];
+    const auto found = kept.find(key);
+    return found == kept.end() ? "" : found->second;
+}
+
+void SettingStore::Forget(const std::string& key) {
+    if (Layer(Origin::Kept).erase(key) != 0) changed_[key] = false;
+}
+
+void SettingStore::Save() {
+    if (changed_.empty()) return;
+    if (paths_.kept.empty())
+        throw Failure(ExitStatus::BadFile,
+                      "no place to keep settings: neither XDG_CONFIG_HOME nor HOME is set; name a "
+                      "file with --settings");
+    SettingTexts texts = ReadSettingFile(paths_.kept, false, true);
+    for (const auto& [key, present] : changed_) {
+        if (present)
+            texts[key] = Kept(key);
+        else
+            texts.erase(key);
+    }
+    WriteKeptSettings(paths_.kept, texts);
+    changed_.clear();
+}
+
+std::string OriginText(Origin origin, const SettingPaths& paths) {
+    if (origin == Origin::UserFile) return paths.user;
+    constexpr const char* names[] = {"command line", "environment", "", "kept value", "default"};
+    return names[static_cast<std::size_t>(origin)];
+}
+
+std::string EnvironmentName(const std::string& key) {
+    return std::string(kEnvironmentPrefix) + key;
+}
+
+const SettingInfo& RequireSetting(const std::string& key, const std::string& where) {
+    if (const SettingInfo* info = FindSetting(key)) return *info;
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("{}: unknown setting '{}'; 'corvane-flash settings' lists all keys",
+                              where, key));
+}
+
+std::string RequireText(const SettingInfo& info, const std::string& text,
+                        const std::string& where) {
+    try {
+        return CheckedText(info, text);
+    } catch (const std::invalid_argument& error) {
+        throw Failure(ExitStatus::WrongUsage, fmt::format("{}: {}", where, error.what()));
+    }
+}
+
+namespace {
+
+/// One "KEY=TEXT"; `where` is what it stands behind.
+void Assign(SettingStore& store, Origin origin, const std::string& assignment,
+            const std::string& where) {
+    const auto equals = assignment.find('=');
+    if (equals == std::string::npos)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{} {}: write KEY=TEXT", where, assignment));
+    const SettingInfo& info = RequireSetting(assignment.substr(0, equals), where);
+    store.Set(origin, info.key, RequireText(info, assignment.substr(equals + 1), where));
+}
+
+}  // namespace
+
+SettingStore LoadSettings(const std::string& settingsFile,
+                          const std::vector<std::string>& assignments) {
+    SettingStore store(FindSettingPaths(settingsFile));
+    const SettingPaths& paths = store.Paths();
+    for (const auto& [key, text] : ReadSettingFile(paths.user, paths.userMustExist, false))
+        store.Set(Origin::UserFile, key, text);
+    for (const auto& [key, text] : ReadSettingFile(paths.kept, false, true))
+        store.Set(Origin::Kept, key, text);
+    for (char** variable = environ; *variable != nullptr; ++variable)
+        if (const std::string text = *variable; text.starts_with(kEnvironmentPrefix))
+            Assign(store, Origin::Environment, text.substr(kEnvironmentPrefix.size()),
+                   "environment variable " + text.substr(0, text.find('=')));
+    for (const std::string& assignment : assignments)
+        Assign(store, Origin::CommandLine, assignment, "--set");
+    return store;
+}
+
+}  // namespace host

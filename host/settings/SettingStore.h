@@ -1,0 +1,82 @@
+// The settings as the plug-in sees them: for each key the value of the first layer that has one.
+
+#pragma once
+
+#include <array>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "host/settings/SettingCatalogue.h"
+#include "host/settings/SettingFiles.h"
+
+namespace host {
+
+/// The layers, the strongest first.
+enum class Origin { CommandLine, Environment, UserFile, Kept, Default };
+
+struct SettingValue {
+    std::string text;
+    Origin origin;
+
+    bool operator==(const SettingValue&) const = default;
+};
+
+class SettingStore {
+  public:
+    /// An empty store: every value is the default.
+    SettingStore() = default;
+    explicit SettingStore(SettingPaths paths) : paths_(std::move(paths)) {}
+
+    /// Puts a checked text into a layer.
+    void Set(Origin origin, const std::string& key, const std::string& text);
+
+    /// The same where no layer above the kept values has one.
+    void SetUnlessChosen(const std::string& key, const std::string& text);
+
+    /// What the plug-in or the tool itself leaves; the key need not be a known one. A MAC address
+    /// is padded to two digits a byte.
+    void Keep(const std::string& key, const std::string& text);
+
+    /// The key must be one of the catalogue.
+    SettingValue Get(const std::string& key) const;
+    std::string Text(const std::string& key) const { return Get(key).text; }
+
+    /// What was kept last under the key, whatever stands above it; empty if nothing.
+    std::string Kept(const std::string& key) const;
+
+    /// Drops the kept value.
+    void Forget(const std::string& key);
+
+    /// Writes the kept file if something was kept that it doesn't hold, joined with what other
+    /// runs have kept there meanwhile.
+    void Save();
+
+    const SettingPaths& Paths() const { return paths_; }
+
+  private:
+    SettingTexts& Layer(Origin origin) { return layers_[static_cast<std::size_t>(origin)]; }
+
+    SettingPaths paths_;
+    std::array<SettingTexts, 4> layers_;
+    std::map<std::string, bool> changed_;  ///< kept keys since loading; false: forgotten
+};
+
+/// "command line", "environment", the user's file, "kept value", "default".
+std::string OriginText(Origin origin, const SettingPaths& paths);
+
+/// The environment variable that holds a setting's value: "CORVANE_SET_" and the key.
+std::string EnvironmentName(const std::string& key);
+
+/// The store of a run: both files, the environment, and the KEY=TEXT assignments of the command
+/// line. Failure (BadFile or WrongUsage) names the key and where it stands.
+SettingStore LoadSettings(const std::string& settingsFile,
+                          const std::vector<std::string>& assignments);
+
+/// The row of the catalogue; Failure (WrongUsage) for an unknown key, beginning with `where`.
+const SettingInfo& RequireSetting(const std::string& key, const std::string& where);
+
+/// CheckedText with a Failure (WrongUsage) that begins with `where`.
+std::string RequireText(const SettingInfo& info, const std::string& text, const std::string& where);
+
+}  // namespace host
