@@ -46,11 +46,35 @@ void SleepForPollInterval() {
 
 }  // namespace
 
-/// A section completed to whole blocks with what the target holds around it. Its size can exceed
-/// 32 bits.
+/// A section completed to whole blocks with what the target holds around it. It refers to the
+/// caller's bytes and copies none of them; its size can exceed 32 bits.
 struct FlashCorvane::WidenedImage {
-    std::uint32_t start;
-    std::vector<std::uint8_t> bytes;
+    using Block = std::array<std::uint8_t, kBlockSize>;
+    using Chunk = std::array<std::uint8_t, LoaderMemory::BufferSize>;
+
+    const std::uint8_t* data;
+    std::uint32_t length;
+    std::uint32_t start;     ///< of the first block
+    std::uint32_t headSize;  ///< bytes before the section, in its first block
+    std::uint32_t padSize;   ///< bytes behind the section, in its last block
+    Block head{};
+    Block pad{};
+
+    std::uint64_t DataEnd() const { return std::uint64_t{headSize} + length; }
+    std::uint64_t Size() const { return DataEnd() + padSize; }
+
+    /// The bytes of a chunk: the caller's own, or put together in `composed` where the chunk has
+    /// some of the others.
+    const std::uint8_t* Bytes(std::uint64_t offset, std::uint32_t count, Chunk& composed) const {
+        const std::uint64_t begin = std::max<std::uint64_t>(offset, headSize);
+        const std::uint64_t end = std::min(offset + count, DataEnd());
+        if (end - begin == count) return data + (begin - headSize);
+        auto at = composed.begin();
+        if (offset < headSize) at = std::copy_n(head.begin(), headSize, at);
+        at = std::copy(data + (begin - headSize), data + (end - headSize), at);
+        if (offset + count > DataEnd()) std::copy_n(pad.begin(), padSize, at);
+        return composed.data();
+    }
 };
 
 // Only failures of the stream are shown here; whatever fails before it is the caller's to report.
@@ -73,26 +97,15 @@ bool FlashCorvane::Program(const std::uint8_t* data, std::uint32_t address, std:
     return true;
 }
 
+// The blocks that the section begins and ends in are read before the target is touched.
 FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::uint32_t address,
                                                std::uint32_t length, std::int16_t page) {
-    const std::uint32_t head = address % kBlockSize;
-    const std::uint32_t start = address - head;
-    const std::uint64_t total = std::uint64_t{length} + head;
-    const std::uint64_t size = (total + kBlockSize - 1) / kBlockSize * kBlockSize;
-    const std::size_t pad = size - total;
-
-    // Had whole before the target is touched, and filled without writing any byte twice.
-    WidenedImage image{start, {}};
-    std::vector<std::uint8_t>& bytes = image.bytes;
-    bytes.reserve(size);
-    bytes.resize(head);
-    if (head > 0) p_mHost.ReadBytes(bytes.data(), head, start, page);
-    bytes.insert(bytes.end(), data, data + length);
-    bytes.resize(size);
-    if (pad > 0) {
-        const auto behind = static_cast<std::uint32_t>(start + total);
-        p_mHost.ReadBytes(bytes.data() + total, pad, behind, page);
-    }
+    const std::uint32_t headSize = address % kBlockSize;
+    const std::uint32_t lastSize = (headSize + length) % kBlockSize;
+    const std::uint32_t padSize = lastSize == 0 ? 0 : kBlockSize - lastSize;
+    WidenedImage image{data, length, address - headSize, headSize, padSize};
+    if (headSize > 0) p_mHost.ReadBytes(image.head.data(), headSize, image.start, page);
+    if (padSize > 0) p_mHost.ReadBytes(image.pad.data(), padSize, address + length, page);
     return image;
 }
 
@@ -108,15 +121,15 @@ void FlashCorvane::StartLoader() {
 // waits for the last chunk here.
 void FlashCorvane::StreamToLoader(const WidenedImage& image, std::int32_t budgetMs,
                                   std::int16_t page) {
+    WidenedImage::Chunk composed;
     std::uint32_t index = 0;
-    std::uint32_t flashAddress = image.start;
-    for (std::size_t offset = 0; offset < image.bytes.size();) {
+    for (std::uint64_t offset = 0; offset < image.Size();) {
         const auto count = static_cast<std::uint32_t>(
-            std::min<std::size_t>(LoaderMemory::BufferSize, image.bytes.size() - offset));
-        ProgramChunk(image.bytes.data() + offset, count, flashAddress, index, page);
+            std::min<std::uint64_t>(LoaderMemory::BufferSize, image.Size() - offset));
+        const auto flashAddress = static_cast<std::uint32_t>(image.start + offset);
+        ProgramChunk(image.Bytes(offset, count, composed), count, flashAddress, index, page);
         index ^= 1;
         offset += count;
-        flashAddress += count;
         WaitForLoader(index, budgetMs);
     }
 }

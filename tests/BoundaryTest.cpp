@@ -2,6 +2,7 @@
 
 #include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <sys/wait.h>
 
 #include <array>
@@ -248,6 +249,23 @@ TEST(Extremes, ErasingTheLargestFlashTakesTimeInProportion) {
     EXPECT_EQ(plugin->WriteDataToFlash(static_cast<const unsigned char*>(nullptr), 0, 0, 1),
               nullptr);
     EXPECT_LT(host.calls - first, 100u);
+}
+
+// Bytes are taken from the caller as they go out, and none from outside the section: the page
+// behind cannot be read.
+TEST(Extremes, SectionIsReadInPlace) {
+    constexpr std::size_t size = 4096;
+    void* pages = mmap(nullptr, 2 * size, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+    ASSERT_EQ(mprotect(pages, size, PROT_READ), 0);
+    const auto* data = static_cast<const unsigned char*>(pages);
+    RecordingHost host("tolva", {{"FlashProgramOption", "Do Not Erase Flash Memory"}});
+    Plugin plugin(host);
+    EXPECT_EQ(plugin->WriteDataToFlash(data + size - 300, 0x1004, 300, 1), nullptr);
+    EXPECT_EQ(host.errors, std::vector<std::string>());
+    host.settings["FlashTimeoutValue"] = "0";  // ends the work behind the first chunk
+    EXPECT_EQ(plugin->WriteDataToFlash(data, 0x1004, 0xFFFFFFFF, 1), nullptr);
+    EXPECT_EQ(host.errors.size(), 1u);
+    munmap(pages, 2 * size);
 }
 
 // A line reaches whoever listens, and nobody is asked for a logger when nobody does.
