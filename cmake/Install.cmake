@@ -14,7 +14,7 @@ target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE
 
 install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h logger/ostrel_logger.h
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
-install(TARGETS flash_corvane ostrel_logger corvane_headers EXPORT FlashCorvane
+install(TARGETS flash_corvane flash_host_check ostrel_logger corvane_headers EXPORT FlashCorvane
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 
@@ -57,6 +57,6 @@ install(DIRECTORY docs/ DESTINATION ${data}/doc/corvane-flash FILES_MATCHING PAT
 install(DIRECTORY examples/minimal-host DESTINATION ${data}/doc/corvane-flash/examples)
 
 # All that `cmake --install` needs, without the tests.
-add_custom_target(kit ALL DEPENDS flash_corvane ostrel_logger corvane-flash
+add_custom_target(kit ALL DEPENDS flash_corvane flash_host_check ostrel_logger corvane-flash
   ${generated}/corvane-flash.bash ${generated}/corvane-flash.zsh ${generated}/corvane-flash.fish
   ${generated}/corvane-flash.1.gz)

@@ -39,6 +39,9 @@ class Target {
 
     /// Lets `milliseconds` of the target's time pass.
     virtual void Pause(std::uint32_t milliseconds) = 0;
+
+    /// Whether a pause lets simulated time pass, so that nobody has to wait for it.
+    virtual bool SimulatesTime() const { return false; }
 };
 
 }  // namespace target

@@ -1,5 +1,9 @@
 // A complete host for the flash plug-in: loads it, creates a device, prints what it found,
-// programs a few bytes, reads them back, and unloads it. To make a host of your own, put your debug
+// programs a few bytes, reads them back, and unloads it; or runs an operation instead:
+//
+//     minimal-host [LIBRARY [OPERATION]]
+//
+// To make a host of your own, put your debug
 // probe in the place of PretendDevice and your user interface in the place of printf.
 
 #include <dlfcn.h>
@@ -129,14 +133,23 @@ static void ProgramAndReadBack(MinimalHost& host, IFlashDevice2& device) {
     if (readBack != data) throw std::runtime_error("flash differs from what was programmed");
 }
 
-static void UseDevice(MinimalHost& host, IFlashDevice2& device) {
+// A user operation that failed and said so has returned no error: look at both.
+static void Perform(MinimalHost& host, IFlashDevice2& device, const char* operation) {
+    Check(operation, device.PerformOperation(operation));
+    if (host.Failed()) throw std::runtime_error("the plug-in has shown an error, see above");
+}
+
+static void UseDevice(MinimalHost& host, IFlashDevice2& device, const char* operation) {
     bool flashAvailable = false;
     const char* operations = nullptr;
     Check("initialising", device.Initialize(&flashAvailable, &operations));
     for (const char* name : {"DeviceInfoFamily", "DeviceInfoFlashSize", "DeviceInfoSectorSize"})
         std::printf("%s: %s\n", name, host.Setting(name).c_str());
     std::printf("operations: %s\n", operations);
-    if (flashAvailable) ProgramAndReadBack(host, device);
+    if (operation != nullptr)
+        Perform(host, device, operation);
+    else if (flashAvailable)
+        ProgramAndReadBack(host, device);
 }
 
 // Only Destroy ends a device, and it must have run before the library is unloaded.
@@ -158,7 +171,7 @@ int main(int argc, char** argv) try {
     void* library = dlopen(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
     if (library == nullptr) throw std::runtime_error(dlerror());
     MinimalHost host;
-    UseDevice(host, *CreateDevice(library, host));
+    UseDevice(host, *CreateDevice(library, host), argc > 2 ? argv[2] : nullptr);
     dlclose(library);
 } catch (const std::exception& error) {
     std::fprintf(stderr, "minimal-host: %s\n", error.what());

@@ -58,6 +58,7 @@ const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
 }
 
 const char* FlashHost::GetProperty(const char* name) {
+    if (std::strcmp(name, keys::kSimulatesTime) == 0) return target_.SimulatesTime() ? "1" : "0";
     bool known = false;
     const char* error = Slot(AfterInterrupt::GoOn, [&] {
         property_ = settings_.Text(name);

@@ -33,6 +33,9 @@ inline constexpr char kRamSize[] = "DeviceInfoRAMSize";
 inline constexpr char kSectorSize[] = "DeviceInfoSectorSize";
 inline constexpr char kFamily[] = "DeviceInfoFamily";
 
+/// Asked for by the host check alone.
+inline constexpr char kSimulatesTime[] = "HostSimulatesTime";
+
 inline constexpr char kEntireFlash[] = "Entire Flash";
 inline constexpr char kByAddressRange[] = "By Address Range";
 inline constexpr char kNecessaryPages[] = "Necessary Pages Only";

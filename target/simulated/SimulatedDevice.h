@@ -47,6 +47,7 @@ class SimulatedDevice final : public Target {
     void Halt() override;
     void Reset(bool flag) override;
     void Pause(std::uint32_t milliseconds) override;
+    bool SimulatesTime() const override { return true; }
 
     // What follows is for tests and tools: it counts as no access, costs no simulated time and
     // breaks no rule.

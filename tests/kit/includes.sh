@@ -7,6 +7,7 @@ cd "$(dirname "$0")/../.."
 allowed="
 plugin: logger device
 device: plugin
+hostcheck: device plugin
 flash: device plugin
 verify: device plugin
 operations: device plugin

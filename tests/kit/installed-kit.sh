@@ -19,6 +19,18 @@ diff "$here/minimal-host.txt" <("$trial/build/minimal-host")
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 [ "$found" -ef "$kit"/lib*/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
 
+# The hosts of the kit keep the contract. The check programs nothing, which the example finds out.
+check=$(echo "$kit"/lib*/libflash_host_check.so)
+head -c 100 /dev/zero >"$trial/image.bin"
+tool=("$kit/bin/corvane-flash" --plugin "$check")
+"${tool[@]}" operation CheckProgress >"$trial/told" 2>&1 &&
+    "${tool[@]}" program "$trial/image.bin" --base 0 --erase none --no-verify >>"$trial/told" 2>&1 &&
+    "$trial/build/minimal-host" "$check" CheckProgress >>"$trial/told" 2>&1 ||
+    { cat "$trial/told"; exit 1; }
+"$trial/build/minimal-host" "$check" >>"$trial/told" 2>&1 && exit 1
+grep 'expected' "$trial/told" && exit 1
+[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = 2 ] || exit 1
+
 share=$kit/share
 bash -n "$share/bash-completion/completions/corvane-flash"
 zsh -n "$share/zsh/vendor-completions/_corvane-flash"
