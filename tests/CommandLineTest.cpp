@@ -144,6 +144,10 @@ const Row kDone[] = {
     {"tool --settings wrong.toml completion bash | bash -n", 0, "", ""},
     {"tool --help", 0, "Usage: corvane-flash [OPTION]... COMMAND", ""},
     {"tool mac program --help", 0, "Usage: corvane-flash mac program ADDRESS [OPTION]...", ""},
+    {"tool help | awk 'NR > 23 || length > 79'", 0, "", ""},
+    {"tool help mac read", 0, "Usage: corvane-flash mac read\n", ""},
+    {"tool help sim", 0, "  quen                  flash=512K,ram=64K,", ""},
+    {"tool --man", 0, "\\fBcorvane\\-flash settings\\fR [\\fIKEY\\fR] [\\fIOPTION\\fR]...", ""},
     {"tool --version", 0, "corvane-flash 1.", ""},
 };
 
@@ -163,6 +167,7 @@ const Row kFailing[] = {
     {"tool operation Nonsense", 1, "", "'Nonsense' is none of the plug-in's operations: Erase |"},
     // The command line.
     {"tool", 2, "", "which command?"},
+    {"tool help nonsense", 2, "", "there is no help on 'nonsense'"},
     {"tool nonsense", 2, "", "unknown command or option: nonsense"},
     {"tool mac", 2, "", "mac what? read or program"},
     {"tool info --nonsense", 2, "", "--nonsense; 'corvane-flash info --help'"},
@@ -250,7 +255,7 @@ std::string WithJson(std::string commands) {
 TEST_P(CommandLine, TellsTheSameInJsonLines) {
     const Row& row = GetParam();
     const std::string commands = row.commands;
-    for (const char* other : {"|", "&", "--help", "--version"})
+    for (const char* other : {"|", "&", "--help", "--man", "--version"})
         if (commands.find(other) != std::string::npos) return;  // it's not all JSON
     const Result result = Workplace().Run(WithJson(commands));
     EXPECT_EQ(result.status, row.status);

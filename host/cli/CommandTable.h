@@ -15,7 +15,7 @@ struct Context;
 struct Outcome;
 
 /// What a shell offers to complete a value with, apart from the fixed choices.
-enum class Offers { Nothing, Files, Devices, Settings, SettingAssignments };
+enum class Offers { Nothing, Files, Devices, Settings, SettingAssignments, HelpWords };
 
 using OptionMember =
     std::variant<bool Options::*, int Options::*, std::string Options::*,
@@ -32,6 +32,9 @@ struct OptionRow {
     const char* environment = "";
 
     bool IsArgument() const { return names[0] != '-'; }
+    bool IsRepeated() const {
+        return std::holds_alternative<std::vector<std::string> Options::*>(member);
+    }
     bool IsSwitch() const {
         return std::holds_alternative<bool Options::*>(member) ||
                std::holds_alternative<int Options::*>(member);

@@ -38,10 +38,20 @@ std::string Option(const OptionRow& row) {
     return fmt::format(".TP\n{}\n{}.{}\n", line, Roff(row.help), environment);
 }
 
+/// "[KEY]..." with nothing but the name set in italics.
+std::string Argument(const std::string& word) {
+    const std::size_t first = word.find_first_not_of('[');
+    const std::size_t end = word.find_first_of("].", first);
+    const std::string tail = end == std::string::npos ? "" : word.substr(end);
+    return fmt::format(R"({}\fI{}\fR{})", word.substr(0, first),
+                       Roff(word.substr(first, end - first)), tail);
+}
+
 std::string Synopsis(const CommandRow& command) {
     std::string line = fmt::format(R"(\fBcorvane\-flash {}\fR)", Roff(command.name));
-    for (const OptionRow& row : command.options)
-        if (row.IsArgument()) line += fmt::format(" \\fI{}\\fR", Roff(row.names));
+    const std::vector<std::string> words = UsageWords(command);
+    for (std::size_t i = 1; i < words.size(); ++i)
+        line += " " + Argument(words[i]);
     return line;
 }
 

@@ -31,6 +31,19 @@ std::vector<std::string> SecondWords(const CommandRows& commands, const std::str
     return words;
 }
 
+std::vector<std::string> UsageWords(const CommandRow& command) {
+    std::vector<std::string> words{command.name};
+    bool options = false;
+    for (const OptionRow& row : command.options) {
+        options = options || !row.IsArgument();
+        if (!row.IsArgument()) continue;
+        const std::string name = row.required ? row.names : "[" + std::string(row.names) + "]";
+        words.push_back(name + (row.IsRepeated() ? "..." : ""));
+    }
+    if (options) words.emplace_back("[OPTION]...");
+    return words;
+}
+
 std::string FirstWordHelp(const CommandRows& commands, const std::string& word) {
     for (const CommandRow& command : commands)
         if (word == command.name) return command.help;

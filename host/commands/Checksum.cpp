@@ -76,7 +76,7 @@ Outcome Run(Context& context) {
 CommandRow Checksum() {
     return {
         "checksum",
-        "Calculate the CRC-32 of the flash, of a range, or of an image",
+        "Calculate the CRC-32 of the flash, a range or an image",
         "With --of, the host computes what the device would answer if its flash held the "
         "image and nothing else.",
         "  corvane-flash checksum\n"

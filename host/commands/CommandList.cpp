@@ -7,9 +7,11 @@ namespace host {
 const CommandRows& AllCommands() {
     using namespace commands;
     static const CommandRows table{
-        Info(),     Program(),      Verify(),          Read(),    Erase(),      BlankCheck(),
-        Checksum(), RegisterRead(), RegisterProgram(), MacRead(), MacProgram(), Operation(),
-        Settings(), Completion(),
+        Info(),     Program(),      Verify(),
+        Read(),     Erase(),        BlankCheck(),
+        Checksum(), RegisterRead(), RegisterProgram(),
+        MacRead(),  MacProgram(),   Operation(),
+        Settings(), Completion(),   Help(),
     };
     return table;
 }

@@ -28,6 +28,7 @@ CommandRow MacProgram();
 CommandRow Operation();
 CommandRow Settings();
 CommandRow Completion();
+CommandRow Help();
 
 // Options that several commands share.
 OptionRow RangeOption(const char* help);

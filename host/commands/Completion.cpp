@@ -19,7 +19,7 @@ Outcome Run(Context& context) {
 
 CommandRow Completion() {
     return {"completion",
-            "Print the shell completion script for bash, zsh or fish",
+            "Print the completion script of a shell: bash, zsh or fish",
             "",
             "  corvane-flash completion bash > ~/.local/share/bash-completion/completions/"
             "corvane-flash",

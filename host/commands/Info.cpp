@@ -48,7 +48,7 @@ Outcome Run(Context& context) {
 }  // namespace
 
 CommandRow Info() {
-    return {"info", "Show what the plug-in found: family, flash, sectors, RAM, operations",
+    return {"info", "Show the device: family, flash, sectors, RAM, operations",
             "",     "  corvane-flash --sim quen,flash=512K info",
             {},     Run};
 }

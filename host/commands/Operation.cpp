@@ -51,8 +51,8 @@ Outcome Run(Context& context) {
 CommandRow Operation() {
     return {
         "operation",
-        "Run one of the plug-in's operations by its name, with the settings as they are",
-        "'corvane-flash info' lists the names.",
+        "Run one of the plug-in's operations by its name",
+        "It works with the settings as they are. 'corvane-flash info' lists the names.",
         "  corvane-flash operation BlankCheck\n"
         "  corvane-flash --set FlashEraseType='Entire Flash' operation Erase",
         {{"NAME", "", "The operation's exact name", &Options::argument, Offers::Nothing, {}, true}},

@@ -77,8 +77,9 @@ Outcome Run(Context& context) {
 
 CommandRow Settings() {
     return {"settings",
-            "List the settings with meaning, accepted texts and origin; show or keep one",
-            "A value comes from the first of: command line, environment variable CORVANE_SET_KEY, "
+            "List the settings, or show, keep or drop one",
+            "Each is shown with its origin, its meaning and the texts that it takes. A value comes "
+            "from the first of: command line, environment variable CORVANE_SET_KEY, "
             "your settings file, kept value (KEY=TEXT here, and what the plug-in publishes), "
             "default. With -q, only the values are shown.",
             "  corvane-flash settings FlashTimeoutValue\n"

@@ -3,14 +3,13 @@
 #include "host/output/Progress.h"
 
 #include <fmt/format.h>
-#include <sys/ioctl.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstdlib>
 #include <string_view>
 #include <vector>
 
+#include "host/base/Terminal.h"
 #include "host/base/Text.h"
 
 namespace host {
@@ -25,12 +24,6 @@ constexpr std::size_t kPercentColumns = 7;
 constexpr std::size_t kDetailColumns = 50;  ///< what amounts, time left and rate can take
 constexpr std::size_t kBarColumnsMin = 8;
 constexpr std::size_t kBarColumnsMax = 40;
-
-std::size_t Columns(std::FILE* stream) {
-    winsize size{};
-    if (ioctl(fileno(stream), TIOCGWINSZ, &size) != 0 || size.ws_col == 0) return 80;
-    return size.ws_col;
-}
 
 std::string RateText(const PhaseProgress& progress) {
     if (progress.doneBytes == 0) return "";
@@ -56,7 +49,7 @@ std::string Bar(unsigned percent, std::size_t columns) {
 ProgressStyle ChooseStyle(const std::string& option, std::FILE* stream) {
     if (option == "bar") return ProgressStyle::Bar;
     if (option == "plain") return ProgressStyle::Plain;
-    if (option == "none" || isatty(fileno(stream)) == 0) return ProgressStyle::None;
+    if (option == "none" || !IsTerminal(stream)) return ProgressStyle::None;
     const char* terminal = std::getenv("TERM");
     const bool dumb = terminal == nullptr || std::string_view(terminal) == "dumb";
     return dumb ? ProgressStyle::Plain : ProgressStyle::Bar;
@@ -97,7 +90,7 @@ bool UpdateGate::Passes(Phase phase, const PhaseProgress& progress, Time now) {
 void ProgressDisplay::DrawBar(Phase phase, const PhaseProgress& progress) {
     if (style_ != ProgressStyle::Bar) return;
     // One column stays free: a terminal wraps when its last one is written.
-    fmt::print(stream_, "\r\033[K{}", BarLine(phase, progress, Columns(stream_) - 1));
+    fmt::print(stream_, "\r\033[K{}", BarLine(phase, progress, TerminalColumns(stream_) - 1));
     std::fflush(stream_);
     drawn_ = true;
 }

@@ -1,0 +1,72 @@
+// Each topic's text, made from the tables.
+
+#include "host/cli/Topics.h"
+
+#include <fmt/format.h>
+
+#include <sstream>
+#include <string_view>
+
+#include "host/base/Errors.h"
+#include "host/cli/CommandTable.h"
+#include "host/cli/Layout.h"
+#include "target/simulated/DeviceOptions.h"
+
+namespace host {
+
+namespace {
+
+/// The target's own help, wrapped like the rest: headings, and lines of a name and a text.
+std::string DevicesHelp() {
+    std::istringstream lines(target::DeviceOptionsHelp());
+    std::string text =
+        "A simulated device stands in for a board: --sim says which one, and --sim-file\n"
+        "keeps its contents in a file, so that the next command finds them.\n\n"
+        "Examples:\n"
+        "  corvane-flash --sim quen,flash=256K --sim-file board.sim program app.hex\n"
+        "  corvane-flash --sim tolva,loader=hangs program app.hex\n";
+    for (std::string line; std::getline(lines, line);) {
+        const std::size_t name = line.find_first_not_of(' ');
+        const std::size_t blanks = name == 0 ? std::string::npos : line.find("  ", name);
+        if (blanks == std::string::npos)
+            text += "\n" + line + "\n";
+        else
+            text += Entry(line.substr(name, blanks - name),
+                          std::string_view(line).substr(line.find_first_not_of(' ', blanks)));
+    }
+    return text;
+}
+
+std::string OptionsHelp() {
+    std::string text = "Every command takes these options, before or behind its own:\n";
+    for (const OptionRow& row : GlobalOptions())
+        text += OptionEntry(row);
+    text += Entry("-h, --help", "Show the help, or that of the command");
+    text += Entry("    --version", "Show the version");
+    text += Entry("    --man", "Print the man page, for 'man -l -'");
+    return text + "\n" +
+           Wrap(
+               "Addresses are hexadecimal, with or without 0x; ranges include both ends. What "
+               "stands behind -- is no option.");
+}
+
+std::string StatusHelp() {
+    std::string text = "How a command ended is told by its exit status:\n";
+    for (const auto& [status, meaning] : kExitStatuses)
+        text += Entry(std::to_string(static_cast<int>(status)), meaning, 8);
+    return text;
+}
+
+const Topic kTopics[] = {
+    {"sim", "Simulated devices: classes, options, faults", DevicesHelp},
+    {"options", "The options that every command takes", OptionsHelp},
+    {"status", "Exit statuses", StatusHelp},
+};
+
+}  // namespace
+
+std::span<const Topic> Topics() {
+    return kTopics;
+}
+
+}  // namespace host
