@@ -7,7 +7,7 @@
 #include <set>
 
 #include "bench/Measurements.h"
-#include "bench/Workloads.h"
+#include "tests/support/Workloads.h"
 
 namespace bench {
 
@@ -15,8 +15,8 @@ Table CountsTable() {
     Table table("counts", "Host calls by kind, beside the least that the protocol allows",
                 {"work", "bytes", "address", "settings", "reads", "writes", "control", "pauses",
                  "display", "calls", "least", "ratio", "bytes in", "bytes out", "paused ms"});
-    for (const Workload& work : CountedWorkloads()) {
-        const Counts counts = CountCalls(work);
+    for (const test::Workload& work : test::CountedWorkloads()) {
+        const test::Counts counts = test::CountCalls(work);
         std::vector<nlohmann::json> row = {work.name, work.sizeBytes,
                                            fmt::format("0x{:x}", work.address)};
         row.insert(row.end(), counts.calls.begin(), counts.calls.end());

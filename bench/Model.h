@@ -5,7 +5,7 @@
 #include <chrono>
 #include <cstdint>
 
-#include "bench/Workloads.h"
+#include "tests/support/Workloads.h"
 
 namespace bench {
 
@@ -27,6 +27,6 @@ struct ModelledTime {
 
 constexpr Link kFastestLink = {0, 1000, 5};
 
-ModelledTime Model(const Workload& work, const Link& link);
+ModelledTime Model(const test::Workload& work, const Link& link);
 
 }  // namespace bench

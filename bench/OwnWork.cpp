@@ -6,6 +6,7 @@
 
 #include "bench/Measurements.h"
 #include "bench/Model.h"
+#include "bench/ReplayHost.h"
 
 namespace bench {
 
@@ -45,9 +46,9 @@ struct OwnTime {
     double Own() const { return std::max(plugin - hostCalls, 0.0); }
 };
 
-OwnTime Measure(const Workload& work) {
-    NullTarget target;
-    LeanHost host(target);
+OwnTime Measure(const test::Workload& work) {
+    test::NullTarget target;
+    ReplayHost host(target);
     test::Plugin plugin(host);
     host.recording = true;
     work.run(host, plugin, work);
@@ -63,9 +64,9 @@ Table OwnWorkTable() {
         "Processor time in ms beside the same host calls replayed without the plug-in, and "
         "the difference as a share of the modelled time on the fastest link",
         {"work", "KiB", "plug-in", "host calls alone", "own", "ratio", "modelled s", "share %"});
-    for (const auto make : {Program, Erase, BlankCheck, Checksum}) {
+    for (const auto make : {test::Program, test::Erase, test::BlankCheck, test::Checksum}) {
         for (const std::uint32_t sizeBytes : {64 * kKiB, 1 * kMiB, 16 * kMiB}) {
-            const Workload work = make(0, sizeBytes);
+            const test::Workload work = make(0, sizeBytes);
             const OwnTime time = Measure(work);
             const double modelled = Model(work, kFastestLink).Total().count();
             table.Add({work.name, sizeBytes / kKiB, time.plugin * 1e3, time.hostCalls * 1e3,
@@ -81,10 +82,10 @@ Table GrowthTable() {
                 "Processor time by size (128 MiB are 131072 sectors), and per KiB with the host "
                 "calls and without",
                 {"work", "KiB", "own ms", "ns per KiB with calls", "own ns per KiB"});
-    for (const auto make : {Program, Erase, BlankCheck, Checksum}) {
+    for (const auto make : {test::Program, test::Erase, test::BlankCheck, test::Checksum}) {
         for (std::uint32_t sizeBytes = 64 * kKiB; sizeBytes <= 128 * kMiB;
              sizeBytes *= sizeBytes == 64 * kMiB ? 2 : 4) {
-            const Workload work = make(0, sizeBytes);
+            const test::Workload work = make(0, sizeBytes);
             const OwnTime time = Measure(work);
             const double nsPerKiB = 1e9 * kKiB / sizeBytes;
             table.Add({work.name, sizeBytes / kKiB, time.Own() * 1e3, time.plugin * nsPerKiB,

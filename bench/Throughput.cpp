@@ -8,7 +8,8 @@
 #include <map>
 
 #include "bench/Measurements.h"
-#include "bench/Workloads.h"
+#include "bench/ReplayHost.h"
+#include "tests/support/Workloads.h"
 
 namespace bench {
 
@@ -46,25 +47,25 @@ void RegisterFunction(const std::string& name, Function function) {
     });
 }
 
-void RegisterOperation(const std::string& name, LeanHost& host, test::Plugin& plugin,
-                       const Workload& work) {
+void RegisterOperation(const std::string& name, test::LeanHost& host, test::Plugin& plugin,
+                       const test::Workload& work) {
     Register(name, [&host, &plugin, work] { work.run(host, plugin, work); });
 }
 
 }  // namespace
 
 Table ThroughputTable() {
-    NullTarget target;
-    LeanHost host(target);
+    test::NullTarget target;
+    ReplayHost host(target);
     test::Plugin plugin(host);
-    const Workload blankCheck = BlankCheck(0, kSizeBytes);
+    const test::Workload blankCheck = test::BlankCheck(0, kSizeBytes);
     host.recording = true;
     blankCheck.run(host, plugin, blankCheck);
     host.recording = false;
 
     Register("host calls", [&host] { host.Replay(); });
     RegisterOperation("blank check", host, plugin, blankCheck);
-    RegisterOperation("checksum", host, plugin, Checksum(0, kSizeBytes));
+    RegisterOperation("checksum", host, plugin, test::Checksum(0, kSizeBytes));
     RegisterFunction("memcmp", [](const unsigned char* chunk) {
         return std::memcmp(chunk, chunk + 1, kChunkBytes - 1);
     });

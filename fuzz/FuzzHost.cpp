@@ -46,9 +46,7 @@ ByteSource ByteSource::Split(std::size_t size) {
 }
 
 // With a sink in place, the trace lines are made as well.
-FuzzHost::FuzzHost(ByteSource answers) : answers_(answers) {
-    static const test::Settings ordinary = test::RecordingHost().settings;
-    settings = ordinary;
+FuzzHost::FuzzHost(ByteSource answers) : settings(test::OrdinarySettings()), answers_(answers) {
     OstrelLoggerSetSink([](void*, int, const char* text) { RequireText(text); }, nullptr);
 }
 
@@ -63,8 +61,7 @@ void FuzzHost::CallReturned() {
 }
 
 void FuzzHost::BecomeOrdinary() {
-    const FuzzHost ordinary({nullptr, nullptr});
-    settings = ordinary.settings;
+    settings = test::OrdinarySettings();
     registers.clear();
     answers_ = {nullptr, nullptr};
     work_ = 0;

@@ -9,7 +9,7 @@
 #include <fstream>
 #include <sstream>
 
-#include "bench/Workloads.h"
+#include "tests/support/Workloads.h"
 
 namespace {
 
@@ -30,8 +30,8 @@ TEST(CallCounts, AreAsRecordedAndNearTheLeast) {
     std::string actual =
         "work bytes@address: settings+reads+writes+control+pauses+display, bytes in, bytes out, "
         "ms paused\n";
-    for (const bench::Workload& work : bench::CountedWorkloads()) {
-        const bench::Counts counts = bench::CountCalls(work);
+    for (const test::Workload& work : test::CountedWorkloads()) {
+        const test::Counts counts = test::CountCalls(work);
         const auto line = fmt::format("{} {}@{:x}: {}, {}, {}, {}\n", work.name, work.sizeBytes,
                                       work.address, fmt::join(counts.calls, "+"), counts.bytesRead,
                                       counts.bytesWritten, counts.pausedMs);

@@ -12,7 +12,7 @@ namespace test {
 
 namespace {
 
-const Settings OrdinarySettings = {
+const Settings kOrdinarySettings = {
     {"FlashVerboseMode", "0"},
     {"FlashResetSetting", "1"},
     {"FlashProgramCRCOption", "0"},
@@ -58,11 +58,15 @@ std::string BytesText(const void* buffer, size_t count, size_t width) {
 
 }  // namespace
 
+const Settings& OrdinarySettings() {
+    return kOrdinarySettings;
+}
+
 RecordingHost::RecordingHost(const std::string& deviceOptions, Settings changes)
     : settings(std::move(changes)),
       device_(std::make_unique<target::SimulatedDevice>(target::ParseDeviceOptions(deviceOptions),
                                                         &clock_)) {
-    settings.insert(OrdinarySettings.begin(), OrdinarySettings.end());
+    settings.insert(kOrdinarySettings.begin(), kOrdinarySettings.end());
     OstrelLoggerSetSink(
         [](void* self, int level, const char* text) {
             static_cast<RecordingHost*>(self)->NoteTrace(level, text);

@@ -19,6 +19,9 @@ namespace test {
 
 using Settings = std::map<std::string, std::string>;
 
+/// All that the plug-in asks for, as an ordinary user has it.
+const Settings& OrdinarySettings();
+
 /// Which calls fail: the first-th, counted from 1, and the `count` - 1 after it. GetDirectory
 /// cannot fail and is not counted. A failing GetProperty does not know the setting.
 struct Fault {

@@ -1,10 +1,10 @@
-#include "bench/Workloads.h"
+#include "tests/support/Workloads.h"
 
 #include <fmt/format.h>
 
 #include <stdexcept>
 
-namespace bench {
+namespace test {
 
 namespace {
 
@@ -29,19 +29,19 @@ void Require(const char* error) {
     if (error != nullptr) throw std::runtime_error(error);
 }
 
-void Write(test::Plugin& plugin, std::uint32_t address, std::uint32_t sizeBytes) {
+void Write(Plugin& plugin, std::uint32_t address, std::uint32_t sizeBytes) {
     static std::vector<unsigned char> data;
     if (data.size() < sizeBytes) data.resize(sizeBytes, 0x5A);
     Require(plugin->WriteDataToFlash(data.data(), address, sizeBytes, 1));
 }
 
-void RunProgram(LeanHost& host, test::Plugin& plugin, const Workload& work) {
+void RunProgram(LeanHost& host, Plugin& plugin, const Workload& work) {
     host.settings["FlashProgramOption"] = "Do Not Erase Flash Memory";
     Require(plugin->ResetSettings(0));
     Write(plugin, work.address, work.sizeBytes);
 }
 
-void RunSparse(LeanHost&, test::Plugin& plugin, const Workload& work) {
+void RunSparse(LeanHost&, Plugin& plugin, const Workload& work) {
     Require(plugin->ResetSettings(0));
     for (std::uint32_t at = 0; at < work.sizeBytes; at += kSparseSegmentBytes) {
         Write(plugin, at / kSparseSegmentBytes * kSparseStepBytes, kSparseSegmentBytes);
@@ -49,7 +49,7 @@ void RunSparse(LeanHost&, test::Plugin& plugin, const Workload& work) {
 }
 
 // An operation on a range, by the names of its settings.
-void Perform(LeanHost& host, test::Plugin& plugin, const Workload& work, const std::string& name,
+void Perform(LeanHost& host, Plugin& plugin, const Workload& work, const std::string& name,
              const std::string& selection, const std::string& prefix) {
     host.settings[selection] = "By Address Range";
     host.settings[prefix + "StartAddr"] = fmt::format("{:x}", work.address);
@@ -57,15 +57,15 @@ void Perform(LeanHost& host, test::Plugin& plugin, const Workload& work, const s
     Require(plugin->PerformOperation(name.c_str()));
 }
 
-void RunErase(LeanHost& host, test::Plugin& plugin, const Workload& work) {
+void RunErase(LeanHost& host, Plugin& plugin, const Workload& work) {
     Perform(host, plugin, work, "Erase", "FlashEraseType", "FlashErase");
 }
 
-void RunBlankCheck(LeanHost& host, test::Plugin& plugin, const Workload& work) {
+void RunBlankCheck(LeanHost& host, Plugin& plugin, const Workload& work) {
     Perform(host, plugin, work, "BlankCheck", "FlashBlankCheckSelection", "FlashBlankCheck");
 }
 
-void RunChecksum(LeanHost& host, test::Plugin& plugin, const Workload& work) {
+void RunChecksum(LeanHost& host, Plugin& plugin, const Workload& work) {
     Perform(host, plugin, work, "CalculateChecksum", "FlashChecksumSelection", "FlashChecksum");
 }
 
@@ -99,7 +99,7 @@ Workload ProgramSparse(std::uint32_t segments) {
 Counts CountCalls(const Workload& work) {
     NullTarget target;
     LeanHost host(target);
-    test::Plugin plugin(host);
+    Plugin plugin(host);
     host.counts = {};
     work.run(host, plugin, work);
     return host.counts;
@@ -118,4 +118,4 @@ std::vector<Workload> CountedWorkloads() {
     return works;
 }
 
-}  // namespace bench
+}  // namespace test

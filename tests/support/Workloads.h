@@ -6,15 +6,15 @@
 #include <string>
 #include <vector>
 
-#include "bench/LeanHost.h"
+#include "tests/support/LeanHost.h"
 
-namespace bench {
+namespace test {
 
 struct Workload {
     std::string name;
     std::uint32_t address = 0;
     std::uint32_t sizeBytes = 0;
-    void (*run)(LeanHost&, test::Plugin&, const Workload&) = nullptr;
+    void (*run)(LeanHost&, Plugin&, const Workload&) = nullptr;
     std::uint64_t leastCalls = 0;  ///< that the device's protocol allows
 };
 
@@ -32,4 +32,4 @@ Counts CountCalls(const Workload& work);
 /// The works whose calls are counted: 1 byte to 16 MiB, aligned and not, and the sparse image.
 std::vector<Workload> CountedWorkloads();
 
-}  // namespace bench
+}  // namespace test
