@@ -42,6 +42,11 @@ class Target {
 
     /// Whether a pause lets simulated time pass, so that nobody has to wait for it.
     virtual bool SimulatesTime() const { return false; }
+
+    /// Whether an access to the running target stops it for a moment. Then it doesn't go on while
+    /// it is looked at: whoever waits for it looks first when it should be done, reads all that it
+    /// wants to know at once, and waits by Pause, which lets it go on.
+    virtual bool LooksStopIt() const { return false; }
 };
 
 }  // namespace target

@@ -45,6 +45,7 @@ Loader::Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash,
     : options_(options), ram_(ram), flash_(flash), controller_(controller), rules_(rules) {}
 
 void Loader::Start() {
+    Forget();
     if (options_.faults.loader == LoaderFault::Dead) return;
     running_ = true;
     block_ = 0;
@@ -53,12 +54,30 @@ void Loader::Start() {
 }
 
 void Loader::Stop() {
-    if (chunk_) ProgramFromBuffer(chunk_->sizeBytes / 2);
-    chunk_.reset();
+    if (!running_) return;
+    if (chunk_) {
+        ProgramFromBuffer(chunk_->sizeBytes / 2);
+        chunk_->end -= now_;
+    }
+    halted_ = true;
     running_ = false;
 }
 
+void Loader::Continue(Time now) {
+    if (!halted_) return;
+    if (chunk_) chunk_->end += now;
+    halted_ = false;
+    running_ = true;
+}
+
+void Loader::Forget() {
+    Stop();
+    halted_ = false;
+    chunk_.reset();
+}
+
 void Loader::AdvanceTo(Time now) {
+    now_ = now;
     if (!running_ || options_.faults.loader == LoaderFault::Hangs) return;
     // The debugger's write is followed by an AdvanceTo, so a chunk that is found while the loader
     // idles was handed over just now; one found behind another chunk starts when that one ends.

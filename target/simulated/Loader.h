@@ -28,15 +28,21 @@ class Loader {
     /// is served first, then the two in turn.
     void Start();
 
-    /// The core was halted or reset. Of a chunk at work, the first half has been programmed and
-    /// its status stays; nobody goes on with it.
+    /// The core was halted. Of a chunk at work, the first half has been programmed and its status
+    /// stays; unless Continue follows, nobody goes on with it.
     void Stop();
+
+    /// The halted core goes on where it was.
+    void Continue(Time now);
+
+    /// The core was reset: there is nothing to go on with.
+    void Forget();
 
     /// Does what the loader has got done by `now`.
     void AdvanceTo(Time now);
 
     /// Whether it programs flash at the moment, so that flash can't be read.
-    bool IsProgramming() const { return chunk_.has_value(); }
+    bool IsProgramming() const { return running_ && chunk_.has_value(); }
 
     /// Whether a write there would change a chunk that was handed over and isn't finished.
     bool Owns(std::uint32_t address, std::uint64_t sizeBytes);
@@ -60,6 +66,8 @@ class Loader {
     const FlashController& controller_;
     RuleLog& rules_;
     bool running_ = false;
+    bool halted_ = false;         ///< in the middle of its work
+    Time now_{0};                 ///< when it was last brought up to date
     std::uint32_t block_ = 0;     ///< served now or next: 0 or 1
     std::optional<Chunk> chunk_;  ///< at work
     Time busyTime_{0};

@@ -82,11 +82,19 @@ void SimulatedDevice::Halt() {
     Perform(0, "Halting the target", [&] { StopCore(); });
 }
 
+void SimulatedDevice::Continue() {
+    Perform(0, "Letting the target go on", [&] {
+        running_ = true;
+        loader_.Continue(time_.Now());
+    });
+}
+
 // The two kinds of reset differ in how the probe goes about them, not in what becomes of the
 // device.
 void SimulatedDevice::Reset(bool /*flag*/) {
     Perform(0, "Resetting the target", [&] {
         StopCore();
+        loader_.Forget();
         controller_.Abort();
         registers_.Reset();
         programLoaded_ = false;
@@ -145,6 +153,7 @@ void SimulatedDevice::StopCore() {
 
 void SimulatedDevice::PowerCycle() {
     StopCore();
+    loader_.Forget();
     controller_.Abort();
     registers_.Reset();
     ram_.LosePower();

@@ -49,6 +49,10 @@ class SimulatedDevice final : public Target {
     void Pause(std::uint32_t milliseconds) override;
     bool SimulatesTime() const override { return true; }
 
+    /// Lets the halted core go on where it was. Other than after Run, the loader keeps what it had
+    /// not finished; without one, the core runs on with nothing that shows outside.
+    void Continue();
+
     // What follows is for tests and tools: it counts as no access, costs no simulated time and
     // breaks no rule.
 

@@ -13,7 +13,8 @@ verify: device plugin
 operations: device plugin
 logger:
 target:
-target/simulated: target
+target/gdb: target
+target/simulated: target target/gdb
 host/base:
 host/image: host/image/records host/base
 host/image/records: host/image host/base

@@ -1,0 +1,106 @@
+// See GdbOptions.h.
+
+#include "target/gdb/GdbOptions.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <charconv>
+
+#include "target/gdb/Hex.h"
+
+namespace target::gdb {
+
+namespace {
+
+using std::string_view;
+using Number = std::optional<std::uint32_t> GdbOptions::*;
+
+bool ParseNumber(string_view text, int base, std::uint32_t& number) {
+    const char* const end = text.data() + text.size();
+    const auto [rest, error] = std::from_chars(text.data(), end, number, base);
+    return error == std::errc() && rest == end;
+}
+
+template <Number Member, int Base>
+bool SetNumber(GdbOptions& options, string_view text) {
+    if (Base == 16 && text.starts_with("0x")) text.remove_prefix(2);
+    std::uint32_t number = 0;
+    if (!ParseNumber(text, Base, number)) return false;
+    options.*Member = number;
+    return true;
+}
+
+bool SetTimeout(GdbOptions& options, string_view text) {
+    constexpr std::uint32_t kHourMs = 3'600'000;
+    const bool isMs = text.ends_with("ms");
+    if (!isMs && !text.ends_with("s")) return false;
+    text.remove_suffix(isMs ? 2 : 1);
+    std::uint32_t number = 0;
+    if (!ParseNumber(text, 10, number) || number == 0 || number > kHourMs) return false;
+    const std::uint64_t ms = std::uint64_t{number} * (isMs ? 1 : 1000);
+    options.timeout = std::chrono::milliseconds(ms);
+    return ms <= kHourMs;
+}
+
+bool SetDetach(GdbOptions& options, string_view text) {
+    options.detach = text == "yes";
+    return text == "yes" || text == "no";
+}
+
+const GdbOptionRow kRows[] = {
+    {"init", "a command", "monitor command to send after connecting; may be repeated", true,
+     [](GdbOptions& o, string_view t) {
+         o.init.emplace_back(t);
+         return !t.empty();
+     }},
+    {"attach", "a number", "target to attach to after that (vAttach)", false,
+     SetNumber<&GdbOptions::attach, 10>},
+    {"reset", "a command",
+     "monitor command that resets the target and leaves it halted; default: reset halt", true,
+     [](GdbOptions& o, string_view t) {
+         o.reset = t;
+         return !t.empty();
+     }},
+    {"pc", "a number", "number of the program counter, where the server doesn't tell", false,
+     SetNumber<&GdbOptions::pc, 10>},
+    {"sp", "a number", "number of the stack pointer, where the server doesn't tell", false,
+     SetNumber<&GdbOptions::sp, 10>},
+    {"ram-end", "a hexadecimal address", "address behind the RAM; default: as the device says",
+     false, SetNumber<&GdbOptions::ramEnd, 16>},
+    {"timeout", "a whole number with ms or s, up to an hour",
+     "how long a reply may take; default: 5s", false, SetTimeout},
+    {"detach", "yes or no",
+     "leave with D, not just by closing the connection, which leaves most targets halted", false,
+     SetDetach},
+};
+
+const GdbOptionRow& FindRow(string_view name) {
+    for (const GdbOptionRow& row : kRows)
+        if (name == row.name) return row;
+    std::string names;
+    for (const GdbOptionRow& row : kRows)
+        names += fmt::format("{}{}", names.empty() ? "" : ", ", row.name);
+    throw GdbOptionError(fmt::format("there is no option '{}'; there are: {}", name, names));
+}
+
+}  // namespace
+
+std::span<const GdbOptionRow> GdbOptionTable() {
+    return kRows;
+}
+
+void ParseGdbOption(const std::string& text, GdbOptions& options) {
+    string_view rest = text;
+    do {
+        const GdbOptionRow& row = FindRow(rest.substr(0, rest.find('=')));
+        rest.remove_prefix(std::min(rest.size(), string_view(row.name).size() + 1));
+        const string_view value = row.isText ? rest : TakeUntil(rest, ',');
+        if (row.isText) rest = {};
+        if (!row.set(options, value))
+            throw GdbOptionError(
+                fmt::format("{} takes {}, not '{}'", row.name, row.accepts, value));
+    } while (!rest.empty());
+}
+
+}  // namespace target::gdb

@@ -1,0 +1,134 @@
+// See ServedSimulation.h.
+
+#include "target/simulated/ServedSimulation.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "target/simulated/Loader.h"
+#include "target/simulated/Ram.h"
+
+namespace target {
+
+namespace {
+
+constexpr int kGeneralPage = 1;
+
+constexpr std::uint32_t kRegisterStart = 0x40000000;
+constexpr std::uint32_t kRegisterSizeBytes = 0x20000000;
+
+// Behind its first instruction the loader is in its loop, so that nobody takes it for unstarted.
+constexpr std::uint32_t kInsideLoader = 4;
+
+}  // namespace
+
+ServedSimulation::ServedSimulation(SimulatedDevice& device,
+                                   std::function<void(const std::string&)> complain,
+                                   std::function<void()> clientGone)
+    : device_(device),
+      complain_(std::move(complain)),
+      clientGone_(std::move(clientGone)),
+      writtenWords_(device.Options().ramSizeBytes / 4) {
+    ResetRegisters();
+}
+
+std::vector<gdb::MemoryRegion> ServedSimulation::Regions() const {
+    const DeviceOptions& options = device_.Options();
+    return {{0, options.flashSizeBytes, options.sectorSizeBytes},
+            {Ram::kStart, options.ramSizeBytes, 0},
+            {kRegisterStart, kRegisterSizeBytes, 0}};
+}
+
+std::string ServedSimulation::Read(std::uint32_t address, std::size_t sizeBytes,
+                                   std::size_t width) {
+    std::string bytes(sizeBytes, '\0');
+    Do([&] { device_.Read(bytes.data(), sizeBytes / width, address, kGeneralPage, width); });
+    return bytes;
+}
+
+void ServedSimulation::Write(std::uint32_t address, std::string_view bytes, std::size_t width) {
+    Do([&] { device_.Write(bytes.data(), bytes.size() / width, address, kGeneralPage, width); });
+    if (address < Ram::kStart || bytes.empty()) return;
+    const std::size_t first = (address - Ram::kStart) / 4;
+    const std::size_t last = (address - Ram::kStart + bytes.size() - 1) / 4;
+    for (std::size_t word = first; word <= last && word < writtenWords_.size(); ++word)
+        writtenWords_[word] = true;
+}
+
+void ServedSimulation::EraseFlash(std::uint32_t address, std::uint32_t sizeBytes) {
+    RequireFlash(address, sizeBytes);
+    const std::uint32_t sector = device_.Options().sectorSizeBytes;
+    if (address % sector != 0 || sizeBytes % sector != 0)
+        throw TargetError(
+            fmt::format("Erasing {} bytes at 0x{:08X}: the device erases whole sectors of {} bytes",
+                        sizeBytes, address, sector));
+    device_.Flash().Erase(address, sizeBytes);
+}
+
+void ServedSimulation::ProgramFlash(std::uint32_t address, std::string_view bytes) {
+    RequireFlash(address, bytes.size());
+    const auto* first = reinterpret_cast<const std::uint8_t*>(bytes.data());
+    if (const auto at = device_.Flash().Program(address, {first, bytes.size()}))
+        throw TargetError(fmt::format("Programming {} bytes at 0x{:08X}: 0x{:08X} isn't erased",
+                                      bytes.size(), address, *at));
+}
+
+void ServedSimulation::Start() {
+    if (IsRunning()) return;
+    const std::uint32_t pc = registers_.values[gdb::CoreRegisters::kPc];
+    const bool goesOn = inLoader_ && pc == haltedAt_;
+    Do([&] {
+        if (goesOn || !WasWritten(pc)) return device_.Continue();
+        device_.LoadProgram(Loader::kFileName, "");
+        device_.Run();
+    });
+    inLoader_ = goesOn || WasWritten(pc);
+    haltedAt_ = goesOn ? pc : pc + kInsideLoader;
+}
+
+void ServedSimulation::Stop() {
+    const bool ran = IsRunning();
+    Do([&] { device_.Halt(); });
+    if (ran && inLoader_) registers_.values[gdb::CoreRegisters::kPc] = haltedAt_;
+}
+
+void ServedSimulation::Reset() {
+    Do([&] { device_.Reset(true); });
+    ResetRegisters();
+}
+
+/// What the device lets pass and a real one would ignore is worth a word as well.
+void ServedSimulation::Do(const std::function<void()>& action) {
+    const std::size_t known = device_.Violations().size();
+    action();
+    const auto& texts = device_.Violations();
+    for (std::size_t i = known; i < texts.size(); ++i)
+        complain_(texts[i]);
+}
+
+void ServedSimulation::RequireFlash(std::uint32_t address, std::size_t sizeBytes) const {
+    if (device_.Flash().Contains(address, sizeBytes)) return;
+    throw TargetError(fmt::format("{} bytes at 0x{:08X}: the device has {} bytes of flash",
+                                  sizeBytes, address, device_.Flash().SizeBytes()));
+}
+
+bool ServedSimulation::WasWritten(std::uint32_t address) const {
+    if (address < Ram::kStart) return false;
+    const std::size_t word = (address - Ram::kStart) / 4;
+    return word < writtenWords_.size() && writtenWords_[word];
+}
+
+// As the vectors at the start of the flash say.
+void ServedSimulation::ResetRegisters() {
+    std::uint8_t vectors[8];
+    device_.Flash().Read(0, vectors);
+    registers_ = {};
+    registers_.values[gdb::CoreRegisters::kSp] = LoadWord(vectors);
+    registers_.values[gdb::CoreRegisters::kPc] = LoadWord(vectors + 4) & ~std::uint32_t{1};
+    registers_.values[gdb::CoreRegisters::kStatus] = 0x01000000;
+    inLoader_ = false;
+}
+
+}  // namespace target

@@ -1,0 +1,249 @@
+// The GDB remote protocol: frames as they stand on the wire, the client beside a peer that follows
+// a script and misbehaves where the script says so, and client and server over a real connection.
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <chrono>
+#include <functional>
+#include <random>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "target/gdb/Frame.h"
+#include "target/gdb/GdbTarget.h"
+#include "target/gdb/Session.h"
+#include "target/simulated/ServedSimulation.h"
+
+namespace {
+
+using namespace target;
+using namespace target::gdb;
+using namespace std::chrono_literals;
+
+constexpr Mailbox kMailbox{0x20001000, 32, 0xFFFFFFFF};
+
+std::string FramesIn(FrameDecoder& decoder) {
+    static constexpr const char* kNames[] = {"packet", "note", "ack", "nak", "interrupt", "damage"};
+    std::string text;
+    while (const auto frame = decoder.Next())
+        text += std::string(kNames[static_cast<int>(frame->kind)]) + "(" + frame->payload + ")";
+    return text;
+}
+
+TEST(GdbFrames, AreReadAsTheyStandOnTheWire) {
+    using Sender = FrameDecoder::Sender;
+    const struct {
+        Sender sender;
+        const char* wire;
+        const char* frames;
+    } rows[] = {
+        {Sender::Server, "$OK#9a", "packet(OK)"},
+        {Sender::Server, "$#00", "packet()"},
+        {Sender::Server, "$OK#9A$OK#9b", "packet(OK)damage(a packet with a wrong checksum)"},
+        {Sender::Server, "$OK#9", ""},
+        {Sender::Server, "$OK#g0", "damage(a packet with a wrong checksum)"},
+        {Sender::Server, "+-\x03noise+", "ack()nak()interrupt()ack()"},
+        {Sender::Server, "$m4$OK#9a", "packet(OK)"},
+        {Sender::Server, "%Stop:T05#99", "note(Stop:T05)"},
+        {Sender::Server, "$0* #7a", "packet(0000)"},
+        {Sender::Server, "$0*\"0#ac", "packet(0000000)"},
+        {Sender::Client, "$0* #7a", "packet(0* )"},
+        {Sender::Server, "$* #4a", "damage(a packet with a malformed run)"},
+        {Sender::Server, "$0*#5a", "damage(a packet with a malformed run)"},
+        {Sender::Server, "$0*\x1f#79", "damage(a packet with a malformed run)"},
+        {Sender::Client,
+         "$a}\x03"
+         "b#43",
+         "packet(a#b)"},
+    };
+    for (const auto& row : rows) {
+        FrameDecoder whole(row.sender);
+        whole.Feed(row.wire);
+        EXPECT_EQ(FramesIn(whole), row.frames) << row.wire;
+    }
+    std::string bytes;
+    for (int i = 0; i < 256; ++i)
+        bytes += static_cast<char>(i);
+    FrameDecoder single(Sender::Server);
+    std::string frames;
+    for (const char byte : Framed(Escaped(bytes))) {
+        single.Feed({&byte, 1});
+        frames += FramesIn(single);
+    }
+    EXPECT_EQ(frames, "packet(" + bytes + ")");
+    FrameDecoder flooded(Sender::Server);
+    flooded.Feed("$" + std::string(kPayloadMax + 1, '0') + "#00+");
+    EXPECT_EQ(FramesIn(flooded), "damage(a packet longer than any that was asked for)ack()");
+}
+
+/// A server on a free port for one client, bounded in time. The hook sees each payload (an
+/// interrupt as "\x03") and may give the bytes to send in place of the answer; kClose closes the
+/// connection.
+class Peer {
+  public:
+    using Hook = std::function<std::optional<std::string>(const std::string& payload)>;
+    static constexpr char kClose[] = "(close)";
+
+    explicit Peer(Hook hook, const char* device = "quen,latency=1ns,bandwidth=0")
+        : device_(ParseDeviceOptions(device)),
+          served_(
+              device_, [](const std::string&) {}, [] {}),
+          hook_(std::move(hook)),
+          listener_(Socket::Listen(Address::Parse(":0"), [this] { return done_.load(); })),
+          address_(Address::Parse(std::to_string(listener_.Port()))),
+          thread_([this] { Serve(); }) {}
+    ~Peer() {
+        done_ = true;
+        thread_.join();
+    }
+
+    Address Where() const { return address_; }
+    SimulatedDevice& Device() { return device_; }
+    std::vector<std::string> Log() {
+        done_ = true;
+        if (thread_.joinable()) thread_.join();
+        thread_ = std::thread([] {});
+        return log_;
+    }
+
+  private:
+    void Serve() try {
+        Socket client = listener_.Accept(std::chrono::steady_clock::now() + 5s);
+        Session session(served_, [](const std::string&) {});
+        FrameDecoder decoder(FrameDecoder::Sender::Client);
+        while (!done_ && client.IsOpen()) {
+            decoder.Feed(client.Read(std::chrono::steady_clock::now() + 20ms));
+            while (const auto frame = decoder.Next())
+                Answer(client, session, *frame);
+        }
+    } catch (const SocketError&) {
+    }
+
+    void Answer(Socket& client, Session& session, const Frame& frame) {
+        const bool interrupt = frame.kind == Frame::Kind::Interrupt;
+        if (frame.kind != Frame::Kind::Packet && !interrupt) return;
+        const std::string payload = interrupt ? "\x03" : frame.payload;
+        log_.push_back(payload);
+        std::string wire = session.AcknowledgesPackets() && !interrupt ? "+" : "";
+        const auto replies = interrupt ? session.Interrupt() : std::vector<std::string>();
+        if (const auto instead = hook_(payload)) {
+            wire = *instead;
+        } else {
+            for (const std::string& reply : interrupt ? replies : session.Answer(payload))
+                wire += Framed(reply);
+        }
+        if (wire == kClose) throw SocketError("as the script says");
+        client.Write(wire, std::chrono::steady_clock::now() + 1s);
+    }
+
+    SimulatedDevice device_;
+    ServedSimulation served_;
+    const Hook hook_;
+    std::atomic<bool> done_ = false;
+    std::vector<std::string> log_;
+    Socket listener_;
+    const Address address_;
+    std::thread thread_;
+};
+
+GdbOptions Quick(std::chrono::milliseconds timeout = 150ms) {
+    GdbOptions options;
+    options.timeout = timeout;
+    return options;
+}
+
+/// A few accesses of each kind, on a target that is halted, runs and is halted again; throws or
+/// gives what was read.
+std::string Work(const Address& where, const GdbOptions& options = Quick()) {
+    GdbTarget target(where, options, kMailbox, {}, {});
+    std::string bytes(64, '\0');
+    for (std::size_t i = 0; i < bytes.size(); ++i)
+        bytes[i] = static_cast<char>(i * 5);
+    target.Write(bytes.data(), bytes.size(), 0x20000100, 1, 1);
+    target.Run();
+    std::uint32_t word = 0;
+    target.Read(&word, 1, 0x2000100C, 1, 4);
+    target.Halt();
+    target.Reset(true);
+    std::string held(bytes.size(), '\0');
+    target.Read(held.data(), held.size(), 0x20000100, 1, 1);
+    target.Release(false);
+    return held == bytes ? "done" : "wrong bytes";
+}
+
+std::string ResultOf(const std::function<std::string()>& work) {
+    try {
+        return work();
+    } catch (const TargetError& error) {
+        return error.what();
+    }
+}
+
+// A payload's answer in place of the session's: once, or each time.
+struct Quirk {
+    const char* payload;  ///< begins so
+    const char* wire;
+    const char* result;  ///< a part of the error, or "done"
+    int times = 1;
+};
+
+TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
+    const Quirk quirks[] = {
+        // Acknowledgements: refused once, twice, lost, garbled reply, late stop reply.
+        {"qSupported", "-", "done"},
+        {"qSupported", "-", "refused \"qSupported", 2},
+        {"qSupported", "$PacketSize=100#c1", "done"},
+        {"qSupported", "+$PacketSize=100#16", "sent no reply"},
+        {"qSupported", "", "acknowledged no packet"},
+        {"?", "$T05#b9", "done", 9},
+        // The way in.
+        {"qSupported", "+$#00", "done"},
+        {"qSupported", "+$PacketSize=10#91", "packets of 16 bytes only"},
+        {"qSupported", "+$PacketSize=ffffffffffffffffff#5c", "done"},
+        {"?", "$W00#b7", "no running target (\"W00\")"},
+        {"?", "$S00#b3", "done"},
+        {"?", "$E01#a6", "answered \"E01\" to \"?\""},
+        {"?", "$O41#b4$T05thread:p1.1;#a6", "done"},
+        {"?", "%Some:news#8b$T05#b9", "done"},
+        {"?", "$T05#b9$T05#b9", "done"},
+        // Accesses.
+        {"m20000100", "$E03#a8", "Reading 64 x 1 bytes at 0x20000100: the GDB server at"},
+        {"m20000100", "$00#60", "answered \"00\" to \"m20000100,40\""},
+        {"m20000100", "$0g#97", "answered \"0g\""},
+        {"m20000100", "$00#61", "sent a packet with a wrong checksum"},
+        {"m20000100", "$0", "sent no reply to \"m20000100,40\" within 0.15 s"},
+        {"m20000100", Peer::kClose, "is gone: it closed the connection"},
+        {"X20000100,0", "$#00", "done"},
+        {"X20000100,4", "$E01#a6", "Writing 64 x 1 bytes at 0x20000100"},
+        // Run control.
+        {"vCont?", "$#00", "done"},
+        {"vCont;c", "$E01#a6", "\"E01\""},
+        {"vCont;c", "$T0b#e6", "stopped by itself: SIGSEGV"},
+        {"vCont;c", "$W00#b7", "has ended"},
+        {"\x03", "$O41#b4$T05#b9", "done"},
+        {"\x03", "$T05#b9$T02#b6", "done"},
+        {"\x03", "$T04#b8", "stopped by itself: SIGILL"},
+        {"\x03", "", "didn't stop the target within"},
+        // The monitor.
+        {"qRcmd", "$#00", "takes no monitor commands"},
+        {"qRcmd", "$O41#b4$E01#a6", "answered \"E01\" to the monitor command \"reset halt\": A"},
+        {"qRcmd", "$O41#b4$O42#b5$OK#9a", "done"},
+        {"qRcmd", "$41#65", "done"},
+        {"qRcmd", "$O41#b4", "didn't end the monitor command"},
+    };
+    for (const Quirk& quirk : quirks) {
+        SCOPED_TRACE(testing::Message() << testing::PrintToString(quirk.payload) << " -> "
+                                        << testing::PrintToString(quirk.wire));
+        int left = quirk.times;
+        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+            if (!payload.starts_with(quirk.payload) || left-- <= 0) return std::nullopt;
+            return quirk.wire;
+        });
+        const std::string result = ResultOf([&] { return Work(peer.Where()); });
+        EXPECT_NE(result.find(quirk.result), std::string::npos) << result;
+    }
+}
+
+}  // namespace
