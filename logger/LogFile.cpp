@@ -5,23 +5,29 @@
 #include <chrono>
 #include <cstdlib>
 #include <cstring>
-#include <ctime>
 
 namespace ostrel {
 
 namespace {
 
+// Appended to, and not handed on to the processes that the host starts.
+#if defined(_WIN32)
+constexpr auto kAppend = "aN";
+#else
+constexpr auto kAppend = "ae";
+#endif
+
 std::string TimeNow() {
-    using std::chrono::milliseconds;
-    const auto sinceEpoch = std::chrono::duration_cast<milliseconds>(
-        std::chrono::system_clock::now().time_since_epoch());
-    const auto seconds = static_cast<std::time_t>(sinceEpoch.count() / 1000);
-    std::tm utc{};
-    gmtime_r(&seconds, &utc);
-    char date[32] = "";
-    std::strftime(date, sizeof date, "%Y-%m-%dT%H:%M:%S", &utc);
-    char text[48] = "";
-    std::snprintf(text, sizeof text, "%s.%03dZ", date, static_cast<int>(sinceEpoch.count() % 1000));
+    using namespace std::chrono;
+    const auto now = floor<milliseconds>(system_clock::now());
+    const year_month_day date(floor<days>(now));
+    const hh_mm_ss time(now - floor<days>(now));
+    char text[64] = "";
+    std::snprintf(
+        text, sizeof text, "%04d-%02u-%02uT%02d:%02d:%02d.%03dZ", static_cast<int>(date.year()),
+        static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()),
+        static_cast<int>(time.hours().count()), static_cast<int>(time.minutes().count()),
+        static_cast<int>(time.seconds().count()), static_cast<int>(time.subseconds().count()));
     return text;
 }
 
@@ -35,7 +41,7 @@ LogFile LogFile::FromEnvironment(const char* variable) {
         log.file_.reset(stderr);
         return log;
     }
-    log.file_.reset(std::fopen(name, "ae"));
+    log.file_.reset(std::fopen(name, kAppend));
     if (!log.IsOpen()) {
         std::fprintf(stderr, "%s: can't write the log file %s: %s\n", variable, name,
                      std::strerror(errno));

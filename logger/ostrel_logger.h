@@ -9,11 +9,16 @@
 
 #include <stdint.h>
 
-#if defined(__GNUC__)
+// Windows exports what the library's list names, and knows no visibility.
+#if defined(__GNUC__) && !defined(_WIN32)
 #define OSTREL_LOGGER_API __attribute__((visibility("default")))
-#define OSTREL_LOGGER_PRINTF(text, first) __attribute__((format(printf, text, first)))
 #else
 #define OSTREL_LOGGER_API
+#endif
+
+#if defined(__GNUC__)
+#define OSTREL_LOGGER_PRINTF(text, first) __attribute__((format(printf, text, first)))
+#else
 #define OSTREL_LOGGER_PRINTF(text, first)
 #endif
 

@@ -128,6 +128,13 @@ class IFlashDevice2 {
     ~IFlashDevice2() = default;
 };
 
+#if defined(_WIN32)
+// 32-bit Windows has several calling conventions, and compilers have options for the default.
+#define FLASH_CORVANE_CDECL __cdecl
+#else
+#define FLASH_CORVANE_CDECL
+#endif
+
 // Creates a device object for the connected microcontroller: reads its identification registers
 // through host and halts it.
 //     variant       the device variant text, as the host names it; not null
@@ -138,17 +145,18 @@ class IFlashDevice2 {
 // Returns null, or the text of what failed. The text belongs to the library and stays valid until
 // the next failing call of this function, or until the library is unloaded.
 extern "C"
-#if defined(_WIN32)
-    __declspec(dllexport)
-#elif defined(__GNUC__)
+#if defined(__GNUC__) && !defined(_WIN32)
     __attribute__((visibility("default")))
 #endif
-        const char* CreateFlashDevice2(const char* variant, const char* text2, const char* text3,
-                                       IFlashHost* host, IFlashDevice2** device);
+    const char* FLASH_CORVANE_CDECL
+    CreateFlashDevice2(const char* variant, const char* text2, const char* text3, IFlashHost* host,
+                       IFlashDevice2** device);
 
 // The type of CreateFlashDevice2, for hosts that look it up in the loaded library.
-typedef const char* (*CreateFlashDevice2Function)(const char* variant, const char* text2,
-                                                  const char* text3, IFlashHost* host,
-                                                  IFlashDevice2** device);
+typedef const char*(FLASH_CORVANE_CDECL* CreateFlashDevice2Function)(const char* variant,
+                                                                     const char* text2,
+                                                                     const char* text3,
+                                                                     IFlashHost* host,
+                                                                     IFlashDevice2** device);
 
 #endif

@@ -1,0 +1,47 @@
+# What the libraries need on Windows, and the packages made of them. The simulated device, the
+# reference host and the tests are not built there.
+
+enable_language(RC)
+
+# The C++ runtime is linked into each library, so that a host needs no DLL of the compiler's.
+# LibraryEntry.cpp says what the wrapped function is for.
+if(CMAKE_SIZEOF_VOID_P EQUAL 8)
+  set(windows_name x64)
+  set(windows_link_options LINKER:--entry=LibraryEntry LINKER:--wrap=__imp_TlsAlloc)
+else()
+  set(windows_name x86)
+  set(windows_link_options LINKER:--entry=_LibraryEntry@12 LINKER:--wrap=_imp__TlsAlloc@0)
+endif()
+
+# corvane_windows_library(TARGET DESCRIPTION): TARGET.dll with that text in its version resource.
+function(corvane_windows_library target description)
+  string(REPLACE "." "," version_numbers ${PROJECT_VERSION})
+  configure_file(${PROJECT_SOURCE_DIR}/windows/Version.rc.in ${target}.rc @ONLY)
+  target_sources(${target} PRIVATE
+    ${PROJECT_SOURCE_DIR}/windows/LibraryEntry.cpp ${CMAKE_CURRENT_BINARY_DIR}/${target}.rc)
+  target_link_options(${target} PRIVATE
+    -static LINKER:--no-insert-timestamp ${windows_link_options})
+  set_target_properties(${target} PROPERTIES PREFIX "")
+endfunction()
+
+# corvane_import_library(NAME DEFINITIONS): a library to link with in place of the DLL whose exports
+# the file lists. Calls by GCC's names get to the functions exported under Microsoft's.
+function(corvane_import_library name definitions)
+  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${definitions})
+  file(READ ${definitions} text)
+  string(REGEX REPLACE "(\"[^\"]+\") = ([^\n]+)" "\\2 == \\1" text "${text}")
+  set(library ${CMAKE_CURRENT_BINARY_DIR}/${name})
+  file(WRITE ${library}.def "${text}")
+  execute_process(COMMAND ${CMAKE_DLLTOOL} --input-def ${library}.def --output-lib ${library}.a
+                  COMMAND_ERROR_IS_FATAL ANY)
+  add_library(${name} STATIC IMPORTED GLOBAL)
+  set_target_properties(${name} PROPERTIES IMPORTED_LOCATION ${library}.a)
+endfunction()
+
+# Boost's headers lie among those of Linux. A directory that holds nothing but a link to them lets
+# the compiler see no others.
+find_path(BOOST_HEADERS boost/version.hpp PATHS /usr/include NO_CMAKE_FIND_ROOT_PATH REQUIRED)
+file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/boost-headers)
+file(CREATE_LINK ${BOOST_HEADERS}/boost ${PROJECT_BINARY_DIR}/boost-headers/boost SYMBOLIC)
+add_library(Boost::headers INTERFACE IMPORTED)
+target_include_directories(Boost::headers INTERFACE ${PROJECT_BINARY_DIR}/boost-headers)

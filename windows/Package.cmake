@@ -1,0 +1,12 @@
+# The zip archive for makers of debuggers on Windows, made by script/package windows.
+
+install(TARGETS flash_corvane flash_host_check ostrel_logger RUNTIME DESTINATION bin)
+install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h logger/ostrel_logger.h
+        DESTINATION include/flash_corvane)
+install(FILES README.md CHANGELOG.md DESTINATION .)
+install(DIRECTORY docs examples DESTINATION .)
+
+set(CPACK_GENERATOR ZIP)
+set(CPACK_PACKAGE_FILE_NAME flash-corvane-${PROJECT_VERSION}-windows-${windows_name})
+set(CPACK_STRIP_FILES ON)
+include(CPack)
