@@ -81,7 +81,7 @@ RecordingHost::~RecordingHost() {
 void RecordingHost::Restart(Fault next) {
     fault = std::move(next);
     calls = 0;
-    failedCall.clear();
+    failedCalls.clear();
     errors.clear();
     messages.clear();
     transcript.clear();
@@ -109,7 +109,7 @@ bool RecordingHost::Fails(const std::string& line) {
         failNext.clear();
         fails = true;
     }
-    if (fails && failedCall.empty()) failedCall = line;
+    if (fails) failedCalls.push_back(line);
     return fails;
 }
 

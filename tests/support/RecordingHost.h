@@ -51,9 +51,9 @@ class RecordingHost final : public StrictHost {
     std::vector<std::string> messages;
     std::uint64_t calls = 0;
     int openDisplays = 0;
-    bool displayMisused = false;  ///< begun twice, or ended or updated without being begun
-    std::string failedCall;       ///< the first one that was made to fail
-    const void* data = nullptr;   ///< shown as DATA in trace lines
+    bool displayMisused = false;           ///< begun twice, or ended or updated without being begun
+    std::vector<std::string> failedCalls;  ///< those that were made to fail
+    const void* data = nullptr;            ///< shown as DATA in trace lines
 
     /// Starts counting calls anew, with that fault, and forgets what was shown.
     void Restart(Fault next);
