@@ -33,8 +33,9 @@ TEST(Library, ExportsOneFunction) {
               "CreateFlashDevice2\n");
 }
 
-// Seen in a process of its own, where nobody else holds the library.
+// Seen in a process of its own, started for it, where nobody else has ever held the library.
 TEST(Library, IsUnloadedAfterUse) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
     const auto loadUseUnload = [] {
         void* library = dlopen(FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
         RecordingHost host("tolva,fail-access=1");

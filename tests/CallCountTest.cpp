@@ -43,7 +43,10 @@ TEST(CallCounts, AreAsRecordedAndNearTheLeast) {
         EXPECT_LE(static_cast<double>(counts.Calls()), most) << line;
     }
     const std::string path = TRANSCRIPT_DIRECTORY "/../call-counts.txt";
-    if (std::getenv("CORVANE_WRITE_TRANSCRIPTS") != nullptr) std::ofstream(path) << actual;
+    if (std::getenv("CORVANE_WRITE_TRANSCRIPTS") != nullptr) {
+        std::ofstream(path) << actual;
+        FAIL() << path << ": written, read it";
+    }
     std::ostringstream expected;
     expected << std::ifstream(path).rdbuf();
     EXPECT_EQ(actual, expected.str());

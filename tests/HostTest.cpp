@@ -437,7 +437,7 @@ TEST(FlashWatch, CountsAnEraseWhenTheDeviceSaysItIsDone) {
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x40400U);
 }
 
-TEST(CommandLine, EveryCommandAndOptionIsInHelpManPageAndCompletions) {
+TEST(CommandTable, EveryCommandAndOptionIsInHelpManPageAndCompletions) {
     std::vector<std::string> words = FirstWords(AllCommands());
     std::vector<std::string> options;
     const auto add = [&](const std::vector<OptionRow>& rows) {
@@ -470,7 +470,7 @@ TEST(CommandLine, EveryCommandAndOptionIsInHelpManPageAndCompletions) {
     }
 }
 
-TEST(CommandLine, OptionsMayStandAnywhere) {
+TEST(CommandTable, OptionsMayStandAnywhere) {
     const std::vector<std::vector<std::string>> lines = {
         {"--sim", "quen", "-vv", "--set", "A=1", "--set", "B=2", "program", "x", "y", "--crc"},
         {"program", "--crc", "x", "--sim", "tolva", "y", "--set", "A=1", "-v", "--set", "B=2", "-v",

@@ -278,7 +278,10 @@ TEST_P(TranscriptTest, IsAsRecorded) {
         actual << line << '\n';
 
     const std::string path = std::string(TRANSCRIPT_DIRECTORY) + "/" + scenario.name + ".txt";
-    if (std::getenv("CORVANE_WRITE_TRANSCRIPTS") != nullptr) std::ofstream(path) << actual.str();
+    if (std::getenv("CORVANE_WRITE_TRANSCRIPTS") != nullptr) {
+        std::ofstream(path) << actual.str();
+        FAIL() << path << ": written, read it";
+    }
     std::ostringstream expected;
     expected << std::ifstream(path).rdbuf();
     EXPECT_EQ(actual.str(), expected.str());
