@@ -12,8 +12,19 @@ add_library(corvane_headers INTERFACE)
 set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
 target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 
-install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h logger/ostrel_logger.h
+install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h
+              logger/ostrel_logger.h
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
+
+# The headers tell the kit's version; they are no templates, so that they compile where they lie.
+foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
+  file(STRINGS ${header} version REGEX "^#define FLASH_CORVANE_VERSION")
+  list(TRANSFORM version REPLACE "^.* " "")
+  if(NOT version STREQUAL "${PROJECT_VERSION_MAJOR};${PROJECT_VERSION_MINOR};${PROJECT_VERSION_PATCH};\"${PROJECT_VERSION}\"")
+    message(FATAL_ERROR "${header} tells another version than ${PROJECT_VERSION}: ${version}")
+  endif()
+  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${header})
+endforeach()
 install(TARGETS flash_corvane flash_host_check ostrel_logger corvane_headers EXPORT FlashCorvane
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
@@ -54,7 +65,8 @@ install(FILES ${generated}/corvane-flash.zsh RENAME _corvane-flash
 install(FILES ${generated}/corvane-flash.fish DESTINATION ${data}/fish/vendor_completions.d)
 install(FILES ${generated}/corvane-flash.1.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
 install(DIRECTORY docs/ DESTINATION ${data}/doc/corvane-flash FILES_MATCHING PATTERN *.md)
-install(DIRECTORY examples/minimal-host DESTINATION ${data}/doc/corvane-flash/examples)
+install(DIRECTORY examples/minimal-host examples/c-host
+        DESTINATION ${data}/doc/corvane-flash/examples)
 
 # All that `cmake --install` needs, without the tests.
 add_custom_target(kit ALL DEPENDS flash_corvane flash_host_check ostrel_logger corvane-flash

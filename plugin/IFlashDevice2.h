@@ -28,6 +28,16 @@
 #include <stddef.h>
 #include <stdint.h>
 
+// The version of the kit that this header comes from, for hosts that are built against several. It
+// says nothing about a plug-in that is loaded: whatever exports CreateFlashDevice2 has exactly this
+// interface and wants exactly that IFlashHost. A change of either would be a new function.
+#ifndef FLASH_CORVANE_VERSION
+#define FLASH_CORVANE_VERSION_MAJOR 1
+#define FLASH_CORVANE_VERSION_MINOR 0
+#define FLASH_CORVANE_VERSION_PATCH 0
+#define FLASH_CORVANE_VERSION "1.0.0"
+#endif
+
 class IFlashHost;
 
 class IFlashDevice2 {

@@ -11,25 +11,35 @@ cmake --install "$1" --prefix "$trial/installed" >/dev/null
 kit=$trial/moved
 mv "$trial/installed" "$kit"
 
-cmake -G Ninja -S "$kit/share/doc/corvane-flash/examples/minimal-host" -B "$trial/build" \
-    -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_CXX_FLAGS="-Wall -Wextra -Werror ${2:+-fsanitize=$2}" >/dev/null
-cmake --build "$trial/build" >/dev/null
-diff "$here/minimal-host.txt" <("$trial/build/minimal-host")
+flags="-Wall -Wextra -Werror ${2:+-fsanitize=$2}"
+for example in minimal-host c-host; do
+    cmake --no-warn-unused-cli -G Ninja -S "$kit/share/doc/corvane-flash/examples/$example" -B "$trial/$example" \
+        -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_{C,CXX}_FLAGS="$flags" >/dev/null
+    cmake --build "$trial/$example" >/dev/null
+done
+diff "$here/minimal-host.txt" <("$trial/minimal-host/minimal-host")
+diff - <("$trial/c-host/c-host") <<'END'
+Dorna, 64KB
+progress: Performing Blank Check
+END
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 [ "$found" -ef "$kit"/lib*/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
 
-# The hosts of the kit keep the contract. The check programs nothing, which the example finds out.
+# The hosts of the kit keep the contract. The check programs nothing, which the examples find out.
 check=$(echo "$kit"/lib*/libflash_host_check.so)
 head -c 100 /dev/zero >"$trial/image.bin"
 tool=("$kit/bin/corvane-flash" --plugin "$check")
 "${tool[@]}" operation CheckProgress >"$trial/told" 2>&1 &&
     "${tool[@]}" program "$trial/image.bin" --base 0 --erase none --no-verify >>"$trial/told" 2>&1 &&
-    "$trial/build/minimal-host" "$check" CheckProgress >>"$trial/told" 2>&1 ||
+    "$trial/minimal-host/minimal-host" "$check" CheckProgress >>"$trial/told" 2>&1 &&
+    "$trial/c-host/c-host" "$check" CheckProgress >>"$trial/told" 2>&1 ||
     { cat "$trial/told"; exit 1; }
-"$trial/build/minimal-host" "$check" >>"$trial/told" 2>&1 && exit 1
+for example in minimal-host c-host; do
+    "$trial/$example/$example" "$check" >>"$trial/told" 2>&1 && exit 1
+done
 grep 'expected' "$trial/told" && exit 1
-[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = 2 ] || exit 1
+[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = 3 ] || exit 1
 
 share=$kit/share
 bash -n "$share/bash-completion/completions/corvane-flash"

@@ -25,6 +25,17 @@ tags_in() {
              s,^ *// \[(reserved; never called)\]$,\1,p' "$1" | paste -d ' ' - -
 }
 
+# "SLOT: NAME" for each slot of both interfaces: once from slots.txt, once from the header in C,
+# where overloads have names of their own.
+expected_names() {
+    sed -nE '/IFlash/s/slot ([0-9]+): .*::([A-Za-z0-9]+)\(.*/\1: \2/p' "$here/slots.txt" |
+        sed 's/^2: AddressW.*/2: RangeWithinFlash/; s/^3: WriteDataTo.*/3: WriteHalfwordsToFlash/'
+}
+names_in() {
+    tr '\n' ' ' <"$1" | grep -oE '/\* [0-9]+ \*/ [a-z]+[^;]*;' |
+        sed -E 's,^/\* ([0-9]+) \*/.*FLASH_CORVANE_CALL\* ([A-Za-z0-9]+)\).*,\1: \2,'
+}
+
 dump=$(mktemp)
 trap 'rm -f "$dump"' EXIT
 failed=0
@@ -37,4 +48,6 @@ for row in "plugin/IFlashHost.h IFlashHost host" "plugin/IFlashDevice2.h IFlashD
     diff -u --label "slots of $class" --label "tags in its header" \
         <(expected_tags "$class" "$side") <(tags_in "$root/$header") || failed=1
 done
+diff -u --label released --label "slots in C" \
+    <(expected_names) <(names_in "$root/plugin/flash_corvane.h") || failed=1
 exit $failed

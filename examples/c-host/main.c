@@ -1,0 +1,272 @@
+/* A host in C: fills the table of slots, loads the plug-in, creates a device, and runs an operation
+ * or programs a few bytes into the pretend device below.
+ *
+ *     c-host [LIBRARY [OPERATION]]
+ *
+ * A real host has its debug probe in the place of memory, Move and the four functions behind it.
+ */
+
+#include <dlfcn.h>
+#include <flash_corvane/flash_corvane.h>
+#include <stdio.h>
+#include <stdlib.h>
+#include <string.h>
+#include <time.h>
+
+enum { FlashSize = 0x10000, SectorSize = 0x400, RamSize = 0x4000, RegisterCount = 64 };
+
+static const uint32_t RamStart = 0x20000000;
+static const uint32_t FlashAddress = 0x400FD000;
+static const uint32_t FlashCommand = 0x400FD008;
+
+struct Setting {
+    char name[40];
+    char value[300];
+};
+
+struct Host {
+    CorvaneHost interface; /* comes first, so that the two pointers are the same */
+    unsigned char flash[FlashSize];
+    unsigned char ram[RamSize];
+    struct {
+        uint32_t address, value;
+    } registers[RegisterCount];
+    struct Setting settings[32];
+    int errors;
+};
+
+static struct Host* Self(CorvaneHost* host) {
+    return (struct Host*)host;
+}
+
+static void Fail(const char* what, const char* text) {
+    fprintf(stderr, "c-host: %s: %s\n", what, text);
+    exit(1);
+}
+
+/* Settings. The plug-in has no defaults. */
+
+static struct Setting* Find(struct Host* self, const char* name) {
+    for (size_t i = 0; i < sizeof self->settings / sizeof self->settings[0]; ++i) {
+        if (strcmp(self->settings[i].name, name) == 0) return &self->settings[i];
+    }
+    return NULL;
+}
+
+static const char* FLASH_CORVANE_CALL GetProperty(CorvaneHost* host, const char* name) {
+    const struct Setting* setting = *name == '\0' ? NULL : Find(Self(host), name);
+    return setting == NULL ? NULL : setting->value;
+}
+
+static const char* FLASH_CORVANE_CALL SetProperty(CorvaneHost* host, const char* name,
+                                                  const char* value) {
+    struct Setting* setting = Find(Self(host), name);
+    if (setting == NULL) setting = Find(Self(host), ""); /* the first free one */
+    if (setting == NULL || strlen(name) >= sizeof setting->name ||
+        strlen(value) >= sizeof setting->value)
+        return "no room for the setting";
+    strcpy(setting->name, name);
+    strcpy(setting->value, value);
+    return NULL;
+}
+
+/* Memory: flash from 0, RAM from 0x20000000; every other word address is a register. */
+
+static unsigned char* At(struct Host* self, uint64_t address, size_t bytes) {
+    if (address + bytes <= FlashSize) return self->flash + address;
+    if (address >= RamStart && address - RamStart + bytes <= RamSize)
+        return self->ram + (address - RamStart);
+    for (size_t i = 0; bytes == 4 && i < RegisterCount; ++i) {
+        if (self->registers[i].address == 0) self->registers[i].address = (uint32_t)address;
+        if (self->registers[i].address == address) return (unsigned char*)&self->registers[i].value;
+    }
+    return NULL;
+}
+
+static uint32_t* Register(struct Host* self, uint32_t address) {
+    return (uint32_t*)(void*)At(self, address, 4);
+}
+
+static void EraseIfCommanded(struct Host* self) {
+    const uint32_t start = *Register(self, FlashAddress);
+    if (*Register(self, FlashCommand) != 0xA4420002) return;
+    if (start < FlashSize) memset(self->flash + start, 0xFF, SectorSize);
+    *Register(self, FlashCommand) = 0;
+}
+
+/* What FlashLoaderMerrow.out does on a real target, done at once. */
+static void ServeLoader(struct Host* self) {
+    for (uint32_t block = 0; block < 2; ++block) {
+        uint32_t fields[4]; /* the loader's own, flash address, byte count, status */
+        memcpy(fields, self->ram + 0x1000 + 16 * block, sizeof fields);
+        if (fields[3] != 0xFFFFFFFF) continue;
+        for (uint32_t i = 0; i < fields[2] && fields[1] + i < FlashSize; ++i)
+            self->flash[fields[1] + i] &= self->ram[0x800 * block + i];
+        memset(self->ram + 0x100C + 16 * block, 0, 4);
+    }
+}
+
+static const char* FLASH_CORVANE_CALL ReadMemory(CorvaneHost* host, void* buffer, size_t count,
+                                                 uint64_t address, int16_t page, size_t width) {
+    const unsigned char* memory = At(Self(host), address, count * width);
+    (void)page;
+    if (memory == NULL) return "can't read target memory: nothing at that address";
+    memcpy(buffer, memory, count * width);
+    return NULL;
+}
+
+static const char* FLASH_CORVANE_CALL WriteMemory(CorvaneHost* host, const void* buffer,
+                                                  size_t count, uint64_t address, int16_t page,
+                                                  size_t width) {
+    struct Host* self = Self(host);
+    unsigned char* memory = At(self, address, count * width);
+    (void)page;
+    if (memory == NULL || address < FlashSize)
+        return "can't write target memory: nothing to write at that address";
+    memcpy(memory, buffer, count * width);
+    EraseIfCommanded(self);
+    ServeLoader(self);
+    return NULL;
+}
+
+/* The core. There is none here. */
+
+static const char* FLASH_CORVANE_CALL LoadProgram(CorvaneHost* host, const char* fileName,
+                                                  const char* second, const char* directory) {
+    (void)host, (void)fileName, (void)second, (void)directory;
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL RunTarget(CorvaneHost* host) {
+    (void)host;
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL HaltTarget(CorvaneHost* host) {
+    (void)host;
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL ResetTarget(CorvaneHost* host, bool flag) {
+    (void)host, (void)flag;
+    return NULL;
+}
+
+/* What the user sees. */
+
+static const char* FLASH_CORVANE_CALL BeginProgress(CorvaneHost* host, const char* title) {
+    (void)host;
+    printf("progress: %s\n", title);
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL UpdateProgress(CorvaneHost* host, uint32_t percent,
+                                                     const char* text) {
+    (void)host, (void)percent, (void)text;
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL EndProgress(CorvaneHost* host) {
+    (void)host;
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL ShowError(CorvaneHost* host, const char* text) {
+    ++Self(host)->errors;
+    printf("error: %s\n", text);
+    return NULL;
+}
+static const char* FLASH_CORVANE_CALL ShowMessage(CorvaneHost* host, const char* text) {
+    (void)host;
+    printf("message: %s\n", text);
+    return NULL;
+}
+
+static const char* FLASH_CORVANE_CALL GetDirectory(CorvaneHost* host) {
+    (void)host;
+    return "./";
+}
+static const char* FLASH_CORVANE_CALL Sleep(CorvaneHost* host, uint32_t milliseconds) {
+    struct timespec left = {milliseconds / 1000, milliseconds % 1000 * 1000000L};
+    (void)host;
+    while (nanosleep(&left, &left) != 0) {
+    }
+    return NULL;
+}
+
+/* The reserved slots stay null: nobody calls them. */
+static const CorvaneHostSlots slots = {
+    .GetProperty = GetProperty,
+    .SetProperty = SetProperty,
+    .LoadProgram = LoadProgram,
+    .RunTarget = RunTarget,
+    .HaltTarget = HaltTarget,
+    .ResetTarget = ResetTarget,
+    .ReadMemory = ReadMemory,
+    .WriteMemory = WriteMemory,
+    .BeginProgress = BeginProgress,
+    .UpdateProgress = UpdateProgress,
+    .EndProgress = EndProgress,
+    .ShowError = ShowError,
+    .ShowMessage = ShowMessage,
+    .GetDirectory = GetDirectory,
+    .Sleep = Sleep,
+};
+
+static struct Host* NewHost(void) {
+    static const struct Setting settings[] = {
+        {"FlashProgramOption", "Necessary Pages Only"},
+        {"FlashProgramBlankCheckOption", "1"},
+        {"FlashProgramCRCOption", "0"},
+        {"FlashResetSetting", "0"},
+        {"FlashTimeoutValue", "5"},
+        {"FlashVerboseMode", "0"},
+    };
+    struct Host* self = calloc(1, sizeof *self);
+    if (self == NULL) Fail("starting", "out of memory");
+    self->interface.slots = &slots;
+    memcpy(self->settings, settings, sizeof settings);
+    *Register(self, 0x400FE000) = 0x000A0000; /* class field 10, Dorna */
+    *Register(self, 0x400FDFC0) = 31;         /* flash: (31 + 1) * 2 KiB, in sectors of 1 KiB */
+    *Register(self, 0x400FDFC4) = 63;         /* RAM: (63 + 1) * 256 bytes */
+    return self;
+}
+
+static void Check(const char* what, const char* errorText) {
+    if (errorText != NULL) Fail(what, errorText);
+}
+
+static void Program(struct Host* host, CorvaneDevice* device) {
+    static const unsigned char data[] = "Hello, flash";
+    const uint32_t address = 0x1004;
+    bool first = false, last = false;
+    Check("address", device->slots->AddressWithinFlash(device, address, &first));
+    Check("address", device->slots->AddressWithinFlash(device, address + sizeof data - 1, &last));
+    if (!first || !last) Fail("planning", "the data doesn't fit into flash");
+
+    Check("start of the load", device->slots->ResetSettings(device, 0));
+    Check("programming", device->slots->WriteDataToFlash(device, data, address, sizeof data, 1));
+    Check("end of the load", device->slots->ResetSettings(device, 2));
+    if (host->errors == 0 && memcmp(host->flash + address, data, sizeof data) != 0)
+        Fail("comparing", "flash differs from what was programmed");
+}
+
+int main(int argc, char** argv) {
+    void* library = dlopen(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
+    CorvaneCreateFlashDevice2 create = NULL;
+    struct Host* host = NewHost();
+    CorvaneDevice* device = NULL;
+    bool flashAvailable = false;
+    const char* operations = NULL;
+    if (library == NULL) Fail("loading", dlerror());
+    *(void**)&create = dlsym(library, "CreateFlashDevice2");
+    if (create == NULL) Fail("loading", dlerror());
+
+    Check("creating", create("", "", "", &host->interface, &device));
+    Check("initialising", device->slots->Initialize(device, &flashAvailable, &operations));
+    printf("%s, %s\n", Find(host, "DeviceInfoFamily")->value,
+           Find(host, "DeviceInfoFlashSize")->value);
+    if (argc > 2)
+        Check(argv[2], device->slots->PerformOperation(device, argv[2]));
+    else if (flashAvailable)
+        Program(host, device);
+    device->slots->Destroy(device);
+    if (host->errors != 0) Fail("working", "the plug-in has shown an error, see above");
+    dlclose(library);
+    free(host);
+    return 0;
+}
