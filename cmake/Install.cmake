@@ -5,6 +5,9 @@
 include(CMakePackageConfigHelpers)
 include(cmake/Package.cmake)
 
+# The libraries are loaded, not linked, and the maker's logger has the file name of the stand-in:
+# they stay out of the directory that everybody's libraries lie in.
+set(plugin_directory ${CMAKE_INSTALL_LIBDIR}/flash_corvane)
 set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
 
 # The headers as a target of their own: a host sees the plug-in through them and dlopen alone.
@@ -26,7 +29,7 @@ foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
   set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${header})
 endforeach()
 install(TARGETS flash_corvane flash_host_check ostrel_logger corvane_headers EXPORT FlashCorvane
-        LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+        LIBRARY DESTINATION ${plugin_directory})
 install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 
 install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake
@@ -64,6 +67,7 @@ install(FILES ${generated}/corvane-flash.zsh RENAME _corvane-flash
         DESTINATION ${data}/zsh/vendor-completions)
 install(FILES ${generated}/corvane-flash.fish DESTINATION ${data}/fish/vendor_completions.d)
 install(FILES ${generated}/corvane-flash.1.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
+install(FILES README.md CHANGELOG.md DESTINATION ${data}/doc/corvane-flash)
 install(DIRECTORY docs/ DESTINATION ${data}/doc/corvane-flash FILES_MATCHING PATTERN *.md)
 install(DIRECTORY examples/minimal-host examples/c-host
         DESTINATION ${data}/doc/corvane-flash/examples)
@@ -71,4 +75,4 @@ install(DIRECTORY examples/minimal-host examples/c-host
 # All that `cmake --install` needs, without the tests.
 add_custom_target(kit ALL DEPENDS flash_corvane flash_host_check ostrel_logger corvane-flash
   ${generated}/corvane-flash.bash ${generated}/corvane-flash.zsh ${generated}/corvane-flash.fish
-  ${generated}/corvane-flash.1.gz)
+  ${generated}/corvane-flash.1.gz ${generated}/changelog.gz)

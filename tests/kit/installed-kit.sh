@@ -24,10 +24,10 @@ progress: Performing Blank Check
 END
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
-[ "$found" -ef "$kit"/lib*/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
+[ "$found" -ef "$kit"/lib*/flash_corvane/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
 
 # The hosts of the kit keep the contract. The check programs nothing, which the examples find out.
-check=$(echo "$kit"/lib*/libflash_host_check.so)
+check=$(echo "$kit"/lib*/flash_corvane/libflash_host_check.so)
 head -c 100 /dev/zero >"$trial/image.bin"
 tool=("$kit/bin/corvane-flash" --plugin "$check")
 "${tool[@]}" operation CheckProgress >"$trial/told" 2>&1 &&

@@ -1,0 +1,36 @@
+#!/bin/sh
+# debian-changelog.sh CHANGELOG.md MAINTAINER: the releases in it as Debian writes them. What isn't
+# released has no date and is left out.
+exec awk -v maintainer="$2" '
+    function flush(  count, words, i, line) {
+        count = split(entry, words)
+        line = "  *"
+        for (i = 2; i <= count; ++i) {
+            if (length(line " " words[i]) > 78) {
+                print line
+                line = "   "
+            }
+            line = line " " words[i]
+        }
+        if (count > 0) print line
+        entry = ""
+    }
+    function finish(  command, stamp) {
+        flush()
+        if (date == "") return
+        command = "date -R -u -d " date
+        command | getline stamp
+        close(command)
+        printf "\n -- %s  %s\n\n", maintainer, stamp
+    }
+    /^## / {
+        finish()
+        date = match($0, /[0-9]+-[0-9]+-[0-9]+/) ? substr($0, RSTART, RLENGTH) : ""
+        if (date != "") printf "corvane-flash (%s) unstable; urgency=medium\n\n", $2
+        next
+    }
+    date == "" { next }
+    /^- / { flush() }
+    /^(- |  )/ { entry = entry " " $0 }
+    END { finish() }
+' "$1"
