@@ -65,6 +65,9 @@ TEST(Identification, OfEveryClass) {
     const Identified rows[] = {
         {"ravik,flash=64K,ram=8K", "Ravik", "64KB", "8KB", "1KB"},
         {"ravik,id=0x00020000", "Ravik", "64KB", "8KB", "1KB"},
+        {"ravik,id=0x0F0800FF,flash=64K,ram=8K", "Ravik", "64KB", "8KB", "1KB"},
+        {"quen,id=0x7F05FFFF,flash=256K,ram=8K", "Quen", "256KB", "8KB", "1KB"},
+        {"mesk,id=0x0F0301FF,flash=96K,ram=64K", "Mesk Rev.B", "96KB", "64KB", "1KB"},
         {"tolva,revision=A,flash=256K,ram=64K", "Tolva Rev.A", "256KB", "64KB", "1KB"},
         {"tolva,revision=B,flash=256K,ram=64K", "Tolva Rev.B", "256KB", "64KB", "1KB"},
         {"tolva,id=0x00010200,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},

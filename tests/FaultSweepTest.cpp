@@ -163,7 +163,7 @@ std::vector<Work> AllWorks() {
     add("ReadMACAddress", "tolva", "FlashMACAddrInput", "ff-ff-ff-ff-ff-ff");
     add("ProgramUserRegister0", "tolva", nullptr, nullptr, {0x12AB, ~0U, ~0U, ~0U});
     add("ProgramUserRegister1", "quen", nullptr, nullptr, {~0U, 0xABCDEF01, ~0U, 0xABCDEF01});
-    add("ProgramMACAddress", "dorna", nullptr, nullptr, {0xB61A00, 0x30201, 0xB61A00, 0x30201});
+    add("ProgramMACAddress", "dorna", nullptr, nullptr, {0xC31B02, 0x60504, 0xC31B02, 0x60504});
     for (const char* device :
          {"ravik,flash=32K", "tolva,flash=32K", "mesk,flash=32K", "orrin,flash=32K",
           "pell,flash=32K", "quen,flash=32K,keyconfig=EF,chunk-time=20ms",

@@ -57,6 +57,33 @@ void CountLines(RecordingHost& host, const std::string& line) {
     host.transcript.push_back(std::to_string(count) + " times: " + line);
 }
 
+// The same on other devices, each with the settings of the first; the time that passed is noted.
+void OnDevices(RecordingHost& host, std::initializer_list<const char*> devices,
+               void (*run)(RecordingHost&, Plugin&)) {
+    for (const char* device : devices) {
+        host.transcript.emplace_back(device);
+        RecordingHost other(device, host.settings);
+        Plugin plugin(other);
+        other.transcribe = true;
+        const auto start = test::VirtualNow();
+        run(other, plugin);
+        std::ranges::move(other.transcript, std::back_inserter(host.transcript));
+        const auto passed =
+            std::chrono::round<std::chrono::milliseconds>(test::VirtualNow() - start);
+        host.transcript.push_back(std::to_string(passed.count()) + " ms");
+    }
+}
+
+void CheckRange(RecordingHost& host, Plugin& plugin, const char* name, const char* start,
+                const char* end) {
+    for (const char* prefix : {"FlashBlankCheck", "FlashChecksum"}) {
+        host.settings[std::string(prefix) + "Selection"] = "By Address Range";
+        host.settings[std::string(prefix) + "StartAddr"] = start;
+        host.settings[std::string(prefix) + "EndAddr"] = end;
+    }
+    Perform(host, plugin, name);
+}
+
 const Scenario Scenarios[] = {
     {"initialize",
      "tolva,revision=B,flash=256K,ram=64K",
@@ -66,6 +93,53 @@ const Scenario Scenarios[] = {
          const char* operations = nullptr;
          Returned(host, "Initialize", plugin->Initialize(&flash, &operations));
          host.transcript.push_back(std::string(flash ? "flash, " : "no flash, ") + operations);
+         bool within = false;
+         Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0x3FFFF, &within));
+         Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0, -1, &within));
+         Returned(host, "special region", plugin->AddressWithinSpecialRegion(0, &within));
+     }},
+    // What belongs to a load and what is left of it: a reset of the target is allowed once, an
+    // erase is made once, and mode 4 keeps it. The clock begins with none of its bits set.
+    {"load-state",
+     "tolva,revision=A,flash=64K",
+     {{"FlashProgramOption", "Use the Erase Options Specified Below"},
+      {"FlashEraseType", "Entire Flash"},
+      {"FlashResetSetting", "0"}},
+     [](RecordingHost& host, Plugin& plugin) {
+         const std::uint32_t clock = 0;
+         host.Device().Write(&clock, 1, 0x400FE060, 1, 4);
+         host.settings.erase("FlashCrystalFreq");
+         Load(host, plugin, 0, 0);
+         host.settings["FlashResetSetting"] = "1";
+         Load(host, plugin, 0, 0);
+         Reset<4>(host, plugin);
+         Load(host, plugin, 0, 0);
+         Reset<0>(host, plugin);
+         Load(host, plugin, 0, 0);
+     }},
+    {"erase-whole-by-class",
+     "tolva",
+     {{"FlashEraseType", "Entire Flash"}, {"FlashResetSetting", "0"}},
+     [](RecordingHost& host, Plugin&) {
+         OnDevices(host,
+                   {"mesk,flash=64K", "mesk,flash=128K", "ravik,flash=128K", "orrin,id=0x10040102",
+                    "quen,keyconfig=0", "dorna,keyconfig=0xFFFFFFFF"},
+                   [](RecordingHost& other, Plugin& plugin) { Perform(other, plugin, "Erase"); });
+     }},
+    // A commit of 5 s is waited for, and a loader as many polls as fit into the time-out.
+    {"time-limits",
+     "tolva",
+     {{"FlashProgramOption", "Do Not Erase Flash Memory"}, {"FlashTimeoutValue", "20"}},
+     [](RecordingHost& host, Plugin&) {
+         OnDevices(host, {"mesk,commit-time=4s", "mesk,commit-time=6s"},
+                   [](RecordingHost& other, Plugin& plugin) {
+                       Perform(other, plugin, "ProgramUserRegister1");
+                       CountLines(other, "read 1x4 0x400FD008 page 1 = 0x00000008");
+                   });
+         OnDevices(host, {"orrin,loader=hangs"}, [](RecordingHost& other, Plugin& plugin) {
+             Load(other, plugin, 0, 4096);
+             CountLines(other, "read 1x4 0x2000100C page 1 = 0xFFFFFFFF");
+         });
      }},
     // Two sections share a sector; partial blocks at both ends; verbose; reset once only.
     {"load-necessary-pages",
@@ -178,6 +252,20 @@ const Scenario Scenarios[] = {
          Perform(host, plugin, "BlankCheck");
          host.settings["FlashBlankCheckSelection"] = "";
          Perform(host, plugin, "BlankCheck");
+
+         // Chunks of 8 bytes: all programmed, every other one, the last one.
+         constexpr std::array<std::uint8_t, 8> cells = {0x00, 0xFF, 0x00, 0xFF,
+                                                        0x00, 0xFF, 0x00, 0xFF};
+         host.Device().Flash().Preset(0x100, std::array<std::uint8_t, 8>{});
+         host.Device().Flash().Preset(0x207, cells);
+         CheckRange(host, plugin, "BlankCheck", "100", "107");
+         CheckRange(host, plugin, "BlankCheck", "200", "207");
+         CheckRange(host, plugin, "BlankCheck", "208", "20F");
+         CheckRange(host, plugin, "BlankCheck", "7", "8");
+         CheckRange(host, plugin, "BlankCheck", "FFF0", "10000");
+         CheckRange(host, plugin, "CalculateChecksum", "FFF0", "10000");
+         host.failNext = "read";
+         CheckRange(host, plugin, "BlankCheck", "0", "0");
      }},
     {"checksum",
      "dorna,flash=64K",

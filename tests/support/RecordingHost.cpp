@@ -29,7 +29,7 @@ const Settings kOrdinarySettings = {
     {"FlashEraseEndAddr", "0"},
     {"FlashCrystalFreq", "8"},
     {"FlashTimeoutValue", "5"},
-    {"FlashMACAddrInput", "00-1A-B6-01-02-03"},
+    {"FlashMACAddrInput", "02-1B-C3-04-05-06"},
     {"FlashMACAddrCommit", "1"},
     {"FlashUserRegister0Input", "12ab"},
     {"FlashUserRegister0Commit", "0"},
