@@ -43,7 +43,7 @@ Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
         Outcome outcome = line.command->run(context);
         SaveSettings(reporter, settings);
         return outcome;
-    } catch (const Failure&) {
+    } catch (...) {
         SaveSettings(reporter, settings);
         throw;
     }
@@ -55,16 +55,17 @@ Outcome Guarded(Reporter& reporter, Action&& action) try {
     Outcome outcome = action();
     if (!outcome.error.empty()) reporter.Error(outcome.error);
     return outcome;
-} catch (const ShownFailure& failure) {
+} catch (const DeviceFailure& failure) {
     reporter.Error(failure.Remark());
     return {failure.Status(), failure.what(), failure.Result()};
 } catch (const Failure& failure) {
     reporter.Error(failure.what());
     return {failure.Status(), failure.what()};
 } catch (const std::exception& error) {
-    const std::string text = fmt::format("the host ran into {}; please report it", error.what());
+    const std::string text =
+        fmt::format("an error of corvane-flash itself: {}; please report it", error.what());
     reporter.Error(text);
-    return {ExitStatus::DeviceFailed, text};
+    return {ExitStatus::InternalError, text};
 }
 
 /// Results that nobody could receive are no success; a reader that has had enough is.

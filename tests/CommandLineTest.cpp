@@ -132,6 +132,11 @@ const Row kDone[] = {
      "gone after the next reset"},
     {"tool mac program 0:1a:b6:1:2:3", 0,
      "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n", "gone after the next reset"},
+    {"tool --set FlashMACAddrCommit=1 mac program 0:1a:b6:1:2:3", 0, "is 00-1a-b6-01-02-03",
+     "FlashMACAddrCommit is 1 (command line)\n"},
+    {"tool operation ProgramUserRegister0 --set FlashUserRegister0Input=12", 0,
+     "user register 0 holds 0x00000012 (not committed), user register 1 holds 0xffffffff\n",
+     nullptr},
     {"tool mac program 01-00-5e-00-00-01 --force", 0, "is 01-00-5e-00-00-01", nullptr},
     {"tool operation BlankCheck", 0, "Blank-checked 256 KiB", "Operation completed successfully."},
     {"tool operation ReadMACAddress", 0, "", "MAC address value: ff-ff-ff-ff-ff-ff"},
@@ -163,6 +168,15 @@ const Row kFailing[] = {
      "erased 0 bytes of 256 KiB and gave no reason"},
     {"tool erase --all --sim mesk,flash=256K", 1, "", "Error erasing flash..\n"},
     {"tool erase --all --sim velk", 1, "", "the device (Velk) has no flash"},
+    {"tool blank-check --sim tolva,fail-access=9", 1, "",
+     "operation BlankCheck failed: Reading 32752 x 1 bytes at 0x0000FFE0 on page 0: "},
+    {"tool mac program 021bc3040506 --commit --sim quen,fail-access=22", 1, "",
+     "; user register 0 holds 0x00c31b02 (committed), user register 1 holds 0x00060504 (perhaps "
+     "committed); run"},
+    {"tool register program 0 12 --commit --sim quen,fail-from=10", 1, "",
+     "user register 0 may have changed and can't be read (not committed), user register 1 is as it "
+     "was; the target couldn't be halted; "},
+    {"tool mac program 021bc3040506 --sim quen,fail-access=8", 1, "", "registers are as they were"},
     {"tool register read 0 --sim ravik", 1, "", "does not have user reigsters"},
     {"tool operation Nonsense", 1, "", "'Nonsense' is none of the plug-in's operations: Erase |"},
     // The command line.
@@ -193,6 +207,8 @@ const Row kFailing[] = {
     {"tool mac program 00-1a-b6-01-02", 2, "", "is no MAC address"},
     {"tool mac program 01-00-5e-00-00-01", 2, "", "is a multicast address"},
     {"tool operation ProgramMACAddress", 2, "", "is all ones"},
+    {"tool operation ProgramUserRegister1", 2, "", "set FlashUserRegister1Input with --set"},
+    {"tool settings FlashMACAddrInput=021bc3040506", 2, "", "belongs to one board and isn't kept"},
     // Files.
     {"tool program none.elf", 3, "", "none.elf"},
     {"tool program data.bin", 3, "", "--base"},
@@ -213,6 +229,8 @@ const Row kFailing[] = {
     {"tool info --sim-file data.bin", 4, "", "data.bin"},
     {"tool info --sim tolva,fail-access=2", 4, "",
      "can't reach the target: identifying the device"},
+    {"tool erase --all --sim tolva,registers=zeros", 4, "", "nothing answers: "},
+    {"tool info --sim tolva,registers=ones", 4, "", "register reads 0xffffffff"},
     // Flash that isn't as it should be.
     {"tool verify small.hex", 5, "Compared      4 bytes",
      "first at 0x10, expected 0x01, actual 0xff; 4 bytes differ; no bit needs an erase"},
@@ -305,6 +323,9 @@ const Row kStories[] = {
      "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\nff-ff-ff-ff-ff-ff\n"
      "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n00-1a-b6-01-02-03\n0x00b61a00\n",
      ""},
+    {"tool -q --sim-file a mac program 021bc3040506 --commit; tool -q --sim-file a mac read\n"
+     "tool --sim-file b operation ProgramMACAddress",
+     2, "02-1b-c3-04-05-06\n02-1b-c3-04-05-06\n", "is all ones"},
     {"tool -q --sim quen,flash=512K --sim-file d program small.hex; tool -q --sim-file d info | "
      "head -1; tool --sim-file d --sim quen,flash=256K info",
      2, "Family      Quen\n", "flash"},

@@ -199,14 +199,15 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
 
     // Two runs at once keep different things; neither loses the other's.
     SettingStore other = LoadSettings(user, {});
-    store.Keep(keys::kMacInput, "0-1a-b6-1-2-4");
-    store.Keep(keys::kFamily, "a \"family\"\n");
+    store.Publish(keys::kMacInput, "0-1a-b6-1-2-4");  // of this board alone
+    EXPECT_EQ(store.Published(keys::kMacInput), "00-1a-b6-01-02-04");
+    store.Publish(keys::kFamily, "a \"family\"\n");
     store.Keep("Of a later plug-in", "x");
     store.Save();
     other.Keep(keys::kChecksumValue, "abcd");
     other.Save();
     SettingStore again = LoadSettings(user, {});
-    EXPECT_EQ(again.Kept(keys::kMacInput), "00-1a-b6-01-02-04");
+    EXPECT_EQ(again.Published(keys::kFamily) + again.Kept(keys::kMacInput), "");
     EXPECT_EQ(again.Text(keys::kMacInput), "00-1a-b6-01-02-03");
     EXPECT_EQ(again.Text(keys::kFamily), "a \"family\"\n");
     EXPECT_EQ(again.Text("Of a later plug-in"), "x");

@@ -14,6 +14,7 @@ enum class ExitStatus {
     BadFile = 3,
     Unreachable = 4,
     ContentsDiffer = 5,
+    InternalError = 70,
     Interrupted = 130,
 };
 
@@ -28,6 +29,7 @@ inline constexpr struct {
     {ExitStatus::BadFile, "a file is missing, unreadable or wrong, or can't be written"},
     {ExitStatus::Unreachable, "the plug-in or the target can't be loaded or reached"},
     {ExitStatus::ContentsDiffer, "the flash differs from what was expected, or isn't blank"},
+    {ExitStatus::InternalError, "an error of the tool itself, to be reported to its makers"},
     {ExitStatus::Interrupted, "interrupted"},
 };
 

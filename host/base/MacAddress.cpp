@@ -37,6 +37,15 @@ std::uint32_t MacAddress::Register(unsigned index) const {
            std::uint32_t{bytes.at(first + 2)} << 16;
 }
 
+MacAddress MacAddress::FromRegisters(std::uint32_t first, std::uint32_t second) {
+    MacAddress address;
+    for (unsigned i = 0; i < 3; ++i) {
+        address.bytes.at(i) = static_cast<std::uint8_t>(first >> (8 * i));
+        address.bytes.at(i + 3) = static_cast<std::uint8_t>(second >> (8 * i));
+    }
+    return address;
+}
+
 std::string MacAddress::Objection() const {
     const auto all = [this](std::uint8_t value) {
         return std::all_of(bytes.begin(), bytes.end(), [=](auto byte) { return byte == value; });

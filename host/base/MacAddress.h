@@ -21,6 +21,9 @@ struct MacAddress {
     /// What user register 0 or 1 holds for this address.
     std::uint32_t Register(unsigned index) const;
 
+    /// The address that the two registers hold, whose highest bytes don't belong to it.
+    static MacAddress FromRegisters(std::uint32_t first, std::uint32_t second);
+
     /// Why no device should have this address, or an empty text.
     std::string Objection() const;
 };

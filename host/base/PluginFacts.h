@@ -41,11 +41,19 @@ inline constexpr char kChecksumTitle[] = "CRC Calculation";
 inline constexpr std::int16_t kFlashPage = 0;
 inline constexpr std::int16_t kRamPage = 1;
 
+inline constexpr std::uint32_t kIdentificationRegister = 0x400FE000;
+inline constexpr std::array<std::uint32_t, 2> kUserRegisters{0x400FE1E0, 0x400FE1E4};
+
 // The flash command register takes an erase command in its low bits, under a key in the high half,
 // and shows the same bit until the erase is done.
 inline constexpr std::uint32_t kFlashCommandRegister = 0x400FD008;
 inline constexpr std::uint32_t kEraseSectorBit = 0x2;
 inline constexpr std::uint32_t kEraseAllBit = 0x4;
+
+// It commits the user register that the flash address register names in the same way.
+inline constexpr std::uint32_t kFlashAddressRegister = 0x400FD000;
+inline constexpr std::uint32_t kCommitBit = 0x8;
+inline constexpr std::uint32_t kCommitOperand = 0x80000000;  ///< and the register's index
 
 // The loader's two chunk buffers lie one behind the other, then its two parameter blocks. It
 // programs blocks of 128 bytes; the plug-in widens each section to whole ones.

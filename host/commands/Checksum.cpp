@@ -60,8 +60,7 @@ Outcome OfFlash(Context& context) {
     return WithDevice(context, [&](FlashDevice& device) {
         const AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
         const Outcome operation = RunOperation(device, plugin::kCalculateChecksum);
-        Outcome outcome =
-            Answer(context, range, "0x" + context.settings.Kept(keys::kChecksumValue));
+        Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
         outcome.result.update(operation.result);
         return outcome;
     });

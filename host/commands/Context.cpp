@@ -17,7 +17,8 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
     Outcome outcome;
     try {
         outcome = work(device);
-    } catch (const Failure&) {
+    } catch (...) {
+        device.LeaveHalted();
         try {
             device.Save();
         } catch (const Failure& second) {

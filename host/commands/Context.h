@@ -19,7 +19,7 @@ struct Context {
 };
 
 /// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
-/// are kept, except after a mere look (`dryRun`).
+/// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
 /// --format and --base.

@@ -15,7 +15,7 @@ namespace {
 /// Read through the plug-in; the host has padded it to two digits a byte.
 std::string ReadMac(FlashDevice& device) {
     device.Perform(plugin::kReadMac, Talk::Verbose);
-    return device.Settings().Kept(keys::kMacInput);
+    return device.Published(keys::kMacInput);
 }
 
 Outcome Show(Context& context, FlashDevice& device) {
@@ -27,14 +27,15 @@ Outcome Show(Context& context, FlashDevice& device) {
 Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
     const std::string old = ReadMac(device);
     context.settings.Set(Origin::CommandLine, keys::kMacInput, mac.Text());
-    context.settings.Set(Origin::CommandLine, keys::kMacCommit, context.options.commit ? "1" : "0");
+    ChooseCommit(device, keys::kMacCommit, context.options.commit);
     device.Perform(plugin::kProgramMac);
-    const std::string now = ReadMac(device);
+    Outcome outcome;
+    const RegisterValues values =
+        CheckRegisters(device, {mac.Register(0), mac.Register(1)}, outcome);
+    const std::string now = MacAddress::FromRegisters(*values[0], *values[1]).Text();
     context.reporter.Result(fmt::format("MAC address: was {}, is {}", old, now));
-    Outcome outcome{.result = {{"old", old}, {"mac", now}, {"committed", context.options.commit}}};
-    for (const unsigned index : {1U, 0U})
-        RequireRegister(outcome, index, mac.Register(index), ReadRegister(device, index));
-    SayWhetherCommitted(context.reporter, context.options.commit);
+    outcome.result.update({{"old", old}, {"mac", now}});
+    SayWhetherCommitted(device, outcome);
     return outcome;
 }
 

@@ -7,11 +7,22 @@
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/RangeOperation.h"
+#include "host/flashing/UserRegisters.h"
 #include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
 namespace {
+
+/// A register value to program must have been named; no default is meant for a board.
+void RequireRegisterSetting(const Context& context, unsigned index) {
+    const char* key = keys::kRegisterInputs[index];
+    if (context.settings.Get(key).origin != Origin::Default) return;
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("nothing says what to program; set {0} with --set, or use "
+                              "'corvane-flash register program {1} VALUE'",
+                              key, index));
+}
 
 /// The default of the address setting is what an unprogrammed device holds; nobody means that.
 void RequireMacSetting(const Context& context) {
@@ -30,18 +41,34 @@ bool IsListed(const std::string& operations, const std::string& name) {
            std::string::npos;
 }
 
+void RequireInput(const Context& context, const std::string& name) {
+    if (name == plugin::kProgramMac) RequireMacSetting(context);
+    for (const unsigned index : {0U, 1U})
+        if (name == plugin::ProgramRegisterOperation(index)) RequireRegisterSetting(context, index);
+}
+
+Outcome RunOn(FlashDevice& device, const std::string& name) {
+    Outcome outcome = RunOperation(device, name);
+    const RegisterValues written{device.Registers().Of(0).written,
+                                 device.Registers().Of(1).written};
+    if (!written[0] && !written[1]) return outcome;
+    const RegisterValues values = CheckRegisters(device, written, outcome);
+    device.Output().Result(Describe(device.Registers(), values));
+    return outcome;
+}
+
 Outcome Run(Context& context) {
     const std::string& name = *context.options.argument;
-    if (name == plugin::kProgramMac) RequireMacSetting(context);
+    RequireInput(context, name);
     return WithDevice(context, [&](FlashDevice& device) {
         try {
-            return RunOperation(device, name);
-        } catch (const ShownFailure& failure) {
+            return RunOn(device, name);
+        } catch (const DeviceFailure& failure) {
             if (IsListed(device.Info().operations, name)) throw;
-            throw ShownFailure(failure.Status(), failure.what(),
-                               fmt::format("'{}' is none of the plug-in's operations: {}", name,
-                                           device.Info().operations),
-                               failure.Result());
+            throw DeviceFailure(failure.Status(), failure.what(),
+                                fmt::format("'{}' is none of the plug-in's operations: {}", name,
+                                            device.Info().operations),
+                                failure.Result());
         }
     });
 }

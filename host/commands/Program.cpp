@@ -98,7 +98,7 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const image::Image
     Load(context, device, plan);
     Outcome outcome{.result = PlanJson(plan)};
     if (IsOn(context, keys::kProgramCrc))
-        outcome.result["checksum"] = context.settings.Kept(keys::kChecksumValue);
+        outcome.result["checksum"] = device.Published(keys::kChecksumValue);
     if (!context.options.noVerify) {
         if (const auto difference = CompareWithFlash(device, image)) {
             outcome.status = ExitStatus::ContentsDiffer;

@@ -30,18 +30,16 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     const unsigned index = Index(context);
     const std::uint32_t old = ReadRegister(device, index);
     context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], HexText(value));
-    context.settings.Set(Origin::CommandLine, keys::kRegisterCommits[index],
-                         context.options.commit ? "1" : "0");
+    ChooseCommit(device, keys::kRegisterCommits[index], context.options.commit);
     device.Perform(plugin::ProgramRegisterOperation(index));
-    const std::uint32_t now = ReadRegister(device, index);
+    Outcome outcome;
+    RegisterValues expected;
+    expected.at(index) = value;
+    const std::uint32_t now = *CheckRegisters(device, expected, outcome).at(index);
     context.reporter.Result(
         fmt::format("User register {}: was {:#010x}, is {:#010x}", index, old, now));
-    Outcome outcome{.result = {{"register", index},
-                               {"old", old},
-                               {"value", now},
-                               {"committed", context.options.commit}}};
-    RequireRegister(outcome, index, value, now);
-    SayWhetherCommitted(context.reporter, context.options.commit);
+    outcome.result.update({{"register", index}, {"old", old}, {"value", now}});
+    SayWhetherCommitted(device, outcome);
     return outcome;
 }
 

@@ -43,6 +43,11 @@ Outcome List(Context& context) {
 
 Outcome Keep(Context& context, const SettingInfo& info, const std::string& text) {
     const std::string checked = RequireText(info, text, "settings");
+    if (IsOfOneBoard(info.key))
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{} belongs to one board and isn't kept; name it with 'mac "
+                                  "program' or 'register program', or for a run with --set",
+                                  info.key));
     context.settings.Keep(info.key, checked);
     context.settings.Save();
     const auto [now, origin] = context.settings.Get(info.key);

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <utility>
 
 #include "host/base/Interrupt.h"
 #include "host/settings/SettingKeys.h"
@@ -18,18 +19,19 @@ constexpr std::uint32_t kReadBytes = 32 * 1024;
 
 /// The plug-in publishes sizes as "256KB".
 std::uint64_t PublishedSize(const SettingStore& settings, const char* key) {
-    const std::string text = settings.Kept(key);
+    const std::string text = settings.Published(key);
     std::uint64_t kilobytes = 0;
     std::from_chars(text.data(), text.data() + text.size(), kilobytes);
     return kilobytes * 1024;
 }
 
-Failure Unreachable(const std::string& doing, const char* error) {
-    return {ExitStatus::Unreachable,
-            fmt::format("can't reach the target: {}: {}; check the connection (of a simulated "
-                        "device: the options of --sim)",
-                        doing, error)};
+/// What a bus reads that nothing drives.
+bool IsNoIdentification(std::uint32_t word) {
+    return word == 0 || word == 0xFFFFFFFF;
 }
+
+constexpr char kCheckConnection[] =
+    "check the connection (of a simulated device: the options of --sim)";
 
 }  // namespace
 
@@ -48,23 +50,32 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
     }
     Create();
     Initialize();
+    reached_ = true;
     reporter_.Say(Talk::Verbose, fmt::format("Plug-in {}", library_.Path()));
 }
 
 void FlashDevice::Create() {
     IFlashDevice2* device = nullptr;
-    Announce("CreateFlashDevice2");
-    if (const char* error = library_.CreateDevice()("", "", "", &Host(), &device))
-        throw Unreachable("identifying the device", error);
+    Call("identifying the device", "CreateFlashDevice2",
+         [&] { return library_.CreateDevice()("", "", "", &Host(), &device); });
     device_.reset(device);
+    if (!device_)
+        throw Failure(ExitStatus::Unreachable,
+                      fmt::format("{} claims success, but has made no device object; name another "
+                                  "plug-in with --plugin",
+                                  library_.Path()));
+    info_.identification = Registers().Identification().value_or(0);
+    if (IsNoIdentification(info_.identification))
+        throw Failure(ExitStatus::Unreachable,
+                      fmt::format("nothing answers: the identification register reads {:#010x}; {}",
+                                  info_.identification, kCheckConnection));
 }
 
 void FlashDevice::Initialize() {
     const char* operations = "";
-    Announce("Initialize");
-    if (const char* error = device_->Initialize(&info_.hasFlash, &operations))
-        throw Unreachable("asking for the device's properties", error);
-    info_.family = settings_.Kept(keys::kFamily);
+    Call("asking for the device's properties", "Initialize",
+         [&] { return device_->Initialize(&info_.hasFlash, &operations); });
+    info_.family = settings_.Published(keys::kFamily);
     info_.flashBytes = PublishedSize(settings_, keys::kFlashSize);
     info_.ramBytes = PublishedSize(settings_, keys::kRamSize);
     info_.sectorBytes = static_cast<std::uint32_t>(PublishedSize(settings_, keys::kSectorSize));
@@ -74,7 +85,8 @@ void FlashDevice::Initialize() {
 
 bool FlashDevice::Contains(std::uint32_t address) {
     bool within = false;
-    Finish(device_->AddressWithinFlash(address, &within), "asking whether an address is flash");
+    Call("asking whether an address is flash", "",
+         [&] { return device_->AddressWithinFlash(address, &within); });
     return within;
 }
 
@@ -97,28 +109,37 @@ AddressRange FlashDevice::RangeInFlash(const std::optional<std::string>& text) {
 
 void FlashDevice::ResetSettings(plugin::ResetMode mode) {
     const int number = static_cast<int>(mode);
-    Announce(fmt::format("ResetSettings {}", number));
-    Finish(device_->ResetSettings(number), "resetting the device");
+    Call("resetting the device", fmt::format("ResetSettings {}", number),
+         [&] { return device_->ResetSettings(number); });
 }
 
 void FlashDevice::WriteSection(const image::Section& section) {
     const std::string range = RangeText({section.address, section.Last()});
-    Announce("WriteDataToFlash " + range);
-    const char* error = device_->WriteDataToFlash(section.bytes.data(), section.address,
-                                                  static_cast<std::uint32_t>(section.bytes.size()),
-                                                  plugin::kRamPage);
-    meter_.End();
-    Finish(error, "programming " + range);
+    Call("programming " + range, "WriteDataToFlash " + range, [&] {
+        const char* error = device_->WriteDataToFlash(
+            section.bytes.data(), section.address, static_cast<std::uint32_t>(section.bytes.size()),
+            plugin::kRamPage);
+        meter_.End();
+        return error;
+    });
     // The plug-in leaves the loader running, which would be in the way of the next section.
     Halt();
 }
 
 void FlashDevice::Perform(const std::string& operation, Talk level) {
     host_.SetMessageLevel(level);
-    Announce("PerformOperation " + operation);
-    const char* error = device_->PerformOperation(operation.c_str());
-    host_.SetMessageLevel(Talk::Normal);
-    Finish(error, "operation " + operation);
+    Call("operation " + operation, "PerformOperation " + operation, [&] {
+        const char* error = device_->PerformOperation(operation.c_str());
+        host_.SetMessageLevel(Talk::Normal);
+        return error;
+    });
+}
+
+std::string FlashDevice::Published(const std::string& key) const {
+    const std::string text = settings_.Published(key);
+    if (!text.empty()) return text;
+    throw Failure(ExitStatus::DeviceFailed,
+                  fmt::format("the plug-in reported success, but has published no {}", key));
 }
 
 std::vector<std::uint8_t> FlashDevice::ReadFlash(const AddressRange& range) {
@@ -126,52 +147,103 @@ std::vector<std::uint8_t> FlashDevice::ReadFlash(const AddressRange& range) {
     for (std::size_t done = 0; done < bytes.size();) {
         const std::size_t count = std::min<std::size_t>(kReadBytes, bytes.size() - done);
         const auto address = range.first + static_cast<std::uint32_t>(done);
-        Finish(Host().ReadMemory(bytes.data() + done, count, address, plugin::kFlashPage, 1),
-               "reading flash at " + HexText(address));
+        Call("reading flash at " + HexText(address), "", [&] {
+            return Host().ReadMemory(bytes.data() + done, count, address, plugin::kFlashPage, 1);
+        });
         meter_.Advance(count);
         done += count;
     }
     return bytes;
 }
 
+std::uint32_t FlashDevice::ReadUserRegister(unsigned index) {
+    std::uint32_t value = 0;
+    Call(fmt::format("reading user register {}", index), "", [&] {
+        return Host().ReadMemory(&value, 1, plugin::kUserRegisters.at(index), plugin::kRamPage,
+                                 sizeof value);
+    });
+    return value;
+}
+
 void FlashDevice::Halt() {
-    Finish(Host().HaltTarget(), "halting the target");
+    Call("halting the target", "", [&] { return Host().HaltTarget(); });
 }
 
-void FlashDevice::Announce(const std::string& call) {
-    if (trace_) trace_->Line("call", call);
-}
-
-void FlashDevice::Finish(const char* error, const std::string& doing) {
-    const std::string text = error == nullptr ? "" : error;
+/// One call: what came of it is looked for in all the places where a failure can show.
+template <typename Action>
+void FlashDevice::Call(const std::string& doing, const std::string& traced, Action&& action) {
+    if (trace_ && !traced.empty()) trace_->Line("call", traced);
+    host_.CallBegins();
+    const char* error = action();
     host_.CallReturned();
-    if (trace_ && error != nullptr) trace_->Line("call", "failed: " + text);
-    if (Interrupted()) {
-        Host().HaltTarget();
-        throw Failure(ExitStatus::Interrupted, "interrupted; " + StateOfFlash());
-    }
-    if (host_.Errors().size() > errorsSeen_) FailAsShown(text, doing);
-    if (error == nullptr) return;
-    throw Failure(ExitStatus::DeviceFailed,
-                  fmt::format("{}: {}; {}; {}", doing, text, StateOfFlash(), Advice()));
+    if (trace_ && error != nullptr) trace_->Line("call", fmt::format("failed: {}", error));
+    if (Interrupted() || !host_.Errors().empty() || error != nullptr)
+        Fail(error == nullptr ? "" : error, doing);
 }
 
-void FlashDevice::FailAsShown(const std::string& text, const std::string& doing) {
-    std::string error = fmt::format("{}: {}", doing, host_.Errors()[errorsSeen_]);
-    if (!text.empty()) error += "; then " + text;
-    errorsSeen_ = host_.Errors().size();
-    if (const auto& found = watch_.FirstNotBlank())
-        throw ShownFailure(
-            ExitStatus::ContentsDiffer, error,
-            fmt::format(
-                "the flash isn't blank: {:#x} holds {:#04x}, not 0xff; erase it first (if it "
-                "just was, the cell is worn out)",
-                found->address, found->actual),
-            {{"blank", false}, {"address", found->address}, {"actual", found->actual}});
-    throw ShownFailure(
-        ExitStatus::DeviceFailed, error,
-        fmt::format("{} ended with {}; {}; {}", doing, text.empty() ? "the errors above" : text,
-                    StateOfFlash(), Advice()));
+void FlashDevice::LeaveHalted() {
+    if (std::exchange(closing_, true)) return;
+    host_.BeginClosing();
+    haltFailed_ = Host().HaltTarget() != nullptr;
+}
+
+RegisterValues FlashDevice::TryUserRegisters() {
+    RegisterValues values;
+    for (unsigned index = 0; index < values.size(); ++index) {
+        std::uint32_t value = 0;
+        if (Host().ReadMemory(&value, 1, plugin::kUserRegisters[index], plugin::kRamPage,
+                              sizeof value) == nullptr)
+            values[index] = value;
+    }
+    return values;
+}
+
+void FlashDevice::Fail(const std::string& error, const std::string& doing) {
+    const std::string cause = host_.FirstFailure();
+    const bool shown = !host_.Errors().empty();
+    LeaveHalted();
+    RegisterValues registers;
+    Json known = Json::object();
+    if (Registers().UserRegistersAccessed()) {
+        registers = TryUserRegisters();
+        known["registers"] = ToJson(Registers(), registers);
+    }
+    const std::string state = State(registers);
+    if (Interrupted())
+        throw DeviceFailure(ExitStatus::Interrupted, "interrupted; " + state,
+                            "interrupted; " + state, known);
+    std::string text = doing + ": " + (shown ? host_.Errors().front() : error);
+    while (text.ends_with('.'))
+        text.pop_back();
+    if (shown && !error.empty()) text += "; then " + error;
+    if (text.find(cause) == std::string::npos) text += "; it began with: " + cause;
+    if (!reached_) {
+        text = fmt::format("can't reach the target: {}; {}", text, kCheckConnection);
+        throw DeviceFailure(ExitStatus::Unreachable, text, text, known);
+    }
+    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text);
+    const std::string rest = fmt::format("; {}; {}", state, Advice());
+    std::string remark = text;
+    if (shown && cause.empty())
+        remark = doing + " ended with " + (error.empty() ? "the errors above" : error);
+    else if (shown)
+        remark = doing + " failed: " + cause;
+    throw DeviceFailure(ExitStatus::DeviceFailed, text + rest, remark + rest, known);
+}
+
+void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error) {
+    std::string remark = fmt::format("the flash isn't blank: {:#x} holds {:#04x}, not 0xff",
+                                     found.address, found.actual);
+    if (watch_.FlashTouched()) remark += "; " + StateOfFlash();
+    throw DeviceFailure(ExitStatus::ContentsDiffer, error, remark,
+                        {{"blank", false}, {"address", found.address}, {"actual", found.actual}});
+}
+
+std::string FlashDevice::State(const RegisterValues& registers) const {
+    std::string text;
+    if (Registers().UserRegistersAccessed()) text = Describe(Registers(), registers);
+    if (text.empty() || watch_.FlashTouched()) text += (text.empty() ? "" : "; ") + StateOfFlash();
+    return haltFailed_ ? text + "; the target couldn't be halted" : text;
 }
 
 std::string FlashDevice::StateOfFlash() const {

@@ -29,18 +29,18 @@ struct DeviceInfo {
     std::uint64_t flashBytes = 0;
     std::uint64_t ramBytes = 0;
     std::uint32_t sectorBytes = 0;
+    std::uint32_t identification = 0;
     bool hasFlash = false;
     std::string operations;  ///< joined by " | "
 
     AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
 };
 
-/// A failure that the user has already been shown; `Remark` is what is left to say,
-/// `Result` what is known for the JSON lines.
-class ShownFailure : public Failure {
+/// A failure of the device or the plug-in. Part of it may have been shown already: `Remark` is what
+/// is left to say, `Result` what is known for the JSON lines.
+class DeviceFailure : public Failure {
   public:
-    ShownFailure(ExitStatus status, const std::string& text, std::string remark,
-                 Json result = Json::object())
+    DeviceFailure(ExitStatus status, const std::string& text, std::string remark, Json result)
         : Failure(status, text), remark_(std::move(remark)), result_(std::move(result)) {}
 
     const std::string& Remark() const { return remark_; }
@@ -68,6 +68,7 @@ class FlashDevice {
     SettingStore& Settings() { return settings_; }
     Reporter& Output() { return reporter_; }
     WorkMeter& Meter() { return meter_; }
+    const RegisterWatch& Registers() const { return host_.Registers(); }
 
     /// Whether the byte at an address lies in flash, by the plug-in's own answer.
     bool Contains(std::uint32_t address);
@@ -85,9 +86,16 @@ class FlashDevice {
     /// Runs a named operation, its messages shown at `level`.
     void Perform(const std::string& operation, Talk level = Talk::Normal);
 
+    /// What the last call has published. Failure (DeviceFailed) when it is nothing.
+    std::string Published(const std::string& key) const;
+
     /// Reads flash of the halted target, counting the bytes for the running phase.
     std::vector<std::uint8_t> ReadFlash(const AddressRange& range);
+    std::uint32_t ReadUserRegister(unsigned index);
     void Halt();
+
+    /// Ends the work after a failure of any kind, Ctrl-C included.
+    void LeaveHalted();
 
     /// Keeps the simulated device's contents, where a file was named for them.
     void Save() const { target_.Save(watch_.ContentsTouched()); }
@@ -100,9 +108,12 @@ class FlashDevice {
     IFlashHost& Host() { return tracingHost_ ? static_cast<IFlashHost&>(*tracingHost_) : host_; }
     void Create();
     void Initialize();
-    void Announce(const std::string& call);
-    void Finish(const char* error, const std::string& doing);
-    [[noreturn]] void FailAsShown(const std::string& text, const std::string& doing);
+    template <typename Action>
+    void Call(const std::string& doing, const std::string& traced, Action&& action);
+    [[noreturn]] void Fail(const std::string& error, const std::string& doing);
+    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error);
+    RegisterValues TryUserRegisters();
+    std::string State(const RegisterValues& registers) const;
     std::string StateOfFlash() const;
     std::string Advice() const;
 
@@ -118,7 +129,9 @@ class FlashDevice {
     std::optional<PluginTrace> pluginTrace_;
     std::unique_ptr<IFlashDevice2, Destroyer> device_;
     DeviceInfo info_;
-    std::size_t errorsSeen_ = 0;
+    bool reached_ = false;  ///< the device was identified, and its properties are known
+    bool closing_ = false;  ///< after a failure
+    bool haltFailed_ = false;
 };
 
 }  // namespace host

@@ -43,13 +43,15 @@ FlashHost::FlashHost(target::Target& target, SettingStore& settings, Reporter& r
 /// Runs a slot's work. No exception leaves; its text becomes the slot's answer.
 template <typename Action>
 const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
-    if (after == AfterInterrupt::Refuse && Interrupted()) return "interrupted by the user";
+    if (after == AfterInterrupt::Refuse && Interrupted() && !closing_)
+        return "interrupted by the user";
     try {
         action();
         return nullptr;
     } catch (const std::exception& error) {
         try {
             errorText_ = error.what();
+            if (firstFailure_.empty()) firstFailure_ = errorText_;
             return errorText_.c_str();
         } catch (...) {
             return "the host ran out of memory";
@@ -69,7 +71,7 @@ const char* FlashHost::GetProperty(const char* name) {
 
 const char* FlashHost::SetProperty(const char* name, const char* value) {
     return Slot(AfterInterrupt::GoOn, [&] {
-        settings_.Keep(name, value);
+        settings_.Publish(name, value);
         if (std::strcmp(name, keys::kMacInput) == 0) publishedMac_ = value;
     });
 }
@@ -97,7 +99,9 @@ const char* FlashHost::ReadMemory(void* buffer, size_t count, uint64_t address, 
                                   size_t width) {
     return Slot(AfterInterrupt::Refuse, [&] {
         const std::uint32_t where = TargetAddress(address);
+        registers_.Accessing(where);
         target_.Read(buffer, count, where, page, width);
+        registers_.Read(where, Word(buffer, count * width));
         watch_.Read(where, count * width, static_cast<const std::uint8_t*>(buffer));
     });
 }
@@ -106,6 +110,8 @@ const char* FlashHost::WriteMemory(const void* buffer, size_t count, uint64_t ad
                                    size_t width) {
     return Slot(AfterInterrupt::Refuse, [&] {
         const std::uint32_t where = TargetAddress(address);
+        registers_.Accessing(where);
+        registers_.Writing(where, Word(buffer, count * width));
         target_.Write(buffer, count, where, page, width);
         watch_.Wrote(where, count * width, Word(buffer, count * width));
     });
@@ -153,7 +159,7 @@ const char* FlashHost::ShowMessage(const char* text) {
         std::string message = text;
         if (!publishedMac_.empty() && message.ends_with(" " + publishedMac_))
             message.replace(message.size() - publishedMac_.size(), publishedMac_.size(),
-                            settings_.Kept(keys::kMacInput));
+                            settings_.Published(keys::kMacInput));
         reporter_.PluginMessage(messageLevel_, message);
     });
 }
@@ -164,6 +170,11 @@ const char* FlashHost::GetDirectory() {
 
 const char* FlashHost::Sleep(uint32_t milliseconds) {
     return Slot(AfterInterrupt::Refuse, [&] { target_.Pause(milliseconds); });
+}
+
+void FlashHost::CallBegins() {
+    firstFailure_.clear();
+    settings_.DropPublished();
 }
 
 void FlashHost::CallReturned() {

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "host/driver/FlashWatch.h"
+#include "host/driver/RegisterWatch.h"
 #include "host/output/Reporter.h"
 #include "host/settings/SettingStore.h"
 #include "plugin/IFlashHost.h"
@@ -28,8 +29,18 @@ class FlashHost final : public IFlashHost {
     /// The level at which the plug-in's messages are shown; errors are always shown.
     void SetMessageLevel(Talk level) { messageLevel_ = level; }
 
-    /// To be called when a call into the plug-in has returned: no display may be open then.
+    /// To be called around each call into the plug-in: what an earlier one left doesn't count for
+    /// it, and no display may be open when it returns.
+    void CallBegins();
     void CallReturned();
+
+    /// Why the first slot of the call that failed did so: the plug-in shows texts of its own.
+    const std::string& FirstFailure() const { return firstFailure_; }
+
+    /// From now on accesses are carried out after Ctrl-C as well, to end the work in order.
+    void BeginClosing() { closing_ = true; }
+
+    const RegisterWatch& Registers() const { return registers_; }
 
     const char* GetProperty(const char* name) override;
     const char* SetProperty(const char* name, const char* value) override;
@@ -74,9 +85,12 @@ class FlashHost final : public IFlashHost {
     std::string directory_;
     std::string property_;   ///< what GetProperty handed out last
     std::string errorText_;  ///< what a failing slot returned last
+    std::string firstFailure_;
     std::string publishedMac_;
     std::vector<std::string> errors_;
+    RegisterWatch registers_;
     Talk messageLevel_ = Talk::Normal;
+    bool closing_ = false;
     bool displayOpen_ = false;
 };
 

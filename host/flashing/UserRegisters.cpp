@@ -1,4 +1,4 @@
-// Reading a user register, and judging what it holds after it was programmed.
+// Reading the user registers, and judging what they hold after they were programmed.
 
 #include "host/flashing/UserRegisters.h"
 
@@ -12,25 +12,48 @@ namespace host {
 
 std::uint32_t ReadRegister(FlashDevice& device, unsigned index) {
     device.Perform(plugin::ReadRegisterOperation(index), Talk::Verbose);
-    return ParseHexArgument(device.Settings().Kept(keys::kRegisterInputs[index]),
+    return ParseHexArgument(device.Published(keys::kRegisterInputs[index]),
                             "what the plug-in has read");
 }
 
-void RequireRegister(Outcome& outcome, unsigned index, std::uint32_t expected,
-                     std::uint32_t actual) {
-    if (expected == actual) return;
-    outcome.status = ExitStatus::ContentsDiffer;
-    outcome.error = fmt::format(
-        "user register {} reads {:#010x} after {:#010x} was programmed; a committed register may "
-        "not take another value",
-        index, actual, expected);
+void ChooseCommit(FlashDevice& device, const char* key, bool asked) {
+    SettingStore& settings = device.Settings();
+    if (asked) return settings.Set(Origin::CommandLine, key, "1");
+    const auto [text, origin] = settings.Get(key);
+    if (origin == Origin::Default) return;
+    device.Output().Say(Talk::Normal, fmt::format("{} is {} ({})", key, text,
+                                                  OriginText(origin, settings.Paths())));
 }
 
-void SayWhetherCommitted(Reporter& reporter, bool committed) {
-    reporter.Say(Talk::Normal,
-                 committed ? "Committed: the value stays after a reset."
-                           : "Not committed: the value is gone after the next reset of the device "
-                             "(a simulated one is reset after each run); --commit keeps it.");
+RegisterValues CheckRegisters(FlashDevice& device, const RegisterValues& expected,
+                              Outcome& outcome) {
+    RegisterValues values;
+    for (unsigned index = 0; index < values.size(); ++index) {
+        values[index] = device.ReadUserRegister(index);
+        if (!expected[index] || expected[index] == values[index]) continue;
+        outcome.status = ExitStatus::ContentsDiffer;
+        outcome.error = fmt::format(
+            "user register {} reads {:#010x} after {:#010x} was programmed; a committed register "
+            "may not take another value",
+            index, *values[index], *expected[index]);
+    }
+    outcome.result["registers"] = ToJson(device.Registers(), values);
+    return values;
+}
+
+void SayWhetherCommitted(FlashDevice& device, Outcome& outcome) {
+    bool committed = true;
+    for (const unsigned index : {0U, 1U}) {
+        const UserRegister& state = device.Registers().Of(index);
+        committed = committed && (!state.written || state.commit == Commit::Done);
+    }
+    outcome.result["committed"] = committed;
+    if (outcome.status != ExitStatus::Done) return;
+    device.Output().Say(Talk::Normal,
+                        committed
+                            ? "Committed: the value stays after a reset."
+                            : "Not committed: the value is gone after the next reset of the device "
+                              "(a simulated one is reset after each run); --commit keeps it.");
 }
 
 }  // namespace host

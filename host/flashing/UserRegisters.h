@@ -1,10 +1,11 @@
 // What the register and MAC address commands share: reading a user register through the plug-in,
-// and what is said about a commit.
+// choosing whether a value is committed, and reading both back.
 
 #pragma once
 
 #include <cstdint>
 
+#include "host/driver/RegisterWatch.h"
 #include "host/output/Reporter.h"
 
 namespace host {
@@ -14,10 +15,17 @@ class FlashDevice;
 /// The register's value, by the plug-in's own read operation.
 std::uint32_t ReadRegister(FlashDevice& device, unsigned index);
 
-/// Makes the outcome a failure (ContentsDiffer) when the register read back isn't as programmed.
-void RequireRegister(Outcome& outcome, unsigned index, std::uint32_t expected,
-                     std::uint32_t actual);
+/// Whether the programming to come commits its value: when that was `asked` for, or else when the
+/// setting `key` says so, which is then shown with where it comes from.
+void ChooseCommit(FlashDevice& device, const char* key, bool asked);
 
-void SayWhetherCommitted(Reporter& reporter, bool committed);
+/// Reads both registers after a programming operation that reported success, and puts what they
+/// hold into the outcome. It is a failure (ContentsDiffer) when one isn't as expected; where
+/// nothing is, the register needn't be anything.
+RegisterValues CheckRegisters(FlashDevice& device, const RegisterValues& expected,
+                              Outcome& outcome);
+
+/// Says so, and puts it into the outcome: whether all that was programmed was seen to be committed.
+void SayWhetherCommitted(FlashDevice& device, Outcome& outcome);
 
 }  // namespace host

@@ -109,6 +109,12 @@ const SettingInfo* FindSetting(const std::string& key) {
     return found == std::end(kCatalogue) ? nullptr : found;
 }
 
+bool IsOfOneBoard(const std::string& key) {
+    const auto& inputs = keys::kRegisterInputs;
+    return key == keys::kMacInput ||
+           std::find(std::begin(inputs), std::end(inputs), key) != std::end(inputs);
+}
+
 std::string AcceptedTexts(const SettingInfo& info) {
     switch (info.form) {
         case Form::Switch:

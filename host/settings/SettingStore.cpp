@@ -29,11 +29,20 @@ void SettingStore::SetUnlessChosen(const std::string& key, const std::string& te
 }
 
 void SettingStore::Keep(const std::string& key, const std::string& text) {
-    const auto mac = key == keys::kMacInput ? ParseMacAddress(text) : std::nullopt;
-    const std::string padded = mac ? mac->Text() : text;
-    if (Kept(key) == padded) return;
-    Layer(Origin::Kept)[key] = padded;
+    if (Kept(key) == text) return;
+    Layer(Origin::Kept)[key] = text;
     changed_[key] = true;
+}
+
+void SettingStore::Publish(const std::string& key, const std::string& text) {
+    const auto mac = key == keys::kMacInput ? ParseMacAddress(text) : std::nullopt;
+    published_[key] = mac ? mac->Text() : text;
+    if (!IsOfOneBoard(key)) Keep(key, text);
+}
+
+std::string SettingStore::Published(const std::string& key) const {
+    const auto found = published_.find(key);
+    return found == published_.end() ? "" : found->second;
 }
 
 SettingValue SettingStore::Get(const std::string& key) const {
@@ -119,7 +128,7 @@ SettingStore LoadSettings(const std::string& settingsFile,
     for (const auto& [key, text] : ReadSettingFile(paths.user, paths.userMustExist, false))
         store.Set(Origin::UserFile, key, text);
     for (const auto& [key, text] : ReadSettingFile(paths.kept, false, true))
-        store.Set(Origin::Kept, key, text);
+        if (!IsOfOneBoard(key)) store.Set(Origin::Kept, key, text);
     for (char** variable = environ; *variable != nullptr; ++variable)
         if (const std::string text = *variable; text.starts_with(kEnvironmentPrefix))
             Assign(store, Origin::Environment, text.substr(kEnvironmentPrefix.size()),

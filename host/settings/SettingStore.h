@@ -34,9 +34,17 @@ class SettingStore {
     /// The same where no layer above the kept values has one.
     void SetUnlessChosen(const std::string& key, const std::string& text);
 
-    /// What the plug-in or the tool itself leaves; the key need not be a known one. A MAC address
-    /// is padded to two digits a byte.
+    /// Leaves a text for later runs; the key need not be a known one.
     void Keep(const std::string& key, const std::string& text);
+
+    /// What the plug-in publishes: kept, unless it stands for one board alone. A MAC address is
+    /// padded to two digits a byte.
+    void Publish(const std::string& key, const std::string& text);
+
+    /// What was published under the key since the last drop; empty if nothing. What the device is
+    /// said to hold is read from here, never from what an earlier run has kept.
+    std::string Published(const std::string& key) const;
+    void DropPublished() { published_.clear(); }
 
     /// The key must be one of the catalogue.
     SettingValue Get(const std::string& key) const;
@@ -59,6 +67,7 @@ class SettingStore {
 
     SettingPaths paths_;
     std::array<SettingTexts, 4> layers_;
+    SettingTexts published_;
     std::map<std::string, bool> changed_;  ///< kept keys since loading; false: forgotten
 };
 
