@@ -146,7 +146,16 @@ const Row kDone[] = {
     {"tool --settings mine.toml settings FlashCrystalFreq=10", 0, "\"10\"  (kept value)", ""},
     {"CORVANE_SET_FlashCrystalFreq=c tool settings FlashCrystalFreq=10", 0, "\"c\"  (environment)",
      "the value of the environment goes before it"},
-    {"tool --settings wrong.toml completion bash | bash -n", 0, "", ""},
+    {"tool completion words -- ''", 0, "program\tProgram image files", ""},
+    {"tool completion words -- -q program --crc -", 0, "--dry-run\t", ""},
+    {"tool completion words -- --progress=plain erase ''", 0, "--all\tErase the whole flash\n", ""},
+    {"tool completion words -- info --sim quen,ram=8K,", 0, "8K,id=\tvalue of the ident", ""},
+    {"tool completion words -- --sim=quen,loader=", 0, "--sim=quen,loader=hangs\t\n", ""},
+    {"tool completion words -- operation ''", 0, "\nBlankCheck\t\n", ""},
+    {"tool completion words -- register program 1 ''", 0, "--commit\tMake the value", ""},
+    {"tool completion words -- help mac ''", 0, "program\tProgram the MAC address\n", ""},
+    {"tool completion words -- --set X=1 --set FlashResetSetting=", 0, "Setting=0\treset", ""},
+    {"tool completion words -- read --trace=", 0, ":files\t--trace=\n", ""},
     {"tool --help", 0, "Usage: corvane-flash [OPTION]... COMMAND", ""},
     {"tool mac program --help", 0, "Usage: corvane-flash mac program ADDRESS [OPTION]...", ""},
     {"tool help | awk 'NR > 23 || length > 79'", 0, "", ""},
@@ -348,6 +357,19 @@ const Row kStories[] = {
      0, "16\n262144\n", nullptr},
     {"tool info > /dev/full", 3, "", "can't write to standard output: No space left on device"},
     {"tool settings | head -1", 0, "FlashProgramOption", ""},
+    // What the shells make of it: bash has taken the word apart, zsh would show what is added.
+    {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
+     ":$PATH bash -c '. "
+     "./c; COMP_LINE=\"corvane-flash program --erase=n\" COMP_POINT=31 COMP_CWORD=4 "
+     "COMP_WORDS=(corvane-flash program --erase = n); _corvane_flash; echo \"${COMPREPLY[@]}\"'",
+     0, "necessary none\n", ""},
+    {"tool completion zsh >c; zsh -fc 'compdef() { }; compadd() { print -r -- $closed }; . ./c; "
+     "words=(" CORVANE_FLASH_TOOL
+     " program --erase=) CURRENT=3 PREFIX=--erase=; _corvane-flash'; :",
+     0, "--erase=necessary --erase=none --erase=all\n", nullptr},
+    {"tool completion fish >c; fish -c '. ./c; complete -C \"" CORVANE_FLASH_TOOL
+     " verify --format=s\"'",
+     0, "--format=srec\n", ""},
 };
 
 class CommandLineStory : public testing::TestWithParam<Row> {};

@@ -25,6 +25,19 @@ inline std::string ProgramRegisterOperation(unsigned index) {
     return "ProgramUserRegister" + std::to_string(index);
 }
 
+/// All of them, in the plug-in's order.
+inline constexpr const char* kOperations[] = {
+    kErase,
+    kBlankCheck,
+    kCalculateChecksum,
+    "ProgramUserRegister0",
+    "ReadUserRegister0",
+    "ProgramUserRegister1",
+    "ReadUserRegister1",
+    kProgramMac,
+    kReadMac,
+};
+
 /// What stands between the names in the list of operations.
 inline constexpr char kOperationSeparator[] = " | ";
 

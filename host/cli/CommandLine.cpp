@@ -49,7 +49,8 @@ CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options)
 void Define(CLI::App& app, const OptionRow& row, Options& options) {
     CLI::Option* option = DefineMember(app, row, options);
     option->required(row.required);
-    if (!row.choices.empty()) option->check(CLI::IsMember(row.choices));
+    if (!row.choices.empty() && row.offers != Offers::SomeChoices)
+        option->check(CLI::IsMember(row.choices));
     if (*row.environment != '\0') option->envname(row.environment);
 }
 

@@ -14,8 +14,17 @@ namespace host {
 struct Context;
 struct Outcome;
 
-/// What a shell offers to complete a value with, apart from the fixed choices.
-enum class Offers { Nothing, Files, Devices, Settings, SettingAssignments, HelpWords };
+/// What a shell offers to complete a value with, apart from the choices. Other texts than the
+/// choices are refused, unless they are `SomeChoices`.
+enum class Offers {
+    Nothing,
+    SomeChoices,
+    Files,
+    Devices,
+    Settings,
+    SettingAssignments,
+    HelpWords,
+};
 
 using OptionMember =
     std::variant<bool Options::*, int Options::*, std::string Options::*,

@@ -16,7 +16,6 @@ namespace host {
 namespace {
 
 constexpr std::size_t kPageColumns = 79;
-constexpr std::size_t kNarrowColumns = 60;
 constexpr std::size_t kNarrowIndent = 6;
 
 std::size_t LineColumns() {
@@ -47,7 +46,7 @@ std::string Wrap(std::string_view text, std::size_t column, std::size_t indent) 
 }
 
 std::string Entry(const std::string& term, std::string_view text, std::size_t termColumns) {
-    const std::size_t indent = LineColumns() < kNarrowColumns ? kNarrowIndent : termColumns;
+    const std::size_t indent = LineColumns() < 2 * termColumns ? kNarrowIndent : termColumns;
     std::string line = "  " + term;
     if (line.size() + 1 < indent)
         line.append(indent - line.size(), ' ');

@@ -26,7 +26,7 @@ struct Options {
 
     // Some commands.
     std::vector<std::string> files;
-    std::vector<std::string> words;  ///< that the help is about
+    std::vector<std::string> words;  ///< that the help is about, or to complete
     std::optional<std::string> format;
     std::optional<std::string> base;
     std::optional<std::string> range;

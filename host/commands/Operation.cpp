@@ -76,14 +76,19 @@ Outcome Run(Context& context) {
 }  // namespace
 
 CommandRow Operation() {
-    return {
-        "operation",
-        "Run one of the plug-in's operations by its name",
-        "It works with the settings as they are. 'corvane-flash info' lists the names.",
-        "  corvane-flash operation BlankCheck\n"
-        "  corvane-flash --set FlashEraseType='Entire Flash' operation Erase",
-        {{"NAME", "", "The operation's exact name", &Options::argument, Offers::Nothing, {}, true}},
-        Run};
+    return {"operation",
+            "Run one of the plug-in's operations by its name",
+            "It works with the settings as they are. 'corvane-flash info' lists the names.",
+            "  corvane-flash operation BlankCheck\n"
+            "  corvane-flash --set FlashEraseType='Entire Flash' operation Erase",
+            {{"NAME",
+              "",
+              "The operation's exact name",
+              &Options::argument,
+              Offers::SomeChoices,
+              {std::begin(plugin::kOperations), std::end(plugin::kOperations)},
+              true}},
+            Run};
 }
 
 }  // namespace host::commands

@@ -6,6 +6,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "target/simulated/DeviceOptions.h"
 
@@ -20,6 +21,8 @@ struct OptionRow {
     /// The value as text, for an option that tells the device from others; null for what may
     /// differ from run to run.
     std::string (*definition)(const DeviceOptions& options);
+    /// All that is accepted, where that is a few words.
+    std::vector<const char*> words = {};
 };
 
 std::span<const OptionRow> OptionTable();
