@@ -5,6 +5,7 @@
 
 #pragma once
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <stdexcept>
@@ -36,6 +37,11 @@ class Target {
 
     /// Resets the target and leaves it halted.
     virtual void Reset(bool flag) = 0;
+
+    /// The target's time since some fixed moment: the machine's, unless the target is simulated.
+    virtual std::chrono::nanoseconds Now() const {
+        return std::chrono::steady_clock::now().time_since_epoch();
+    }
 
     /// Lets `milliseconds` of the target's time pass.
     virtual void Pause(std::uint32_t milliseconds) = 0;

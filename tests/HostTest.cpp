@@ -421,19 +421,39 @@ TEST(FlashHost, AnswersInsteadOfThrowing) {
     EXPECT_EQ(test.host.SetProperty("Something new", "x"), nullptr);
 }
 
+TEST(AddressSet, JoinsWhatOverlapsOrTouches) {
+    AddressSet set;
+    for (const AddressRange& range : {AddressRange{0x40, 0x4F},
+                                      {0x80, 0x8F},
+                                      {0x10, 0x1F},
+                                      {0x20, 0x2F},
+                                      {0x48, 0x58},
+                                      {0xFFFFFFF0, 0xFFFFFFFF}})
+        set.Add(range);
+    EXPECT_EQ(set.Ranges(),
+              (std::vector<AddressRange>{
+                  {0x10, 0x2F}, {0x40, 0x58}, {0x80, 0x8F}, {0xFFFFFFF0, 0xFFFFFFFF}}));
+    EXPECT_EQ(set.BytesIn({0x2F, 0x80}), 0x1BU);
+    set.Add({0x18, 0xFFFFFFFF});
+    EXPECT_EQ(set.Bytes(), 0xFFFFFFF0U);
+}
+
 TEST(FlashWatch, CountsAnEraseWhenTheDeviceSaysItIsDone) {
     HostUnderTest test;
     test.watch.SetGeometry(0x40000, 0x400);
     const std::uint32_t erase = 0xA4420002;
     const std::uint8_t busy[4] = {2};
     const std::uint8_t idle[4] = {0};
-    test.watch.Wrote(0x400FD008, 4, erase);
+    test.watch.Writing(0x400FD000, 0x800);
+    test.watch.Writing(0x400FD008, erase);
+    EXPECT_EQ(test.watch.Work().attempted.Ranges(), (std::vector<AddressRange>{{0x800, 0xBFF}}));
+    EXPECT_TRUE(test.watch.Work().erased.Empty());
     test.watch.Read(0x400FD008, 4, busy);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0U);
     test.watch.Read(0x400FD008, 4, idle);
     test.watch.Read(0x400FD008, 4, idle);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x400U);
-    test.watch.Wrote(0x400FD008, 4, 0xA4420004);
+    test.watch.Writing(0x400FD008, 0xA4420004);
     test.watch.Read(0x400FD008, 4, idle);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x40400U);
 }

@@ -5,6 +5,7 @@
 #pragma once
 
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <string>
 
@@ -58,13 +59,13 @@ inline constexpr std::uint32_t kIdentificationRegister = 0x400FE000;
 inline constexpr std::array<std::uint32_t, 2> kUserRegisters{0x400FE1E0, 0x400FE1E4};
 
 // The flash command register takes an erase command in its low bits, under a key in the high half,
-// and shows the same bit until the erase is done.
+// and shows the same bit until the erase is done. A sector is named by the flash address register.
+inline constexpr std::uint32_t kFlashAddressRegister = 0x400FD000;
 inline constexpr std::uint32_t kFlashCommandRegister = 0x400FD008;
 inline constexpr std::uint32_t kEraseSectorBit = 0x2;
 inline constexpr std::uint32_t kEraseAllBit = 0x4;
 
 // It commits the user register that the flash address register names in the same way.
-inline constexpr std::uint32_t kFlashAddressRegister = 0x400FD000;
 inline constexpr std::uint32_t kCommitBit = 0x8;
 inline constexpr std::uint32_t kCommitOperand = 0x80000000;  ///< and the register's index
 
@@ -73,7 +74,6 @@ inline constexpr std::uint32_t kCommitOperand = 0x80000000;  ///< and the regist
 inline constexpr std::uint32_t kBlockBytes = 128;
 inline constexpr std::uint32_t kChunkBytes = 2048;
 inline constexpr std::uint32_t kLoaderBuffers = 0x20000000;
-inline constexpr std::uint32_t kLoaderBuffersEnd = kLoaderBuffers + 2 * kChunkBytes;
 inline constexpr std::array<std::uint32_t, 2> kParameterBlocks{0x20001000, 0x20001010};
 
 // The words of a parameter block, by their offset.
@@ -81,5 +81,8 @@ inline constexpr std::uint32_t kChunkAddressOffset = 4;
 inline constexpr std::uint32_t kChunkSizeOffset = 8;
 inline constexpr std::uint32_t kStatusOffset = 12;
 inline constexpr std::uint32_t kStatusPending = 0xFFFFFFFF;
+
+/// How long the plug-in sleeps after it has found a chunk pending, before it looks again.
+inline constexpr std::chrono::milliseconds kPollInterval{100};
 
 }  // namespace host::plugin

@@ -2,6 +2,10 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+#include <chrono>
+#include <cstdlib>
+#include <limits>
 #include <string>
 
 #include "host/commands/Commands.h"
@@ -67,11 +71,19 @@ void Expect(Context& context, WorkMeter& meter, const ProgramPlan& plan, std::ui
     if (!context.options.noVerify) meter.Expect(Phase::Verify, plan.imageBytes);
 }
 
-/// The wait for the loader is one budget for a whole section, so a fixed default would fail large
-/// images on slow flash. Each chunk may cost two polls more, unless the user has set a limit.
-void AllowTime(Context& context, const ProgramPlan& plan) {
+/// The whole seconds that a text begins with; what the plug-in refuses is no time.
+std::chrono::seconds Seconds(const std::string& text) {
+    const auto number = std::strtoll(text.c_str(), nullptr, 10);
+    return std::chrono::seconds(std::clamp<long long>(number, 0, std::numeric_limits<int>::max()));
+}
+
+/// The limit holds for each chunk, and for the plug-in's polls of a section together. So a fixed
+/// default would fail large images on slow flash: each chunk may cost two polls more, unless the
+/// user has set a limit.
+void AllowTime(Context& context, FlashDevice& device, const ProgramPlan& plan) {
     constexpr std::uint64_t kChunksPerSecond = 5;
     const SettingValue limit = context.settings.Get(keys::kTimeout);
+    device.LimitLastChunk(Seconds(limit.text));
     if (limit.origin != Origin::Default) return;
     const auto seconds =
         std::stoul(limit.text) + plan.transferBytes / (plugin::kChunkBytes * kChunksPerSecond);
@@ -79,7 +91,7 @@ void AllowTime(Context& context, const ProgramPlan& plan) {
 }
 
 void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
-    AllowTime(context, plan);
+    AllowTime(context, device, plan);
     device.ResetSettings(ResetMode::LoadBegins);
     for (const image::Section& section : plan.sections)
         device.WriteSection(section);

@@ -41,7 +41,8 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
       target_(options.target),
       meter_(reporter),
       watch_(meter_),
-      host_(target_.Get(), settings, reporter, watch_, ExecutableDirectory()),
+      loader_(target_.Get(), watch_),
+      host_(loader_, settings, reporter, watch_, ExecutableDirectory()),
       library_(options.plugin.value_or("")) {
     if (options.trace) {
         trace_.emplace(*options.trace);
@@ -115,15 +116,26 @@ void FlashDevice::ResetSettings(plugin::ResetMode mode) {
 
 void FlashDevice::WriteSection(const image::Section& section) {
     const std::string range = RangeText({section.address, section.Last()});
+    std::string unfinished;
     Call("programming " + range, "WriteDataToFlash " + range, [&] {
         const char* error = device_->WriteDataToFlash(
             section.bytes.data(), section.address, static_cast<std::uint32_t>(section.bytes.size()),
             plugin::kRamPage);
+        // The plug-in doesn't look whether the loader has finished the last chunk.
+        unfinished = AwaitLoader();
         meter_.End();
-        return error;
+        return error == nullptr && !unfinished.empty() ? unfinished.c_str() : error;
     });
     // The plug-in leaves the loader running, which would be in the way of the next section.
     Halt();
+}
+
+/// What kept the loader from finishing; empty when nothing did.
+std::string FlashDevice::AwaitLoader() try {
+    loader_.AwaitIdle();
+    return "";
+} catch (const target::TargetError& error) {
+    return error.what();
 }
 
 void FlashDevice::Perform(const std::string& operation, Talk level) {
@@ -247,15 +259,18 @@ std::string FlashDevice::State(const RegisterValues& registers) const {
 }
 
 std::string FlashDevice::StateOfFlash() const {
-    if (!watch_.FlashTouched()) return "the flash is as it was";
-    const PhaseProgress& erased = meter_.Of(Phase::Erase);
-    const PhaseProgress& written = meter_.Of(Phase::Program);
-    if (written.totalBytes != 0 && written.doneBytes == written.totalBytes)
-        return "the image is programmed, but not compared";
-    std::string text = "the flash is incomplete: " + SizeText(erased.doneBytes) + " erased";
-    if (written.totalBytes != 0)
-        text += fmt::format(", {} of {} handed to the loader", SizeText(written.doneBytes),
-                            SizeText(written.totalBytes));
+    const FlashWork& work = watch_.Work();
+    if (work.attempted.Empty()) return "the flash is as it was";
+    const std::uint64_t toWrite = meter_.Of(Phase::Program).totalBytes;
+    const std::uint64_t written = work.programmed.Bytes();
+    const std::uint64_t handedOver = work.handedOver.Bytes();
+    if (toWrite != 0 && written == toWrite) return "the image is programmed, but not compared";
+    std::string text = "the flash is incomplete: " + SizeText(work.erased.Bytes()) + " erased";
+    if (toWrite != 0)
+        text += fmt::format(", {} of {} written", SizeText(written), SizeText(toWrite));
+    if (handedOver > written)
+        text += fmt::format(", {} handed to the loader and not seen to be finished",
+                            SizeText(handedOver - written));
     return text + "; run the command again before the device is used";
 }
 

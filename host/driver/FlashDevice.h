@@ -19,6 +19,7 @@
 #include "host/driver/TracingHost.h"
 #include "host/image/Image.h"
 #include "host/output/WorkMeter.h"
+#include "host/targets/LoaderWait.h"
 #include "host/targets/SimulatedTarget.h"
 
 namespace host {
@@ -81,7 +82,13 @@ class FlashDevice {
     void RequireFlash() const;
 
     void ResetSettings(plugin::ResetMode mode);
+
+    /// Hands a section to the plug-in and waits until the loader is done with it; then the target
+    /// is halted.
     void WriteSection(const image::Section& section);
+
+    /// How long the loader may take for the last chunk of a section.
+    void LimitLastChunk(std::chrono::milliseconds limit) { loader_.SetLimit(limit); }
 
     /// Runs a named operation, its messages shown at `level`.
     void Perform(const std::string& operation, Talk level = Talk::Normal);
@@ -114,6 +121,7 @@ class FlashDevice {
     [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error);
     RegisterValues TryUserRegisters();
     std::string State(const RegisterValues& registers) const;
+    std::string AwaitLoader();
     std::string StateOfFlash() const;
     std::string Advice() const;
 
@@ -122,6 +130,7 @@ class FlashDevice {
     SimulatedTarget target_;
     WorkMeter meter_;
     FlashWatch watch_;
+    LoaderWait loader_;
     FlashHost host_;
     std::optional<Trace> trace_;
     std::optional<TracingHost> tracingHost_;

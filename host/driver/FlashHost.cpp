@@ -112,8 +112,8 @@ const char* FlashHost::WriteMemory(const void* buffer, size_t count, uint64_t ad
         const std::uint32_t where = TargetAddress(address);
         registers_.Accessing(where);
         registers_.Writing(where, Word(buffer, count * width));
+        watch_.Writing(where, Word(buffer, count * width));
         target_.Write(buffer, count, where, page, width);
-        watch_.Wrote(where, count * width, Word(buffer, count * width));
     });
 }
 

@@ -29,17 +29,16 @@ void FlashWatch::SetGeometry(std::uint64_t flashBytes, std::uint32_t sectorBytes
 
 void FlashWatch::ProgramLoaded() {
     meter_.Begin(Phase::Program);
-    flashTouched_ = contentsTouched_ = true;
 }
 
-void FlashWatch::Wrote(std::uint32_t address, std::size_t bytes, std::uint32_t word) {
-    if (address == plugin::kFlashCommandRegister) {
-        contentsTouched_ = true;
-        BeginErase(word);
-    }
-    if (meter_.Running() == Phase::Program && address >= plugin::kLoaderBuffers &&
-        address < plugin::kLoaderBuffersEnd)
-        meter_.Advance(bytes);
+void FlashWatch::Writing(std::uint32_t address, std::uint32_t word) {
+    if (address == plugin::kFlashAddressRegister) addressRegister_ = word;
+    if (address == plugin::kFlashCommandRegister) NoteCommand(word);
+}
+
+void FlashWatch::Programmed(const AddressRange& chunk) {
+    work_.programmed.Add(chunk);
+    if (meter_.Running() == Phase::Program) meter_.Advance(chunk.Size());
 }
 
 void FlashWatch::Read(std::uint32_t address, std::size_t bytes, const std::uint8_t* data) {
@@ -55,16 +54,21 @@ void FlashWatch::Read(std::uint32_t address, std::size_t bytes, const std::uint8
     meter_.Advance(bytes);
 }
 
-void FlashWatch::BeginErase(std::uint32_t command) {
+void FlashWatch::NoteCommand(std::uint32_t command) {
+    commanded_ = true;
     pendingErase_ = command & (plugin::kEraseSectorBit | plugin::kEraseAllBit);
     if (pendingErase_ == 0) return;
+    erasing_ = pendingErase_ == plugin::kEraseAllBit
+                   ? AddressRange{0, static_cast<std::uint32_t>(flashBytes_ - 1)}
+                   : AddressRange{addressRegister_, addressRegister_ + sectorBytes_ - 1};
+    work_.attempted.Add(erasing_);
     meter_.Begin(Phase::Erase);
-    flashTouched_ = true;
 }
 
 void FlashWatch::FinishErase(std::uint32_t commandRegister) {
     if (pendingErase_ == 0 || (commandRegister & pendingErase_) != 0) return;
-    meter_.Advance(pendingErase_ == plugin::kEraseAllBit ? flashBytes_ : sectorBytes_);
+    work_.erased.Add(erasing_);
+    meter_.Advance(erasing_.Size());
     pendingErase_ = 0;
 }
 

@@ -46,6 +46,7 @@ class SimulatedDevice final : public Target {
     void Run() override;
     void Halt() override;
     void Reset(bool flag) override;
+    std::chrono::nanoseconds Now() const override { return time_.Now(); }
     void Pause(std::uint32_t milliseconds) override;
     bool SimulatesTime() const override { return true; }
 
