@@ -15,19 +15,7 @@ add_library(corvane_headers INTERFACE)
 set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
 target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 
-install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h
-              logger/ostrel_logger.h
-        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
-
-# The headers tell the kit's version; they are no templates, so that they compile where they lie.
-foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
-  file(STRINGS ${header} version REGEX "^#define FLASH_CORVANE_VERSION")
-  list(TRANSFORM version REPLACE "^.* " "")
-  if(NOT version STREQUAL "${PROJECT_VERSION_MAJOR};${PROJECT_VERSION_MINOR};${PROJECT_VERSION_PATCH};\"${PROJECT_VERSION}\"")
-    message(FATAL_ERROR "${header} tells another version than ${PROJECT_VERSION}: ${version}")
-  endif()
-  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${header})
-endforeach()
+include(cmake/Headers.cmake)
 install(TARGETS flash_corvane flash_host_check ostrel_logger corvane_headers EXPORT FlashCorvane
         LIBRARY DESTINATION ${plugin_directory})
 install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})

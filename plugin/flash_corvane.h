@@ -50,6 +50,12 @@
 #define FLASH_CORVANE_CALL __thiscall
 #endif
 
+#if defined(_WIN32)
+#define FLASH_CORVANE_CDECL __cdecl
+#else
+#define FLASH_CORVANE_CDECL
+#endif
+
 #ifdef __cplusplus
 extern "C" {
 #endif
@@ -129,9 +135,11 @@ struct CorvaneDeviceSlots {
 
 /* The type of the one exported function, "CreateFlashDevice2", to be looked up in the loaded
  * library. An ordinary C function on every system. */
-typedef const char* (*CorvaneCreateFlashDevice2)(const char* variant, const char* text2,
-                                                 const char* text3, CorvaneHost* host,
-                                                 CorvaneDevice** device);
+typedef const char*(FLASH_CORVANE_CDECL* CorvaneCreateFlashDevice2)(const char* variant,
+                                                                    const char* text2,
+                                                                    const char* text3,
+                                                                    CorvaneHost* host,
+                                                                    CorvaneDevice** device);
 
 #ifdef __cplusplus
 }

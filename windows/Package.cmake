@@ -1,8 +1,8 @@
-# The zip archive for makers of debuggers on Windows, made by script/package windows.
+# The archive for makers of debuggers on Windows, made by script/package windows: the libraries, the
+# headers and the documents.
 
+include(cmake/Headers.cmake)
 install(TARGETS flash_corvane flash_host_check ostrel_logger RUNTIME DESTINATION bin)
-install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h logger/ostrel_logger.h
-        DESTINATION include/flash_corvane)
 install(FILES README.md CHANGELOG.md DESTINATION .)
 install(DIRECTORY docs examples DESTINATION .)
 

@@ -2,9 +2,10 @@
 // for Microsoft's ABI it must write the same, whatever the compiler of the plug-in was. Then it
 // loads and unloads the plug-in more often than a process has thread-local indices.
 
-#include "logger/ostrel_logger.h"
-#include "plugin/IFlashDevice2.h"
-#include "plugin/IFlashHost.h"
+#include <flash_corvane/IFlashDevice2.h>
+#include <flash_corvane/IFlashHost.h>
+#include <flash_corvane/ostrel_logger.h>
+
 #include "tests/windows/System.h"
 
 namespace {

@@ -1,7 +1,8 @@
 // A logger in the maker's place: compiled for Microsoft's ABI it has the names, the calling
 // conventions and the table of slots that the maker's own library has.
 
-#include "logger/ostrel_logger.h"
+#include <flash_corvane/ostrel_logger.h>
+
 #include "tests/windows/System.h"
 
 static OstrelLoggerSink theSink;
