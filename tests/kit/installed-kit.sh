@@ -11,7 +11,9 @@ cmake --install "$1" --prefix "$trial/installed" >/dev/null
 kit=$trial/moved
 mv "$trial/installed" "$kit"
 
-flags="-Wall -Wextra -Werror ${2:+-fsanitize=$2}"
+# With sanitizers, as the libraries were built: by Clang.
+[ -z "$2" ] || export CC=clang CXX=clang++
+flags="-Wall -Wextra -Werror ${2:+-fsanitize=${2#fuzzer-no-link,}}"
 for example in minimal-host c-host; do
     cmake --no-warn-unused-cli -G Ninja -S "$kit/share/doc/corvane-flash/examples/$example" -B "$trial/$example" \
         -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_{C,CXX}_FLAGS="$flags" >/dev/null

@@ -1,0 +1,1 @@
+// Stands for the headers that are precompiled for all tests.
