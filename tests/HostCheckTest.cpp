@@ -150,7 +150,7 @@ void Fail(Slot& slot, const char* text) {
 const FaultyHost kFaultyHosts[] = {
     {"GetProperty: expected null for a setting that the host hasn't; came \"\" for \"FlashHost",
      [](Host& h) {
-         h.get = [&h, get = h.get](const char* name) { return get(name) ? get(name) : ""; };
+         h.get = [get = h.get](const char* name) { return get(name) ? get(name) : ""; };
      }},
     {"GetProperty: expected keys told apart by upper and lower case; came \"0\"",
      [](Host& h) { h.settings["flashresetsetting"] = "0"; }},
@@ -177,7 +177,7 @@ const FaultyHost kFaultyHosts[] = {
      }},
     {"SetProperty: expected a copy of the value, which GetProperty returns; came \"?\" after \"1\"",
      [](Host& h) {
-         h.get = [&h, get = h.get](const char* name) {
+         h.get = [get = h.get](const char* name) {
              return string(name) == "FlashChecksumValue" ? "?" : get(name);
          };
      }},
