@@ -92,11 +92,14 @@ void PrintTo(const Row& row, std::ostream* stream) {
 // Commands that succeed.
 const Row kDone[] = {
     {"tool info", 0,
-     "Family      Tolva Rev.B\nFlash       256 KiB (0x0-0x3ffff)\nSector      1 KiB\n"
+     "Family      Tolva Rev.B\nId register 0x10010100\nFlash       256 KiB (0x0-0x3ffff)\nSector   "
+     "   1 KiB\n"
      "RAM         64 KiB\nOperations  Erase | BlankCheck | ",
      ""},
     {"tool --sim dorna,flash=2M,sector=8K info", 0,
-     "Family      Dorna\nFlash       2 MiB (0x0-0x1fffff)\nSector      8 KiB\n", ""},
+     "Family      Dorna\nId register 0x901a0000\nFlash       2 MiB (0x0-0x1fffff)\nSector      8 "
+     "KiB\n",
+     ""},
     {"tool info --sim velk", 0, "Flash       none", ""},
     {"CORVANE_SIM=quen tool info", 0, "Family      Quen", ""},
     {"tool program $ELF", 0, "Erased        6 KiB", "5.5 KiB in 1 section for Tolva Rev.B"},
@@ -121,7 +124,10 @@ const Row kDone[] = {
      "in 1 section"},
     {"tool erase --all", 0, "Erased        256 KiB", "Erase covers 0x0-0x3ffff: 256 sectors"},
     {"tool erase --range 3ff-400", 0, "Erased        2 KiB", "Erase covers 0x0-0x7ff: 2 sectors"},
-    {"tool erase --range 0-0 --dry-run", 0, "would erase 0x0-0x3ff: 1 sector, 1 KiB; 255 KiB", ""},
+    {"tool erase --range 0-0 --dry-run", 0,
+     "would erase 0x0-0x3ff: 1 sector, 1 KiB; 255 KiB of flash are left as they are\nDry run: "
+     "nothing was touched\n",
+     ""},
     {"tool -q blank-check --range 5-5", 0, "0x5-0x5 is blank\n", nullptr},
     {"tool -q checksum", 0, "0xb7094978\n", ""},
     {"tool checksum --range 0-3", 0, "0xffffffff\n", "CRC-32 value: 0xffffffff"},
@@ -357,6 +363,9 @@ const Row kStories[] = {
      0, "16\n262144\n", nullptr},
     {"tool info > /dev/full", 3, "", "can't write to standard output: No space left on device"},
     {"tool settings | head -1", 0, "FlashProgramOption", ""},
+    {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL
+     " --json -q program $ELF --sim tolva,loader=hangs | sed -n '$p'",
+     0, "\"clearedBytes\":480,\"flashChanged\":true,\"phases\":{\"erase\"", nullptr},
     // What the shells make of it: bash has taken the word apart, zsh would show what is added.
     {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
      ":$PATH bash -c '. "

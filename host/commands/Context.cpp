@@ -2,6 +2,8 @@
 
 #include "host/commands/Context.h"
 
+#include <utility>
+
 namespace host {
 
 namespace {
@@ -28,6 +30,12 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
     }
     if (!context.options.dryRun) device.Save();
     return outcome;
+}
+
+Outcome NothingTouched(Context& context, Json plan) {
+    context.reporter.Result("Dry run: nothing was touched");
+    plan["dryRun"] = true;
+    return {.result = std::move(plan)};
 }
 
 image::ReadOptions ImageOptions(const Options& options) {

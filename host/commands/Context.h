@@ -22,6 +22,9 @@ struct Context {
 /// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
+/// What ends a --dry-run: `plan` is what would be done.
+Outcome NothingTouched(Context& context, Json plan);
+
 /// --format and --base.
 image::ReadOptions ImageOptions(const Options& options);
 

@@ -22,8 +22,9 @@ Outcome RunOn(Context& context, FlashDevice& device) {
             fmt::format("would erase {}: {}, {}; {} of flash are left as they are",
                         RangeText(covered), CountText(sectors, "sector"), SizeText(covered.Size()),
                         SizeText(info.flashBytes - covered.Size())));
-        return {.result = members};
+        return NothingTouched(context, members);
     }
+    device.Know(members);
     Outcome outcome = RunOperation(device, plugin::kErase);
     outcome.result.update(members);
     return outcome;

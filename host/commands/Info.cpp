@@ -27,12 +27,14 @@ Outcome Show(Context& context, FlashDevice& device) {
         info.hasFlash ? fmt::format("{} ({})", SizeText(info.flashBytes), RangeText(info.Flash()))
                       : "none that the plug-in can work on";
     reporter.Result("Family      " + (info.family.empty() ? "not recognized" : info.family));
+    reporter.Result(fmt::format("Id register {:#010x}", info.identification));
     reporter.Result("Flash       " + flash);
     reporter.Result("Sector      " + SizeText(info.sectorBytes));
     reporter.Result("RAM         " + SizeText(info.ramBytes));
     reporter.Result("Operations  " + info.operations);
     reporter.Result("Plug-in     " + device.LibraryPath());
     return {.result = {{"family", info.family},
+                       {"identification", info.identification},
                        {"hasFlash", info.hasFlash},
                        {"flashBytes", info.flashBytes},
                        {"sectorBytes", info.sectorBytes},
@@ -48,7 +50,7 @@ Outcome Run(Context& context) {
 }  // namespace
 
 CommandRow Info() {
-    return {"info", "Show the device: family, flash, sectors, RAM, operations",
+    return {"info", "Show the device: family, id, flash, sectors, RAM, operations",
             "",     "  corvane-flash --sim quen,flash=512K info",
             {},     Run};
 }

@@ -139,7 +139,8 @@ Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images)
         else
             context.reporter.Say(Talk::Verbose, line);
     }
-    if (context.options.dryRun) return {.result = PlanJson(plan)};
+    if (context.options.dryRun) return NothingTouched(context, PlanJson(plan));
+    device.Know(PlanJson(plan));
     return LoadAndCompare(context, device, images.image, plan);
 }
 

@@ -9,6 +9,7 @@
 #include <utility>
 
 #include "host/base/Interrupt.h"
+#include "host/output/Summary.h"
 #include "host/settings/SettingKeys.h"
 
 namespace host {
@@ -215,7 +216,8 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
     const bool shown = !host_.Errors().empty();
     LeaveHalted();
     RegisterValues registers;
-    Json known = Json::object();
+    Json known = known_;
+    known.update({{"flashChanged", watch_.FlashTouched()}, {"phases", PhasesJson(meter_)}});
     if (Registers().UserRegistersAccessed()) {
         registers = TryUserRegisters();
         known["registers"] = ToJson(Registers(), registers);
@@ -233,7 +235,7 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
         text = fmt::format("can't reach the target: {}; {}", text, kCheckConnection);
         throw DeviceFailure(ExitStatus::Unreachable, text, text, known);
     }
-    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text);
+    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text, known);
     const std::string rest = fmt::format("; {}; {}", state, Advice());
     std::string remark = text;
     if (shown && cause.empty())
@@ -243,12 +245,12 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
     throw DeviceFailure(ExitStatus::DeviceFailed, text + rest, remark + rest, known);
 }
 
-void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error) {
+void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error, Json known) {
     std::string remark = fmt::format("the flash isn't blank: {:#x} holds {:#04x}, not 0xff",
                                      found.address, found.actual);
     if (watch_.FlashTouched()) remark += "; " + StateOfFlash();
-    throw DeviceFailure(ExitStatus::ContentsDiffer, error, remark,
-                        {{"blank", false}, {"address", found.address}, {"actual", found.actual}});
+    known.update({{"blank", false}, {"address", found.address}, {"actual", found.actual}});
+    throw DeviceFailure(ExitStatus::ContentsDiffer, error, remark, known);
 }
 
 std::string FlashDevice::State(const RegisterValues& registers) const {

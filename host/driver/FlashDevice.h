@@ -96,6 +96,9 @@ class FlashDevice {
     /// What the last call has published. Failure (DeviceFailed) when it is nothing.
     std::string Published(const std::string& key) const;
 
+    /// Adds to what the JSON lines of a failure say: the command's plan, for one.
+    void Know(const Json& members) { known_.update(members); }
+
     /// Reads flash of the halted target, counting the bytes for the running phase.
     std::vector<std::uint8_t> ReadFlash(const AddressRange& range);
     std::uint32_t ReadUserRegister(unsigned index);
@@ -118,7 +121,7 @@ class FlashDevice {
     template <typename Action>
     void Call(const std::string& doing, const std::string& traced, Action&& action);
     [[noreturn]] void Fail(const std::string& error, const std::string& doing);
-    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error);
+    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error, Json known);
     RegisterValues TryUserRegisters();
     std::string State(const RegisterValues& registers) const;
     std::string AwaitLoader();
@@ -138,6 +141,7 @@ class FlashDevice {
     std::optional<PluginTrace> pluginTrace_;
     std::unique_ptr<IFlashDevice2, Destroyer> device_;
     DeviceInfo info_;
+    Json known_ = Json::object();
     bool reached_ = false;  ///< the device was identified, and its properties are known
     bool closing_ = false;  ///< after a failure
     bool haltFailed_ = false;
