@@ -54,6 +54,8 @@ template <typename Action>
 Outcome Guarded(Reporter& reporter, Action&& action) try {
     Outcome outcome = action();
     if (!outcome.error.empty()) reporter.Error(outcome.error);
+    for (const std::string& line : outcome.details)
+        reporter.ErrorDetail(line);
     return outcome;
 } catch (const DeviceFailure& failure) {
     reporter.Error(failure.Remark());

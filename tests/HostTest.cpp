@@ -316,21 +316,25 @@ TEST(ProgramPlan, JoiningChangesNoByteOfFlash) {
     }
 }
 
-TEST(Comparison, SaysWhereAndWhetherAnEraseIsMissing) {
-    std::optional<Difference> difference;
+TEST(Comparison, JoinsWhatLiesCloseAndKeepsTheFirstRanges) {
+    Differences found;
     const std::vector<std::uint8_t> same(5, 0x12);
-    Compare(difference, 0, same, same);
-    EXPECT_EQ(difference, std::nullopt);
-    Compare(difference, 0x100, std::vector<std::uint8_t>{1, 0x0F, 3},
-            std::vector<std::uint8_t>{1, 0xFF, 3});
-    EXPECT_EQ(difference, (Difference{0x101, 0x0F, 0xFF, 1, false}));
-    Compare(difference, 0x200, std::vector<std::uint8_t>{0xFF, 0},
-            std::vector<std::uint8_t>{0xFE, 1});
-    EXPECT_EQ(difference, (Difference{0x101, 0x0F, 0xFF, 3, true}));
-    EXPECT_EQ(Describe(*difference),
-              "the flash differs from the image: first at 0x101, expected 0x0f, actual 0xff; 3 "
-              "bytes differ; some bits were not erased: program with --erase necessary, or erase "
-              "the range first; a cell that stays so is damaged");
+    Compare(found, 0, same, same);
+    EXPECT_TRUE(found.Empty());
+    const auto differ = [&](std::uint32_t address, std::uint8_t expected, std::uint8_t actual) {
+        Compare(found, address, std::vector<std::uint8_t>{1, expected},
+                std::vector<std::uint8_t>{1, actual});
+    };
+    differ(0x0FF, 0x0F, 0xFF);
+    differ(0x10F, 0x03, 0x02);  // 15 equal bytes lie in between
+    EXPECT_EQ(found, (Differences{2, 1, {{{0x100, 0x110}, 0x0F, 0xFF}}, 0x110, true}));
+    differ(0x120, 0x00, 0x01);  // 16
+    EXPECT_EQ(found.ranges.back(), (DifferentRange{{0x121, 0x121}, 0x00, 0x01}));
+    for (std::uint32_t i = 2; i < 20; ++i)
+        differ(0x1000 * i, 0x00, 0x01);
+    EXPECT_EQ(found.rangeCount, 20U);
+    EXPECT_EQ(found.ranges.size(), Differences::kRangesShown);
+    EXPECT_EQ(found.ranges.back().range.last, 0x7001U);
 }
 
 TEST(Progress, FitsEveryTerminal) {

@@ -42,6 +42,10 @@ inline constexpr const char* kOperations[] = {
 /// What stands between the names in the list of operations.
 inline constexpr char kOperationSeparator[] = " | ";
 
+/// What ends a step of an operation: the whole text, and the end of the other one.
+inline constexpr char kStepDone[] = "Operation completed successfully.";
+inline constexpr char kStepFailed[] = "..";
+
 /// The events at which a host resets the settings.
 enum class ResetMode : int { LoadBegins = 0, TargetWillRun = 1, LoadComplete = 2 };
 

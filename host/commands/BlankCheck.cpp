@@ -12,7 +12,7 @@ namespace {
 
 Outcome RunOn(Context& context, FlashDevice& device) {
     const AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
-    Outcome outcome = RunOperation(device, plugin::kBlankCheck);
+    Outcome outcome = RunOperation(device, plugin::kBlankCheck, Talk::Verbose);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
     context.reporter.Result(RangeText(range) + " is blank");
     return outcome;

@@ -59,7 +59,7 @@ Outcome OfImage(Context& context) {
 Outcome OfFlash(Context& context) {
     return WithDevice(context, [&](FlashDevice& device) {
         const AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
-        const Outcome operation = RunOperation(device, plugin::kCalculateChecksum);
+        const Outcome operation = RunOperation(device, plugin::kCalculateChecksum, Talk::Verbose);
         Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
         outcome.result.update(operation.result);
         return outcome;

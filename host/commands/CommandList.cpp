@@ -43,6 +43,10 @@ OptionRow DryRunOption() {
     return {"--dry-run", "", "Show what would be done, and touch nothing", &Options::dryRun};
 }
 
+OptionRow NoVerifyOption() {
+    return {"--no-verify", "", "Leave out the read-back and comparison", &Options::noVerify};
+}
+
 OptionRow CommitOption() {
     return {"--commit", "", "Make the value survive a reset", &Options::commit};
 }

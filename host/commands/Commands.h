@@ -36,6 +36,7 @@ OptionRow ImagesArgument();
 OptionRow FormatOption();
 OptionRow BaseOption();
 OptionRow DryRunOption();
+OptionRow NoVerifyOption();
 OptionRow CommitOption();
 
 }  // namespace host::commands

@@ -25,8 +25,13 @@ Outcome RunOn(Context& context, FlashDevice& device) {
         return NothingTouched(context, members);
     }
     device.Know(members);
-    Outcome outcome = RunOperation(device, plugin::kErase);
+    const bool verify = !context.options.noVerify;
+    Outcome outcome = RunOperation(device, plugin::kErase, Talk::Verbose, verify);
     outcome.result.update(members);
+    if (outcome.status == ExitStatus::Done)
+        context.reporter.Done(verify ? fmt::format("Done: {} is blank", RangeText(covered))
+                                     : "Done: the device reported the erase done, and nothing was "
+                                       "compared");
     return outcome;
 }
 
@@ -50,6 +55,7 @@ CommandRow Erase() {
             "  corvane-flash erase --all --dry-run",
             {{"--all", "", "Erase the whole flash", &Options::all},
              RangeOption("Erase the sectors that hold these addresses"),
+             NoVerifyOption(),
              DryRunOption()},
             Run};
 }

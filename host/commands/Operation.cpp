@@ -48,12 +48,15 @@ void RequireInput(const Context& context, const std::string& name) {
 }
 
 Outcome RunOn(FlashDevice& device, const std::string& name) {
-    Outcome outcome = RunOperation(device, name);
+    Outcome outcome = RunOperation(device, name, Talk::Normal);
     const RegisterValues written{device.Registers().Of(0).written,
                                  device.Registers().Of(1).written};
-    if (!written[0] && !written[1]) return outcome;
-    const RegisterValues values = CheckRegisters(device, written, outcome);
-    device.Output().Result(Describe(device.Registers(), values));
+    if (written[0] || written[1]) {
+        const RegisterValues values = CheckRegisters(device, written, outcome);
+        device.Output().Result(Describe(device.Registers(), values));
+    }
+    if (outcome.status == ExitStatus::Done)
+        device.Output().Done(fmt::format("Done: operation {}", name));
     return outcome;
 }
 

@@ -104,7 +104,16 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
     if (IsOn(context, keys::kProgramCrc)) device.ResetSettings(ResetMode::LoadComplete);
 }
 
-Outcome LoadAndCompare(Context& context, FlashDevice& device, const image::Image& image,
+/// What can still be tried depends on what was erased.
+std::string Advice(const Differences& differences, const EraseChoice& erase) {
+    if (!differences.notErased) return "these bytes were not programmed";
+    if (erase.kind == EraseChoice::Kind::Necessary || erase.kind == EraseChoice::Kind::Everything)
+        return "some bits stay 0 although their sectors were erased: the cells are worn out or "
+               "protected";
+    return "some bits were not erased first: program it with --erase necessary";
+}
+
+Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages& images,
                        const ProgramPlan& plan) {
     Expect(context, device.Meter(), plan, device.Info().flashBytes);
     Load(context, device, plan);
@@ -112,14 +121,16 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const image::Image
     if (IsOn(context, keys::kProgramCrc))
         outcome.result["checksum"] = device.Published(keys::kChecksumValue);
     if (!context.options.noVerify) {
-        if (const auto difference = CompareWithFlash(device, image)) {
-            outcome.status = ExitStatus::ContentsDiffer;
-            outcome.error = Describe(*difference);
-            outcome.result["difference"] = ToJson(*difference);
-        }
+        if (const auto differences = CompareWithFlash(device, images.image); !differences.Empty())
+            FailAsDifferent(outcome, differences, images,
+                            Advice(differences, ChosenErase(context.settings)));
     }
     outcome.result["phases"] = PhasesJson(device.Meter());
     ShowSummary(context.reporter, device.Meter());
+    if (outcome.status == ExitStatus::Done)
+        context.reporter.Done(context.options.noVerify
+                                  ? "Done: the image is programmed, but not compared"
+                                  : "Done: the flash holds the image");
     return outcome;
 }
 
@@ -141,7 +152,7 @@ Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images)
     }
     if (context.options.dryRun) return NothingTouched(context, PlanJson(plan));
     device.Know(PlanJson(plan));
-    return LoadAndCompare(context, device, images.image, plan);
+    return LoadAndCompare(context, device, images, plan);
 }
 
 void CheckEraseOption(const Options& options) {
@@ -181,7 +192,7 @@ CommandRow Program() {
              {"--blank-check", "", "Check that the flash is blank before programming it",
               &Options::blankCheck},
              {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},
-             {"--no-verify", "", "Leave out the read-back and comparison", &Options::noVerify},
+             NoVerifyOption(),
              DryRunOption()},
             Run};
 }

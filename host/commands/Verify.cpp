@@ -13,16 +13,14 @@ namespace {
 Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
     RequireFit(device, images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
-    const auto difference = CompareWithFlash(device, images.image);
-    Outcome outcome{.result = {{"equal", !difference}, {"phases", PhasesJson(device.Meter())}}};
+    const Differences differences = CompareWithFlash(device, images.image);
+    const bool equal = differences.Empty();
+    Outcome outcome{.result = {{"equal", equal}, {"phases", PhasesJson(device.Meter())}}};
     ShowSummary(context.reporter, device.Meter());
-    if (!difference) {
+    if (equal)
         context.reporter.Result("The flash holds the image");
-        return outcome;
-    }
-    outcome.status = ExitStatus::ContentsDiffer;
-    outcome.error = Describe(*difference);
-    outcome.result["difference"] = ToJson(*difference);
+    else
+        FailAsDifferent(outcome, differences, images, "");
     return outcome;
 }
 

@@ -4,12 +4,15 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <cstring>
 #include <exception>
 #include <limits>
+#include <string_view>
 #include <utility>
 
 #include "host/base/Interrupt.h"
+#include "host/base/PluginFacts.h"
 #include "host/settings/SettingCatalogue.h"
 #include "host/settings/SettingKeys.h"
 
@@ -142,14 +145,17 @@ const char* FlashHost::EndProgress() {
     });
 }
 
-// After Ctrl-C the plug-in explains in its own words why it stops; that is no news.
+// What the tool itself says at the end is no news from the plug-in: why it stops after Ctrl-C, the
+// byte that isn't blank, and that a step has failed which has said why.
 const char* FlashHost::ShowError(const char* text) {
     return Slot(AfterInterrupt::GoOn, [&] {
+        const bool echo = !errors_.empty() && std::string_view(text).ends_with(plugin::kStepFailed);
         errors_.emplace_back(text);
         if (Interrupted())
             reporter_.PluginMessage(Talk::Verbose, text);
         else
-            reporter_.PluginError(text);
+            reporter_.PluginError(echo || watch_.FirstNotBlank() ? Talk::Verbose : Talk::Quiet,
+                                  text);
     });
 }
 
@@ -160,7 +166,9 @@ const char* FlashHost::ShowMessage(const char* text) {
         if (!publishedMac_.empty() && message.ends_with(" " + publishedMac_))
             message.replace(message.size() - publishedMac_.size(), publishedMac_.size(),
                             settings_.Published(keys::kMacInput));
-        reporter_.PluginMessage(messageLevel_, message);
+        const bool told = message == plugin::kStepDone;
+        reporter_.PluginMessage(told ? std::max(messageLevel_, Talk::Verbose) : messageLevel_,
+                                message);
     });
 }
 

@@ -7,6 +7,7 @@
 #include <algorithm>
 
 #include "host/driver/FlashDevice.h"
+#include "host/flashing/ImageSet.h"
 
 namespace host {
 
@@ -15,57 +16,128 @@ namespace {
 /// So much is read before it is compared; an image can be as large as the flash.
 constexpr std::size_t kPieceBytes = std::size_t{1024} * 1024;
 
-}  // namespace
+/// Equal bytes that don't end a range: some are equal by chance.
+constexpr std::uint32_t kGapBytesMax = 15;
 
-void Compare(std::optional<Difference>& difference, std::uint32_t address,
-             std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual) {
-    for (std::size_t i = 0; i < expected.size(); ++i) {
-        if (expected[i] == actual[i]) continue;
-        if (!difference)
-            difference = {address + static_cast<std::uint32_t>(i), expected[i], actual[i], 0,
-                          false};
-        ++difference->count;
-        if ((expected[i] & ~actual[i]) != 0) difference->notErased = true;
+void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
+         std::uint8_t actual) {
+    const bool joins =
+        differences.rangeCount != 0 && address - differences.lastAddress <= kGapBytesMax + 1;
+    if (!joins && ++differences.rangeCount <= Differences::kRangesShown)
+        differences.ranges.push_back({{address, address}, expected, actual});
+    if (differences.rangeCount <= Differences::kRangesShown)
+        differences.ranges.back().range.last = address;
+    ++differences.byteCount;
+    differences.lastAddress = address;
+    if ((expected & ~actual) != 0) differences.notErased = true;
+}
+
+/// Calls `compare` for each piece of a range that was read.
+template <typename Action>
+void ReadPieces(FlashDevice& device, const AddressRange& range, const Action& compare) {
+    std::uint64_t rest = range.Size();
+    for (std::uint32_t address = range.first; rest > 0;) {
+        const auto size = static_cast<std::uint32_t>(std::min<std::uint64_t>(kPieceBytes, rest));
+        compare(address, device.ReadFlash({address, address + (size - 1)}));
+        rest -= size;
+        address += size;
     }
 }
 
-std::optional<Difference> CompareWithFlash(FlashDevice& device, const image::Image& image) {
-    std::optional<Difference> difference;
+template <typename Action>
+Differences Read(FlashDevice& device, const Action& work) {
+    Differences differences;
     device.Halt();
     device.Meter().Begin(Phase::Verify);
-    for (const image::Section& section : image.Sections()) {
-        std::span<const std::uint8_t> rest = section.bytes;
-        for (std::uint32_t address = section.address; !rest.empty();) {
-            const auto piece = rest.first(std::min(kPieceBytes, rest.size()));
-            const auto last = address + static_cast<std::uint32_t>(piece.size() - 1);
-            Compare(difference, address, piece, device.ReadFlash({address, last}));
-            rest = rest.subspan(piece.size());
-            address = last + 1;
-        }
-    }
+    work(differences);
     device.Meter().End();
-    return difference;
+    return differences;
 }
 
-std::string Describe(const Difference& difference) {
-    return fmt::format(
-        "the flash differs from the image: first at {:#x}, expected {:#04x}, actual {:#04x}; {} "
-        "differ{}; {}",
-        difference.address, difference.expected, difference.actual,
-        difference.count == 1 ? "1 byte" : fmt::format("{} bytes", difference.count),
-        difference.count == 1 ? "s" : "",
-        difference.notErased
-            ? "some bits were not erased: program with --erase necessary, or erase the range "
-              "first; a cell that stays so is damaged"
-            : "no bit needs an erase: the bytes were not programmed, or not from this image");
+std::string Extent(const Differences& differences) {
+    return fmt::format("{} in {}", CountText(differences.byteCount, "byte"),
+                       CountText(differences.rangeCount, "range"));
 }
 
-Json ToJson(const Difference& difference) {
-    return {{"address", difference.address},
-            {"expected", difference.expected},
-            {"actual", difference.actual},
-            {"bytes", difference.count},
-            {"notErased", difference.notErased}};
+Json ToJson(const Differences& differences, const LoadedImages* images) {
+    Json ranges = Json::array();
+    for (const auto& [range, expected, actual] : differences.ranges) {
+        ranges.push_back({{"address", range.first},
+                          {"bytes", range.Size()},
+                          {"expected", expected},
+                          {"actual", actual}});
+        if (images != nullptr) ranges.back()["file"] = images->FileOf(range.first);
+    }
+    const DifferentRange& first = differences.ranges.front();
+    return {{"address", first.range.first},
+            {"expected", first.expected},
+            {"actual", first.actual},
+            {"bytes", differences.byteCount},
+            {"ranges", ranges},
+            {"rangeCount", differences.rangeCount},
+            {"notErased", differences.notErased}};
+}
+
+void Fail(Outcome& outcome, const Differences& differences, const LoadedImages* images,
+          std::string error) {
+    outcome.status = ExitStatus::ContentsDiffer;
+    outcome.error = std::move(error);
+    outcome.result["difference"] = ToJson(differences, images);
+    // The closing line of an erase has the first byte already.
+    if (images == nullptr && differences.rangeCount == 1) return;
+    for (const auto& [range, expected, actual] : differences.ranges)
+        outcome.details.push_back(fmt::format(
+            "  {:<23} {}first expected {:#04x}, actual {:#04x}", RangeText(range),
+            images == nullptr ? "" : images->FileOf(range.first) + ": ", expected, actual));
+    if (const auto more = differences.rangeCount - differences.ranges.size(); more != 0)
+        outcome.details.push_back("  and " + CountText(more, "more range"));
+}
+
+}  // namespace
+
+void Compare(Differences& differences, std::uint32_t address,
+             std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual) {
+    for (std::size_t i = 0; i < expected.size(); ++i)
+        if (expected[i] != actual[i])
+            Add(differences, address + static_cast<std::uint32_t>(i), expected[i], actual[i]);
+}
+
+Differences CompareWithFlash(FlashDevice& device, const image::Image& image) {
+    return Read(device, [&](Differences& differences) {
+        for (const image::Section& section : image.Sections())
+            ReadPieces(device, {section.address, section.Last()},
+                       [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
+                           const std::span<const std::uint8_t> all = section.bytes;
+                           Compare(differences, address,
+                                   all.subspan(address - section.address, actual.size()), actual);
+                       });
+    });
+}
+
+Differences CompareWithErased(FlashDevice& device, const AddressRange& range) {
+    const std::vector<std::uint8_t> erased(std::min<std::uint64_t>(kPieceBytes, range.Size()),
+                                           0xFF);
+    return Read(device, [&](Differences& differences) {
+        ReadPieces(device, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
+            Compare(differences, address, std::span(erased).first(actual.size()), actual);
+        });
+    });
+}
+
+void FailAsDifferent(Outcome& outcome, const Differences& differences, const LoadedImages& images,
+                     const std::string& advice) {
+    Fail(outcome, differences, &images,
+         fmt::format("the flash differs from {}: {}{}{}", images.Name(), Extent(differences),
+                     advice.empty() ? "" : "; ", advice));
+}
+
+void FailAsNotErased(Outcome& outcome, const Differences& differences) {
+    const DifferentRange& first = differences.ranges.front();
+    Fail(outcome, differences, nullptr,
+         fmt::format("the flash isn't blank although the device reported the erase done: {:#x} "
+                     "holds {:#04x}, not 0xff; {} not blank; the cells are worn out or protected",
+                     first.range.first, first.actual, Extent(differences)));
+    outcome.result["blank"] = false;
 }
 
 }  // namespace host

@@ -3,37 +3,58 @@
 #pragma once
 
 #include <cstdint>
-#include <optional>
 #include <span>
 #include <string>
+#include <vector>
 
 #include "host/base/Json.h"
+#include "host/base/Text.h"
 #include "host/image/Image.h"
+#include "host/output/Reporter.h"
 
 namespace host {
 
 class FlashDevice;
+struct LoadedImages;
 
-struct Difference {
-    std::uint32_t address = 0;  ///< of the first byte that differs
-    std::uint8_t expected = 0;
+/// Bytes that differ, near enough to each other to be told as one range.
+struct DifferentRange {
+    AddressRange range;
+    std::uint8_t expected = 0;  ///< of the first byte, which differs
     std::uint8_t actual = 0;
-    std::uint64_t count = 0;
-    bool notErased = false;  ///< some bit that should be 1 is 0: only an erase can mend that
 
-    bool operator==(const Difference&) const = default;
+    bool operator==(const DifferentRange&) const = default;
 };
 
-/// Adds what differs between two runs of bytes at an address to the difference found so far.
-void Compare(std::optional<Difference>& difference, std::uint32_t address,
+struct Differences {
+    static constexpr std::size_t kRangesShown = 8;
+
+    std::uint64_t byteCount = 0;  ///< that differ
+    std::uint64_t rangeCount = 0;
+    std::vector<DifferentRange> ranges;  ///< the first of them
+    std::uint32_t lastAddress = 0;       ///< of the last byte that differs
+    bool notErased = false;  ///< some bit that should be 1 is 0: only an erase can mend that
+
+    bool Empty() const { return byteCount == 0; }
+    bool operator==(const Differences&) const = default;
+};
+
+/// Adds what differs between two runs of bytes at an address to what was found so far, below it.
+void Compare(Differences& differences, std::uint32_t address,
              std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual);
 
 /// Reads all that the image covers and compares. The target is halted first.
-std::optional<Difference> CompareWithFlash(FlashDevice& device, const image::Image& image);
+Differences CompareWithFlash(FlashDevice& device, const image::Image& image);
 
-/// One line: where, what, how many, and what to try.
-std::string Describe(const Difference& difference);
+/// The same with what an erase leaves.
+Differences CompareWithErased(FlashDevice& device, const AddressRange& range);
 
-Json ToJson(const Difference& difference);
+/// Makes the outcome the failure (ContentsDiffer) of a flash that should hold the images, with a
+/// line for each of the first ranges that names the file; `advice` ends the closing line.
+void FailAsDifferent(Outcome& outcome, const Differences& differences, const LoadedImages& images,
+                     const std::string& advice);
+
+/// The same of a flash that should be erased.
+void FailAsNotErased(Outcome& outcome, const Differences& differences);
 
 }  // namespace host

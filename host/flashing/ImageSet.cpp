@@ -4,10 +4,24 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+
 #include "host/base/Errors.h"
 #include "host/driver/FlashDevice.h"
 
 namespace host {
+
+std::string LoadedImages::FileOf(std::uint32_t address) const {
+    for (const auto& [file, range] : origins)
+        if (range.first <= address && address <= range.last) return file;
+    return Name();
+}
+
+std::string LoadedImages::Name() const {
+    const auto differs = [&](const Origin& origin) { return origin.file != origins.front().file; };
+    const bool several = std::any_of(origins.begin(), origins.end(), differs);
+    return origins.empty() || several ? "the images" : origins.front().file;
+}
 
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
     LoadedImages images;

@@ -21,6 +21,12 @@ struct LoadedImages {
         AddressRange range;
     };
     std::vector<Origin> origins;
+
+    /// The file that a byte of the image stems from.
+    std::string FileOf(std::uint32_t address) const;
+
+    /// The file, or "the images" where there are several.
+    std::string Name() const;
 };
 
 /// Reads the files and joins them.

@@ -6,6 +6,7 @@
 
 #include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
+#include "host/flashing/Comparison.h"
 #include "host/flashing/ProgramPlan.h"
 #include "host/output/Summary.h"
 
@@ -38,15 +39,20 @@ std::optional<AddressRange> CoveredRange(FlashDevice& device, const RangeOperati
                            operation.unitBytes == 0 ? info.sectorBytes : operation.unitBytes);
 }
 
-void Announce(FlashDevice& device, const RangeOperation& operation) {
+/// Returns what is to be read back afterwards.
+std::optional<AddressRange> Announce(FlashDevice& device, const RangeOperation& operation,
+                                     bool verifyErase) {
     const auto covered = CoveredRange(device, operation);
-    if (!covered) return;
+    if (!covered) return std::nullopt;
     device.Meter().Expect(operation.phase, covered->Size());
-    if (operation.phase == Phase::Erase)
-        device.Output().Say(
-            Talk::Normal,
-            fmt::format("Erase covers {}: {}", RangeText(*covered),
-                        CountText(covered->Size() / device.Info().sectorBytes, "sector")));
+    if (operation.phase != Phase::Erase) return std::nullopt;
+    device.Output().Say(
+        Talk::Normal,
+        fmt::format("Erase covers {}: {}", RangeText(*covered),
+                    CountText(covered->Size() / device.Info().sectorBytes, "sector")));
+    if (!verifyErase) return std::nullopt;
+    device.Meter().Expect(Phase::Verify, covered->Size());
+    return covered;
 }
 
 }  // namespace
@@ -58,12 +64,21 @@ AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
     return range;
 }
 
-Outcome RunOperation(FlashDevice& device, const std::string& name) {
+Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level, bool verifyErase) {
+    std::optional<AddressRange> erased;
     for (const RangeOperation& operation : kRangeOperations)
-        if (name == operation.name) Announce(device, operation);
-    device.Perform(name);
+        if (name == operation.name) erased = Announce(device, operation, verifyErase);
+    device.Perform(name, level);
+    Outcome outcome{.result = {{"operation", name}}};
+    if (erased) {
+        outcome.result["blank"] = true;
+        if (const Differences differences = CompareWithErased(device, *erased);
+            !differences.Empty())
+            FailAsNotErased(outcome, differences);
+    }
+    outcome.result["phases"] = PhasesJson(device.Meter());
     ShowSummary(device.Output(), device.Meter());
-    return {.result = {{"operation", name}, {"phases", PhasesJson(device.Meter())}}};
+    return outcome;
 }
 
 }  // namespace host

@@ -20,7 +20,10 @@ AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
                          const std::optional<std::string>& text);
 
 /// Announces the work as the settings are, an erase as the sectors it covers; runs the operation,
-/// any of the plug-in's, and shows the summary. The outcome holds the phases.
-Outcome RunOperation(FlashDevice& device, const std::string& name);
+/// any of the plug-in's, its messages shown at `level`; reads back what an erase has covered unless
+/// that is unwanted; and shows the summary. The outcome holds the phases, and is a failure
+/// (ContentsDiffer) when the erased range isn't blank.
+Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level,
+                     bool verifyErase = true);
 
 }  // namespace host

@@ -55,9 +55,9 @@ void Reporter::PluginMessage(Talk level, const std::string& text) {
     if (Hears(level)) Line(stderr, text);
 }
 
-void Reporter::PluginError(const std::string& text) {
+void Reporter::PluginError(Talk level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "error"}, {"text", text}});
-    Error(text);
+    if (Hears(level)) Error(text);
 }
 
 void Reporter::Error(const std::string& text) {

@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <string>
+#include <vector>
 
 #include "host/base/Errors.h"
 #include "host/base/Json.h"
@@ -19,6 +20,7 @@ struct Outcome {
     ExitStatus status = ExitStatus::Done;
     std::string error = {};
     Json result = Json::object();
+    std::vector<std::string> details = {};  ///< lines to show below the error
 };
 
 class Reporter {
@@ -39,11 +41,19 @@ class Reporter {
     /// A line for those who want to hear this much.
     void Say(Talk level, const std::string& text);
 
+    /// What the command has done, the last line of its summary.
+    void Done(const std::string& text) {
+        if (Hears(Talk::Normal)) Result(text);
+    }
+
     /// A message or an error that the plug-in shows its user.
     void PluginMessage(Talk level, const std::string& text);
-    void PluginError(const std::string& text);
+    void PluginError(Talk level, const std::string& text);
 
     void Error(const std::string& text);
+
+    /// A line of an error that takes several.
+    void ErrorDetail(const std::string& text) { Line(stderr, text); }
     void Progress(Phase phase, const PhaseProgress& progress);
     void End(const Outcome& outcome);
 
