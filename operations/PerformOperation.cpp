@@ -37,16 +37,16 @@ struct FlashCorvane::Operations {
 
     static constexpr auto runOnUserRegisters = &FlashCorvane::RunUserRegisterOperation;
     static constexpr NamedOperation table[] = {
-        {"Erase", kListed, &FlashCorvane::RunErase, {}, {}},
-        {"BlankCheck", kListed, &FlashCorvane::RunBlankCheck, {}, {}},
-        {"CalculateChecksum", kListed, &FlashCorvane::RunCalculateChecksum, {}, {}},
-        {"ProgramUserRegister0", kListed, runOnUserRegisters, Program, Register0},
-        {"ReadUserRegister0", kListed, runOnUserRegisters, Read, Register0},
-        {"ProgramUserRegister1", kListed, runOnUserRegisters, Program, Register1},
-        {"ReadUserRegister1", kListed, runOnUserRegisters, Read, Register1},
-        {"ProgramMACAddress", kListed, runOnUserRegisters, Program, MACAddress},
-        {"ReadMACAddress", kListed, runOnUserRegisters, Read, MACAddress},
-        {"Test", kUnlisted, &FlashCorvane::RunTest, {}, {}},
+        {"Erase", &FlashCorvane::RunErase, kListed, {}, {}},
+        {"BlankCheck", &FlashCorvane::RunBlankCheck, kListed, {}, {}},
+        {"CalculateChecksum", &FlashCorvane::RunCalculateChecksum, kListed, {}, {}},
+        {"ProgramUserRegister0", runOnUserRegisters, kListed, Program, Register0},
+        {"ReadUserRegister0", runOnUserRegisters, kListed, Read, Register0},
+        {"ProgramUserRegister1", runOnUserRegisters, kListed, Program, Register1},
+        {"ReadUserRegister1", runOnUserRegisters, kListed, Read, Register1},
+        {"ProgramMACAddress", runOnUserRegisters, kListed, Program, MACAddress},
+        {"ReadMACAddress", runOnUserRegisters, kListed, Read, MACAddress},
+        {"Test", &FlashCorvane::RunTest, kUnlisted, {}, {}},
     };
 };
 

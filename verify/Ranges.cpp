@@ -13,7 +13,7 @@ namespace {
 // What one host read may ask for, a little short of 32 KiB. The buffer has room for four times as
 // much: a host that rounds a read up to its own transfer size must not write past it.
 constexpr std::uint32_t kChunkSize = 32752;
-constexpr std::size_t kReadBufferSize = 4 * kChunkSize;
+constexpr std::size_t kReadBufferSize = std::size_t{4} * kChunkSize;
 constexpr std::int16_t kFlashPage = 0;
 
 }  // namespace

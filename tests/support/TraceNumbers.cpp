@@ -36,7 +36,7 @@ class NumberChecker final : public Logging::ILogger {
     }
 
   private:
-    static void Pass(uint64_t id, int facility, int module, int level, std::string text,
+    static void Pass(uint64_t id, int facility, int module, int level, const std::string& text,
                      bool plain) {
         const bool right = id == 0 && facility == 11 && module == 3 &&
                            plain == text.starts_with("Erasing Flash Page");
