@@ -253,14 +253,15 @@ const Scenario Scenarios[] = {
          host.settings["FlashBlankCheckSelection"] = "";
          Perform(host, plugin, "BlankCheck");
 
-         // Chunks of 8 bytes: all programmed, every other one, the last one.
-         constexpr std::array<std::uint8_t, 8> cells = {0x00, 0xFF, 0x00, 0xFF,
-                                                        0x00, 0xFF, 0x00, 0xFF};
-         host.Device().Flash().Preset(0x100, std::array<std::uint8_t, 8>{});
-         host.Device().Flash().Preset(0x207, cells);
+         // Chunks of 8 bytes: all programmed, the last one, every other one behind a whole chunk.
+         auto& flash = host.Device().Flash();
+         flash.Preset(0x100, std::array<std::uint8_t, 8>{});
+         flash.Preset(0x207, std::array<std::uint8_t, 1>{0x7F});
+         for (std::uint32_t odd = 0xFFE5; odd < 0xFFEC; odd += 2)
+             flash.Preset(odd, std::array<std::uint8_t, 1>{0xFE});
          CheckRange(host, plugin, "BlankCheck", "100", "107");
          CheckRange(host, plugin, "BlankCheck", "200", "207");
-         CheckRange(host, plugin, "BlankCheck", "208", "20F");
+         CheckRange(host, plugin, "BlankCheck", "7FF4", "FFEB");
          CheckRange(host, plugin, "BlankCheck", "7", "8");
          CheckRange(host, plugin, "BlankCheck", "FFF0", "10000");
          CheckRange(host, plugin, "CalculateChecksum", "FFF0", "10000");

@@ -154,7 +154,7 @@ const char* RecordingHost::SetProperty(const char* name, const char* value) {
 
 const char* RecordingHost::LoadProgram(const char* fileName, const char* second,
                                        const char* directory) {
-    return Answer(fmt::format("load \"{}\" \"{}\" \"{}\"", fileName, second, directory), [&] {
+    return Answer(fmt::format(R"(load "{}" "{}" "{}")", fileName, second, directory), [&] {
         device_->LoadProgram(fileName, directory);
         return "";
     });
