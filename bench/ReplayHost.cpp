@@ -2,11 +2,12 @@
 
 namespace bench {
 
-void ReplayHost::Note(const test::Call& call) {
-    LeanHost::Note(call);
-    if (!recording) return;
-    calls_.push_back(call);
-    if (call.text != nullptr) calls_.back().text = texts_.insert(call.text).first->c_str();
+const char* ReplayHost::Note(const test::Call& call) {
+    if (recording) {
+        calls_.push_back(call);
+        if (call.text != nullptr) calls_.back().text = texts_.insert(call.text).first->c_str();
+    }
+    return LeanHost::Note(call);
 }
 
 void ReplayHost::Replay() {

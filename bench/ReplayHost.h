@@ -21,7 +21,7 @@ class ReplayHost final : public test::LeanHost {
     void Replay();
 
   private:
-    void Note(const test::Call& call) override;
+    const char* Note(const test::Call& call) override;
     void Make(const test::Call& call);
 
     std::vector<test::Call> calls_;

@@ -31,71 +31,60 @@ const char* LeanHost::GetProperty(const char* name) {
 }
 
 const char* LeanHost::SetProperty(const char* name, const char* value) {
-    Note({Setting, 1, name});
     settings[name] = value;
-    return nullptr;
+    return Note({Setting, 1, name});
 }
 
 const char* LeanHost::LoadProgram(const char* fileName, const char*, const char* directory) {
-    Note({Control, 2, fileName});
     target_.LoadProgram(fileName, directory);
-    return nullptr;
+    return Note({Control, 2, fileName});
 }
 
 const char* LeanHost::RunTarget() {
-    Note({Control, 4});
     target_.Run();
-    return nullptr;
+    return Note({Control, 4});
 }
 
 const char* LeanHost::HaltTarget() {
-    Note({Control, 6});
     target_.Halt();
-    return nullptr;
+    return Note({Control, 6});
 }
 
 const char* LeanHost::ResetTarget(bool flag) {
-    Note({Control, 7, nullptr, flag});
     target_.Reset(flag);
-    return nullptr;
+    return Note({Control, 7, nullptr, flag});
 }
 
 const char* LeanHost::ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
                                  size_t width) {
     const auto at = static_cast<std::uint32_t>(address);
-    Note({Read, 10, nullptr, 0, at, count, page, width});
     counts.bytesRead += count * width;
     target_.Read(buffer, count, at, page, width);
-    return nullptr;
+    return Note({Read, 10, nullptr, 0, at, count, page, width});
 }
 
 const char* LeanHost::WriteMemory(const void* buffer, size_t count, uint64_t address, int16_t page,
                                   size_t width) {
     const auto at = static_cast<std::uint32_t>(address);
-    Note({Write, 11, nullptr, 0, at, count, page, width});
     counts.bytesWritten += count * width;
     target_.Write(buffer, count, at, page, width);
-    return nullptr;
+    return Note({Write, 11, nullptr, 0, at, count, page, width});
 }
 
 const char* LeanHost::BeginProgress(const char* title) {
-    Note({Display, 16, title});
-    return nullptr;
+    return Note({Display, 16, title});
 }
 
 const char* LeanHost::UpdateProgress(uint32_t percent, const char* text) {
-    Note({Display, 17, text, percent});
-    return nullptr;
+    return Note({Display, 17, text, percent});
 }
 
 const char* LeanHost::EndProgress() {
-    Note({Display, 18});
-    return nullptr;
+    return Note({Display, 18});
 }
 
 const char* LeanHost::ShowMessage(const char* text) {
-    Note({Display, 20, text});
-    return nullptr;
+    return Note({Display, 20, text});
 }
 
 // A figure for work that failed would mean nothing.
@@ -105,10 +94,9 @@ const char* LeanHost::ShowError(const char* text) {
 }
 
 const char* LeanHost::Sleep(uint32_t milliseconds) {
-    Note({Pause, 22, nullptr, milliseconds});
     counts.pausedMs += milliseconds;
     target_.Pause(milliseconds);
-    return nullptr;
+    return Note({Pause, 22, nullptr, milliseconds});
 }
 
 }  // namespace test

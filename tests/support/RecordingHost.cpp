@@ -115,16 +115,17 @@ bool RecordingHost::Fails(const std::string& line) {
 
 // Every text that is handed out lives in the same memory, which the next call overwrites: whoever
 // keeps a pointer to it is found out.
-const char* RecordingHost::Answer(const std::string& line,
-                                  const std::function<std::string()>& action) {
+const char* RecordingHost::Answer(const std::string& line, const std::function<void()>& action) {
     std::fill(answer_.begin(), answer_.end(), '#');
+    bytesRead_.clear();
     if (Fails(line)) {
         Note(line + " ! " + fault.text);
         answer_ = fault.text;
         return answer_.c_str();
     }
     try {
-        Note(line + action());
+        action();
+        Note(line + bytesRead_);
         return nullptr;
     } catch (const target::TargetError& error) {
         Note(line + " ! " + error.what());
@@ -146,46 +147,32 @@ const char* RecordingHost::GetProperty(const char* name) {
 }
 
 const char* RecordingHost::SetProperty(const char* name, const char* value) {
-    return Answer(fmt::format("set {} = \"{}\"", name, value), [&] {
-        settings[name] = value;
-        return "";
-    });
+    return Answer(fmt::format("set {} = \"{}\"", name, value), [&] { settings[name] = value; });
 }
 
 const char* RecordingHost::LoadProgram(const char* fileName, const char* second,
                                        const char* directory) {
-    return Answer(fmt::format(R"(load "{}" "{}" "{}")", fileName, second, directory), [&] {
-        device_->LoadProgram(fileName, directory);
-        return "";
-    });
+    return Answer(fmt::format(R"(load "{}" "{}" "{}")", fileName, second, directory),
+                  [&] { device_->LoadProgram(fileName, directory); });
 }
 
 const char* RecordingHost::RunTarget() {
-    return Answer("run", [&] {
-        device_->Run();
-        return "";
-    });
+    return Answer("run", [&] { device_->Run(); });
 }
 
 const char* RecordingHost::HaltTarget() {
-    return Answer("halt", [&] {
-        device_->Halt();
-        return "";
-    });
+    return Answer("halt", [&] { device_->Halt(); });
 }
 
 const char* RecordingHost::ResetTarget(bool flag) {
-    return Answer(fmt::format("reset {}", flag), [&] {
-        device_->Reset(flag);
-        return "";
-    });
+    return Answer(fmt::format("reset {}", flag), [&] { device_->Reset(flag); });
 }
 
 const char* RecordingHost::ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
                                       size_t width) {
     return Answer(TransferText("read", count, address, page, width), [&] {
         device_->Read(buffer, count, static_cast<std::uint32_t>(address), page, width);
-        return BytesText(buffer, count, width);
+        bytesRead_ = BytesText(buffer, count, width);
     });
 }
 
@@ -194,36 +181,33 @@ const char* RecordingHost::WriteMemory(const void* buffer, size_t count, uint64_
     const std::string line = TransferText("write", count, address, page, width);
     return Answer(line + BytesText(buffer, count, width), [&] {
         device_->Write(buffer, count, static_cast<std::uint32_t>(address), page, width);
-        return "";
     });
 }
 
 const char* RecordingHost::BeginProgress(const char* title) {
-    return Answer(fmt::format("begin \"{}\"", title), [&] {
-        displayMisused |= openDisplays++ != 0;
-        return "";
-    });
+    return Answer(fmt::format("begin \"{}\"", title),
+                  [&] { displayMisused |= openDisplays++ != 0; });
 }
 
 const char* RecordingHost::UpdateProgress(uint32_t percent, const char* text) {
     displayMisused |= openDisplays != 1;
-    return Answer(fmt::format("update {} \"{}\"", percent, text), [] { return ""; });
+    return Answer(fmt::format("update {} \"{}\"", percent, text));
 }
 
 // An end that fails is an end all the same.
 const char* RecordingHost::EndProgress() {
     displayMisused |= --openDisplays != 0;
-    return Answer("end", [] { return ""; });
+    return Answer("end");
 }
 
 const char* RecordingHost::ShowError(const char* text) {
     errors.emplace_back(text);
-    return Answer(fmt::format("error \"{}\"", text), [] { return ""; });
+    return Answer(fmt::format("error \"{}\"", text));
 }
 
 const char* RecordingHost::ShowMessage(const char* text) {
     messages.emplace_back(text);
-    return Answer(fmt::format("message \"{}\"", text), [] { return ""; });
+    return Answer(fmt::format("message \"{}\"", text));
 }
 
 const char* RecordingHost::GetDirectory() {
@@ -233,10 +217,7 @@ const char* RecordingHost::GetDirectory() {
 }
 
 const char* RecordingHost::Sleep(uint32_t milliseconds) {
-    return Answer(fmt::format("sleep {}", milliseconds), [&] {
-        device_->Pause(milliseconds);
-        return "";
-    });
+    return Answer(fmt::format("sleep {}", milliseconds), [&] { device_->Pause(milliseconds); });
 }
 
 CreateFlashDevice2Function Factory() {

@@ -81,11 +81,13 @@ class RecordingHost final : public StrictHost {
     bool Fails(const std::string& line);
     void Note(const std::string& line);
     void NoteTrace(int level, std::string text);
-    const char* Answer(const std::string& line, const std::function<std::string()>& action);
+    const char* Answer(
+        const std::string& line, const std::function<void()>& action = [] {});
 
     VirtualClock clock_;
     std::unique_ptr<target::SimulatedDevice> device_;
-    std::string answer_;  ///< what the last call returned; gone with the next one
+    std::string bytesRead_;  ///< by the call, as its line shows them
+    std::string answer_;     ///< what the last call returned; gone with the next one
 };
 
 /// Loads the built plug-in once and creates a device object; throws std::runtime_error with the
