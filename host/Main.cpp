@@ -2,8 +2,10 @@
 
 #include "host/Tool.h"
 #include "host/base/Interrupt.h"
+#include "host/base/Streams.h"
 
 int main(int argc, char** argv) {
-    host::CatchInterrupts();
+    host::OccupyStandardStreams();
+    host::CatchSignals();
     return host::RunTool({argv + 1, argv + argc});
 }

@@ -3,13 +3,17 @@
 #include "host/Tool.h"
 
 #include <fmt/format.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdio>
 #include <exception>
+#include <optional>
 #include <system_error>
 
+#include "host/base/FileLock.h"
+#include "host/base/Interrupt.h"
+#include "host/base/Streams.h"
 #include "host/cli/CommandLine.h"
 #include "host/commands/Commands.h"
 #include "host/settings/SettingKeys.h"
@@ -25,12 +29,19 @@ Reporter::Options ReporterOptions(const Options& options) {
     return {static_cast<Talk>(talk), options.json, traced ? "none" : options.progress};
 }
 
-/// What was kept on the way is worth keeping after a failure as well; that it can't be kept is no
-/// reason for a command to fail.
-void SaveSettings(Reporter& reporter, SettingStore& settings) try {
-    settings.Save();
+/// What was published on the way is worth keeping after a failure as well; that it can't be kept
+/// (there may be no home directory) is no reason for a command to fail. That another run keeps us
+/// from it is one.
+std::optional<FileBusy> SaveSettings(const Context& context) try {
+    if (!context.options.dryRun)
+        context.settings.Save(
+            [&](const std::string& text) { context.reporter.Say(Talk::Normal, text); });
+    return std::nullopt;
+} catch (const FileBusy& busy) {
+    return busy;
 } catch (const Failure& failure) {
-    reporter.Say(Talk::Normal, failure.what());
+    context.reporter.Say(Talk::Verbose, failure.what());
+    return std::nullopt;
 }
 
 Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
@@ -39,14 +50,16 @@ Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
         settings = LoadSettings(line.options.settingsFile.value_or(""), line.options.set);
     if (line.options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
     Context context{line.options, reporter, settings};
+    Outcome outcome;
     try {
-        Outcome outcome = line.command->run(context);
-        SaveSettings(reporter, settings);
-        return outcome;
+        outcome = line.command->run(context);
     } catch (...) {
-        SaveSettings(reporter, settings);
+        if (const auto busy = SaveSettings(context)) reporter.Error(busy->what());
         throw;
     }
+    const auto busy = SaveSettings(context);
+    if (!busy || outcome.status != ExitStatus::Done) return outcome;
+    return {busy->Status(), busy->what(), outcome.result};
 }
 
 /// Runs something and shows how it failed, if it did.
@@ -71,13 +84,13 @@ Outcome Guarded(Reporter& reporter, Action&& action) try {
 }
 
 /// Results that nobody could receive are no success; a reader that has had enough is.
-Outcome CheckOutput(Outcome outcome, Reporter& reporter) {
-    const int error = reporter.OutputError();
+Outcome CheckOutput(Outcome outcome, int error, Reporter& reporter) {
     if (error == 0 || error == EPIPE || outcome.status != ExitStatus::Done) return outcome;
-    const std::string text = "can't write to standard output: " +
-                             std::error_code(error, std::generic_category()).message();
+    const std::string text =
+        "can't write to standard output: " + std::generic_category().message(error);
     reporter.Error(text);
-    return {ExitStatus::BadFile, text, outcome.result};
+    const auto status = Interrupted() ? ExitStatus::Interrupted : ExitStatus::BadFile;
+    return {status, text, outcome.result};
 }
 
 }  // namespace
@@ -92,14 +105,14 @@ int RunTool(const std::vector<std::string>& words) {
         return Outcome{};
     });
     if (line.command == nullptr) {
-        std::fputs(line.text.c_str(), stdout);
+        outcome = CheckOutput(outcome, WriteAll(STDOUT_FILENO, line.text), early);
         if (outcome.status != ExitStatus::Done) early.End(outcome);
         return static_cast<int>(outcome.status);
     }
     Reporter reporter(ReporterOptions(line.options));
     reporter.Begin(line.options.command);
     outcome = Guarded(reporter, [&] { return RunCommand(reporter, line); });
-    outcome = CheckOutput(std::move(outcome), reporter);
+    outcome = CheckOutput(std::move(outcome), reporter.OutputError(), reporter);
     reporter.End(outcome);
     return static_cast<int>(outcome.status);
 }

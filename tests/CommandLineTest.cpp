@@ -220,6 +220,11 @@ const Row kFailing[] = {
     {"tool erase --range ''", 2, "", "'' is no address range"},
     {"tool blank-check --range 0-40000", 2, "", "doesn't lie in the device's flash, 0x0-0x3ffff"},
     {"tool read small.hex", 2, "", "small.hex exists; overwrite it with --force"},
+    {"ln -s small.hex l; tool program small.hex --trace l --force", 2, "",
+     "the trace can't be written to l: that is an image file of this run, small.hex"},
+    {"tool --sim-file new read ./new", 2, "", "that is the device file of this run, new"},
+    {"tool info --trace data.bin", 2, "", "data.bin exists; overwrite it with --force"},
+    {"tool read - --json", 2, nullptr, "both want standard output"},
     {"tool read flash.elf", 2, "", "name a .bin, .hex or .srec file"},
     {"tool register program 0 xyz", 2, "", "the value 'xyz' is no hexadecimal number"},
     {"tool register read 2", 2, "", "INDEX: 2 not in"},
@@ -237,9 +242,12 @@ const Row kFailing[] = {
     {"tool program small.hex far.srec", 3, "", "far.srec: the section 0x40000-0x40003 doesn't"},
     {"tool program small.hex --sim velk", 3, "", "the device has none to program"},
     {"tool info --settings wrong.toml", 3, "", "wrong.toml: line 1: FlashTimeoutValue can't be"},
-    {"tool info --settings none.toml", 3, "", "none.toml: can't be read"},
-    {"tool read none/flash.bin", 3, "", "can't write the flash contents to none/flash.bin"},
-    {"tool info --trace none/t", 3, "", "can't write the trace to none/t"},
+    {"tool info --settings none.toml", 3, "",
+     "can't read the settings file none.toml: No such file"},
+    {"tool read none/flash.bin", 3, "", "can't write the image file none/flash.bin: No such file"},
+    {"tool info --trace /dev/full", 3, nullptr, "the trace /dev/full is incomplete: No space left"},
+    {"chmod a-w data.bin; tool read data.bin --force", 3, "", "data.bin: it is read-only"},
+    {"tool info --trace none/t", 3, "", "can't write the trace none/t: No such file"},
     // Plug-in and target.
     {"tool info --plugin none.so", 4, "", "none.so: cannot open shared object file"},
     {"tool info --plugin broken.so", 4, "", "broken.so"},
@@ -270,6 +278,8 @@ const Row kFailing[] = {
     {"timeout --foreground --preserve-status -s INT 1 " CORVANE_FLASH_TOOL
      " program /usr/lib/firmware-tomu/toboot.elf --sim tolva,loader=hangs",
      130, "", "interrupted; the flash is incomplete: 6 KiB erased"},
+    {"mkfifo f; timeout --foreground --preserve-status -s HUP 1 " CORVANE_FLASH_TOOL " program f",
+     130, "", "interrupted"},
 };
 
 /// That a stream holds a part; that it is empty for ""; nothing for null.
@@ -293,7 +303,7 @@ TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
 
 /// The first "tool" of the commands, or the tool's path, with --json behind it.
 std::string WithJson(std::string commands) {
-    const std::string name = commands.find("timeout") == 0 ? CORVANE_FLASH_TOOL : "tool";
+    const std::string name = commands.find("timeout") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
     return commands.insert(commands.find(name) + name.size(), " --json");
 }
 
@@ -366,13 +376,43 @@ const Row kStories[] = {
     {"tool settings FlashVerboseMode=1 >/dev/null; tool -q settings FlashVerboseMode; tool -q "
      "checksum; tool -q settings FlashChecksumValue; tool -q settings --forget FlashVerboseMode",
      0, "1\n0xb7094978\nb7094978\n0\n", ""},
+    {"(unset XDG_CONFIG_HOME HOME; tool -q info >/dev/null && tool settings FlashVerboseMode=1)", 3,
+     "", "corvane-flash: no place to keep settings"},
     {"XDG_CONFIG_HOME=/proc/none tool -q blank-check && XDG_CONFIG_HOME=/proc/none tool settings "
      "FlashVerboseMode=1",
-     3, "is blank", "can't write settings to /proc/none"},
+     3, "is blank", "can't write the settings file /proc/none"},
     {"tool read a.bin; ln a.bin old; tool -q read a.bin --force --range 0-f && wc -c < a.bin; wc "
      "-c "
      "< old",
      0, "16\n262144\n", nullptr},
+    {"ln -s a.bin l; tool -q read l --range 0-f && tool -q read l --range 0-1f --force\n"
+     "test -L l && wc -c < a.bin; chmod a-w a.bin; tool -q read l --force",
+     3, "32\n", "can't write the image file l: it is read-only"},
+    {"export CORVANE_SIM_FILE=d; tool program far.srec --dry-run; tool program small.hex --dry-run "
+     "--sim tolva,fail-access=9; tool erase --all --dry-run; ls -d d config",
+     2, "would erase", "'config': No such file"},
+    {"(ulimit -f 8; tool -q read x --trace t); echo $? x*", 0, "3 x*\n", "File too large"},
+    {"timeout --foreground -s KILL 1 " CORVANE_FLASH_TOOL
+     " program $ELF --sim tolva,loader=hangs --trace t; tail -1 t",
+     0, "  host     ", nullptr},
+    {"tool info --trace t >&- 2>&-; head -1 t; echo $?; tool -q info --trace t; tool --help >&-", 3,
+     "# Trace of corvane-flash ", "can't write to standard output: Bad file descriptor"},
+    // Eight at once: each waits for its turn, and nothing gets lost.
+    {"export CORVANE_SIM_FILE=d; n=0\n"
+     "for key in EraseStart EraseEnd BlankCheckStart BlankCheckEnd ChecksumStart ChecksumEnd; do\n"
+     "n=$((n + 1)); tool -q program data.bin --base ${n}000 & tool -q settings Flash${key}Addr=$n &"
+     "\ndone; tool -q mac program 0-1-2-3-4-5 --commit & tool -q settings FlashCrystalFreq=c & "
+     "wait\n"
+     "for n in 1 2 3 4 5 6; do tool -q verify data.bin --base ${n}000; done; tool -q mac read\n"
+     "cat config/*/settings.kept.toml | grep -c 'Addr = .[1-6]\\|CrystalFreq = .c'; ls -d *.*",
+     0,
+     "image\nThe flash holds the image\nThe flash holds the image\n00-01-02-03-04-05\n7\nbad.hex",
+     nullptr},
+    {"mkdir -p config/corvane-flash; set -- d.lock config/corvane-flash/settings.kept.toml.lock\n"
+     "flock -F $1 sleep 20 & a=$!; flock -F $2 sleep 20 & b=$!; sleep 0.2\n"
+     "tool info --sim-file d & c=$!; tool -q settings FlashVerboseMode=1; echo $?; wait $c; "
+     "c=$?; kill $a $b; exit $c",
+     4, "3\n", "another run has been using the contents file of the simulated device d for 10 s"},
     {"tool info > /dev/full", 3, "", "can't write to standard output: No space left on device"},
     {"tool settings | head -1", 0, "FlashProgramOption", ""},
     {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL

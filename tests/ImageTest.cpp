@@ -336,9 +336,9 @@ TEST_F(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
 
 TEST_F(ImageFiles, SayWhyTheyCannotBeRead) {
     const std::string path = directory_.string();
-    EXPECT_EQ(path + ": the image file can't be read: Is a directory",
+    EXPECT_EQ("can't read the image file " + path + ": Is a directory",
               FailureOf([&] { ReadImageFile(path, {}); }));
-    EXPECT_EQ(path + "/x: the image file can't be read: No such file or directory",
+    EXPECT_EQ("can't read the image file " + path + "/x: No such file or directory",
               FailureOf([&] { ReadImageFile(path + "/x", {}); }));
 }
 

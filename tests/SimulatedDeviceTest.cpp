@@ -3,16 +3,12 @@
 #include "target/simulated/SimulatedDevice.h"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
-#include <filesystem>
-#include <fstream>
 #include <functional>
-#include <iterator>
 #include <memory>
 #include <numeric>
 
-#include "target/simulated/ContentsFile.h"
+#include "target/simulated/Contents.h"
 
 namespace {
 
@@ -409,39 +405,19 @@ TEST(Options, BadOnesAreNamed) {
     }
 }
 
-class ContentsFile : public testing::Test {
-  protected:
-    void TearDown() override { std::filesystem::remove_all(directory_); }
+std::unique_ptr<target::SimulatedDevice> Decode(const std::string& contents,
+                                                const std::string& options) {
+    return target::DecodeContents(contents, target::ParseDeviceOptions(options));
+}
 
-    std::unique_ptr<target::SimulatedDevice> Open(const std::string& options) {
-        return target::OpenContents(path_, target::ParseDeviceOptions(options));
-    }
-    std::string Stored() {
-        std::ifstream file(path_, std::ios::binary);
-        return {std::istreambuf_iterator<char>(file), {}};
-    }
-    void Store(const std::string& bytes) {
-        std::filesystem::remove(path_);  // some file systems flush a file that is overwritten
-        std::ofstream(path_, std::ios::binary) << bytes;
-    }
-
-    const std::string directory_ = testing::TempDir() + "contents-" + std::to_string(getpid());
-    const std::string path_ = directory_ + "/device";
-
-  private:
-    const bool made_ = std::filesystem::create_directory(directory_);
-};
-
-TEST_F(ContentsFile, KeepsTheDevice) {
-    {
-        auto device = Open("dorna,flash=128M,sector=1K,revision=2,erase-time=1us");
-        device->Flash().Preset(0x7FFFF80, Pattern(128));
-        device->PresetCommittedUserRegisters({0x00B61A00, 0x00030201});
-        SaveContents(path_, *device);
-        SaveContents(path_, *device);
-    }
-    EXPECT_LT(std::filesystem::file_size(path_), 2048U);
-    auto device = target::OpenContents(path_, target::DefaultDeviceOptions());
+TEST(Contents, KeepTheDevice) {
+    target::SimulatedDevice kept(
+        target::ParseDeviceOptions("dorna,flash=128M,sector=1K,revision=2,erase-time=1us"));
+    kept.Flash().Preset(0x7FFFF80, Pattern(128));
+    kept.PresetCommittedUserRegisters({0x00B61A00, 0x00030201});
+    const std::string contents = EncodeContents(kept);
+    EXPECT_LT(contents.size(), 2048U);
+    auto device = target::DecodeContents(contents, target::DefaultDeviceOptions());
     EXPECT_EQ(DefinitionText(device->Options()),
               "dorna,id=0x901A0200,flash=128M,ram=256K,sector=1K,keyconfig=0xFFFFFFEF");
     EXPECT_EQ(device->Options().timings.sectorErase, 8ms);
@@ -459,18 +435,15 @@ TEST_F(ContentsFile, KeepsTheDevice) {
         device->Pause(8);
     }
     EXPECT_TRUE(device->FlashContents() == Bytes(0x8000000, 0xFF));
-    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory_), {}), 1);
 }
 
-TEST_F(ContentsFile, RefusesWhatItDidNotWrite) {
-    auto device = Open("tolva");
-    device->Flash().Preset(0, Bytes{0});
-    SaveContents(path_, *device);
-    const std::string good = Stored();
-    const auto refused = [&](const std::string& bytes, const char* why) {
-        Store(bytes);
-        const std::string error = ErrorOf([&] { Open("tolva"); });
-        EXPECT_TRUE(error.starts_with("The contents file " + path_ + " can't be used: ")) << error;
+TEST(Contents, AreRefusedWhenTheyAreNoDevice) {
+    target::SimulatedDevice device(target::DefaultDeviceOptions());
+    device.Flash().Preset(0, Bytes{0});
+    const std::string good = EncodeContents(device);
+    const auto refused = [](const std::string& contents, const char* why) {
+        const std::string error = ErrorOf([&] { Decode(contents, "tolva"); });
+        EXPECT_NE(error, "no error");
         EXPECT_NE(error.find(why), std::string::npos) << error;
     };
     for (std::size_t size = 0; size < good.size(); ++size)
@@ -481,12 +454,12 @@ TEST_F(ContentsFile, RefusesWhatItDidNotWrite) {
         refused(flipped, i < 8 ? "no simulated device" : i < 12 ? "version" : "checksum");
     }
     refused(good + "x", "checksum");
-    Store(good);
-    EXPECT_EQ(Open("tolva")->FlashContents(), device->FlashContents());
+    EXPECT_EQ(Decode(good, "tolva")->FlashContents(), device.FlashContents());
 }
 
-TEST_F(ContentsFile, OptionsMustAgree) {
-    SaveContents(path_, *Open("velk,flash=512K,revision=B"));
+TEST(Contents, MustAgreeWithTheOptions) {
+    const std::string contents = EncodeContents(
+        target::SimulatedDevice(target::ParseDeviceOptions("velk,flash=512K,revision=B")));
     const struct {
         const char* options;
         const char* error;
@@ -502,23 +475,9 @@ TEST_F(ContentsFile, OptionsMustAgree) {
          "Option \"revision\" of the simulated device: 0 is asked for, but the kept device has 1;"},
     };
     for (const auto& [options, expected] : cases) {
-        const std::string error = ErrorOf([&, &o = options] { Open(o); });
+        const std::string error = ErrorOf([&, &o = options] { Decode(contents, o); });
         EXPECT_TRUE(error.starts_with(expected)) << error;
     }
-}
-
-TEST_F(ContentsFile, SystemErrorsNameThePath) {
-    const auto device = Open("tolva");
-    const std::string noDirectory = directory_ + "/none/device";
-    EXPECT_EQ(ErrorOf([&] { SaveContents(noDirectory, *device); }),
-              "Creating the contents file " + noDirectory +
-                  " failed: No such file or directory; check the path and its permissions.");
-    EXPECT_EQ(ErrorOf([&] { SaveContents(directory_, *device); }),
-              "Replacing the contents file " + directory_ +
-                  " failed: Is a directory; check the path and its permissions.");
-    EXPECT_FALSE(std::filesystem::exists(directory_ + ".tmp-" + std::to_string(getpid())));
-    EXPECT_NE(ErrorOf([&] { target::OpenContents(directory_, {}); }).find("Is a directory"),
-              std::string::npos);
 }
 
 }  // namespace

@@ -40,6 +40,7 @@ const std::vector<OptionRow>& GlobalOptions() {
         {"--trace", "FILE",
          "Write the plug-in's trace lines and all host calls to FILE (- is standard error)",
          &Options::trace, Offers::Files},
+        {"--force", "", "Write over files that exist (--trace, read)", &Options::force},
         {"--progress",
          "MODE",
          "How progress is shown: auto, bar, plain (for logs), none",

@@ -8,34 +8,72 @@ namespace host {
 
 namespace {
 
-DeviceOptions DeviceOf(const Options& options) {
-    return {{options.sim, options.simFile}, options.plugin, options.trace};
-}
-
-}  // namespace
-
-Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work) {
-    FlashDevice device(DeviceOf(context.options), context.settings, context.reporter);
+Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(FlashDevice&)>& work) {
+    const Options& options = context.options;
+    const DeviceOptions named{{options.sim, options.simFile}, options.plugin, trace};
+    FlashDevice device(named, context.settings, context.reporter);
     Outcome outcome;
     try {
         outcome = work(device);
     } catch (...) {
         device.LeaveHalted();
         try {
-            device.Save();
+            if (!options.dryRun) device.Save();
         } catch (const Failure& second) {
             context.reporter.Error(second.what());
         }
         throw;
     }
-    if (!context.options.dryRun) device.Save();
+    if (!options.dryRun) device.Save();
     return outcome;
+}
+
+Trace OpenTrace(const Context& context, const std::string& path) {
+    InputFiles(context).RequireOther(path, "the trace");
+    return Trace(path, ExistingFiles(context.options));
+}
+
+}  // namespace
+
+Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work) {
+    if (!context.options.trace) return WorkOn(context, nullptr, work);
+    Trace trace = OpenTrace(context, *context.options.trace);
+    Outcome outcome;
+    try {
+        outcome = WorkOn(context, &trace, work);
+    } catch (...) {
+        if (!trace.Problem().empty()) context.reporter.Error(trace.Problem());
+        throw;
+    }
+    if (trace.Problem().empty()) return outcome;
+    if (outcome.status != ExitStatus::Done) {
+        context.reporter.Error(trace.Problem());
+        return outcome;
+    }
+    return {ExitStatus::BadFile, trace.Problem(), outcome.result};
 }
 
 Outcome NothingTouched(Context& context, Json plan) {
     context.reporter.Result("Dry run: nothing was touched");
     plan["dryRun"] = true;
     return {.result = std::move(plan)};
+}
+
+FilesInUse InputFiles(const Context& context) {
+    const Options& options = context.options;
+    FilesInUse files;
+    for (const std::string& file : options.files)
+        files.Add(file, "an image file");
+    files.Add(options.imageOf.value_or(""), "the image file");
+    files.Add(options.simFile.value_or(""), "the device file");
+    files.Add(context.settings.Paths().user, "the settings file");
+    files.Add(context.settings.Paths().kept, "the file of kept settings");
+    files.Add(PluginFile(options.plugin.value_or("")), "the plug-in");
+    return files;
+}
+
+Existing ExistingFiles(const Options& options) {
+    return options.force ? Existing::Replace : Existing::Keep;
 }
 
 image::ReadOptions ImageOptions(const Options& options) {

@@ -4,6 +4,8 @@
 
 #include <functional>
 
+#include "host/base/FilesInUse.h"
+#include "host/base/OutputFile.h"
 #include "host/cli/Options.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/ImageSet.h"
@@ -19,11 +21,18 @@ struct Context {
 };
 
 /// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
-/// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted.
+/// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted. A
+/// trace that isn't whole is a failure.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
 /// What ends a --dry-run: `plan` is what would be done.
 Outcome NothingTouched(Context& context, Json plan);
+
+/// What the command line names to be read or kept, which nothing may be written over.
+FilesInUse InputFiles(const Context& context);
+
+/// --force.
+Existing ExistingFiles(const Options& options);
 
 /// --format and --base.
 image::ReadOptions ImageOptions(const Options& options);

@@ -41,6 +41,12 @@ Outcome List(Context& context) {
     return {.result = {{"settings", all}}};
 }
 
+/// Keeping is what the command is for, so that it fails when nothing can be kept.
+void Save(Context& context) {
+    context.settings.Save(
+        [&](const std::string& text) { context.reporter.Say(Talk::Normal, text); });
+}
+
 Outcome Keep(Context& context, const SettingInfo& info, const std::string& text) {
     const std::string checked = RequireText(info, text, "settings");
     if (IsOfOneBoard(info.key))
@@ -49,7 +55,7 @@ Outcome Keep(Context& context, const SettingInfo& info, const std::string& text)
                                   "program' or 'register program', or for a run with --set",
                                   info.key));
     context.settings.Keep(info.key, checked);
-    context.settings.Save();
+    Save(context);
     const auto [now, origin] = context.settings.Get(info.key);
     ShowOne(context, info);
     if (origin < Origin::Kept)
@@ -62,7 +68,7 @@ Outcome Keep(Context& context, const SettingInfo& info, const std::string& text)
 Outcome Forget(Context& context, const std::string& key) {
     const SettingInfo& info = RequireSetting(key, "settings");
     context.settings.Forget(key);
-    context.settings.Save();
+    Save(context);
     ShowOne(context, info);
     return {.result = ToJson(context, info)};
 }

@@ -39,14 +39,14 @@ constexpr char kCheckConnection[] =
 FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter)
     : settings_(settings),
       reporter_(reporter),
-      target_(options.target),
+      target_(options.target, [&](const std::string& text) { reporter.Say(Talk::Normal, text); }),
       meter_(reporter),
       watch_(meter_),
       loader_(target_.Get(), watch_),
       host_(loader_, settings, reporter, watch_, ExecutableDirectory()),
+      trace_(options.trace),
       library_(options.plugin.value_or("")) {
-    if (options.trace) {
-        trace_.emplace(*options.trace);
+    if (trace_) {
         tracingHost_.emplace(host_, *trace_);
         pluginTrace_.emplace(*trace_, library_.Handle());
     }

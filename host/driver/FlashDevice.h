@@ -52,11 +52,12 @@ class DeviceFailure : public Failure {
     Json result_;
 };
 
-/// Which target, through which plug-in, and whether it is traced.
+/// Which target, through which plug-in, and what traces it: null, or a trace that outlives the
+/// device.
 struct DeviceOptions {
     TargetOptions target;
     std::optional<std::string> plugin;
-    std::optional<std::string> trace;
+    Trace* trace = nullptr;
 };
 
 class FlashDevice {
@@ -135,7 +136,7 @@ class FlashDevice {
     FlashWatch watch_;
     LoaderWait loader_;
     FlashHost host_;
-    std::optional<Trace> trace_;
+    Trace* trace_;
     std::optional<TracingHost> tracingHost_;
     PluginLibrary library_;
     std::optional<PluginTrace> pluginTrace_;

@@ -29,15 +29,16 @@ std::string InstalledPath() {
     return kFileName;
 }
 
-/// A bare file name would be looked for where the system keeps its libraries, not here.
-std::string ChosenPath(const std::string& path) {
+}  // namespace
+
+std::string PluginFile(const std::string& path) {
+    if (path.empty()) return InstalledPath();
+    // A bare file name would be looked for where the system keeps its libraries, not here.
     return path.find('/') == std::string::npos ? "./" + path : path;
 }
 
-}  // namespace
-
 PluginLibrary::PluginLibrary(const std::string& path) {
-    const std::string file = path.empty() ? InstalledPath() : ChosenPath(path);
+    const std::string file = PluginFile(path);
     handle_.reset(dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL));
     if (!handle_)
         throw Failure(ExitStatus::Unreachable,

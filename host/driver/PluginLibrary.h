@@ -9,10 +9,13 @@
 
 namespace host {
 
+/// The plug-in library's file: the one at `path`; for an empty one, the libflash_corvane.so that
+/// was installed with the tool, or else its mere name, which the system's loader looks for.
+std::string PluginFile(const std::string& path);
+
 class PluginLibrary {
   public:
-    /// Loads the library at `path`; with an empty one, the libflash_corvane.so that was installed
-    /// with the tool, or else the one that the system finds. Failure (Unreachable) says what the
+    /// Loads the library that PluginFile tells. Failure (Unreachable) says what the
     /// loader said, or that the library is no plug-in.
     explicit PluginLibrary(const std::string& path);
 

@@ -4,49 +4,68 @@
 
 #include <dlfcn.h>
 #include <fmt/format.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <cerrno>
-#include <iterator>
+#include <filesystem>
 #include <system_error>
 
-#include "host/base/Errors.h"
+#include "host/base/InputFile.h"
+#include "host/base/Streams.h"
 
 namespace host {
 
 namespace {
 
-constexpr std::size_t kBufferBytes = std::size_t{64} * 1024;
+constexpr FileKind kTraceFile{"trace", ExitStatus::BadFile, 0};
+
+/// By this beginning of its first line a file is known to be a trace.
+constexpr char kFirstLine[] = "# Trace of corvane-flash";
 
 void ReceiveLine(void* context, int level, const char* text) {
     static_cast<Trace*>(context)->Line("plug-in", fmt::format("{} {}", level, text));
 }
 
-}  // namespace
-
-Trace::Trace(const std::string& path)
-    : path_(path), stream_(path == "-" ? stderr : std::fopen(path.c_str(), "w")) {
-    if (stream_ == nullptr)
-        throw Failure(ExitStatus::BadFile,
-                      fmt::format("can't write the trace to {}: {}", path,
-                                  std::error_code(errno, std::generic_category()).message()));
+bool IsTrace(const std::string& path) {
+    std::error_code ignored;
+    return std::filesystem::is_regular_file(path, ignored) &&
+           InputFile(kTraceFile, path).Beginning().starts_with(kFirstLine);
 }
 
-Trace::~Trace() {
-    Flush();
-    if (stream_ != stderr) std::fclose(stream_);
+Descriptor Open(const std::string& path, Existing existing) {
+    if (path == "-") return Descriptor(dup(STDERR_FILENO));
+    RequireWritable(kTraceFile, path, IsTrace(path) ? Existing::Replace : existing);
+    Descriptor file = OpenForWriting(kTraceFile, path);
+    struct stat status {};
+    if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode)) return file;
+    if (flock(file.Get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK)
+        throw FileFailure(kTraceFile, "write", path, "another run is writing it");
+    if (ftruncate(file.Get(), 0) != 0) throw FileFailure(kTraceFile, "write", path, errno);
+    return file;
+}
+
+}  // namespace
+
+Trace::Trace(const std::string& path, Existing existing)
+    : path_(path), file_(Open(path, existing)) {
+    Write(fmt::format("{} {}: seconds, source, event\n", kFirstLine, CORVANE_FLASH_VERSION));
 }
 
 void Trace::Line(const char* source, const std::string& text) {
     const std::chrono::duration<double> elapsed = std::chrono::steady_clock::now() - start_;
-    fmt::format_to(std::back_inserter(pending_), "{:12.6f}  {:<7}  {}\n", elapsed.count(), source,
-                   text);
-    if (pending_.size() >= kBufferBytes) Flush();
+    Write(fmt::format("{:12.6f}  {:<7}  {}\n", elapsed.count(), source, text));
 }
 
-void Trace::Flush() {
-    std::fwrite(pending_.data(), 1, pending_.size(), stream_);
-    std::fflush(stream_);
-    pending_.clear();
+void Trace::Write(const std::string& text) {
+    if (error_ == 0) error_ = WriteAll(file_.Get(), text);
+}
+
+std::string Trace::Problem() const {
+    if (error_ == 0) return {};
+    return fmt::format("the trace {} is incomplete: {}", path_ == "-" ? "on standard error" : path_,
+                       std::generic_category().message(error_));
 }
 
 PluginTrace::PluginTrace(Trace& trace, void* library)

@@ -1,34 +1,36 @@
 // The trace file: what host and plug-in did, line by line with times, for the person whose board
-// doesn't erase. Lines are buffered, so that tracing changes the timing little.
+// doesn't erase. Every line is written at once, so that those before a crash are there.
 
 #pragma once
 
 #include <chrono>
-#include <cstdio>
-#include <memory>
 #include <string>
+
+#include "host/base/Descriptor.h"
+#include "host/base/OutputFile.h"
 
 namespace host {
 
 class Trace {
   public:
-    /// Opens the file; "-" is standard error. Failure (BadFile).
-    explicit Trace(const std::string& path);
-    ~Trace();
-
-    Trace(const Trace&) = delete;
-    Trace& operator=(const Trace&) = delete;
+    /// Opens the file; "-" is standard error. A file that is there is written over only when it
+    /// may be replaced, or is a trace itself; else Failure (WrongUsage). Failure (BadFile) for one
+    /// that can't be written, or that another run is writing.
+    Trace(const std::string& path, Existing existing);
 
     /// `source` is who speaks: "host" for a slot that the plug-in calls, "call" for a call into the
-    /// plug-in, "plug-in" for one of its own trace lines.
+    /// plug-in, "plug-in" for one of its own trace lines. What can't be written is remembered.
     void Line(const char* source, const std::string& text);
 
-    void Flush();
+    /// Why the trace isn't whole, for the user; empty when it is.
+    std::string Problem() const;
 
   private:
+    void Write(const std::string& text);
+
     std::string path_;
-    std::FILE* stream_;
-    std::string pending_;
+    Descriptor file_;
+    int error_ = 0;
     std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
 };
 

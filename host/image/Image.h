@@ -9,7 +9,16 @@
 #include <string>
 #include <vector>
 
+#include "host/base/FileKind.h"
+
 namespace host::image {
+
+/// The largest flash of a device has this many bytes: 16 bits count it in units of 2 KiB.
+inline constexpr std::uint64_t kFlashBytesMax = std::uint64_t{128} << 20;
+
+/// Text needs two digits a byte, and as much again for what stands around them; ELF files hold
+/// debugging information as well.
+inline constexpr FileKind kImageFile{"image file", ExitStatus::BadFile, 4 * kFlashBytesMax};
 
 /// A run of bytes at consecutive addresses; never empty inside an Image.
 struct Section {
@@ -73,6 +82,9 @@ Image ParseImage(const std::string& contents, const std::string& name, const Rea
 
 /// The format that a file name's extension asks for; raw binary for any that isn't known.
 Format FormatForWriting(const std::string& path);
+
+/// The bytes as people read them, line by line.
+std::string FormatDump(const Image& image);
 
 /// The contents of a file of that format. Raw binary fills the gaps between sections with 0xFF
 /// and starts with the first section's first byte; sections spread over more than 256 MiB cannot

@@ -1,72 +1,18 @@
 // Reading an image file: getting its contents, telling its format, and calling the right reader.
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
-#include <cerrno>
 #include <string_view>
-#include <system_error>
 
 #include "host/base/Errors.h"
 #include "host/base/HexDigits.h"
+#include "host/base/InputFile.h"
 #include "host/image/Formats.h"
 
 namespace host::image {
 namespace {
 
-class File {
-  public:
-    explicit File(const std::string& path)
-        : path_(path), descriptor_(open(path.c_str(), O_RDONLY | O_CLOEXEC)) {
-        if (descriptor_ < 0) Fail();
-    }
-    ~File() { close(descriptor_); }
-    File(const File&) = delete;
-    File& operator=(const File&) = delete;
-
-    std::string Contents() const {
-        std::string contents;
-        contents.resize(kChunkBytes + SizeHint());
-        std::size_t size = 0;
-        while (const std::size_t count = Read(contents.data() + size, contents.size() - size)) {
-            size += count;
-            if (size == contents.size()) contents.resize(2 * size);
-        }
-        contents.resize(size);
-        return contents;
-    }
-
-  private:
-    static constexpr std::size_t kChunkBytes = 65536;
-
-    /// The size of a regular file; a pipe doesn't know its own.
-    std::size_t SizeHint() const {
-        struct stat status {};
-        const bool known = fstat(descriptor_, &status) == 0 && S_ISREG(status.st_mode);
-        return known ? static_cast<std::size_t>(status.st_size) : 0;
-    }
-
-    std::size_t Read(char* buffer, std::size_t size) const {
-        ssize_t count = -1;
-        do {
-            count = read(descriptor_, buffer, size);
-        } while (count < 0 && errno == EINTR);
-        if (count < 0) Fail();
-        return static_cast<std::size_t>(count);
-    }
-
-    [[noreturn]] void Fail() const {
-        throw Failure(
-            ExitStatus::BadFile,
-            fmt::format("{}: the image file can't be read: {}; check its name and permissions",
-                        path_, std::generic_category().message(errno)));
-    }
-
-    const std::string& path_;
-    const int descriptor_;
-};
+const std::string kStandardInput = "standard input";
 
 std::optional<Format> DetectFormat(std::string_view contents) {
     if (contents.starts_with("\177ELF")) return Format::Elf;
@@ -130,7 +76,12 @@ Image ParseImage(const std::string& contents, const std::string& name, const Rea
 }
 
 Image ReadImageFile(const std::string& path, const ReadOptions& options) {
-    return ParseImage(File(path).Contents(), path, options);
+    InputFile file(kImageFile, path);
+    const std::string& name = path == "-" ? kStandardInput : path;
+    // What isn't known to be text or ELF holds no more than the bytes themselves.
+    const bool binary = !file.Beginning().empty() &&
+                        ChooseFormat(file.Beginning(), name, options) == Format::Binary;
+    return ParseImage(file.Contents(binary ? kFlashBytesMax : kImageFile.maxBytes), name, options);
 }
 
 }  // namespace host::image

@@ -5,10 +5,11 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <string_view>
+
+#include "host/base/Streams.h"
 
 namespace host {
 
@@ -42,6 +43,10 @@ void Reporter::Begin(const std::string& command) {
 
 void Reporter::Result(const std::string& text) {
     Line(out_, text);
+}
+
+void Reporter::Data(const std::string& bytes) {
+    Write(stdout, bytes);
 }
 
 void Reporter::Say(Talk level, const std::string& text) {
@@ -95,11 +100,13 @@ void Reporter::JsonLine(const char* event, const Json& members) {
 }
 
 void Reporter::Line(std::FILE* stream, const std::string& text) {
+    Write(stream, text + "\n");
+}
+
+void Reporter::Write(std::FILE* stream, const std::string& text) {
     display_.Clear();
-    const std::string line = text + "\n";
-    const bool written =
-        std::fwrite(line.data(), 1, line.size(), stream) == line.size() && std::fflush(stream) == 0;
-    if (!written && stream == stdout && outputError_ == 0) outputError_ = errno;
+    const int error = WriteAll(fileno(stream), text);
+    if (stream == stdout && outputError_ == 0) outputError_ = error;
 }
 
 }  // namespace host

@@ -38,6 +38,9 @@ class Reporter {
     /// What the command was run for: shown whatever the level.
     void Result(const std::string& text);
 
+    /// The same as bytes that aren't for people, which go to standard output as they are.
+    void Data(const std::string& bytes);
+
     /// A line for those who want to hear this much.
     void Say(Talk level, const std::string& text);
 
@@ -65,6 +68,7 @@ class Reporter {
   private:
     void JsonLine(const char* event, const Json& members);
     void Line(std::FILE* stream, const std::string& text);
+    void Write(std::FILE* stream, const std::string& text);
 
     Options options_;
     std::FILE* out_;  ///< where results go that people read

@@ -7,14 +7,13 @@
 
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <optional>
 #include <sstream>
 #include <stdexcept>
 
 #include "host/base/Errors.h"
-#include "host/base/Files.h"
+#include "host/base/InputFile.h"
+#include "host/base/OutputFile.h"
 #include "host/settings/SettingCatalogue.h"
 
 namespace host {
@@ -42,13 +41,11 @@ std::string ConfigurationDirectory() {
                     kept ? "; the tool wrote this file and can do without: delete it" : ""));
 }
 
-std::string Contents(const std::string& path, bool mustExist, bool kept) {
-    std::error_code error;
-    if (!mustExist && !fs::exists(path, error) && !error) return {};
-    std::ifstream stream(path, std::ios::binary);
-    if (!stream || fs::is_directory(path, error))
-        Refuse(path, "can't be read; give another one with --settings", kept);
-    return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+/// A file that can't even be looked at (there is no such directory, or it is somebody else's) is
+/// missing.
+std::string Contents(const std::string& path, bool mustExist) {
+    std::error_code ignored;
+    return mustExist || fs::exists(path, ignored) ? ReadWholeFile(kSettingsFile, path) : "";
 }
 
 /// A number is taken where it can mean only one thing: a decimal one for a decimal setting, a
@@ -98,7 +95,7 @@ SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept)
     if (path.empty()) return {};
     SettingTexts texts;
     try {
-        const toml::table table = toml::parse(Contents(path, mustExist, kept), path);
+        const toml::table table = toml::parse(Contents(path, mustExist), path);
         for (const auto& [key, node] : table)
             try {
                 texts[std::string(key.str())] = ReadEntry(std::string(key.str()), node, kept);
@@ -115,6 +112,11 @@ SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept)
     return texts;
 }
 
+void MakeDirectoryOf(const std::string& path) {
+    std::error_code ignored;  // what follows from it is reported by the writing
+    fs::create_directories(fs::path(path).parent_path(), ignored);
+}
+
 void WriteKeptSettings(const std::string& path, const SettingTexts& texts) {
     toml::table table;
     for (const auto& [key, text] : texts)
@@ -122,9 +124,7 @@ void WriteKeptSettings(const std::string& path, const SettingTexts& texts) {
     std::ostringstream contents;
     contents << "# Written by corvane-flash; values of your own belong into the file beside it.\n"
              << table << '\n';
-    std::error_code ignored;  // what follows from it is reported by the writing
-    fs::create_directories(fs::path(path).parent_path(), ignored);
-    WriteWholeFile(path, contents.str(), "settings");
+    WriteWholeFile(kSettingsFile, path, contents.str(), Existing::Replace);
 }
 
 }  // namespace host

@@ -6,7 +6,12 @@
 #include <map>
 #include <string>
 
+#include "host/base/FileKind.h"
+
 namespace host {
+
+inline constexpr FileKind kSettingsFile{"settings file", ExitStatus::BadFile,
+                                        std::uint64_t{1} << 20};
 
 using SettingTexts = std::map<std::string, std::string>;
 
@@ -24,7 +29,10 @@ SettingPaths FindSettingPaths(const std::string& chosen);
 /// names the file, the line and what to do. The kept file may hold what only the plug-in writes.
 SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept);
 
-/// Writes the kept file, and makes its directory when that is missing. Failure (BadFile).
+/// Makes the directory of the kept file when that is missing.
+void MakeDirectoryOf(const std::string& path);
+
+/// Writes the kept file. Failure (BadFile).
 void WriteKeptSettings(const std::string& path, const SettingTexts& texts);
 
 }  // namespace host

@@ -63,12 +63,14 @@ void SettingStore::Forget(const std::string& key) {
     if (Layer(Origin::Kept).erase(key) != 0) changed_[key] = false;
 }
 
-void SettingStore::Save() {
+void SettingStore::Save(const WaitNotice& say) {
     if (changed_.empty()) return;
     if (paths_.kept.empty())
         throw Failure(ExitStatus::BadFile,
                       "no place to keep settings: neither XDG_CONFIG_HOME nor HOME is set; name a "
                       "file with --settings");
+    MakeDirectoryOf(paths_.kept);
+    const FileLock lock(kSettingsFile, paths_.kept, say);
     SettingTexts texts = ReadSettingFile(paths_.kept, false, true);
     for (const auto& [key, present] : changed_) {
         if (present)

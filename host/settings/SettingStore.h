@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "host/base/FileLock.h"
 #include "host/settings/SettingCatalogue.h"
 #include "host/settings/SettingFiles.h"
 
@@ -57,8 +58,9 @@ class SettingStore {
     void Forget(const std::string& key);
 
     /// Writes the kept file if something was kept that it doesn't hold, joined with what other
-    /// runs have kept there meanwhile.
-    void Save();
+    /// runs have kept there meanwhile; `say` is told when one of them must be waited for. Failure
+    /// (BadFile).
+    void Save(const WaitNotice& say);
 
     const SettingPaths& Paths() const { return paths_; }
 

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 
+#include "host/base/FileLock.h"
 #include "target/simulated/SimulatedDevice.h"
 
 namespace host {
@@ -18,9 +19,10 @@ struct TargetOptions {
 
 class SimulatedTarget {
   public:
-    /// Failure (WrongUsage) for options that name no device, or another one than the file holds;
-    /// Failure (Unreachable) for a contents file that can't be used.
-    explicit SimulatedTarget(const TargetOptions& options);
+    /// Keeps the contents file locked for as long as it lives; what there is to wait for is told to
+    /// `say`. Failure (WrongUsage) for options that name no device, or another one than the file
+    /// holds; Failure (Unreachable) for a contents file that can't be used.
+    SimulatedTarget(const TargetOptions& options, const WaitNotice& say);
 
     target::Target& Get() { return *device_; }
 
@@ -30,6 +32,7 @@ class SimulatedTarget {
 
   private:
     std::string path_;
+    std::optional<FileLock> lock_;
     std::unique_ptr<target::SimulatedDevice> device_;
 };
 

@@ -1,0 +1,79 @@
+// The holder removes the lock file before it lets go. Whoever gets a lock then looks whether the
+// file that it has locked is still the one of that name, and else begins again.
+
+#include "host/base/FileLock.h"
+
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <chrono>
+#include <filesystem>
+#include <thread>
+
+#include "host/base/Interrupt.h"
+#include "host/base/OutputFile.h"
+
+namespace host {
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+constexpr std::chrono::seconds kPatience{10};
+constexpr std::chrono::milliseconds kLook{20};
+
+std::string LockPath(const std::string& path) {
+    std::error_code ignored;
+    return std::filesystem::weakly_canonical(FollowLinks(path), ignored).string() + ".lock";
+}
+
+bool IsStillThere(const Descriptor& file, const std::string& path) {
+    struct stat locked {};
+    struct stat named {};
+    return fstat(file.Get(), &locked) == 0 && stat(path.c_str(), &named) == 0 &&
+           locked.st_dev == named.st_dev && locked.st_ino == named.st_ino;
+}
+
+enum class Attempt { Locked, Busy, Impossible };
+
+Attempt TryLock(Descriptor& file, const std::string& path) {
+    for (;;) {
+        file = Descriptor(
+            open(path.c_str(), O_RDONLY | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0666));
+        if (!file.IsOpen()) return Attempt::Impossible;
+        if (flock(file.Get(), LOCK_EX | LOCK_NB) != 0) {
+            const bool busy = errno == EWOULDBLOCK;
+            file = Descriptor();
+            return busy ? Attempt::Busy : Attempt::Impossible;
+        }
+        if (IsStillThere(file, path)) return Attempt::Locked;
+    }
+}
+
+}  // namespace
+
+FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNotice& say)
+    : path_(LockPath(path)) {
+    const auto start = Clock::now();
+    for (bool said = false; TryLock(file_, path_) == Attempt::Busy; said = true) {
+        ThrowIfInterrupted();
+        if (!said)
+            say(fmt::format("another run uses the {} {}; waiting up to {} s", kind.name, path,
+                            kPatience.count()));
+        if (Clock::now() - start >= kPatience)
+            throw FileBusy(kind.unusable,
+                           fmt::format("another run has been using the {} {} for {} s; try again "
+                                       "when it has ended",
+                                       kind.name, path, kPatience.count()));
+        std::this_thread::sleep_for(kLook);
+    }
+}
+
+FileLock::~FileLock() {
+    if (file_.IsOpen()) unlink(path_.c_str());
+}
+
+}  // namespace host

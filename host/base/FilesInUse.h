@@ -1,0 +1,27 @@
+// The files that a run works with, so that nothing that it writes goes over one of them.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace host {
+
+class FilesInUse {
+  public:
+    /// `what` says what the file is to the run: "the image file". An empty path and "-" add none.
+    void Add(const std::string& path, const std::string& what);
+
+    /// Failure (WrongUsage) when `path`, where `output` is to be written, is one of them under any
+    /// name, links included.
+    void RequireOther(const std::string& path, const std::string& output) const;
+
+  private:
+    struct File {
+        std::string path;
+        std::string what;
+    };
+    std::vector<File> files_;
+};
+
+}  // namespace host

@@ -1,0 +1,135 @@
+// The contents: a header, the device's definition as option text, the user registers, the flash
+// pages that aren't erased, and a checksum over all of it. Numbers are little-endian.
+
+#include "target/simulated/Contents.h"
+
+#include <fmt/format.h>
+#include <zlib.h>
+
+#include <algorithm>
+#include <array>
+#include <span>
+#include <utility>
+
+#include "target/simulated/Ram.h"
+
+namespace target {
+
+namespace {
+
+using Bytes = std::span<const std::uint8_t>;
+
+constexpr std::array<std::uint8_t, 8> kMagic = {'C', 'O', 'R', 'V', 'S', 'I', 'M', '\n'};
+constexpr std::uint32_t kVersion = 1;
+
+Bytes BytesOf(const std::string& text) {
+    return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+std::uint32_t Checksum(Bytes bytes) {
+    return static_cast<std::uint32_t>(crc32_z(0, bytes.data(), bytes.size()));
+}
+
+void AppendWord(std::string& text, std::uint32_t value) {
+    std::array<std::uint8_t, 4> bytes{};
+    StoreWord(bytes.data(), value);
+    text.append(bytes.begin(), bytes.end());
+}
+
+void AppendPages(std::string& text, const FlashArray& flash) {
+    for (std::size_t i = 0; i < flash.PageCount(); ++i) {
+        const FlashArray::Page* page = flash.ProgrammedPage(i);
+        if (page == nullptr) continue;
+        AppendWord(text, static_cast<std::uint32_t>(i));
+        text.append(page->begin(), page->end());
+    }
+}
+
+// Takes checked contents apart. What doesn't fit together is still refused: a checksum can be
+// forged.
+class Decoder {
+  public:
+    explicit Decoder(Bytes bytes) : rest_(bytes) {}
+
+    void CheckFrame();
+    DeviceOptions Definition();
+    void Fill(SimulatedDevice& device);
+
+  private:
+    Bytes Take(std::size_t size) {
+        if (size > rest_.size()) throw ContentsError("it ends too early");
+        return std::exchange(rest_, rest_.subspan(size)).first(size);
+    }
+    std::uint32_t TakeWord() { return LoadWord(Take(4).data()); }
+
+    Bytes rest_;
+};
+
+void Decoder::CheckFrame() {
+    const Bytes whole = rest_;
+    if (rest_.size() < kMagic.size() || !std::equal(kMagic.begin(), kMagic.end(), rest_.begin())) {
+        throw ContentsError("it holds no simulated device");
+    }
+    Take(kMagic.size());
+    const std::uint32_t version = TakeWord();
+    if (version != kVersion) {
+        throw ContentsError(
+            fmt::format("it has version {}, and this program reads version {}", version, kVersion));
+    }
+    if (rest_.size() < 4) throw ContentsError("it ends too early");
+    const std::size_t checkedSize = whole.size() - 4;
+    if (Checksum(whole.first(checkedSize)) != LoadWord(whole.data() + checkedSize)) {
+        throw ContentsError("its checksum is wrong, so it is damaged or cut short");
+    }
+    rest_ = rest_.first(rest_.size() - 4);
+}
+
+DeviceOptions Decoder::Definition() {
+    const auto text = Take(TakeWord());
+    try {
+        DeviceOptions options = ParseDeviceOptions(std::string(text.begin(), text.end()));
+        options.given.clear();
+        return options;
+    } catch (const OptionError& error) {
+        throw ContentsError(fmt::format("it holds a device unknown here ({})", error.what()));
+    }
+}
+
+void Decoder::Fill(SimulatedDevice& device) {
+    const std::uint32_t register0 = TakeWord();
+    const std::uint32_t register1 = TakeWord();
+    device.PresetCommittedUserRegisters({register0, register1});
+    while (!rest_.empty()) {
+        const std::uint32_t index = TakeWord();
+        const auto page = Take(FlashArray::kPageSizeBytes);
+        if (index >= device.Flash().PageCount()) throw ContentsError("it has too much flash");
+        device.Flash().Preset(index * FlashArray::kPageSizeBytes, page);
+    }
+}
+
+}  // namespace
+
+std::unique_ptr<SimulatedDevice> DecodeContents(const std::string& contents,
+                                                const DeviceOptions& today, Clock* clock) {
+    Decoder decoder(BytesOf(contents));
+    decoder.CheckFrame();
+    const DeviceOptions kept = decoder.Definition();
+    auto device = std::make_unique<SimulatedDevice>(ReopenOptions(kept, today), clock);
+    decoder.Fill(*device);
+    return device;
+}
+
+std::string EncodeContents(const SimulatedDevice& device) {
+    std::string contents(kMagic.begin(), kMagic.end());
+    AppendWord(contents, kVersion);
+    const std::string definition = DefinitionText(device.Options());
+    AppendWord(contents, static_cast<std::uint32_t>(definition.size()));
+    contents += definition;
+    for (const std::uint32_t value : device.CommittedUserRegisters())
+        AppendWord(contents, value);
+    AppendPages(contents, device.Flash());
+    AppendWord(contents, Checksum(BytesOf(contents)));
+    return contents;
+}
+
+}  // namespace target
