@@ -46,12 +46,27 @@ CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options)
         row.member);
 }
 
+bool IsTyped(const std::string& option, const std::vector<std::string>& words) {
+    return std::any_of(words.begin(), words.end(), [&](const std::string& word) {
+        return word == option || word.starts_with(option + "=");
+    });
+}
+
+bool HasTypedRival(const OptionRow& row, const std::vector<std::string>& words) {
+    return std::any_of(row.rivals.begin(), row.rivals.end(),
+                       [&](const std::string& rival) { return IsTyped(rival, words); });
+}
+
 void Define(CLI::App& app, const OptionRow& row, Options& options) {
     CLI::Option* option = DefineMember(app, row, options);
     option->required(row.required);
     if (!row.choices.empty() && row.offers != Offers::SomeChoices)
         option->check(CLI::IsMember(row.choices));
-    if (*row.environment != '\0') option->envname(row.environment);
+}
+
+void TakeEnvironment(CLI::App& app, const OptionRow& row, const std::vector<std::string>& words) {
+    if (*row.environment != '\0' && !HasTypedRival(row, words))
+        app.get_option(SplitNames(row).back())->envname(row.environment);
 }
 
 /// The app of a command; for one of two words, below the app of the first word.
@@ -83,12 +98,14 @@ struct Parser {
     const CommandRow* chosen = nullptr;
     bool man = false;
 
-    explicit Parser(const CommandRows& commands) {
+    Parser(const CommandRows& commands, const std::vector<std::string>& words) {
         app.set_version_flag("--version", std::string("corvane-flash " CORVANE_FLASH_VERSION));
         app.add_flag("--man", man);
         app.require_subcommand(0, 1);
-        for (const OptionRow& row : GlobalOptions())
+        for (const OptionRow& row : GlobalOptions()) {
             Define(app, row, options);
+            TakeEnvironment(app, row, words);
+        }
         for (const CommandRow& row : commands) {
             CLI::App* command = AddCommand(app, row);
             for (const OptionRow& option : row.options)
@@ -122,7 +139,7 @@ std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
 }  // namespace
 
 ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words) {
-    Parser parser(commands);
+    Parser parser(commands, words);
     std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
     try {
         parser.app.parse(words);

@@ -21,6 +21,7 @@ enum class Offers {
     SomeChoices,
     Files,
     Devices,
+    GdbOptions,
     Settings,
     SettingAssignments,
     HelpWords,
@@ -39,6 +40,7 @@ struct OptionRow {
     std::vector<std::string> choices = {};
     bool required = false;
     const char* environment = "";
+    std::vector<std::string> rivals = {};  ///< any of them, when typed, beats the environment
 
     bool IsArgument() const { return names[0] != '-'; }
     bool IsRepeated() const {

@@ -5,6 +5,7 @@
 #include <algorithm>
 
 #include "host/settings/SettingCatalogue.h"
+#include "target/gdb/GdbOptions.h"
 #include "target/simulated/DeviceOptions.h"
 #include "target/simulated/OptionTable.h"
 
@@ -59,10 +60,20 @@ Words Devices(const std::string& typed) {
     return words;
 }
 
+Words GdbOptions(const std::string& typed) {
+    Words words;
+    const std::string before = typed.substr(0, typed.rfind(',') + 1);
+    for (const target::gdb::GdbOptionRow& option : target::gdb::GdbOptionTable())
+        words.push_back({before + option.name + "=", option.meaning});
+    return words;
+}
+
 Words Values(const OptionRow& row, const std::string& typed) {
     switch (row.offers) {
         case Offers::Devices:
             return Devices(typed);
+        case Offers::GdbOptions:
+            return GdbOptions(typed);
         case Offers::Settings:
             return Settings(typed, false);
         case Offers::SettingAssignments:

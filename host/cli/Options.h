@@ -15,6 +15,9 @@ struct Options {
     // Every command.
     std::optional<std::string> sim;
     std::optional<std::string> simFile;
+    std::optional<std::string> gdb;
+    std::vector<std::string> gdbOptions;
+    std::optional<std::string> loader;
     std::optional<std::string> settingsFile;
     std::optional<std::string> plugin;
     std::optional<std::string> trace;
@@ -43,6 +46,7 @@ struct Options {
     bool dryRun = false;
     bool force = false;
     bool noVerify = false;
+    bool run = false;
 };
 
 }  // namespace host

@@ -10,6 +10,7 @@
 #include "host/base/Errors.h"
 #include "host/cli/CommandTable.h"
 #include "host/cli/Layout.h"
+#include "target/gdb/GdbOptions.h"
 #include "target/simulated/DeviceOptions.h"
 
 namespace host {
@@ -37,6 +38,21 @@ std::string DevicesHelp() {
     return text;
 }
 
+std::string GdbHelp() {
+    std::string text =
+        "A board behind a debug probe is reached through the probe's GDB server. While the flash\n"
+        "loader runs, most servers must stop it for each look; how it is dealt with otherwise is\n"
+        "told by --gdb-option. docs/boards.md has the options for common servers.\n\n"
+        "Examples:\n"
+        "  corvane-flash --gdb :3333 --loader FlashLoaderMerrow.out program app.elf --run\n"
+        "  corvane-flash --gdb :1234 --gdb-option pc=15,sp=13 --gdb-option reset=system_reset "
+        "info\n"
+        "\nOptions:\n";
+    for (const target::gdb::GdbOptionRow& row : target::gdb::GdbOptionTable())
+        text += Entry(row.name, fmt::format("{} ({})", row.meaning, row.accepts));
+    return text;
+}
+
 std::string OptionsHelp() {
     std::string text = "Every command takes these options, before or behind its own:\n";
     for (const OptionRow& row : GlobalOptions())
@@ -59,6 +75,7 @@ std::string StatusHelp() {
 
 const Topic kTopics[] = {
     {"sim", "Simulated devices: classes, options, faults", DevicesHelp},
+    {"gdb", "Boards behind a GDB server", GdbHelp},
     {"options", "The options that every command takes", OptionsHelp},
     {"status", "Exit statuses", StatusHelp},
 };

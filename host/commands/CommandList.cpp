@@ -7,11 +7,9 @@ namespace host {
 const CommandRows& AllCommands() {
     using namespace commands;
     static const CommandRows table{
-        Info(),     Program(),      Verify(),
-        Read(),     Erase(),        BlankCheck(),
-        Checksum(), RegisterRead(), RegisterProgram(),
-        MacRead(),  MacProgram(),   Operation(),
-        Settings(), Completion(),   Help(),
+        Info(),     Program(),      Verify(),          Read(),       Erase(),      BlankCheck(),
+        Checksum(), RegisterRead(), RegisterProgram(), MacRead(),    MacProgram(), Operation(),
+        Reset(),    Serve(),        Settings(),        Completion(), Help(),
     };
     return table;
 }
@@ -49,6 +47,10 @@ OptionRow NoVerifyOption() {
 
 OptionRow CommitOption() {
     return {"--commit", "", "Make the value survive a reset", &Options::commit};
+}
+
+OptionRow RunOption(const char* help) {
+    return {"--run", "", help, &Options::run};
 }
 
 }  // namespace commands

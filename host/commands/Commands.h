@@ -26,6 +26,8 @@ CommandRow RegisterProgram();
 CommandRow MacRead();
 CommandRow MacProgram();
 CommandRow Operation();
+CommandRow Reset();
+CommandRow Serve();
 CommandRow Settings();
 CommandRow Completion();
 CommandRow Help();
@@ -38,5 +40,6 @@ OptionRow BaseOption();
 OptionRow DryRunOption();
 OptionRow NoVerifyOption();
 OptionRow CommitOption();
+OptionRow RunOption(const char* help);
 
 }  // namespace host::commands

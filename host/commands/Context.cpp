@@ -6,11 +6,15 @@
 
 namespace host {
 
+TargetOptions TargetOf(const Options& options) {
+    return {options.sim, options.simFile, options.gdb, options.gdbOptions, options.loader};
+}
+
 namespace {
 
 Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(FlashDevice&)>& work) {
     const Options& options = context.options;
-    const DeviceOptions named{{options.sim, options.simFile}, options.plugin, trace};
+    const DeviceOptions named{TargetOf(options), options.plugin, trace};
     FlashDevice device(named, context.settings, context.reporter);
     Outcome outcome;
     try {
@@ -18,13 +22,13 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
     } catch (...) {
         device.LeaveHalted();
         try {
-            if (!options.dryRun) device.Save();
+            device.Close(options.dryRun ? Contents::LeftAlone : Contents::Kept);
         } catch (const Failure& second) {
             context.reporter.Error(second.what());
         }
         throw;
     }
-    if (!options.dryRun) device.Save();
+    device.Close(options.dryRun ? Contents::LeftAlone : Contents::Kept);
     return outcome;
 }
 
@@ -66,6 +70,7 @@ FilesInUse InputFiles(const Context& context) {
         files.Add(file, "an image file");
     files.Add(options.imageOf.value_or(""), "the image file");
     files.Add(options.simFile.value_or(""), "the device file");
+    files.Add(options.loader.value_or(""), "the loader");
     files.Add(context.settings.Paths().user, "the settings file");
     files.Add(context.settings.Paths().kept, "the file of kept settings");
     files.Add(PluginFile(options.plugin.value_or("")), "the plug-in");

@@ -20,9 +20,12 @@ struct Context {
     SettingStore& settings;
 };
 
+/// The target that the options ask for.
+TargetOptions TargetOf(const Options& options);
+
 /// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
 /// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted. A
-/// trace that isn't whole is a failure.
+/// real one is released; a trace that isn't whole is a failure.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
 /// What ends a --dry-run: `plan` is what would be done.

@@ -127,6 +127,7 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages
     }
     outcome.result["phases"] = PhasesJson(device.Meter());
     ShowSummary(context.reporter, device.Meter());
+    if (context.options.run && outcome.status == ExitStatus::Done) device.StartProgram();
     if (outcome.status == ExitStatus::Done)
         context.reporter.Done(context.options.noVerify
                                   ? "Done: the image is programmed, but not compared"
@@ -193,6 +194,7 @@ CommandRow Program() {
               &Options::blankCheck},
              {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},
              NoVerifyOption(),
+             RunOption("Reset the device afterwards and let it run its program"),
              DryRunOption()},
             Run};
 }

@@ -34,15 +34,21 @@ bool IsNoIdentification(std::uint32_t word) {
 constexpr char kCheckConnection[] =
     "check the connection (of a simulated device: the options of --sim)";
 
+TraceLine LinesTo(Trace* trace) {
+    if (trace == nullptr) return {};
+    return [trace](const char* source, const std::string& text) { trace->Line(source, text); };
+}
+
 }  // namespace
 
 FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter)
     : settings_(settings),
       reporter_(reporter),
-      target_(options.target, [&](const std::string& text) { reporter.Say(Talk::Normal, text); }),
+      target_(Open(options.target, LinesTo(options.trace),
+                   [&](const std::string& text) { reporter.Say(Talk::Normal, text); })),
       meter_(reporter),
       watch_(meter_),
-      loader_(target_.Get(), watch_),
+      loader_(target_->Get(), watch_),
       host_(loader_, settings, reporter, watch_, ExecutableDirectory()),
       trace_(options.trace),
       library_(options.plugin.value_or("")) {
@@ -83,6 +89,7 @@ void FlashDevice::Initialize() {
     info_.sectorBytes = static_cast<std::uint32_t>(PublishedSize(settings_, keys::kSectorSize));
     info_.operations = operations;
     watch_.SetGeometry(info_.flashBytes, info_.sectorBytes);
+    target_->RamEndsAt(plugin::kLoaderBuffers + static_cast<std::uint32_t>(info_.ramBytes));
 }
 
 bool FlashDevice::Contains(std::uint32_t address) {
@@ -180,6 +187,25 @@ std::uint32_t FlashDevice::ReadUserRegister(unsigned index) {
 
 void FlashDevice::Halt() {
     Call("halting the target", "", [&] { return Host().HaltTarget(); });
+}
+
+void FlashDevice::Reset() {
+    Call("resetting the device", "", [&] { return Host().ResetTarget(true); });
+}
+
+void FlashDevice::StartProgram() {
+    Reset();
+    ResetSettings(plugin::ResetMode::TargetWillRun);
+    runsAtEnd_ = true;
+}
+
+void FlashDevice::Close(Contents contents) {
+    if (contents == Contents::Kept) target_->Keep(watch_.ContentsTouched());
+    try {
+        target_->Release(runsAtEnd_);
+    } catch (const target::TargetError& error) {
+        throw Failure(ExitStatus::DeviceFailed, error.what());
+    }
 }
 
 /// One call: what came of it is looked for in all the places where a failure can show.

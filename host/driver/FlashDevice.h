@@ -20,7 +20,7 @@
 #include "host/image/Image.h"
 #include "host/output/WorkMeter.h"
 #include "host/targets/LoaderWait.h"
-#include "host/targets/SimulatedTarget.h"
+#include "host/targets/OpenTarget.h"
 
 namespace host {
 
@@ -59,6 +59,9 @@ struct DeviceOptions {
     std::optional<std::string> plugin;
     Trace* trace = nullptr;
 };
+
+/// What becomes of a simulated device's contents at the end.
+enum class Contents { Kept, LeftAlone };
 
 class FlashDevice {
   public:
@@ -108,8 +111,15 @@ class FlashDevice {
     /// Ends the work after a failure of any kind, Ctrl-C included.
     void LeaveHalted();
 
-    /// Keeps the simulated device's contents, where a file was named for them.
-    void Save() const { target_.Save(watch_.ContentsTouched()); }
+    void Reset();
+
+    /// Resets the device and prepares it to run its own program, which begins when the device is
+    /// closed.
+    void StartProgram();
+
+    /// The last thing done with a device: a simulated one's contents are kept, where a file was
+    /// named for them, and the target is left halted or starts its program. Failure.
+    void Close(Contents contents);
 
   private:
     struct Destroyer {
@@ -131,7 +141,7 @@ class FlashDevice {
 
     SettingStore& settings_;
     Reporter& reporter_;
-    SimulatedTarget target_;
+    std::unique_ptr<OpenTarget> target_;
     WorkMeter meter_;
     FlashWatch watch_;
     LoaderWait loader_;
@@ -146,6 +156,7 @@ class FlashDevice {
     bool reached_ = false;  ///< the device was identified, and its properties are known
     bool closing_ = false;  ///< after a failure
     bool haltFailed_ = false;
+    bool runsAtEnd_ = false;
 };
 
 }  // namespace host

@@ -55,6 +55,12 @@ void Reporter::Say(Talk level, const std::string& text) {
     Line(stderr, text);
 }
 
+void Reporter::Listening(const std::string& host, unsigned port) {
+    JsonLine("listening", {{"host", host}, {"port", port}});
+    Result(fmt::format("Listening at {}:{}; Ctrl-C ends it", host, port));
+    std::fflush(out_);
+}
+
 void Reporter::PluginMessage(Talk level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "info"}, {"text", text}});
     if (Hears(level)) Line(stderr, text);

@@ -49,6 +49,9 @@ class Reporter {
         if (Hears(Talk::Normal)) Result(text);
     }
 
+    /// Where clients may connect from now on.
+    void Listening(const std::string& host, unsigned port);
+
     /// A message or an error that the plug-in shows its user.
     void PluginMessage(Talk level, const std::string& text);
     void PluginError(Talk level, const std::string& text);

@@ -43,10 +43,10 @@ void LoaderWait::AwaitIdle() {
         const AddressRange flash = chunks_[*block]->flash;
         Forget();
         if (stop_()) return;
-        throw target::TargetError(
-            fmt::format("the loader hasn't finished the chunk for {} within {} s; allow it more "
-                        "time (FlashTimeoutValue), if the flash is that slow",
-                        RangeText(flash), std::chrono::floor<std::chrono::seconds>(limit_).count()));
+        throw target::TargetError(fmt::format(
+            "the loader hasn't finished the chunk for {} within {} s; allow it more "
+            "time (FlashTimeoutValue), if the flash is that slow",
+            RangeText(flash), std::chrono::floor<std::chrono::seconds>(limit_).count()));
     }
 }
 

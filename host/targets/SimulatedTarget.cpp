@@ -50,9 +50,13 @@ SimulatedTarget::SimulatedTarget(const TargetOptions& options, const WaitNotice&
     }
 }
 
-void SimulatedTarget::Save(bool changed) const {
+void SimulatedTarget::Keep(bool changed) {
     if (path_.empty() || (!changed && IsThere(path_))) return;
     WriteWholeFile(kContentsFile, path_, target::EncodeContents(*device_), Existing::Replace);
+}
+
+void SimulatedTarget::Release(bool run) {
+    if (run) device_->Continue();
 }
 
 }  // namespace host

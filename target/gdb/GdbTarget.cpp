@@ -132,7 +132,7 @@ void GdbTarget::Write(const void* buffer, std::size_t count, std::uint32_t addre
         memory_.Write(address, bytes);
         if (look_ && InMailbox(address, size))
             look_->replace(address - mailbox_.address, size, bytes);
-        else
+        else if (OverlapsMailbox(address, size))
             look_.reset();
     });
 }
@@ -156,6 +156,11 @@ bool GdbTarget::InMailbox(std::uint32_t address, std::size_t size) const {
     const std::uint64_t end = std::uint64_t{address} + size;
     return address >= mailbox_.address &&
            end <= std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
+}
+
+bool GdbTarget::OverlapsMailbox(std::uint32_t address, std::size_t size) const {
+    return std::uint64_t{address} + size > mailbox_.address &&
+           address < std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
 }
 
 void GdbTarget::Resume() {
@@ -209,6 +214,7 @@ void GdbTarget::Pause(std::uint32_t pauseMs) {
 }
 
 void GdbTarget::Release(bool start) {
+    if (connection_.IsLost()) return;
     Perform([] { return std::string("Leaving the target"); },
             [&] {
                 if (start && !options_.detach) {

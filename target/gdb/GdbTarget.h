@@ -74,6 +74,7 @@ class GdbTarget final : public Target {
     void Resume();
     std::string ReadMailbox(std::uint32_t address, std::size_t size);
     bool InMailbox(std::uint32_t address, std::size_t size) const;
+    bool OverlapsMailbox(std::uint32_t address, std::size_t size) const;
 
     const std::string name_;
     const GdbOptions options_;

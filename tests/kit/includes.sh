@@ -20,11 +20,11 @@ host/image: host/image/records host/base
 host/image/records: host/image host/base
 host/settings: host/base
 host/output: host/base
-host/targets: host/base target target/simulated
+host/targets: host/base target target/gdb target/simulated
 host/driver: host/output host/settings host/targets host/image host/base plugin target
 host/flashing: host/driver host/image host/output host/settings host/base
-host/cli: host/settings host/targets host/base target/simulated
-host/commands: host/cli host/flashing host/driver host/image host/output host/settings host/base
+host/cli: host/settings host/targets host/base target/gdb target/simulated
+host/commands: host/cli host/flashing host/driver host/targets host/image host/output host/settings host/base
 host: host/commands host/cli host/output host/settings host/base"
 
 failed=0

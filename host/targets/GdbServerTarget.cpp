@@ -1,0 +1,57 @@
+// From the options' texts to a connected target, and what the host knows of its loader.
+
+#include "host/targets/GdbServerTarget.h"
+
+#include <fmt/format.h>
+
+#include "host/base/Errors.h"
+#include "host/base/Interrupt.h"
+#include "host/base/PluginFacts.h"
+
+namespace host {
+
+namespace {
+
+namespace gdb = target::gdb;
+
+// Both parameter blocks.
+constexpr gdb::Mailbox kMailbox{
+    plugin::kParameterBlocks[0],
+    2 * (plugin::kParameterBlocks[1] - plugin::kParameterBlocks[0]),
+    plugin::kStatusPending,
+};
+
+gdb::GdbOptions ParseOptions(const TargetOptions& options) {
+    gdb::GdbOptions parsed;
+    for (const std::string& text : options.gdbOptions)
+        gdb::ParseGdbOption(text, parsed);
+    parsed.loader = options.loader.value_or("");
+    return parsed;
+}
+
+gdb::PacketTrace PacketsTo(const TraceLine& trace) {
+    if (!trace) return {};
+    return [trace](const char* direction, const std::string& packet) {
+        trace("gdb", fmt::format("{} {}", direction, packet));
+    };
+}
+
+}  // namespace
+
+GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& trace) {
+    try {
+        const gdb::GdbOptions parsed = ParseOptions(options);
+        const gdb::Address address = gdb::Address::Parse(*options.gdb);
+        target_ = std::make_unique<gdb::GdbTarget>(address, parsed, kMailbox, Interrupted,
+                                                   PacketsTo(trace));
+    } catch (const gdb::GdbOptionError& error) {
+        throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb-option: {}", error.what()));
+    } catch (const std::invalid_argument& error) {
+        throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb: {}", error.what()));
+    } catch (const target::TargetError& error) {
+        if (Interrupted()) throw Failure(ExitStatus::Interrupted, "interrupted");
+        throw Failure(ExitStatus::Unreachable, error.what());
+    }
+}
+
+}  // namespace host

@@ -1,0 +1,54 @@
+// A target of the kind that the command line asks for, while it is open. What kinds there are
+// stands in one table.
+
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "host/base/FileLock.h"
+#include "target/Target.h"
+
+namespace host {
+
+/// As the command line names it.
+struct TargetOptions {
+    std::optional<std::string> sim;       ///< class and options of a simulated device
+    std::optional<std::string> simFile;   ///< where its contents are kept
+    std::optional<std::string> gdb;       ///< where a GDB server listens
+    std::vector<std::string> gdbOptions;  ///< how to deal with it
+    std::optional<std::string> loader;    ///< the loader's file, for a real target
+};
+
+/// Takes lines for the trace; `source` is who speaks.
+using TraceLine = std::function<void(const char* source, const std::string& text)>;
+
+class OpenTarget {
+  public:
+    virtual ~OpenTarget() = default;
+
+    virtual target::Target& Get() = 0;
+
+    /// What the plug-in has found out: the address behind the device's RAM.
+    virtual void RamEndsAt(std::uint32_t /*address*/) {}
+
+    /// Keeps what must outlive the run; `changed` tells whether there is anything new. Failure
+    /// (Unreachable).
+    virtual void Keep(bool /*changed*/) {}
+
+    /// The last thing done with a target: leaves it halted, or has it run its own program from
+    /// where the last reset has put it. TargetError.
+    virtual void Release(bool run) = 0;
+};
+
+/// Failure (WrongUsage) for options that name no target, Failure (Unreachable) for a target that
+/// can't be had. `trace` may be empty; what there is to wait for is told to
+/// `say`.
+std::unique_ptr<OpenTarget> Open(const TargetOptions& options, const TraceLine& trace,
+                                 const WaitNotice& say);
+
+}  // namespace host

@@ -1,0 +1,37 @@
+// The simulated device of a command line, served to GDB and whatever else speaks its protocol.
+
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+
+#include "host/targets/SimulatedTarget.h"
+#include "target/gdb/Server.h"
+#include "target/simulated/ServedSimulation.h"
+
+namespace host {
+
+class TargetServer {
+  public:
+    using Complaint = std::function<void(const std::string& text)>;
+
+    /// Listens at "[HOST:]PORT". Failure (WrongUsage) or Failure (Unreachable). `complain` is told
+    /// what the device refuses, and that its contents can't be kept.
+    TargetServer(const TargetOptions& options, const std::string& address,
+                 const Complaint& complain, const WaitNotice& say);
+
+    std::string Host() const { return address_.host; }
+    std::uint16_t Port() const { return server_.Port(); }
+
+    /// Serves until Ctrl-C.
+    void Run() { server_.Run(); }
+
+  private:
+    SimulatedTarget target_;
+    target::gdb::Address address_;
+    target::ServedSimulation served_;
+    target::gdb::Server server_;
+};
+
+}  // namespace host
