@@ -9,6 +9,7 @@
 #include "host/base/Errors.h"
 #include "host/cli/CommandTable.h"
 #include "host/cli/Words.h"
+#include "target/gdb/GdbOptions.h"
 #include "target/simulated/DeviceOptions.h"
 
 namespace host {
@@ -95,6 +96,12 @@ std::string ManPage(const CommandRows& commands) {
     for (const CommandRow& command : commands)
         page += Command(command);
     page += ".SH SIMULATED DEVICES\n.nf\n" + Roff(target::DeviceOptionsHelp()) + "\n.fi\n";
+    page +=
+        ".SH GDB SERVERS\nWith \\fB\\-\\-gdb\\fR the target is a board behind a GDB server. "
+        "\\fB\\-\\-gdb\\-option\\fR takes:\n";
+    for (const target::gdb::GdbOptionRow& row : target::gdb::GdbOptionTable())
+        page += fmt::format(".TP\n\\fB{}\\fR=\\fIVALUE\\fR\n{} ({}).\n", Roff(row.name),
+                            Roff(row.meaning), Roff(row.accepts));
     page += ".SH EXIT STATUS\n";
     for (const auto& [status, meaning] : kExitStatuses)
         page += fmt::format(".TP\n{}\n{}.\n", static_cast<int>(status), Roff(meaning));

@@ -2,10 +2,14 @@
 // a script and misbehaves where the script says so, and client and server over a real connection.
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <fstream>
 #include <functional>
+#include <initializer_list>
 #include <random>
 #include <string>
 #include <thread>
@@ -13,6 +17,7 @@
 
 #include "target/gdb/Frame.h"
 #include "target/gdb/GdbTarget.h"
+#include "target/gdb/Hex.h"
 #include "target/gdb/Session.h"
 #include "target/simulated/ServedSimulation.h"
 
@@ -154,10 +159,35 @@ GdbOptions Quick(std::chrono::milliseconds timeout = 150ms) {
     return options;
 }
 
+std::string Little(std::initializer_list<std::uint32_t> words) {
+    std::string bytes;
+    for (const std::uint32_t word : words)
+        for (int i = 0; i < 4; ++i)
+            bytes += static_cast<char>(word >> (8 * i));
+    return bytes;
+}
+
+/// The smallest program: one segment of four bytes, and as many behind it that aren't in the file.
+const std::string& LoaderFile() {
+    static const std::string path = [] {
+        std::string file = testing::TempDir() + "gdb-test-loader-" + std::to_string(getpid());
+        std::ofstream(file) << "\x7f"
+                               "ELF\1\1\1"
+                            << std::string(9, '\0')
+                            << Little({0x00280002, 1, 0x20002001, 52, 0, 0, 0x00200034, 1, 0})
+                            << Little({1, 84, 0, 0x20002000, 4, 8, 7, 4}) << "\xfe\xe7\xfe\xe7";
+        return file;
+    }();
+    return path;
+}
+
 /// A few accesses of each kind, on a target that is halted, runs and is halted again; throws or
 /// gives what was read.
-std::string Work(const Address& where, const GdbOptions& options = Quick()) {
+std::string Work(const Address& where, GdbOptions options = Quick()) {
+    options.loader = LoaderFile();
+    options.ramEnd = 0x20010000;
     GdbTarget target(where, options, kMailbox, {}, {});
+    target.LoadProgram("", "");
     std::string bytes(64, '\0');
     for (std::size_t i = 0; i < bytes.size(); ++i)
         bytes[i] = static_cast<char>(i * 5);
@@ -194,14 +224,16 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         // Acknowledgements: refused once, twice, lost, garbled reply, late stop reply.
         {"qSupported", "-", "done"},
         {"qSupported", "-", "refused \"qSupported", 2},
-        {"qSupported", "$PacketSize=100#c1", "done"},
+        {"qSupported", "$PacketSize=100#c1",
+         "number of the register sp; --gdb-option sp=NUMBER does"},
         {"qSupported", "+$PacketSize=100#16", "sent no reply"},
         {"qSupported", "", "acknowledged no packet"},
         {"?", "$T05#b9", "done", 9},
         // The way in.
-        {"qSupported", "+$#00", "done"},
+        {"qSupported", "+$#00", "number of the register sp; --gdb-option sp=NUMBER does"},
         {"qSupported", "+$PacketSize=10#91", "packets of 16 bytes only"},
-        {"qSupported", "+$PacketSize=ffffffffffffffffff#5c", "done"},
+        {"qSupported", "+$PacketSize=ffffffffffffffffff#5c",
+         "number of the register sp; --gdb-option sp=NUMBER does"},
         {"?", "$W00#b7", "no running target (\"W00\")"},
         {"?", "$S00#b3", "done"},
         {"?", "$E01#a6", "answered \"E01\" to \"?\""},
@@ -226,6 +258,15 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         {"\x03", "$T05#b9$T02#b6", "done"},
         {"\x03", "$T04#b8", "stopped by itself: SIGILL"},
         {"\x03", "", "didn't stop the target within"},
+        // The loader.
+        {"qXfer:features", "$#00", "answered \"\" to \"qXfer:features:read:target.xml:0"},
+        {"qXfer:features", "$l<target#2f", "no XML"},
+        {"qXfer:features", "$l<target/>#9c", "register sp; --gdb-option sp=NUMBER"},
+        {"qXfer:features", "$l<target><xi:include href='a'/></target>#f6", "without end", 99},
+        {"qXfer:features", "$m#6d", "sends its document target.xml without end"},
+        {"m20002000", "$fee7fee600000000#4d", "0x20002003 doesn't hold what was written there"},
+        {"P10", "$E01#a6", "answered \"E01\" to \"P10=00000001\""},
+        {"P", "$#00", "Loading the program"},
         // The monitor.
         {"qRcmd", "$#00", "takes no monitor commands"},
         {"qRcmd", "$O41#b4$E01#a6", "answered \"E01\" to the monitor command \"reset halt\": A"},
@@ -243,6 +284,134 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         });
         const std::string result = ResultOf([&] { return Work(peer.Where()); });
         EXPECT_NE(result.find(quirk.result), std::string::npos) << result;
+    }
+}
+
+bool IsOptional(const std::string& payload) {
+    return payload.starts_with("qSupported") || payload == "QStartNoAckMode" ||
+           payload == "vCont?" || payload.ends_with(",0:");
+}
+
+// Whichever request fails, and however: what can be done without is done without, the rest is an
+// error, and nobody waits for long.
+TEST(GdbClient, ReportsAFailureOfAnyRequest) {
+    std::size_t count = 0;
+    for (const char* wire : {"$E01#a6", "$zz#f4", "", Peer::kClose}) {
+        for (const bool forGood : {false, true}) {
+            for (std::size_t failing = 0; failing == 0 || failing < count; ++failing) {
+                std::size_t index = 0;
+                std::string failed;
+                Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+                    const std::size_t at = index++;
+                    if (at < failing || (at > failing && !forGood)) return std::nullopt;
+                    if (at == failing) failed = payload;
+                    return wire;
+                });
+                const auto start = std::chrono::steady_clock::now();
+                const std::string result =
+                    ResultOf([&] { return Work(peer.Where(), Quick(60ms)); });
+                count = std::max(count, peer.Log().size());
+                const bool optional = IsOptional(failed) && !forGood;
+                EXPECT_TRUE(result == "done"
+                                ? optional
+                                : result.find("GDB server at localhost:") != result.npos)
+                    << failing << " " << failed << " -> " << wire << ": " << result;
+                EXPECT_LT(std::chrono::steady_clock::now() - start, 10s);
+            }
+        }
+    }
+    EXPECT_GT(count, 15U);
+}
+
+TEST(GdbClient, KeepsToThePacketSizeAndCutsAtWords) {
+    std::mt19937 random(1);
+    for (const std::size_t packetSize : {0x40U, 0x43U, 0x100U, 0x400U, 0x4000U, 0U}) {
+        for (const bool binary : {true, false}) {
+            const std::size_t limit = packetSize == 0 ? 400 : packetSize;
+            std::uint64_t end = 0;
+            std::string breach;
+            Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+                const Request request = ParseRequest(payload);
+                const bool reads = request.kind == Request::Kind::ReadMemory;
+                const std::size_t size = reads ? 2 * request.length : Escaped(payload).size();
+                const std::uint32_t behind = request.address + request.length;
+                const bool cut = reads || !request.data.empty();
+                if (size + kFrameSize > limit || (cut && behind % 4 != 0 && behind != end))
+                    breach = Shown(payload);
+                if (payload.starts_with("qSupported"))
+                    return "+" +
+                           Framed(packetSize == 0
+                                      ? ""
+                                      : "PacketSize=" +
+                                            ToHex(std::string{static_cast<char>(packetSize >> 8),
+                                                              static_cast<char>(packetSize)}));
+                if (payload.starts_with("X") && !binary) return "+" + Framed("");
+                return std::nullopt;
+            });
+            GdbTarget target(peer.Where(), Quick(5s), kMailbox, {}, {});
+            for (const std::size_t around : {std::size_t{4}, limit / 2 - 10, limit - 20, limit}) {
+                for (std::uint32_t i = 0; i < 4; ++i) {
+                    std::string bytes(around + i, '\0');
+                    for (char& byte : bytes)
+                        byte = "#$}*\x03\x00+a"[random() % 8];
+                    const std::uint32_t address = 0x20002000 + i;
+                    end = address + bytes.size();
+                    target.Write(bytes.data(), bytes.size(), address, 1, 1);
+                    std::string held(bytes.size(), '?');
+                    target.Read(held.data(), held.size(), address, 1, 1);
+                    EXPECT_EQ(held, bytes) << packetSize << (binary ? " X" : " M");
+                }
+            }
+            const std::uint32_t word = 0x12345678;
+            target.Write(&word, 1, 0x400FD000, 1, 4);
+            EXPECT_EQ(peer.Log().back(), "M400fd000,4:78563412");
+            EXPECT_EQ(breach, "") << packetSize;
+        }
+    }
+}
+
+// What a server in non-stop mode answers while the program runs, and whether that makes the client
+// look without stopping it.
+TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
+    const struct {
+        const char* look;  ///< the answer to a read while the program runs; null: the bytes
+        const char* news;  ///< sent along with it
+        const char* result;
+        bool live;
+    } rows[] = {
+        {nullptr, "", "done", true},
+        {"$E01#a6", "", "done", false},
+        {"", "", "done", false},
+        {nullptr, "%Stop:T0bthread:1;#e4", "stopped by itself: SIGSEGV", true},
+    };
+    for (const auto& row : rows) {
+        bool nonStop = false;
+        bool running = false;
+        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+            if (payload.starts_with("qSupported"))
+                return "+" + Framed("QNonStop+;qXfer:features:read+");
+            if (payload.starts_with("QNonStop:")) {
+                nonStop = payload.back() == '1';
+                return "+$OK#9a";
+            }
+            if (!nonStop) return std::nullopt;
+            if (payload == "vCont;c") {
+                running = true;
+                return "+$OK#9a";
+            }
+            if (payload == "vCont;t") {
+                running = false;
+                return "+$OK#9a%Stop:T00#94";
+            }
+            if (payload == "vStopped") return "+$OK#9a";
+            if (!running || payload[0] != 'm') return std::nullopt;
+            if (row.look != nullptr) return std::string("+") + row.look;
+            return "+" + Framed("00000000") + row.news;
+        });
+        const std::string result = ResultOf([&] { return Work(peer.Where()); });
+        EXPECT_NE(result.find(row.result), std::string::npos) << result;
+        const auto log = peer.Log();
+        EXPECT_EQ(std::count(log.begin(), log.end(), "\x03") == 0, row.live);
     }
 }
 
