@@ -265,7 +265,7 @@ TEST(ProgramPlan, ErasesJoinsAndCounts) {
          {{Joined(a, {b}), c}, {{0, 0x7FF}, {0x1000, 0x1BFF}}, 0x1400, 5, 0x831, 0xF00, 0xBCF}},
         {{Kind::Nothing, {}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0}},
         {{Kind::Everything, {}},
-         {{Joined(a, {b}), c}, {{0, 0xFFFF}}, 0x10000, 64, 0x831, 0xF00, 0xF7CF}},
+         {{Joined(a, {b}), c}, {{0, 0xFFFF}}, 0x10000, 64, 0x831, 0xF00, 0xF7CF, true}},
         {{Kind::Range, {0x3FF, 0x400}},
          {{Joined(a, {b}), c}, {{0, 0x7FF}}, 0x800, 2, 0x831, 0xF00, 0x7D0}},
         {{Kind::Range, {0x5FF, 0x600}},
@@ -276,7 +276,7 @@ TEST(ProgramPlan, ErasesJoinsAndCounts) {
     for (const image::Section& section : {a, b, c})
         image.Add(section.address, section.bytes, "test");
     for (const auto& [erase, expected] : cases) {
-        EXPECT_EQ(PlanProgram(image, flash, erase), expected)
+        EXPECT_EQ(PlanProgram(image, {}, flash, erase), expected)
             << static_cast<int>(erase.kind) << " " << RangeText(erase.range);
     }
 }
@@ -309,7 +309,7 @@ TEST(ProgramPlan, JoiningChangesNoByteOfFlash) {
         }
         const EraseChoice erase{static_cast<EraseChoice::Kind>(random(4)),
                                 {random(0x4000), 0x4000 + random(0x4000)}};
-        const ProgramPlan plan = PlanProgram(image, {0x8000, 0x400}, erase);
+        const ProgramPlan plan = PlanProgram(image, {}, {0x8000, 0x400}, erase);
         EXPECT_LE(plan.sections.size(), image.Sections().size());
         EXPECT_EQ(FlashAfter(plan.erased, plan.sections), FlashAfter(plan.erased, image.Sections()))
             << "round " << round;

@@ -1,16 +1,18 @@
-// How the host waits for the loader: on a board that says when it was looked at, and in whole
-// program loads under virtual time.
+// How the host waits for the loader, on a board that says when it was looked at; and whole program
+// loads under virtual time: what they lose, and what they leave alone.
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
-#include <stdlib.h>
+#include <unistd.h>
 
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 
 #include "host/base/PluginFacts.h"
 #include "host/commands/Commands.h"
 #include "host/targets/LoaderWait.h"
+#include "target/simulated/Contents.h"
 #include "tests/support/VirtualTime.h"
 
 namespace host {
@@ -145,30 +147,79 @@ TEST(LoaderWait, AwaitsTheLoaderBeforeItIsStopped) {
               "halt@66361 load@66361 run@66361 handing handed halt@66361 ");
 }
 
-/// corvane-flash program, in this process.
-Outcome Program(const std::string& sim, const std::string& file, Options options = {}) {
-    Reporter reporter({Talk::Quiet, false, "none"});
-    SettingStore settings;
-    options.sim = sim;
-    options.plugin = FLASH_CORVANE_LIBRARY;
-    options.files = {file};
-    options.base = "1083";
-    Context context{options, reporter, settings};
-    return commands::Program().run(context);
+std::string Contents(const std::string& path) {
+    std::ostringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
 }
 
-/// An image file of the test's own, gone with it.
-struct ImageFile {
-    explicit ImageFile(const std::string& bytes) { std::ofstream(path) << bytes; }
-    ~ImageFile() { std::filesystem::remove(path); }
-    std::string path =
-        std::filesystem::temp_directory_path() / fmt::format("loader-test-{}.bin", getpid());
+std::string TemporaryName(const char* what) {
+    return std::filesystem::temp_directory_path() /
+           fmt::format("loader-test-{}-{}", getpid(), what);
+}
+
+/// corvane-flash program, in this process, with files of its own.
+struct Tool {
+    Tool() {
+        std::filesystem::remove(image);
+        std::filesystem::remove(contents);
+    }
+    ~Tool() {
+        std::filesystem::remove(image);
+        std::filesystem::remove(contents);
+        std::filesystem::remove(trace);
+    }
+
+    Outcome Program(const std::string& bytes, const std::string& base, Options options = {}) {
+        std::ofstream(image) << bytes;
+        Reporter reporter({Talk::Quiet, false, "none"});
+        SettingStore settings;
+        options.sim = sim;
+        options.plugin = FLASH_CORVANE_LIBRARY;
+        options.files = {image};
+        options.base = base;
+        Context context{options, reporter, settings};
+        return commands::Program().run(context);
+    }
+
+    /// The same on a device that stays. How many bytes were erased and written.
+    std::pair<int, int> Update(const std::string& bytes, bool rewrite = false) {
+        Options options;
+        options.simFile = contents;
+        options.rewrite = rewrite;
+        options.trace = trace;
+        const Outcome outcome = Program(bytes, "0", options);
+        EXPECT_EQ(outcome.status, ExitStatus::Done) << outcome.error;
+        const auto device =
+            target::DecodeContents(Contents(contents), target::ParseDeviceOptions(sim));
+        const auto flash = device->FlashContents();
+        EXPECT_TRUE(std::equal(bytes.begin(), bytes.end(), flash.begin(),
+                               [](char a, std::uint8_t b) { return a == static_cast<char>(b); }));
+        counts.clear();
+        for (std::size_t page = 0; page < 16; ++page)
+            counts += std::to_string(device->Flash().EraseCount(page));
+        const Json phases = outcome.result["phases"];
+        const auto bytesOf = [&](const char* phase) {
+            return phases.contains(phase) ? phases[phase]["bytes"].get<int>() : 0;
+        };
+        looked = bytesOf("look");
+        EXPECT_EQ(bytesOf("verify"), bytes.size());
+        return {bytesOf("erase"), bytesOf("program")};
+    }
+
+    std::string sim = "quen,flash=32K";
+    std::string counts;  ///< how often each of the first pages was erased
+    int looked = 0;
+    const std::string image = TemporaryName("image");
+    const std::string contents = TemporaryName("contents");
+    const std::string trace = TemporaryName("trace");
 };
 
 TEST(Program, LosesNoChunkHoweverSlowTheLoader) {
-    const ImageFile image(std::string(5000, 'x'));
     for (const char* chunkTime : {"0", "1ms", "60ms", "100ms", "500ms", "1500ms"}) {
-        const Outcome outcome = Program(fmt::format("dorna,chunk-time={}", chunkTime), image.path);
+        Tool tool;
+        tool.sim = fmt::format("dorna,chunk-time={}", chunkTime);
+        const Outcome outcome = tool.Program(std::string(5000, 'x'), "1083");
         EXPECT_EQ(outcome.status, ExitStatus::Done) << chunkTime << outcome.error;
         EXPECT_EQ(outcome.result["phases"]["program"]["bytes"], 5120) << chunkTime;
     }
@@ -176,10 +227,11 @@ TEST(Program, LosesNoChunkHoweverSlowTheLoader) {
 
 TEST(Program, EndsInBoundedTimeWhenTheLoaderHangs) {
     for (const std::size_t bytes : {100U, 5000U}) {
-        const ImageFile image(std::string(bytes, 'x'));
+        Tool tool;
+        tool.sim = "dorna,loader=hangs";
         const auto before = test::VirtualNow();
         try {
-            Program("dorna,loader=hangs", image.path);
+            tool.Program(std::string(bytes, 'x'), "0");
             ADD_FAILURE() << bytes;
         } catch (const Failure& failure) {
             EXPECT_NE(std::string(failure.what()).find("within 30 s"), std::string::npos)
@@ -187,6 +239,34 @@ TEST(Program, EndsInBoundedTimeWhenTheLoaderHangs) {
         }
         EXPECT_LE(test::VirtualNow() - before, 60s) << bytes;
     }
+}
+
+TEST(Program, LeavesAloneWhatIsThere) {
+    using Work = std::pair<int, int>;
+    Tool tool;
+    std::string image(12 * 1024 - 100, 'x');
+    EXPECT_EQ(tool.Update(image), Work(0x3000, 0x3000));
+    EXPECT_EQ(tool.looked, 0);  // the samples tell that nothing is there
+    EXPECT_EQ(tool.counts, "1111111111110000");
+
+    EXPECT_EQ(tool.Update(image), Work(0, 0));
+    EXPECT_EQ(tool.looked, 0x3000);
+    EXPECT_EQ(tool.counts, "1111111111110000");
+    EXPECT_EQ(Contents(tool.trace).find("LoadProgram"), std::string::npos);
+
+    image[0x7FF] = 'y';
+    EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
+    EXPECT_EQ(tool.counts, "1211111111110000");
+    image[0x800] = image[0x1000] = image[0x2C00] = 'z';  // one sector between, then six
+    EXPECT_EQ(tool.Update(image), Work(0x1000, 0x1000));
+    EXPECT_EQ(tool.counts, "1222211111120000");
+    EXPECT_EQ(tool.Update(image, true), Work(0x3000, 0x3000));
+
+    image.assign(0x8000, 'w');
+    EXPECT_EQ(tool.Update(image), Work(0x8000, 0x8000));  // all at once
+    EXPECT_NE(Contents(tool.trace).find("0xa4420004"), std::string::npos);
+    image[0] = 'v';
+    EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
 }
 
 }  // namespace

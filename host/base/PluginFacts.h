@@ -8,6 +8,7 @@
 #include <chrono>
 #include <cstdint>
 #include <string>
+#include <string_view>
 
 namespace host::plugin {
 
@@ -68,6 +69,13 @@ inline constexpr std::uint32_t kFlashAddressRegister = 0x400FD000;
 inline constexpr std::uint32_t kFlashCommandRegister = 0x400FD008;
 inline constexpr std::uint32_t kEraseSectorBit = 0x2;
 inline constexpr std::uint32_t kEraseAllBit = 0x4;
+
+/// Whether the plug-in can erase all of a device's flash with one command. Of the Mesk class it
+/// knows the flash block registers for these sizes only.
+inline bool ErasesWhole(std::string_view family, std::uint64_t flashBytes) {
+    return !family.starts_with("Mesk") ||
+           (flashBytes % 0x8000 == 0 && flashBytes != 0 && flashBytes <= 0x20000);
+}
 
 // It commits the user register that the flash address register names in the same way.
 inline constexpr std::uint32_t kCommitBit = 0x8;

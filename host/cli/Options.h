@@ -46,6 +46,7 @@ struct Options {
     bool dryRun = false;
     bool force = false;
     bool noVerify = false;
+    bool rewrite = false;
     bool run = false;
 };
 

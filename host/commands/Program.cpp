@@ -13,6 +13,7 @@
 #include "host/flashing/Comparison.h"
 #include "host/flashing/ImageSet.h"
 #include "host/flashing/ProgramPlan.h"
+#include "host/flashing/Unchanged.h"
 #include "host/output/Summary.h"
 #include "host/settings/RangeSettings.h"
 
@@ -57,6 +58,7 @@ Json PlanJson(const ProgramPlan& plan) {
             {"erased", erased},
             {"sectors", plan.sectorCount},
             {"imageBytes", plan.imageBytes},
+            {"unchangedBytes", plan.unchangedBytes},
             {"clearedBytes", plan.clearedBytes}};
 }
 
@@ -90,8 +92,9 @@ void AllowTime(Context& context, FlashDevice& device, const ProgramPlan& plan) {
     Choose(context, keys::kTimeout, std::to_string(seconds));
 }
 
-void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
+void WriteSections(Context& context, FlashDevice& device, const ProgramPlan& plan) {
     AllowTime(context, device, plan);
+    if (plan.erasesWhole) ChooseErase(context, device, "all");
     device.ResetSettings(ResetMode::LoadBegins);
     for (const image::Section& section : plan.sections)
         device.WriteSection(section);
@@ -101,6 +104,10 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
                       fmt::format("the plug-in erased {} of {} and gave no reason; the image was "
                                   "programmed over what was there; try --erase necessary",
                                   SizeText(erased), SizeText(plan.erasedBytes)));
+}
+
+void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
+    if (!plan.sections.empty()) WriteSections(context, device, plan);
     if (IsOn(context, keys::kProgramCrc)) device.ResetSettings(ResetMode::LoadComplete);
 }
 
@@ -111,6 +118,17 @@ std::string Advice(const Differences& differences, const EraseChoice& erase) {
         return "some bits stay 0 although their sectors were erased: the cells are worn out or "
                "protected";
     return "some bits were not erased first: program it with --erase necessary";
+}
+
+void ShowUnchanged(Reporter& reporter, const ProgramPlan& plan) {
+    if (plan.unchangedBytes != 0 && reporter.Hears(Talk::Normal))
+        reporter.Result(fmt::format("{:<13} {}", "Left alone", SizeText(plan.unchangedBytes)));
+}
+
+const char* DoneText(const ProgramPlan& plan, bool compared) {
+    if (plan.sections.empty()) return "Done: the flash held the image already";
+    return compared ? "Done: the flash holds the image"
+                    : "Done: the image is programmed, but not compared";
 }
 
 Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages& images,
@@ -127,20 +145,29 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages
     }
     outcome.result["phases"] = PhasesJson(device.Meter());
     ShowSummary(context.reporter, device.Meter());
+    ShowUnchanged(context.reporter, plan);
     if (context.options.run && outcome.status == ExitStatus::Done) device.StartProgram();
     if (outcome.status == ExitStatus::Done)
-        context.reporter.Done(context.options.noVerify
-                                  ? "Done: the image is programmed, but not compared"
-                                  : "Done: the flash holds the image");
+        context.reporter.Done(DoneText(plan, !context.options.noVerify));
     return outcome;
+}
+
+/// What a load of the necessary sectors needs not touch.
+AddressSet LeftAlone(Context& context, FlashDevice& device, const image::Image& image,
+                     const EraseChoice& erase) {
+    if (erase.kind != EraseChoice::Kind::Necessary || context.options.rewrite) return {};
+    return FindUnchanged(device, image);
 }
 
 Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
     RequireFit(device, images);
     ApplyOptions(context, device);
     const DeviceInfo& info = device.Info();
-    const FlashGeometry flash{info.flashBytes, info.sectorBytes};
-    const ProgramPlan plan = PlanProgram(images.image, flash, ChosenErase(context.settings));
+    const FlashGeometry flash{info.flashBytes, info.sectorBytes,
+                              plugin::ErasesWhole(info.family, info.flashBytes)};
+    const EraseChoice erase = ChosenErase(context.settings);
+    const ProgramPlan plan =
+        PlanProgram(images.image, LeftAlone(context, device, images.image, erase), flash, erase);
     context.reporter.Say(Talk::Normal,
                          fmt::format("{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
                                      CountText(plan.sections.size(), "section"), info.family,
@@ -177,7 +204,8 @@ CommandRow Program() {
     return {"program",
             "Program image files into flash and compare the result",
             "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors that the "
-            "image touches are erased whole, so what else they hold is lost.",
+            "image touches are erased whole, so what else they hold is lost; those that hold it "
+            "already are left alone.",
             "  corvane-flash program firmware.elf\n"
             "  corvane-flash program boot.hex app.srec --crc\n"
             "  corvane-flash program data.bin --base 0x8000 --erase none",
@@ -193,6 +221,8 @@ CommandRow Program() {
              {"--blank-check", "", "Check that the flash is blank before programming it",
               &Options::blankCheck},
              {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},
+             {"--rewrite", "", "Erase and program also what the flash holds already",
+              &Options::rewrite},
              NoVerifyOption(),
              RunOption("Reset the device afterwards and let it run its program"),
              DryRunOption()},

@@ -8,6 +8,7 @@
 #include <iterator>
 
 #include "host/base/PluginFacts.h"
+#include "host/flashing/Unchanged.h"
 #include "host/settings/RangeSettings.h"
 
 namespace host {
@@ -19,26 +20,24 @@ using plugin::kBlockBytes;
 /// The longest gap that is cheaper to fill than to start the loader once more for: one chunk.
 constexpr std::uint64_t kGapBytesMax = plugin::kChunkBytes;
 
-/// Adds a run of sectors behind or over the last one of an ascending list.
-void AppendRun(std::vector<AddressRange>& runs, const AddressRange& run) {
-    if (!runs.empty() && run.first <= std::uint64_t{runs.back().last} + 1)
-        runs.back().last = std::max(runs.back().last, run.last);
-    else
-        runs.push_back(run);
-}
-
 std::vector<AddressRange> ErasedRuns(const image::Image& image, const FlashGeometry& flash,
                                      const EraseChoice& erase) {
     using Kind = EraseChoice::Kind;
-    std::vector<AddressRange> runs;
     if (erase.kind == Kind::Everything)
-        runs.push_back({0, static_cast<std::uint32_t>(flash.flashBytes - 1)});
+        return {{0, static_cast<std::uint32_t>(flash.flashBytes - 1)}};
     if (erase.kind == Kind::Range && erase.range.first <= erase.range.last)
-        runs.push_back(SectorsCovering(erase.range, flash.sectorBytes));
-    if (erase.kind == Kind::Necessary)
-        for (const image::Section& section : image.Sections())
-            AppendRun(runs, SectorsCovering({section.address, section.Last()}, flash.sectorBytes));
-    return runs;
+        return {SectorsCovering(erase.range, flash.sectorBytes)};
+    if (erase.kind == Kind::Necessary) return SectorsOf(image, flash.sectorBytes).Ranges();
+    return {};
+}
+
+/// One command in place of one for each of all the sectors.
+bool ErasesWhole(const std::vector<AddressRange>& erased, const FlashGeometry& flash,
+                 const EraseChoice& erase) {
+    if (erase.kind == EraseChoice::Kind::Everything) return true;
+    return erase.kind == EraseChoice::Kind::Necessary && flash.erasesWhole &&
+           flash.flashBytes > flash.sectorBytes && erased.size() == 1 && erased[0].first == 0 &&
+           std::uint64_t{erased[0].last} + 1 >= flash.flashBytes;
 }
 
 /// How many bytes of a range are erased. The runs are either one, or whole sectors of which each
@@ -94,23 +93,22 @@ EraseChoice ChosenErase(const SettingStore& settings) {
     return range ? EraseChoice{Kind::Range, *range} : EraseChoice{Kind::Everything, {}};
 }
 
-AddressRange SectorsCovering(const AddressRange& range, std::uint32_t sectorBytes) {
-    return {range.first - range.first % sectorBytes,
-            range.last - range.last % sectorBytes + (sectorBytes - 1)};
-}
-
-ProgramPlan PlanProgram(const image::Image& image, const FlashGeometry& flash,
-                        const EraseChoice& erase) {
+ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
+                        const FlashGeometry& flash, const EraseChoice& erase) {
+    const image::Image changed = Without(image, unchanged);
     ProgramPlan plan;
-    plan.erased = ErasedRuns(image, flash, erase);
-    plan.sections = Join(image, plan.erased);
+    plan.erased = ErasedRuns(changed, flash, erase);
+    plan.erasesWhole = ErasesWhole(plan.erased, flash, erase);
+    plan.sections = Join(changed, plan.erased);
+    plan.unchanged = unchanged;
     plan.imageBytes = image.ByteCount();
+    plan.unchangedBytes = plan.imageBytes - changed.ByteCount();
     for (const image::Section& section : plan.sections)
         plan.transferBytes += WidenedBytes(section);
     for (const AddressRange& run : plan.erased)
         plan.erasedBytes += run.Size();
     plan.clearedBytes = plan.erasedBytes;
-    for (const image::Section& section : image.Sections())
+    for (const image::Section& section : changed.Sections())
         plan.clearedBytes -= ErasedBytes({section.address, section.Last()}, plan.erased);
     plan.sectorCount = plan.erasedBytes / flash.sectorBytes;
     return plan;
@@ -119,13 +117,17 @@ ProgramPlan PlanProgram(const image::Image& image, const FlashGeometry& flash,
 std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& flash) {
     std::vector<std::string> lines;
     for (const AddressRange& run : plan.erased)
-        lines.push_back(fmt::format("erase    {:<23} {}", RangeText(run),
-                                    CountText(run.Size() / flash.sectorBytes, "sector")));
+        lines.push_back(fmt::format("erase    {:<23} {}{}", RangeText(run),
+                                    CountText(run.Size() / flash.sectorBytes, "sector"),
+                                    plan.erasesWhole ? ", all at once" : ""));
     if (plan.erased.empty()) lines.emplace_back("erase    nothing");
     for (const image::Section& section : plan.sections)
         lines.push_back(fmt::format("program  {:<23} {}",
                                     RangeText({section.address, section.Last()}),
                                     SizeText(section.bytes.size())));
+    for (const AddressRange& run : plan.unchanged.Ranges())
+        lines.push_back(fmt::format("leave    {:<23} {} with the image in place", RangeText(run),
+                                    CountText(run.Size() / flash.sectorBytes, "sector")));
     lines.push_back(
         fmt::format("{} of the image; {} more are cleared with its sectors; {} of "
                     "flash are not erased",

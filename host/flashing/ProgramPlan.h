@@ -8,16 +8,12 @@
 #include <string>
 #include <vector>
 
-#include "host/base/Text.h"
+#include "host/base/AddressSet.h"
+#include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
 #include "host/settings/SettingStore.h"
 
 namespace host {
-
-struct FlashGeometry {
-    std::uint64_t flashBytes = 0;
-    std::uint32_t sectorBytes = 0;
-};
 
 /// What a load erases, as the settings say it.
 struct EraseChoice {
@@ -38,18 +34,21 @@ struct ProgramPlan {
     /// Bytes that are erased and don't belong to the image: they lose what they hold.
     std::uint64_t clearedBytes = 0;
 
+    bool erasesWhole = false;          ///< by one command for all of the flash
+    AddressSet unchanged;              ///< sectors of the image that are left alone
+    std::uint64_t unchangedBytes = 0;  ///< of the image, in these sectors
+
     bool operator==(const ProgramPlan&) const = default;
 };
 
 /// The erase step of a load, from the settings as they are.
 EraseChoice ChosenErase(const SettingStore& settings);
 
-/// The whole sectors that hold a byte of the range.
-AddressRange SectorsCovering(const AddressRange& range, std::uint32_t sectorBytes);
-
-/// The image must lie in flash. Sections whose gap is short and erased anyway are joined.
-ProgramPlan PlanProgram(const image::Image& image, const FlashGeometry& flash,
-                        const EraseChoice& erase);
+/// The image must lie in flash. The sectors in `unchanged` hold what they should. Sections whose
+/// gap is short and erased anyway are joined. Where the necessary sectors are all of the flash, it
+/// is erased whole.
+ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
+                        const FlashGeometry& flash, const EraseChoice& erase);
 
 /// The lines that --dry-run shows.
 std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& flash);

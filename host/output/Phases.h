@@ -8,7 +8,7 @@
 
 namespace host {
 
-enum class Phase { Erase, BlankCheck, Program, Checksum, Read, Verify };
+enum class Phase { Look, Erase, BlankCheck, Program, Checksum, Read, Verify };
 
 struct PhaseName {
     const char* id;       ///< in JSON lines
@@ -16,7 +16,8 @@ struct PhaseName {
     const char* done;     ///< in a summary
 };
 
-inline constexpr std::array<PhaseName, 6> kPhaseNames{{
+inline constexpr std::array<PhaseName, 7> kPhaseNames{{
+    {"look", "Looking", "Looked at"},
     {"erase", "Erasing", "Erased"},
     {"blank-check", "Blank check", "Blank-checked"},
     {"program", "Programming", "Written"},

@@ -1,5 +1,6 @@
-// The contents: a header, the device's definition as option text, the user registers, the flash
-// pages that aren't erased, and a checksum over all of it. Numbers are little-endian.
+// The contents: a header, the device's definition as option text, the user registers, how often the
+// pages were erased, the flash pages that aren't erased, and a checksum over all of it. Numbers are
+// little-endian. Version 1 had no erase counts; it is still read.
 
 #include "target/simulated/Contents.h"
 
@@ -20,7 +21,8 @@ namespace {
 using Bytes = std::span<const std::uint8_t>;
 
 constexpr std::array<std::uint8_t, 8> kMagic = {'C', 'O', 'R', 'V', 'S', 'I', 'M', '\n'};
-constexpr std::uint32_t kVersion = 1;
+constexpr std::uint32_t kVersion = 2;
+constexpr std::uint32_t kVersionWithoutCounts = 1;
 
 Bytes BytesOf(const std::string& text) {
     return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
@@ -34,6 +36,22 @@ void AppendWord(std::string& text, std::uint32_t value) {
     std::array<std::uint8_t, 4> bytes{};
     StoreWord(bytes.data(), value);
     text.append(bytes.begin(), bytes.end());
+}
+
+/// Runs of pages that were erased equally often: how many runs, then first page, length and count.
+void AppendEraseCounts(std::string& text, const FlashArray& flash) {
+    std::string runs;
+    for (std::size_t first = 0, next = 0; first < flash.PageCount(); first = next) {
+        const std::uint32_t count = flash.EraseCount(first);
+        while (next < flash.PageCount() && flash.EraseCount(next) == count)
+            ++next;
+        if (count == 0) continue;
+        AppendWord(runs, static_cast<std::uint32_t>(first));
+        AppendWord(runs, static_cast<std::uint32_t>(next - first));
+        AppendWord(runs, count);
+    }
+    AppendWord(text, static_cast<std::uint32_t>(runs.size() / 12));
+    text += runs;
 }
 
 void AppendPages(std::string& text, const FlashArray& flash) {
@@ -62,7 +80,10 @@ class Decoder {
     }
     std::uint32_t TakeWord() { return LoadWord(Take(4).data()); }
 
+    void FillEraseCounts(FlashArray& flash);
+
     Bytes rest_;
+    std::uint32_t version_ = 0;
 };
 
 void Decoder::CheckFrame() {
@@ -71,10 +92,10 @@ void Decoder::CheckFrame() {
         throw ContentsError("it holds no simulated device");
     }
     Take(kMagic.size());
-    const std::uint32_t version = TakeWord();
-    if (version != kVersion) {
-        throw ContentsError(
-            fmt::format("it has version {}, and this program reads version {}", version, kVersion));
+    version_ = TakeWord();
+    if (version_ != kVersion && version_ != kVersionWithoutCounts) {
+        throw ContentsError(fmt::format("it has version {}, and this program reads version {}",
+                                        version_, kVersion));
     }
     if (rest_.size() < 4) throw ContentsError("it ends too early");
     const std::size_t checkedSize = whole.size() - 4;
@@ -99,11 +120,23 @@ void Decoder::Fill(SimulatedDevice& device) {
     const std::uint32_t register0 = TakeWord();
     const std::uint32_t register1 = TakeWord();
     device.PresetCommittedUserRegisters({register0, register1});
+    if (version_ != kVersionWithoutCounts) FillEraseCounts(device.Flash());
     while (!rest_.empty()) {
         const std::uint32_t index = TakeWord();
         const auto page = Take(FlashArray::kPageSizeBytes);
         if (index >= device.Flash().PageCount()) throw ContentsError("it has too much flash");
         device.Flash().Preset(index * FlashArray::kPageSizeBytes, page);
+    }
+}
+
+void Decoder::FillEraseCounts(FlashArray& flash) {
+    for (std::uint32_t runs = TakeWord(); runs > 0; --runs) {
+        const std::uint64_t first = TakeWord();
+        const std::uint64_t length = TakeWord();
+        const std::uint32_t count = TakeWord();
+        if (first + length > flash.PageCount()) throw ContentsError("it has too much flash");
+        for (std::uint64_t page = first; page < first + length; ++page)
+            flash.PresetEraseCount(page, count);
     }
 }
 
@@ -127,6 +160,7 @@ std::string EncodeContents(const SimulatedDevice& device) {
     contents += definition;
     for (const std::uint32_t value : device.CommittedUserRegisters())
         AppendWord(contents, value);
+    AppendEraseCounts(contents, device.Flash());
     AppendPages(contents, device.Flash());
     AppendWord(contents, Checksum(BytesOf(contents)));
     return contents;

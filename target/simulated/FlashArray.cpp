@@ -29,7 +29,10 @@ void ForEachPart(std::uint32_t address, std::span<Byte> bytes, Visit&& visit) {
 }  // namespace
 
 FlashArray::FlashArray(std::uint32_t sizeBytes, std::optional<StuckCell> stuckCell)
-    : sizeBytes_(sizeBytes), stuckCell_(stuckCell), pages_(sizeBytes / kPageSizeBytes) {}
+    : sizeBytes_(sizeBytes),
+      stuckCell_(stuckCell),
+      pages_(sizeBytes / kPageSizeBytes),
+      eraseCounts_(pages_.size()) {}
 
 bool FlashArray::Contains(std::uint64_t address, std::uint64_t sizeBytes) const {
     return address <= sizeBytes_ && sizeBytes <= sizeBytes_ - address;
@@ -66,8 +69,11 @@ std::optional<std::uint32_t> FlashArray::Program(std::uint32_t address,
 }
 
 void FlashArray::Erase(std::uint32_t address, std::uint32_t sizeBytes) {
-    const auto first = pages_.begin() + address / kPageSizeBytes;
-    std::for_each(first, first + sizeBytes / kPageSizeBytes, [](auto& page) { page.reset(); });
+    const std::size_t first = address / kPageSizeBytes;
+    for (std::size_t page = first; page < first + sizeBytes / kPageSizeBytes; ++page) {
+        pages_[page].reset();
+        ++eraseCounts_[page];
+    }
 }
 
 void FlashArray::Preset(std::uint32_t address, std::span<const std::uint8_t> bytes) {

@@ -39,6 +39,10 @@ class FlashArray {
     /// Sets all bits of the pages from `address` on; both numbers are multiples of the page size.
     void Erase(std::uint32_t address, std::uint32_t sizeBytes);
 
+    /// How often a page was erased.
+    std::uint32_t EraseCount(std::size_t index) const { return eraseCounts_[index]; }
+    void PresetEraseCount(std::size_t index, std::uint32_t count) { eraseCounts_[index] = count; }
+
     /// Puts the bytes there, whatever the cells held before.
     void Preset(std::uint32_t address, std::span<const std::uint8_t> bytes);
 
@@ -51,6 +55,7 @@ class FlashArray {
     const std::uint32_t sizeBytes_;
     const std::optional<StuckCell> stuckCell_;
     std::vector<std::unique_ptr<Page>> pages_;
+    std::vector<std::uint32_t> eraseCounts_;  ///< of each page
 };
 
 }  // namespace target

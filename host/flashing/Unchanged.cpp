@@ -1,0 +1,162 @@
+// Looking at flash before a load, and deciding what is left alone.
+
+#include "host/flashing/Unchanged.h"
+
+#include <algorithm>
+#include <span>
+
+#include "host/base/PluginFacts.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/Sectors.h"
+
+namespace host {
+
+namespace {
+
+/// So much is read before it is compared; an image can be as large as the flash.
+constexpr std::uint64_t kPieceBytes = std::uint64_t{1} << 20;
+
+constexpr std::uint64_t kSamplesMin = 2;
+constexpr std::uint64_t kSamplesMax = 8;
+
+// What the plug-in's fixed pauses cost for another section and for a sector, and a chunk on a flash
+// of ordinary speed; script/bench shows them.
+constexpr std::uint64_t kLoaderStartMs = 110;
+constexpr std::uint64_t kSectorMs = 20;
+constexpr std::uint64_t kChunkMs = 10;
+
+AddressRange BlockOf(std::uint32_t address) {
+    return {address - address % plugin::kBlockBytes, address | (plugin::kBlockBytes - 1)};
+}
+
+/// The sector with that number, counted over the ranges of whole sectors.
+AddressRange Sector(const AddressSet& sectors, std::uint64_t number, std::uint32_t sectorBytes) {
+    for (const AddressRange& run : sectors.Ranges()) {
+        const std::uint64_t count = run.Size() / sectorBytes;
+        if (number >= count) {
+            number -= count;
+            continue;
+        }
+        const auto first = static_cast<std::uint32_t>(run.first + number * sectorBytes);
+        return {first, first + (sectorBytes - 1)};
+    }
+    return {};
+}
+
+/// Adds the sectors of a piece of flash that hold what they should. The last one may be cut short
+/// by the end of the flash.
+void AddEqualSectors(AddressSet& unchanged, std::uint32_t address,
+                     std::span<const std::uint8_t> actual, std::span<const std::uint8_t> expected,
+                     std::uint32_t sectorBytes) {
+    while (!actual.empty()) {
+        const std::size_t size = std::min<std::size_t>(sectorBytes, actual.size());
+        if (std::ranges::equal(actual.first(size), expected.first(size)))
+            unchanged.Add({address, address + (sectorBytes - 1)});
+        actual = actual.subspan(size);
+        expected = expected.subspan(size);
+        address += sectorBytes;
+    }
+}
+
+bool HoldsASample(FlashDevice& device, const image::Image& image) {
+    const auto holds = [&](const AddressRange& block) {
+        return device.ReadFlash(block) == ContentsAfterLoad(image, block);
+    };
+    return std::ranges::any_of(SampleBlocks(image, device.Info().sectorBytes), holds);
+}
+
+}  // namespace
+
+std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const AddressRange& range) {
+    std::vector<std::uint8_t> contents(range.Size(), 0xFF);
+    const auto& sections = image.Sections();
+    auto section = std::ranges::partition_point(
+        sections, [&](const image::Section& other) { return other.Last() < range.first; });
+    for (; section != sections.end() && section->address <= range.last; ++section) {
+        const std::uint32_t first = std::max(section->address, range.first);
+        const std::uint32_t last = std::min(section->Last(), range.last);
+        std::copy_n(section->bytes.begin() + (first - section->address),
+                    std::size_t{last} - first + 1, contents.begin() + (first - range.first));
+    }
+    return contents;
+}
+
+std::vector<AddressRange> SampleBlocks(const image::Image& image, std::uint32_t sectorBytes) {
+    const AddressSet sectors = SectorsOf(image, sectorBytes);
+    const std::uint64_t count = sectors.Bytes() / sectorBytes;
+    const std::uint64_t samples = std::min(count, std::clamp(count / 4, kSamplesMin, kSamplesMax));
+    std::vector<AddressRange> blocks;
+    for (std::uint64_t i = 0; i < samples; ++i) {
+        const std::uint64_t number = samples == 1 ? 0 : i * (count - 1) / (samples - 1);
+        const AddressRange sector = Sector(sectors, number, sectorBytes);
+        const auto contents = ContentsAfterLoad(image, sector);
+        const auto found = std::ranges::find_if(contents, [](auto byte) { return byte != 0xFF; });
+        if (found != contents.end())
+            blocks.push_back(
+                BlockOf(sector.first + static_cast<std::uint32_t>(found - contents.begin())));
+    }
+    if (blocks.empty() && !image.Empty()) blocks.push_back(BlockOf(image.Sections()[0].address));
+    return blocks;
+}
+
+AddressSet WorthLeaving(const AddressSet& unchanged, const AddressSet& sectors,
+                        std::uint32_t sectorBytes) {
+    AddressSet worth;
+    for (const AddressRange& run : unchanged.Ranges()) {
+        const std::uint64_t neighbours =
+            (run.first == 0 ? 0 : sectors.BytesIn({run.first - 1, run.first - 1})) +
+            sectors.BytesIn({run.last + 1, run.last + 1});
+        const std::uint64_t alongMs =
+            run.Size() / sectorBytes * kSectorMs + run.Size() * kChunkMs / plugin::kChunkBytes;
+        if (neighbours < 2 || alongMs >= kLoaderStartMs) worth.Add(run);
+    }
+    return worth;
+}
+
+image::Image Without(const image::Image& image, const AddressSet& addresses) {
+    image::Image rest;
+    const auto add = [&](const image::Section& section, std::uint64_t first, std::uint64_t end) {
+        if (first >= end) return;
+        const auto from =
+            section.bytes.begin() + static_cast<std::ptrdiff_t>(first - section.address);
+        rest.Add(static_cast<std::uint32_t>(first),
+                 {from, from + static_cast<std::ptrdiff_t>(end - first)}, "the image");
+    };
+    const auto& ranges = addresses.Ranges();
+    for (const image::Section& section : image.Sections()) {
+        std::uint64_t next = section.address;
+        auto range = std::ranges::partition_point(
+            ranges, [&](const AddressRange& other) { return other.last < section.address; });
+        for (; range != ranges.end() && range->first < section.End(); ++range) {
+            add(section, next, range->first);
+            next = std::uint64_t{range->last} + 1;
+        }
+        add(section, next, section.End());
+    }
+    return rest;
+}
+
+AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
+    const std::uint32_t sectorBytes = device.Info().sectorBytes;
+    const AddressSet sectors = SectorsOf(image, sectorBytes);
+    device.Halt();
+    if (!HoldsASample(device, image)) return {};
+    AddressSet unchanged;
+    WorkMeter& meter = device.Meter();
+    meter.Expect(Phase::Look, sectors.Bytes());
+    meter.Begin(Phase::Look);
+    const std::uint64_t step = std::max<std::uint64_t>(kPieceBytes / sectorBytes, 1) * sectorBytes;
+    for (const AddressRange& run : sectors.Ranges()) {
+        const std::uint64_t end = std::min(std::uint64_t{run.last} + 1, device.Info().flashBytes);
+        for (std::uint64_t first = run.first; first < end; first += step) {
+            const AddressRange piece{static_cast<std::uint32_t>(first),
+                                     static_cast<std::uint32_t>(std::min(first + step, end) - 1)};
+            AddEqualSectors(unchanged, piece.first, device.ReadFlash(piece),
+                            ContentsAfterLoad(image, piece), sectorBytes);
+        }
+    }
+    meter.End();
+    return WorthLeaving(unchanged, sectors, sectorBytes);
+}
+
+}  // namespace host
