@@ -34,19 +34,26 @@ class MinimalHost final : public IFlashHost {
     }
 
     // A real host loads directory + fileName into the target here, and starts it in RunTarget.
-    const char* LoadProgram(const char*, const char*, const char*) override { return nullptr; }
+    const char* LoadProgram(const char*, const char*, const char*) override {
+        return AwaitLoader();
+    }
     const char* RunTarget() override {
         device_.Run();
+        loaderRuns_ = true;
         return nullptr;
     }
     const char* HaltTarget() override {
+        const char* error = AwaitLoader();
         device_.Halt();
-        return nullptr;
+        loaderRuns_ = false;
+        return error;
     }
     const char* ResetTarget(bool) override { return HaltTarget(); }
 
     const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t,
                            size_t width) override {
+        if (address < 0x20000000)
+            if (const char* error = AwaitLoader()) return error;  // flash is busy till then
         const bool done = device_.Read(buffer, static_cast<uint32_t>(address), count * width);
         return done ? nullptr : "can't read target memory: nothing at that address";
     }
@@ -87,6 +94,22 @@ class MinimalHost final : public IFlashHost {
     const std::string& Setting(const std::string& name) const { return settings_.at(name); }
 
   private:
+    // The plug-in doesn't wait for the last chunk, and a halt would lose it. So wait until no
+    // status word says "to do", but only if a loader was started: the words are arbitrary before.
+    const char* AwaitLoader() {
+        using Clock = std::chrono::steady_clock;
+        const auto until =
+            Clock::now() + std::chrono::seconds(std::stoi(settings_["FlashTimeoutValue"]));
+        for (const uint32_t statusWord : {0x2000100C, 0x2000101C})
+            for (uint32_t status = 0; loaderRuns_; Sleep(5)) {
+                if (!device_.Read(&status, statusWord, sizeof status))
+                    return "can't read a status word";
+                if (status != 0xFFFFFFFF) break;
+                if (Clock::now() > until) return "the loader doesn't finish its last chunk";
+            }
+        return nullptr;
+    }
+
     static const char* Print(const char* kind, const char* text) {
         std::printf("%s: %s\n", kind, text);
         return nullptr;
@@ -94,6 +117,7 @@ class MinimalHost final : public IFlashHost {
 
     PretendDevice device_;
     bool failed_ = false;
+    bool loaderRuns_ = false;
     // The plug-in has no defaults: what it reads and the host doesn't know is a failure.
     std::map<std::string, std::string> settings_ = {
         {"FlashProgramOption", "Necessary Pages Only"},
