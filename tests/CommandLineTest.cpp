@@ -415,9 +415,27 @@ const Row kStories[] = {
      4, "3\n", "another run has been using the contents file of the simulated device d for 10 s"},
     {"tool info > /dev/full", 3, "", "can't write to standard output: No space left on device"},
     {"tool settings | head -1", 0, "FlashProgramOption", ""},
+    // A map: what is there, what an image would change; and what is kept.
+    {"export CORVANE_SIM_FILE=d; tool -q program small.hex --sim mesk,flash=16K; tool -q map\n"
+     "tool -q program data.bin --base 200 --dry-run | tail -6\n"
+     "tool -q program data.bin --base 200 --keep; tool -q verify small.hex; tool -q map",
+     0,
+     "0x0000  #...............\nA character is a sector of 1 KiB\n  . blank                  15 "
+     "KiB\n"
+     "  # in use                 1 KiB\n"
+     "0x0000  x...............\nA character is a sector of 1 KiB\n  . blank                  15.2 "
+     "KiB\n"
+     "  + to be programmed       300 bytes\n  x cleared along with it  512 bytes\n"
+     "Dry run: nothing was touched\nThe flash holds the image\n0x0000  #....",
+     ""},
+    {"tool --json map small.hex | tail -1", 0,
+     "\"runs\":[{\"address\":0,\"bytes\":16,\"state\":\"blank\"},{\"address\":16,\"bytes\":4,"
+     "\"state\":\"program\"},{\"address\":20,\"bytes\":262124,\"state\":\"blank\"}]",
+     nullptr},
+    {"tool program small.hex --keep --erase all", 2, "", "--keep goes with --erase necessary"},
     {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL
      " --json -q program $ELF --sim tolva,loader=hangs | sed -n '$p'",
-     0, "\"clearedBytes\":480,\"flashChanged\":true,\"phases\":{\"erase\"", nullptr},
+     0, "\"clearedBytes\":480,\"keptBytes\":0,\"flashChanged\":true,\"phases\":{\"erase\"", nullptr},
     // What the shells make of it: bash has taken the word apart, zsh would show what is added.
     {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
      ":$PATH bash -c '. "

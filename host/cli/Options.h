@@ -45,6 +45,7 @@ struct Options {
     bool crc = false;
     bool dryRun = false;
     bool force = false;
+    bool keep = false;
     bool noVerify = false;
     bool rewrite = false;
     bool run = false;

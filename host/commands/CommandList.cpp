@@ -7,9 +7,10 @@ namespace host {
 const CommandRows& AllCommands() {
     using namespace commands;
     static const CommandRows table{
-        Info(),     Program(),      Verify(),          Read(),       Erase(),      BlankCheck(),
-        Checksum(), RegisterRead(), RegisterProgram(), MacRead(),    MacProgram(), Operation(),
-        Reset(),    Serve(),        Settings(),        Completion(), Help(),
+        Info(),     Program(),    Verify(),    Map(),          Read(),
+        Erase(),    BlankCheck(), Checksum(),  RegisterRead(), RegisterProgram(),
+        MacRead(),  MacProgram(), Operation(), Reset(),        Serve(),
+        Settings(), Completion(), Help(),
     };
     return table;
 }

@@ -5,6 +5,7 @@
 
 #include "host/cli/CommandTable.h"
 #include "host/commands/Context.h"
+#include "host/flashing/ProgramPlan.h"
 
 namespace host {
 
@@ -17,6 +18,7 @@ namespace host::commands {
 CommandRow Info();
 CommandRow Program();
 CommandRow Verify();
+CommandRow Map();
 CommandRow Read();
 CommandRow Erase();
 CommandRow BlankCheck();
@@ -31,6 +33,10 @@ CommandRow Serve();
 CommandRow Settings();
 CommandRow Completion();
 CommandRow Help();
+
+/// Reads all of the flash and draws it, with what a plan would do to it. Returns the runs.
+Json ShowMap(Context& context, FlashDevice& device, const image::Image& image,
+             const ProgramPlan& plan);
 
 // Options that several commands share.
 OptionRow RangeOption(const char* help);

@@ -11,9 +11,10 @@
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/Comparison.h"
+#include "host/flashing/DevicePlan.h"
 #include "host/flashing/ImageSet.h"
+#include "host/flashing/KeptBytes.h"
 #include "host/flashing/ProgramPlan.h"
-#include "host/flashing/Unchanged.h"
 #include "host/output/Summary.h"
 #include "host/settings/RangeSettings.h"
 
@@ -152,35 +153,51 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages
     return outcome;
 }
 
-/// What a load of the necessary sectors needs not touch.
-AddressSet LeftAlone(Context& context, FlashDevice& device, const image::Image& image,
-                     const EraseChoice& erase) {
-    if (erase.kind != EraseChoice::Kind::Necessary || context.options.rewrite) return {};
-    return FindUnchanged(device, image);
+/// --keep: adds to the image what else its sectors hold. Returns how many bytes that is.
+std::uint64_t KeepOthers(FlashDevice& device, LoadedImages& images, const EraseChoice& erase) {
+    if (erase.kind == EraseChoice::Kind::Nothing) return 0;
+    if (erase.kind != EraseChoice::Kind::Necessary)
+        throw Failure(
+            ExitStatus::WrongUsage,
+            "--keep goes with --erase necessary: what all or a range is to erase can't be kept");
+    const image::Image kept = KeptBytes(images.image, ReadSectors(device, images.image));
+    images.Add(kept, "what the flash held");
+    return kept.ByteCount();
 }
 
-Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
-    RequireFit(device, images);
-    ApplyOptions(context, device);
-    const DeviceInfo& info = device.Info();
-    const FlashGeometry flash{info.flashBytes, info.sectorBytes,
-                              plugin::ErasesWhole(info.family, info.flashBytes)};
-    const EraseChoice erase = ChosenErase(context.settings);
-    const ProgramPlan plan =
-        PlanProgram(images.image, LeftAlone(context, device, images.image, erase), flash, erase);
-    context.reporter.Say(Talk::Normal,
-                         fmt::format("{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
-                                     CountText(plan.sections.size(), "section"), info.family,
-                                     SizeText(info.flashBytes)));
+void ShowPlan(Context& context, const ProgramPlan& plan, const FlashGeometry& flash) {
     for (const std::string& line : Describe(plan, flash)) {
         if (context.options.dryRun)
             context.reporter.Result(line);
         else
             context.reporter.Say(Talk::Verbose, line);
     }
-    if (context.options.dryRun) return NothingTouched(context, PlanJson(plan));
-    device.Know(PlanJson(plan));
-    return LoadAndCompare(context, device, images, plan);
+}
+
+Outcome RunOn(Context& context, FlashDevice& device, LoadedImages images) {
+    RequireFit(device, images);
+    ApplyOptions(context, device);
+    const DeviceInfo& info = device.Info();
+    const EraseChoice erase = ChosenErase(context.settings);
+    const std::uint64_t kept = context.options.keep ? KeepOthers(device, images, erase) : 0;
+    const ProgramPlan plan = PlanOnDevice(device, images.image, erase, context.options.rewrite);
+    const std::string keeping =
+        kept == 0 ? "" : fmt::format(", {} of it kept from the flash", SizeText(kept));
+    context.reporter.Say(
+        Talk::Normal, fmt::format("{} in {}{} for {}, {} of flash", SizeText(plan.imageBytes),
+                                  CountText(plan.sections.size(), "section"), keeping, info.family,
+                                  SizeText(info.flashBytes)));
+    ShowPlan(context, plan, GeometryOf(device));
+    Json planned = PlanJson(plan);
+    planned["keptBytes"] = kept;
+    if (context.options.dryRun) {
+        planned["runs"] = ShowMap(context, device, images.image, plan);
+        return NothingTouched(context, planned);
+    }
+    device.Know(planned);
+    Outcome outcome = LoadAndCompare(context, device, images, plan);
+    outcome.result["keptBytes"] = kept;
+    return outcome;
 }
 
 void CheckEraseOption(const Options& options) {
@@ -194,8 +211,9 @@ void CheckEraseOption(const Options& options) {
 
 Outcome Run(Context& context) {
     CheckEraseOption(context.options);
-    const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
-    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
+    LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
+    return WithDevice(
+        context, [&](FlashDevice& device) { return RunOn(context, device, std::move(images)); });
 }
 
 }  // namespace
@@ -204,8 +222,9 @@ CommandRow Program() {
     return {"program",
             "Program image files into flash and compare the result",
             "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors that the "
-            "image touches are erased whole, so what else they hold is lost; those that hold it "
-            "already are left alone.",
+            "image touches are erased whole, so what else they hold is lost, unless --keep keeps "
+            "it (not when the load fails: 'read' makes a copy). Sectors that hold the image's "
+            "bytes already are left alone.",
             "  corvane-flash program firmware.elf\n"
             "  corvane-flash program boot.hex app.srec --crc\n"
             "  corvane-flash program data.bin --base 0x8000 --erase none",
@@ -218,6 +237,9 @@ CommandRow Program() {
               &Options::erase,
               Offers::SomeChoices,
               {"necessary", "none", "all"}},
+             {"--keep", "",
+              "Read what else the image's sectors hold, and program it back with the image",
+              &Options::keep},
              {"--blank-check", "", "Check that the flash is blank before programming it",
               &Options::blankCheck},
              {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},

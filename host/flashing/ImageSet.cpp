@@ -11,6 +11,12 @@
 
 namespace host {
 
+void LoadedImages::Add(const image::Image& added, const std::string& file) {
+    for (const image::Section& section : added.Sections())
+        origins.push_back({file, {section.address, section.Last()}});
+    image.Add(added, file);
+}
+
 std::string LoadedImages::FileOf(std::uint32_t address) const {
     for (const auto& [file, range] : origins)
         if (range.first <= address && address <= range.last) return file;
@@ -25,12 +31,8 @@ std::string LoadedImages::Name() const {
 
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
     LoadedImages images;
-    for (const std::string& path : paths) {
-        const image::Image image = image::ReadImageFile(path, options);
-        for (const image::Section& section : image.Sections())
-            images.origins.push_back({path, {section.address, section.Last()}});
-        images.image.Add(image, path);
-    }
+    for (const std::string& path : paths)
+        images.Add(image::ReadImageFile(path, options), path);
     return images;
 }
 

@@ -22,6 +22,9 @@ struct LoadedImages {
     };
     std::vector<Origin> origins;
 
+    /// Adds an image, which `file` names in what is said of it.
+    void Add(const image::Image& added, const std::string& file);
+
     /// The file that a byte of the image stems from.
     std::string FileOf(std::uint32_t address) const;
 

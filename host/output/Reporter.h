@@ -9,6 +9,7 @@
 
 #include "host/base/Errors.h"
 #include "host/base/Json.h"
+#include "host/base/Terminal.h"
 #include "host/output/Progress.h"
 
 namespace host {
@@ -65,6 +66,9 @@ class Reporter {
 
     /// The error number of what couldn't be written to standard output, or 0.
     int OutputError() const { return outputError_; }
+
+    /// How wide the terminal is that shows results.
+    std::size_t Columns() const { return TerminalColumns(out_); }
 
     bool Hears(Talk level) const { return options_.talk >= level; }
 
