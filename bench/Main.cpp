@@ -40,6 +40,8 @@ struct NamedTable {
 
 constexpr NamedTable kTables[] = {{"counts", bench::CountsTable},
                                   {"model", bench::ModelledTimeTable},
+                                  {"tool", bench::ToolTable},
+                                  {"starts", bench::StartsTable},
                                   {"own", bench::OwnWorkTable},
                                   {"growth", bench::GrowthTable},
                                   {"throughput", bench::ThroughputTable}};

@@ -12,6 +12,13 @@ Table CountsTable();
 /// A program load on one virtual clock, by link and by the loader's speed.
 Table ModelledTimeTable();
 
+/// A program load under a host that waits for the loader, and under one that doesn't, beside what
+/// link and flash need.
+Table ToolTable();
+
+/// What another section costs beside another sector.
+Table StartsTable();
+
 /// The plug-in's processor time beside that of its host calls alone.
 Table OwnWorkTable();
 
