@@ -35,7 +35,7 @@ struct ProgramPlan {
     std::uint64_t clearedBytes = 0;
 
     bool erasesWhole = false;          ///< by one command for all of the flash
-    AddressSet unchanged;              ///< sectors of the image that are left alone
+    AddressSet unchanged = {};         ///< sectors of the image that are left alone
     std::uint64_t unchangedBytes = 0;  ///< of the image, in these sectors
 
     bool operator==(const ProgramPlan&) const = default;
