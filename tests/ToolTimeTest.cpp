@@ -16,8 +16,8 @@ TEST(ToolTime, IsNearTheLimitOnEveryLink) {
                                        time.waiting.count(), time.limit.count(), time.looks);
         EXPECT_EQ(time.chunks, 512U) << where;
         EXPECT_LE(time.Ratio(), 1.05) << where;
-        EXPECT_GE(time.Ratio(), 1) << where;
-        EXPECT_LE(time.looks, 4 * time.chunks) << where;
+        EXPECT_GE(time.Ratio(), 0.99) << where;  // the last chunk overlaps with a pause
+        EXPECT_LE(static_cast<double>(time.looks), 3.5 * static_cast<double>(time.chunks)) << where;
         EXPECT_LE(time.samples, 0.05 * time.waiting) << where;
     }
 }
