@@ -70,6 +70,7 @@ TEST(Identification, OfEveryClass) {
         {"mesk,id=0x0F0301FF,flash=96K,ram=64K", "Mesk Rev.B", "96KB", "64KB", "1KB"},
         {"tolva,revision=A,flash=256K,ram=64K", "Tolva Rev.A", "256KB", "64KB", "1KB"},
         {"tolva,revision=B,flash=256K,ram=64K", "Tolva Rev.B", "256KB", "64KB", "1KB"},
+        {"tolva,id=0x00018000,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},
         {"tolva,id=0x00010200,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},
         {"mesk,revision=A,flash=2K,ram=64K", "Mesk Rev.A", "2KB", "64KB", "1KB"},
         {"mesk,revision=B,flash=256K,ram=64K", "Mesk Rev.B", "256KB", "64KB", "1KB"},
@@ -115,6 +116,7 @@ TEST(Addresses, AreComparedStrictlyInThirtyTwoBits) {
     EXPECT_EQ(within(0x3F000, 0x1000), "no");
     EXPECT_EQ(within(0x1000, -0x1000), "yes");
     EXPECT_EQ(within(0x1000, -0x1001), "no");
+    EXPECT_EQ(within(0x40000, -1), "no");
     EXPECT_EQ(within(0x1000, INT32_MIN), "no");
     EXPECT_EQ(within(~0ull, 0), tooBig);
 
