@@ -5,6 +5,7 @@
 #include <sys/mman.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdio>
 #include <locale>
@@ -255,6 +256,12 @@ TEST(Extremes, ErasingTheLargestFlashTakesTimeInProportion) {
     EXPECT_EQ(plugin->WriteDataToFlash(static_cast<const unsigned char*>(nullptr), 0, 0, 1),
               nullptr);
     EXPECT_LT(host.calls - first, 100u);
+
+    // Above 40 MiB the percentage wraps: of 128 MiB, nothing above 31 is ever reported.
+    host.transcribe = true;
+    EXPECT_EQ(plugin->PerformOperation("BlankCheck"), nullptr);
+    EXPECT_GT(std::ranges::count(host.transcript, "update 31 \"Checking...\""), 0);
+    EXPECT_EQ(std::ranges::count(host.transcript, "update 32 \"Checking...\""), 0);
 }
 
 // Bytes are taken from the caller as they go out, and none from outside the section: the page

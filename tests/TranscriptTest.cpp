@@ -122,7 +122,8 @@ const Scenario Scenarios[] = {
      {{"FlashEraseType", "Entire Flash"}, {"FlashResetSetting", "0"}},
      [](RecordingHost& host, Plugin&) {
          OnDevices(host,
-                   {"mesk,flash=64K", "mesk,flash=128K", "ravik,flash=128K", "orrin,id=0x10040102",
+                   {"mesk,flash=64K", "mesk,flash=128K", "ravik,flash=128K", "ravik,id=0x00020000",
+                    "tolva,id=0x00010200", "orrin,id=0x10040102", "pell,keyconfig=0xFFFFFFEF",
                     "quen,keyconfig=0", "dorna,keyconfig=0xFFFFFFFF"},
                    [](RecordingHost& other, Plugin& plugin) { Perform(other, plugin, "Erase"); });
      }},
@@ -149,6 +150,8 @@ const Scenario Scenarios[] = {
          Reset<0>(host, plugin);
          Load(host, plugin, 0x1004, 8);
          Load(host, plugin, 0x13FE, 5000);
+         Load(host, plugin, 0xBFE, 8);
+         Load(host, plugin, 0x1900, 8);  // erased already
      }},
     {"load-erase-whole-and-check",
      "mesk,flash=96K",
@@ -204,6 +207,8 @@ const Scenario Scenarios[] = {
          host.settings["FlashEraseEndAddr"] = "10000";  // the first address behind
          Perform(host, plugin, "Erase");
          host.settings["FlashEraseEndAddr"] = "7FE";  // before the start, in the same sector
+         Perform(host, plugin, "Erase");
+         host.settings["FlashEraseStartAddr"] = "10000";
          Perform(host, plugin, "Erase");
          host.settings["FlashEraseType"] = "entire flash";
          Perform(host, plugin, "Erase");
@@ -295,6 +300,8 @@ const Scenario Scenarios[] = {
          Reset<4>(host, plugin);
          host.settings["FlashResetSetting"] = "true";
          Reset<0>(host, plugin);
+         host.settings["FlashResetSetting"] = "0";
+         OnDevices(host, {"quen"}, Reset<1>);
      }},
     {"settings-reset-without-flash",
      "velk",
@@ -336,7 +343,12 @@ const Scenario Scenarios[] = {
     {"no-user-registers",
      "ravik",
      {},
-     [](RecordingHost& host, Plugin& plugin) { Perform(host, plugin, "ReadMACAddress"); }},
+     [](RecordingHost& host, Plugin&) {
+         OnDevices(host, {"ravik", "tolva,id=0x00010200"},
+                   [](RecordingHost& other, Plugin& plugin) {
+                       Perform(other, plugin, "ReadMACAddress");
+                   });
+     }},
     {"other-operations",
      "tolva",
      {},
