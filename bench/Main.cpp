@@ -38,13 +38,11 @@ struct NamedTable {
     bench::Table (*make)();
 };
 
-constexpr NamedTable kTables[] = {{"counts", bench::CountsTable},
-                                  {"model", bench::ModelledTimeTable},
-                                  {"tool", bench::ToolTable},
-                                  {"starts", bench::StartsTable},
-                                  {"own", bench::OwnWorkTable},
-                                  {"growth", bench::GrowthTable},
-                                  {"throughput", bench::ThroughputTable}};
+constexpr NamedTable kTables[] = {
+    {"counts", bench::CountsTable},   {"model", bench::ModelledTimeTable},
+    {"tool", bench::ToolTable},       {"starts", bench::StartsTable},
+    {"packets", bench::PacketsTable}, {"own", bench::OwnWorkTable},
+    {"growth", bench::GrowthTable},   {"throughput", bench::ThroughputTable}};
 
 }  // namespace
 

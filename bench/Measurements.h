@@ -19,6 +19,9 @@ Table ToolTable();
 /// What another section costs beside another sector.
 Table StartsTable();
 
+/// What a chunk and a look at the loader cost behind a GDB server.
+Table PacketsTable();
+
 /// The plug-in's processor time beside that of its host calls alone.
 Table OwnWorkTable();
 

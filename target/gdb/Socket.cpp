@@ -55,6 +55,7 @@ AddressList LookUp(const Address& address, int flags) {
 // beside, and is left to itself when the wait is over.
 AddressList LookUpBefore(Deadline deadline, const Address& address,
                          const InterruptCheck& interrupted) {
+    if (AddressList list = LookUp(address, AI_NUMERICHOST); list.error == 0) return list;
     std::promise<AddressList> promise;
     std::future<AddressList> list = promise.get_future();
     std::thread([address, promise = std::move(promise)]() mutable {

@@ -153,7 +153,7 @@ class Peer {
     std::thread thread_;
 };
 
-GdbOptions Quick(std::chrono::milliseconds timeout = 150ms) {
+GdbOptions Quick(std::chrono::milliseconds timeout = 500ms) {
     GdbOptions options;
     options.timeout = timeout;
     return options;
@@ -245,7 +245,7 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         {"m20000100", "$00#60", "answered \"00\" to \"m20000100,40\""},
         {"m20000100", "$0g#97", "answered \"0g\""},
         {"m20000100", "$00#61", "sent a packet with a wrong checksum"},
-        {"m20000100", "$0", "sent no reply to \"m20000100,40\" within 0.15 s"},
+        {"m20000100", "$0", "sent no reply to \"m20000100,40\" within 0.5 s"},
         {"m20000100", Peer::kClose, "is gone: it closed the connection"},
         {"X20000100,0", "$#00", "done"},
         {"X20000100,4", "$E01#a6", "Writing 64 x 1 bytes at 0x20000100"},
