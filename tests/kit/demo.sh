@@ -2,6 +2,6 @@
 # Holds the README to what script/demo prints, with the tool in the directory given.
 set -euo pipefail
 cd "$(dirname "$0")/../.."
-shown=$(sed -n '/^This is what the demo shows:/,/^## /p' README.md | sed -n '/^```$/,//{//d;p}')
+shown=$(sed -n '/^This is what the demo shows/,/^## /p' README.md | sed -n '/^```$/,//{//d;p}')
 [ -n "$shown" ] || { echo "README.md shows no demo"; exit 1; }
 diff <(echo "$shown") <(script/demo "$1") || { echo "README.md shows another demo"; exit 1; }
