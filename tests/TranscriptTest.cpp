@@ -111,10 +111,14 @@ const Scenario Scenarios[] = {
          host.settings.erase("FlashCrystalFreq");
          Load(host, plugin, 0, 0);
          host.settings["FlashResetSetting"] = "1";
+         host.settings["FlashCrystalFreq"] = "zz";
          Load(host, plugin, 0, 0);
          Reset<4>(host, plugin);
          Load(host, plugin, 0, 0);
          Reset<0>(host, plugin);
+         host.settings["FlashEraseType"] = "none";  // fails, and is tried again
+         Load(host, plugin, 0, 0);
+         host.settings["FlashEraseType"] = "Entire Flash";
          Load(host, plugin, 0, 0);
      }},
     {"erase-whole-by-class",
@@ -272,6 +276,8 @@ const Scenario Scenarios[] = {
          CheckRange(host, plugin, "CalculateChecksum", "FFF0", "10000");
          host.failNext = "read";
          CheckRange(host, plugin, "BlankCheck", "0", "0");
+         host.settings.erase("FlashBlankCheckSelection");
+         Perform(host, plugin, "BlankCheck");
      }},
     {"checksum",
      "dorna,flash=64K",
@@ -302,6 +308,8 @@ const Scenario Scenarios[] = {
          Reset<0>(host, plugin);
          host.settings["FlashResetSetting"] = "0";
          OnDevices(host, {"quen"}, Reset<1>);
+         host.settings["FlashResetSetting"] = "1";
+         OnDevices(host, {"ravik"}, Reset<0>);
      }},
     {"settings-reset-without-flash",
      "velk",
