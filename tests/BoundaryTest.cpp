@@ -82,7 +82,7 @@ TEST(Identification, OfEveryClass) {
         {"dorna,flash=1M,ram=256K,sector=128K", "Dorna", "1024KB", "256KB", "128KB"},
         // With bit 31, bits 23 to 20 do not count for the class; they do for the sizes.
         {"dorna,id=0x801A0000,flash=1M,ram=256K,sector=2K", "Dorna", "1024KB", "256KB", "2KB"},
-        {"dorna,id=0x001A0000,flash=1M,ram=256K,sector=2K", "Ravik", "1024KB", "256KB", "2KB"},
+        {"dorna,id=0x7F1AFFFF,flash=1M,ram=256K,sector=2K", "Ravik", "1024KB", "256KB", "2KB"},
     };
     for (const Identified& row : rows) {
         SCOPED_TRACE(row.device);
