@@ -129,7 +129,8 @@ static const char* FLASH_CORVANE_CALL WriteMemory(CorvaneHost* host, const void*
     return NULL;
 }
 
-/* The core. There is none here. */
+/* The core. There is none here. A real host waits for the loader's last chunk before it halts,
+ * resets or reads the target, as minimal-host does. */
 
 static const char* FLASH_CORVANE_CALL LoadProgram(CorvaneHost* host, const char* fileName,
                                                   const char* second, const char* directory) {
