@@ -140,14 +140,14 @@ const Row kDone[] = {
     {"tool register read 1", 0, "0xffffffff\n", ""},
     {"tool register program 1 12ab", 0, "User register 1: was 0xffffffff, is 0x000012ab\n",
      "gone after the next reset"},
-    {"tool mac program 0:1a:b6:1:2:3", 0,
-     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n", "gone after the next reset"},
-    {"tool --set FlashMACAddrCommit=1 mac program 0:1a:b6:1:2:3", 0, "is 00-1a-b6-01-02-03",
+    {"tool mac program 2:1b:c3:4:5:6", 0,
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 02-1b-c3-04-05-06\n", "gone after the next reset"},
+    {"tool --set FlashMACAddrCommit=1 mac program 2:1b:c3:4:5:6", 0, "is 02-1b-c3-04-05-06",
      "FlashMACAddrCommit is 1 (command line)\n"},
     {"tool operation ProgramUserRegister0 --set FlashUserRegister0Input=12", 0,
      "user register 0 holds 0x00000012 (not committed), user register 1 holds 0xffffffff\n",
      nullptr},
-    {"tool mac program 01-00-5e-00-00-01 --force", 0, "is 01-00-5e-00-00-01", nullptr},
+    {"tool mac program 03-1b-c3-04-05-06 --force", 0, "is 03-1b-c3-04-05-06", nullptr},
     {"tool operation BlankCheck", 0, "Done: operation BlankCheck\n", "Performing Blank Check...\n"},
     {"tool operation ReadMACAddress", 0, nullptr, "MAC address value: ff-ff-ff-ff-ff-ff"},
     {"tool operation Test", 0, "Done: operation Test\n", ""},
@@ -228,8 +228,8 @@ const Row kFailing[] = {
     {"tool read flash.elf", 2, "", "name a .bin, .hex or .srec file"},
     {"tool register program 0 xyz", 2, "", "the value 'xyz' is no hexadecimal number"},
     {"tool register read 2", 2, "", "INDEX: 2 not in"},
-    {"tool mac program 00-1a-b6-01-02", 2, "", "is no MAC address"},
-    {"tool mac program 01-00-5e-00-00-01", 2, "", "is a multicast address"},
+    {"tool mac program 02-1b-c3-04-05", 2, "", "is no MAC address"},
+    {"tool mac program 03-1b-c3-04-05-06", 2, "", "is a multicast address"},
     {"tool operation ProgramMACAddress", 2, "", "is all ones"},
     {"tool operation ProgramUserRegister1", 2, "", "set FlashUserRegister1Input with --set"},
     {"tool settings FlashMACAddrInput=021bc3040506", 2, "", "belongs to one board and isn't kept"},
@@ -354,11 +354,11 @@ const Row kStories[] = {
      "400-7ff\n"
      "tool -q program data.bin --base 10 --erase none",
      5, "The flash holds the image\n0x400-0x7ff is blank\n", "bits were not erased"},
-    {"export CORVANE_SIM_FILE=d; tool -q mac program 0-1a-b6-1-2-3; tool mac read\n"
-     "tool -q mac program 0-1a-b6-1-2-3 --commit; tool mac read; tool register read 0",
+    {"export CORVANE_SIM_FILE=d; tool -q mac program 2-1b-c3-4-5-6; tool mac read\n"
+     "tool -q mac program 2-1b-c3-4-5-6 --commit; tool mac read; tool register read 0",
      0,
-     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\nff-ff-ff-ff-ff-ff\n"
-     "MAC address: was ff-ff-ff-ff-ff-ff, is 00-1a-b6-01-02-03\n00-1a-b6-01-02-03\n0x00b61a00\n",
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 02-1b-c3-04-05-06\nff-ff-ff-ff-ff-ff\n"
+     "MAC address: was ff-ff-ff-ff-ff-ff, is 02-1b-c3-04-05-06\n02-1b-c3-04-05-06\n0x00c31b02\n",
      ""},
     {"tool -q --sim-file a mac program 021bc3040506 --commit; tool -q --sim-file a mac read\n"
      "tool --sim-file b operation ProgramMACAddress",

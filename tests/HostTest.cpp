@@ -105,30 +105,30 @@ TEST(Text, ReadsRangesAndNamesWhatIsWrong) {
 
 TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {
     const std::pair<const char*, const char*> cases[] = {
-        {"00-1A-B6-01-02-03", "00-1a-b6-01-02-03"},
-        {"00:1a:b6:01:02:03", "00-1a-b6-01-02-03"},
-        {"0-1a-b6-1-2-3", "00-1a-b6-01-02-03"},
-        {"001AB6010203", "00-1a-b6-01-02-03"},
+        {"02-1B-C3-04-05-06", "02-1b-c3-04-05-06"},
+        {"02:1b:c3:04:05:06", "02-1b-c3-04-05-06"},
+        {"2-1b-c3-4-5-6", "02-1b-c3-04-05-06"},
+        {"021BC3040506", "02-1b-c3-04-05-06"},
         {"", nullptr},
-        {"01AB6010203", nullptr},
-        {"001AB60102033", nullptr},
-        {"00-1A-B6-01-02", nullptr},
-        {"00-1A-B6-01-02-03-04", nullptr},
-        {"00-1A:B6-01-02-03", nullptr},
-        {"00--1A-B6-01-02-03", nullptr},
-        {"00-1A-B6-01-02-03-", nullptr},
-        {"000-1A-B6-01-02-03", nullptr},
-        {"0G-1A-B6-01-02-03", nullptr},
+        {"21BC3040506", nullptr},
+        {"021BC30405063", nullptr},
+        {"02-1B-C3-04-05", nullptr},
+        {"02-1B-C3-04-05-06-04", nullptr},
+        {"02-1B:C3-04-05-06", nullptr},
+        {"02--1B-C3-04-05-03", nullptr},
+        {"02-1B-C3-04-05-06-", nullptr},
+        {"002-1B-C3-04-05-06", nullptr},
+        {"0G-1B-C3-04-05-06", nullptr},
     };
     for (const auto& [text, expected] : cases) {
         const auto mac = ParseMacAddress(text);
         EXPECT_EQ(mac ? mac->Text() : "refused", expected ? expected : "refused") << text;
     }
-    const MacAddress mac = *ParseMacAddress("00-1A-B6-01-02-03");
-    EXPECT_EQ(mac.Register(0), 0x00B61A00U);
-    EXPECT_EQ(mac.Register(1), 0x00030201U);
+    const MacAddress mac = *ParseMacAddress("02-1B-C3-04-05-06");
+    EXPECT_EQ(mac.Register(0), 0x00C31B02U);
+    EXPECT_EQ(mac.Register(1), 0x00060504U);
     EXPECT_EQ(mac.Objection(), "");
-    for (const char* text : {"000000000000", "ffffffffffff", "01-00-5e-00-00-01"})
+    for (const char* text : {"000000000000", "ffffffffffff", "03-1b-c3-04-05-06"})
         EXPECT_NE(ParseMacAddress(text)->Objection(), "") << text;
 }
 
@@ -179,7 +179,7 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
     const TemporaryDirectory directory;
     const std::string userText =
         "FlashTimeoutValue = 7\nFlashEraseEndAddr = 0x3FFFF\n"
-        "FlashResetSetting = false\nFlashMACAddrInput = '001AB6010203'\n";
+        "FlashResetSetting = false\nFlashMACAddrInput = '021BC3040506'\n";
     const std::string user = directory.Write("mine.toml", userText);
     setenv("CORVANE_SET_FlashCrystalFreq", "10", 1);
     SettingStore store = LoadSettings(user, {"FlashVerboseMode=1", "FlashEraseType=Entire Flash"});
@@ -188,7 +188,7 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
         {keys::kTimeout, {"7", Origin::UserFile}},
         {keys::kEraseEnd, {"3ffff", Origin::UserFile}},
         {keys::kReset, {"0", Origin::UserFile}},
-        {keys::kMacInput, {"00-1a-b6-01-02-03", Origin::UserFile}},
+        {keys::kMacInput, {"02-1b-c3-04-05-06", Origin::UserFile}},
         {keys::kCrystalFreq, {"10", Origin::Environment}},
         {keys::kVerbose, {"1", Origin::CommandLine}},
         {keys::kEraseType, {"Entire Flash", Origin::CommandLine}},
@@ -199,8 +199,8 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
 
     // Two runs at once keep different things; neither loses the other's.
     SettingStore other = LoadSettings(user, {});
-    store.Publish(keys::kMacInput, "0-1a-b6-1-2-4");  // of this board alone
-    EXPECT_EQ(store.Published(keys::kMacInput), "00-1a-b6-01-02-04");
+    store.Publish(keys::kMacInput, "2-1b-c3-4-5-7");  // of this board alone
+    EXPECT_EQ(store.Published(keys::kMacInput), "02-1b-c3-04-05-07");
     store.Publish(keys::kFamily, "a \"family\"\n");
     store.Keep("Of a later plug-in", "x");
     store.Save([](const std::string&) {});
@@ -208,7 +208,7 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
     other.Save([](const std::string&) {});
     SettingStore again = LoadSettings(user, {});
     EXPECT_EQ(again.Published(keys::kFamily) + again.Kept(keys::kMacInput), "");
-    EXPECT_EQ(again.Text(keys::kMacInput), "00-1a-b6-01-02-03");
+    EXPECT_EQ(again.Text(keys::kMacInput), "02-1b-c3-04-05-06");
     EXPECT_EQ(again.Text(keys::kFamily), "a \"family\"\n");
     EXPECT_EQ(again.Text("Of a later plug-in"), "x");
     again.Forget(keys::kFamily);

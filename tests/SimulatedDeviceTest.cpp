@@ -414,14 +414,14 @@ TEST(Contents, KeepTheDevice) {
     target::SimulatedDevice kept(
         target::ParseDeviceOptions("dorna,flash=128M,sector=1K,revision=2,erase-time=1us"));
     kept.Flash().Preset(0x7FFFF80, Pattern(128));
-    kept.PresetCommittedUserRegisters({0x00B61A00, 0x00030201});
+    kept.PresetCommittedUserRegisters({0x00C31B02, 0x00060504});
     const std::string contents = EncodeContents(kept);
     EXPECT_LT(contents.size(), 2048U);
     auto device = target::DecodeContents(contents, target::DefaultDeviceOptions());
     EXPECT_EQ(DefinitionText(device->Options()),
               "dorna,id=0x901A0200,flash=128M,ram=256K,sector=1K,keyconfig=0xFFFFFFEF");
     EXPECT_EQ(device->Options().timings.sectorErase, 8ms);
-    EXPECT_EQ(device->CommittedUserRegisters(), (std::array{0x00B61A00U, 0x00030201U}));
+    EXPECT_EQ(device->CommittedUserRegisters(), (std::array{0x00C31B02U, 0x00060504U}));
     Bytes expected(0x8000000, 0xFF);
     std::copy_n(Pattern(128).begin(), 128, expected.end() - 128);
     EXPECT_TRUE(device->FlashContents() == expected);

@@ -15,7 +15,7 @@ struct MacAddress {
 
     bool operator==(const MacAddress&) const = default;
 
-    /// "00-1a-b6-01-02-03": the only form that the plug-in programs.
+    /// "02-1b-c3-04-05-06": the only form that the plug-in programs.
     std::string Text() const;
 
     /// What user register 0 or 1 holds for this address.

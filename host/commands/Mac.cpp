@@ -45,7 +45,7 @@ MacAddress RequireMac(const Options& options) {
     if (!mac)
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("'{}' is no MAC address; write six hexadecimal bytes, as in "
-                                  "00-1a-b6-01-02-03, 0:1a:b6:1:2:3 or 001ab6010203",
+                                  "02-1b-c3-04-05-06, 2:1b:c3:4:5:6 or 021bc3040506",
                                   text));
     const std::string objection = mac->Objection();
     if (!objection.empty() && !options.force)
@@ -76,7 +76,7 @@ CommandRow MacProgram() {
         "mac program",
         "Program the MAC address",
         "Without --commit the address is gone after the next reset of the device.",
-        "  corvane-flash mac program 00-1a-b6-01-02-03 --commit",
+        "  corvane-flash mac program 02-1b-c3-04-05-06 --commit",
         {{"ADDRESS",
           "",
           "Six hexadecimal bytes, separated by - or : or not at all",

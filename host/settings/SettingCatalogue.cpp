@@ -126,7 +126,7 @@ std::string AcceptedTexts(const SettingInfo& info) {
         case Form::Hex:
             return "a hexadecimal number up to ffffffff";
         case Form::Mac:
-            return "six hexadecimal bytes, as in 00-1a-b6-01-02-03";
+            return "six hexadecimal bytes, as in 02-1b-c3-04-05-06";
         case Form::Choice:
             return fmt::format("\"{}\"", fmt::join(info.choices, "\", \""));
         case Form::Published:
