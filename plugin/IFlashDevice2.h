@@ -16,9 +16,12 @@
 // that fails is not a failing call: the user has been shown why, through IFlashHost::ShowError.
 // No exception leaves the library.
 //
-// Threads. One device object is called from one thread at a time, and CreateFlashDevice2 is not
-// called from two threads at once. Every call runs to its end on the caller's thread, calling the
-// host's slots as it goes.
+// Threads. The calls on one device object come one at a time, from whichever thread. Those of
+// CreateFlashDevice2 come one at a time in the whole process. Every call runs to its end on the
+// caller's thread, calling the host's slots as it goes.
+//
+// Pointers. None may be null but where it is said, and none is tested: outputs are written without
+// a look. Texts are NUL-terminated bytes and are not used after the call.
 //
 // Each slot ends with a tag: who implements it, and when the host may call it.
 
@@ -147,7 +150,8 @@ class IFlashDevice2 {
 
 // Creates a device object for the connected microcontroller: reads its identification registers
 // through host and halts it.
-//     variant       the device variant text, as the host names it; not null
+//     variant       the name that the host has for the device; it goes into the trace and
+//                   decides nothing; not null
 //     text2, text3  two further texts, not used; not null
 //     host          the services of the caller, which keeps it alive and owns it until after
 //                   Destroy; not null and not checked

@@ -1,18 +1,22 @@
 // IFlashHost: what a debugging host does for the flash plug-in.
 //
 // The plug-in touches nothing by itself. Every register access, message, progress display, pause
-// and setting is a call of one of the slots below, made on the thread that called into
-// IFlashDevice2, one at a time, while that call lasts. A slot must not call back into the device
-// object that is calling it.
+// and setting is a call of one of the slots below. The slots are called on the thread that made the
+// call of IFlashDevice2 or CreateFlashDevice2, while it lasts. A slot must not call back into the
+// device object that is calling it.
 //
 // This header is a binary contract. The order of the slots is the contract: it never changes, and
 // no slot is ever removed. It needs nothing but the two standard headers below and compiles from
 // C++11 on.
 //
 // Errors. Every slot that returns `const char*` returns null for success or a NUL-terminated error
-// text for failure, GetProperty and GetDirectory excepted. The text belongs to the host; the
-// plug-in copies it before it makes its next call, so the memory may be reused then. An empty text
-// is a failure too. A failing slot must have no further effect that the host would mind.
+// text for failure, GetProperty and GetDirectory excepted. The text belongs to the host and must
+// stay valid until the next call of any slot; by then the plug-in has copied it. An empty text is
+// a failure too. A failing slot must have no further effect that the host would mind.
+//
+// Texts are NUL-terminated bytes. Those that the plug-in makes are ASCII; what it was given by the
+// host comes back byte for byte. Percent signs in them mean nothing. Texts and buffers that are
+// handed to a slot belong to the plug-in and are valid during the call; none of them is null.
 //
 // Exceptions must not leave a slot.
 //
@@ -28,19 +32,22 @@ class IFlashHost {
   public:
     // Slot 0. Looks up a setting by its exact, case-sensitive name.
     // Returns the setting's value, or null when the host has no setting of that name. The text
-    // must stay valid until the next call of any slot. The plug-in asks twice for each value that
-    // it uses and expects the same text both times.
+    // must stay valid until the next call of any slot. The plug-in asks twice in a row for each
+    // value: the first answer tells whether the setting exists, the second is used.
     // [host implements; any time after creation]
     virtual const char* GetProperty(const char* name) = 0;
 
     // Slot 1. Stores a setting: device information, the last checksum, a register read back.
-    // name and value are NUL-terminated, owned by the plug-in and valid during the call.
+    // name and value are valid during the call; a host that keeps them copies them.
     // [host implements; any time after creation]
     virtual const char* SetProperty(const char* name, const char* value) = 0;
 
     // Slot 2. Loads a program file into the halted target, ready for RunTarget to start it.
     // fileName is a file name without a directory; second is always the empty text; directory is
-    // the directory text, ending in a path separator. All three are valid during the call.
+    // the text of GetDirectory with "..\..\merrow\" behind it, on every system. All three are valid
+    // during the call. The host sets the program counter, and the stack pointer where the program
+    // doesn't; the plug-in touches no register of the core. The host does well to write 0 to the
+    // loader's two status words, 0x2000100C and 0x2000101C, before the program starts.
     // [host implements; during WriteDataToFlash]
     virtual const char* LoadProgram(const char* fileName, const char* second,
                                     const char* directory) = 0;
@@ -108,13 +115,15 @@ class IFlashHost {
     // [reserved; never called]
     virtual const char* Reserved15() = 0;
 
-    // Slot 16. Begins a progress display with a title. Only one display is open at a time. When
-    // it fails, no display is open and EndProgress is not called.
+    // Slot 16. Begins a progress display with a title, which is valid during the call. Only one
+    // display is open at a time. When it fails, no display is open and EndProgress is not called.
     // [host implements; during WriteDataToFlash, PerformOperation and ResetSettings]
     virtual const char* BeginProgress(const char* title) = 0;
 
     // Slot 17. Reports how far the work of the open display has come, in percent (0 to 100), with
-    // a short text. An error text from here stops the work: the way to offer a cancel button.
+    // a short text, which is valid during the call. Over more than 40 MiB the percentage starts
+    // again from a small number. An error text from here stops the work: the way to offer a cancel
+    // button.
     // [host implements; while a progress display is open]
     virtual const char* UpdateProgress(uint32_t percent, const char* text) = 0;
 

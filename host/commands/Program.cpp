@@ -138,7 +138,7 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages
     Load(context, device, plan);
     Outcome outcome{.result = PlanJson(plan)};
     if (IsOn(context, keys::kProgramCrc))
-        outcome.result["checksum"] = device.Published(keys::kChecksumValue);
+        outcome.result["checksum"] = "0x" + device.Published(keys::kChecksumValue);
     if (!context.options.noVerify) {
         if (const auto differences = CompareWithFlash(device, images.image); !differences.Empty())
             FailAsDifferent(outcome, differences, images,
