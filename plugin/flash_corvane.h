@@ -21,6 +21,7 @@
  * This holds for the Itanium and for the Microsoft C++ ABI, which give the slots the same order.
  * `this` is an ordinary first argument, except on 32-bit Windows, where it goes in a register:
  * FLASH_CORVANE_CALL says so, and belongs before the name of each function that goes into a table.
+ * (Microsoft's compiler takes that on member functions only: a 32-bit host in C needs another one.)
  * bool is one byte, 0 or 1.
  *
  * Needs C99 or C++11.

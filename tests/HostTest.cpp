@@ -5,11 +5,13 @@
 #include <gtest/gtest.h>
 #include <stdlib.h>
 
+#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <random>
 #include <sstream>
 #include <stdexcept>
+#include <thread>
 
 #include "host/base/Errors.h"
 #include "host/base/MacAddress.h"
@@ -234,6 +236,7 @@ TEST(Settings, FilesThatAreWrongAreNamedWithTheLine) {
         const std::string failure = FailureOf([&] { LoadSettings(path, {}); });
         EXPECT_TRUE(failure.starts_with("3: settings file " + path)) << failure;
         EXPECT_NE(failure.find(expected), std::string::npos) << failure;
+        EXPECT_EQ(failure.find("delete it"), std::string::npos) << "it is the user's own";
     }
     EXPECT_TRUE(FailureOf([&] { LoadSettings(directory.File("none.toml"), {}); }).starts_with("3"));
 }
@@ -460,6 +463,25 @@ TEST(FlashWatch, CountsAnEraseWhenTheDeviceSaysItIsDone) {
     test.watch.Writing(0x400FD008, 0xA4420004);
     test.watch.Read(0x400FD008, 4, idle);
     EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x40400U);
+}
+
+TEST(WorkMeter, GivesEachPhaseTheTimeInWhichItIsTheCurrentOne) {
+    using Seconds = std::chrono::duration<double>;
+    HostUnderTest test;
+    const auto start = std::chrono::steady_clock::now();
+    test.meter.Begin(Phase::Read);
+    std::this_thread::sleep_for(4ms);
+    test.meter.Begin(Phase::Verify);
+    std::this_thread::sleep_for(2ms);
+    test.meter.End();
+    const Seconds elapsed = std::chrono::steady_clock::now() - start;
+    std::this_thread::sleep_for(2ms);
+    test.meter.End();
+    const double read = test.meter.Of(Phase::Read).seconds;
+    const double verified = test.meter.Of(Phase::Verify).seconds;
+    EXPECT_GE(read, 0.004);
+    EXPECT_GE(verified, 0.002);
+    EXPECT_LE(read + verified, elapsed.count());
 }
 
 TEST(CommandTable, EveryCommandAndOptionIsInHelpAndManPage) {

@@ -132,6 +132,7 @@ TEST(ImageFile, NamesFileAndLineOfWhatIsWrong) {
         {"S9030000FC\nS9030000FC", "f: line 2: more text found behind the termination record"},
         {"S904000001FA", "f: line 1: address and data: 3 bytes found, 2 expected in an S9 record"},
         {"S4030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
+        {"SA030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
         {"S307FFFFFFFF0102F9\nS9030000FC",
          "f: line 1: 2 bytes at address 0xFFFFFFFF run past 0xFFFFFFFF"},
     };
@@ -266,6 +267,8 @@ TEST(ImageFile, WritesRecordsThatEndAtMultiplesOfTheirLength) {
         "S00600004844521B\nS3080000FFFD010203F5\nS3060001000004F4\nS3060001002005D3\n"
         "S5030003F9\nS70500000000FA\n",
         FormatImage(image, Format::SRecord));
+    for (const char* path : {"a.s19", "a.S28", "a.s37", "a.srec", "a.mot", "a.mhx"})
+        EXPECT_EQ(FormatForWriting(path), Format::SRecord) << path;
     EXPECT_EQ(std::string("\1\2\3\4") + std::string(31, '\xFF') + "\5",
               FormatImage(image, Format::Binary));
 }

@@ -394,6 +394,8 @@ TEST(Options, BadOnesAreNamed) {
         {"quen,keyconfig=100000000", "Option \"keyconfig=100000000\""},
         {"quen,erase-time=5", "Option \"erase-time=5\""},
         {"quen,erase-time=2h", "Option \"erase-time=2h\""},
+        {"quen,erase-time=18446744074s", "Option \"erase-time=18446744074s\""},    // wraps to 0.3 s
+        {"quen,flash=18014398509482048K", "Option \"flash=18014398509482048K\""},  // to 64K
         {"quen,fail-access=0", "Option \"fail-access=0\""},
         {"quen,erase=maybe", "Option \"erase=maybe\""},
         {"quen,stuck-cell=512K", "Option \"stuck-cell=512K\""},
@@ -458,6 +460,11 @@ TEST(Contents, AreRefusedWhenTheyAreNoDevice) {
 }
 
 TEST(Contents, MustAgreeWithTheOptions) {
+    // A class without user registers has none to fill.
+    const std::string ravik =
+        EncodeContents(target::SimulatedDevice(target::ParseDeviceOptions("ravik")));
+    EXPECT_EQ(Decode(ravik, "ravik")->CommittedUserRegisters(),
+              (std::array{0xFFFFFFFFU, 0xFFFFFFFFU}));
     const std::string contents = EncodeContents(
         target::SimulatedDevice(target::ParseDeviceOptions("velk,flash=512K,revision=B")));
     const struct {
