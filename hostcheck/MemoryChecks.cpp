@@ -1,5 +1,5 @@
-// Memory accesses, in the RAM behind the loader's buffers and parameter blocks alone. What lies
-// there is put back.
+// Memory accesses, in the RAM behind the loader's buffers and parameter blocks alone but for one
+// register that is read. What lies there is put back.
 
 #include <algorithm>
 #include <numeric>
@@ -33,6 +33,13 @@ Bytes Counted(std::size_t bytes, std::uint8_t first) {
     Bytes counted(bytes);
     std::iota(counted.begin(), counted.end(), first);
     return counted;
+}
+
+/// The one register that is read: every plug-in begins with it.
+constexpr std::uint32_t kIdentification = 0x400FE000;
+
+std::string ReadsARegister(CheckedHost& host) {
+    return "it reads " + Hex(host.Read(kIdentification, 4, 4)) + ", low byte first";
 }
 
 std::string ReadsAWord(CheckedHost& host) {
@@ -118,6 +125,7 @@ std::string RefusesUnmappedWrites(CheckedHost& host) {
 }
 
 constexpr Check kChecks[] = {
+    {Stage::Creation, "ReadMemory", "the identification register at 0x400FE000", ReadsARegister},
     {Stage::Creation, "ReadMemory", "a word of RAM during CreateFlashDevice2", ReadsAWord},
     {Stage::Initialize, "WriteMemory", "the same bytes in all widths, in the order of the buffer",
      KeepsEveryWidth},

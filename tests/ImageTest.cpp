@@ -132,13 +132,14 @@ TEST(ImageFile, NamesFileAndLineOfWhatIsWrong) {
         {"S9030000FC\nS9030000FC", "f: line 2: more text found behind the termination record"},
         {"S904000001FA", "f: line 1: address and data: 3 bytes found, 2 expected in an S9 record"},
         {"S4030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
-        {"SA030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
         {"S307FFFFFFFF0102F9\nS9030000FC",
          "f: line 1: 2 bytes at address 0xFFFFFFFF run past 0xFFFFFFFF"},
     };
     for (const auto& [contents, text] : cases)
         EXPECT_EQ(text, Complaint(contents));
     EXPECT_EQ("f: no ELF header found", Complaint("hello", {Format::Elf, {}}));
+    EXPECT_EQ("f: line 1: a line found that begins with none of S0 to S3 and S5 to S9",
+              Complaint("SA030000FC", {Format::SRecord, {}}));
     EXPECT_EQ("f: line 1: no ':' found at the beginning, where each record of Intel HEX has one",
               Complaint("hello", {Format::IntelHex, {}}));
 }

@@ -12,7 +12,7 @@ kit=$trial/moved
 mv "$trial/installed" "$kit"
 
 # With sanitizers, as the libraries were built: by Clang. Those for C++ have to be in a C program, too.
-[ -z "$2" ] || export CC=clang CXX=clang++ LDFLAGS="-fsanitize-link-c++-runtime -lstdc++"
+[ -z "${2:-}" ] || export CC=clang CXX=clang++ LDFLAGS="-fsanitize-link-c++-runtime -lstdc++"
 flags="-Wall -Wextra -Werror ${2:+-fsanitize=${2#fuzzer-no-link,}}"
 for example in minimal-host c-host; do
     cmake --no-warn-unused-cli -G Ninja -S "$kit/share/doc/corvane-flash/examples/$example" -B "$trial/$example" \
