@@ -182,10 +182,10 @@ Outcome RunOn(Context& context, FlashDevice& device, LoadedImages images) {
     const std::uint64_t kept = context.options.keep ? KeepOthers(device, images, erase) : 0;
     const ProgramPlan plan = PlanOnDevice(device, images.image, erase, context.options.rewrite);
     const std::string keeping =
-        kept == 0 ? "" : fmt::format(", {} of it kept from the flash", SizeText(kept));
+        kept == 0 ? "" : fmt::format(" ({} of it kept from the flash)", SizeText(kept));
     context.reporter.Say(
-        Talk::Normal, fmt::format("{} in {}{} for {}, {} of flash", SizeText(plan.imageBytes),
-                                  CountText(plan.sections.size(), "section"), keeping, info.family,
+        Talk::Normal, fmt::format("{}{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
+                                  keeping, CountText(plan.sections.size(), "section"), info.family,
                                   SizeText(info.flashBytes)));
     ShowPlan(context, plan, GeometryOf(device));
     Json planned = PlanJson(plan);
