@@ -23,6 +23,8 @@
 #include "host/commands/Commands.h"
 #include "host/driver/FlashHost.h"
 #include "host/flashing/Comparison.h"
+#include "host/flashing/FlashMap.h"
+#include "host/flashing/KeptBytes.h"
 #include "host/flashing/ProgramPlan.h"
 #include "host/settings/SettingKeys.h"
 #include "target/simulated/SimulatedDevice.h"
@@ -317,6 +319,37 @@ TEST(ProgramPlan, JoiningChangesNoByteOfFlash) {
         EXPECT_EQ(FlashAfter(plan.erased, plan.sections), FlashAfter(plan.erased, image.Sections()))
             << "round " << round;
     }
+}
+
+TEST(KeptBytes, AreThoseBetweenTheSectionsOfAnImage) {
+    image::Image image;
+    image.Add(2, {0x22, 0x33}, "image");
+    image.Add(6, {0x66}, "image");
+    image.Add(20, {0x20}, "image");
+    image::Image contents;
+    contents.Add(0, {1, 0xFF, 0, 0, 4, 5, 0, 0xFF, 8, 0xFF, 10, 0xFF}, "flash");
+    contents.Add(20, {0xFF, 0xFF, 0xFF, 0xFF}, "flash");
+    const std::vector<image::Section> expected{{0, {1}}, {4, {4, 5}}, {8, {8, 0xFF, 10}}};
+    EXPECT_EQ(KeptBytes(image, contents).Sections(), expected);
+}
+
+TEST(FlashMap, TellsWhatALoadDoesToEachPart) {
+    std::vector<std::uint8_t> contents(64, 0xFF);
+    contents[1] = contents[20] = contents[33] = contents[60] = 0;
+    image::Image image;
+    image.Add(16, std::vector<std::uint8_t>(4, 0), "image");   // programmed, and 20 cleared
+    image.Add(34, std::vector<std::uint8_t>(14, 0), "image");  // there already
+    ProgramPlan plan;
+    plan.sections = {image.Sections()[0]};
+    plan.erased = {{16, 31}};
+    const FlashGeometry flash{64, 16};
+    const auto runs = MapFlash(contents, flash, image, plan);
+    using enum MapState;
+    const std::vector<MapRun> expected{{{0, 15}, Used},  {{16, 19}, Program}, {{20, 31}, Cleared},
+                                       {{32, 33}, Used}, {{34, 47}, Held},    {{48, 63}, Used}};
+    EXPECT_EQ(runs, expected);
+    EXPECT_EQ(DrawMap(runs, flash, 40)[0], "0x00  #x=#");
+    EXPECT_EQ(DrawMap(runs, {64, 1}, 13)[1], "0x08  ########");
 }
 
 TEST(Comparison, JoinsWhatLiesCloseAndKeepsTheFirstRanges) {
