@@ -118,6 +118,15 @@ const Row kDone[] = {
     {"tool program small.hex --progress bar", 0, nullptr, "\r\033[KProgramming "},
     {"tool program small.hex --trace -", 0, nullptr, "plug-in  3 FlashCorvane::WriteDataToFlash()"},
     {"tool -q program small.hex --trace t && cat t", 0, "host     LoadProgram \"FlashLoader", ""},
+    {"tool program data.bin --base 1083 --sim dorna,chunk-time=100ms", 0, "Written       384 bytes",
+     nullptr},
+    {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d", 0,
+     "Left alone    5.5 KiB\nDone: the flash held the image already\n", nullptr},
+    {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d --dry-run", 0,
+     "erase    nothing\nleave    0x0-0x17ff              6 sectors with the image in place\n",
+     nullptr},
+    {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d --rewrite", 0,
+     "Erased        6 KiB", nullptr},
     {"tool program small.hex data.bin --base 400 --dry-run --sim-file d && test ! -e d", 0,
      "erase    0x0-0x7ff               2 sectors\nprogram  0x10-0x52b              1.3 KiB\n"
      "304 bytes of the image; 1.7 KiB more are cleared with its sectors; 254 KiB of flash are not "
@@ -303,7 +312,8 @@ TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
 
 /// The first "tool" of the commands, or the tool's path, with --json behind it.
 std::string WithJson(std::string commands) {
-    const std::string name = commands.find("timeout") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
+    const std::string name =
+        commands.find("timeout") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
     return commands.insert(commands.find(name) + name.size(), " --json");
 }
 
@@ -435,7 +445,8 @@ const Row kStories[] = {
     {"tool program small.hex --keep --erase all", 2, "", "--keep goes with --erase necessary"},
     {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL
      " --json -q program $ELF --sim tolva,loader=hangs | sed -n '$p'",
-     0, "\"clearedBytes\":480,\"keptBytes\":0,\"flashChanged\":true,\"phases\":{\"erase\"", nullptr},
+     0, "\"clearedBytes\":480,\"keptBytes\":0,\"flashChanged\":true,\"phases\":{\"erase\"",
+     nullptr},
     // What the shells make of it: bash has taken the word apart, zsh would show what is added.
     {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
      ":$PATH bash -c '. "
