@@ -81,6 +81,10 @@ inline bool ErasesWhole(std::string_view family, std::uint64_t flashBytes) {
 inline constexpr std::uint32_t kCommitBit = 0x8;
 inline constexpr std::uint32_t kCommitOperand = 0x80000000;  ///< and the register's index
 
+// What the plug-in has the host load: a file in a directory below the host's.
+inline constexpr char kLoaderFile[] = "FlashLoaderMerrow.out";
+inline constexpr char kLoaderSubdirectory[] = R"(..\..\merrow\)";
+
 // The loader's two chunk buffers lie one behind the other, then its two parameter blocks. It
 // programs blocks of 128 bytes; the plug-in widens each section to whole ones.
 inline constexpr std::uint32_t kBlockBytes = 128;

@@ -117,6 +117,8 @@ AddressRange FlashDevice::RangeInFlash(const std::optional<std::string>& text) {
 }
 
 void FlashDevice::ResetSettings(plugin::ResetMode mode) {
+    // The plug-in erases before it asks for the loader.
+    if (mode == plugin::ResetMode::LoadBegins) target_->RequireLoader(ExecutableDirectory());
     const int number = static_cast<int>(mode);
     Call("resetting the device", fmt::format("ResetSettings {}", number),
          [&] { return device_->ResetSettings(number); });

@@ -54,4 +54,10 @@ GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& 
     }
 }
 
+void GdbServerTarget::RequireLoader(const std::string& directory) try {
+    target_->RequireProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
+} catch (const target::TargetError& error) {
+    throw Failure(ExitStatus::BadFile, error.what());
+}
+
 }  // namespace host

@@ -17,6 +17,7 @@ class GdbServerTarget final : public OpenTarget {
 
     target::Target& Get() override { return *target_; }
     void RamEndsAt(std::uint32_t address) override { target_->SetRamEnd(address); }
+    void RequireLoader(const std::string& directory) override;
     void Release(bool run) override { target_->Release(run); }
 
   private:

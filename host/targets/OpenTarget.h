@@ -36,6 +36,10 @@ class OpenTarget {
     /// What the plug-in has found out: the address behind the device's RAM.
     virtual void RamEndsAt(std::uint32_t /*address*/) {}
 
+    /// To be asked before flash is erased for a load. Failure (BadFile) when the loader's file
+    /// can't be had; `directory` is what the host tells the plug-in.
+    virtual void RequireLoader(const std::string& /*directory*/) {}
+
     /// Keeps what must outlive the run; `changed` tells whether there is anything new. Failure
     /// (Unreachable).
     virtual void Keep(bool /*changed*/) {}

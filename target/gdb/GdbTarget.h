@@ -45,6 +45,10 @@ class GdbTarget final : public Target {
 
     /// Writes the program's ELF file into RAM and compares it; then sets program counter and stack.
     void LoadProgram(const std::string& fileName, const std::string& directory) override;
+
+    /// Whether LoadProgram would find a program that it can load; touches nothing.
+    void RequireProgram(const std::string& fileName, const std::string& directory);
+
     void Run() override;
     void Halt() override;
     void Reset(bool flag) override;

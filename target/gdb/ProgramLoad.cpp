@@ -17,7 +17,9 @@ constexpr std::size_t kDocumentSizeMax = std::size_t{1} << 20;
 constexpr std::size_t kMonitorOutputMax = std::size_t{64} << 10;
 
 // The directory text was written for another system.
-std::string LoaderPath(const std::string& fileName, std::string directory) {
+std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
+                       std::string directory) {
+    if (!options.loader.empty()) return options.loader;
     std::replace(directory.begin(), directory.end(), '\\', '/');
     return std::filesystem::path(directory + fileName).lexically_normal().string();
 }
@@ -32,14 +34,17 @@ std::string RegisterBytes(std::uint32_t value) {
 }  // namespace
 
 void GdbTarget::LoadProgram(const std::string& fileName, const std::string& directory) {
-    const std::string path =
-        options_.loader.empty() ? LoaderPath(fileName, directory) : options_.loader;
+    const std::string path = LoaderPath(options_, fileName, directory);
     Perform([&] { return fmt::format("Loading the program {}", path); },
             [&] {
                 if (started_)
                     throw ProtocolError("isn't asked: the target is running; halt it first");
                 LoadSegments(path);
             });
+}
+
+void GdbTarget::RequireProgram(const std::string& fileName, const std::string& directory) {
+    ReadLoaderFile(LoaderPath(options_, fileName, directory));
 }
 
 void GdbTarget::LoadSegments(const std::string& path) {

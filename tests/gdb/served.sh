@@ -72,6 +72,32 @@ for expected in 'Transfer rate' 'matched' '0x400fe000:.*0x10050000' '^pc ' 'deta
 done
 ! grep -i 'mis-matched\|error' gdb
 
+# Wrong options, nobody there, a server that hangs, and Ctrl-C while it does.
+expect() {
+    local wanted=$1 words=$2 status=0
+    shift 2
+    timeout 30 "$tool" "$@" >said 2>&1 </dev/null || status=$?
+    [ "$status" = "$wanted" ] && grep -q -- "$words" said || { echo "$* -> $status"; cat said; exit 1; }
+}
+expect 2 'no HOST:PORT' --gdb nonsense info
+expect 2 'give one of them' --gdb ":$port" --sim quen info
+expect 2 'pc takes a number' --gdb ":$port" --gdb-option pc=x info
+expect 4 'refused; is it running' --gdb :1 info
+expect 3 'nowhere.out can.t be opened: No such file' --gdb ":$port" --loader nowhere.out program "$elf" --rewrite
+CORVANE_SIM=velk expect 0 'Quen' --gdb ":$port" info
+CORVANE_GDB=:1 expect 0 'Velk\|none' --sim velk info
+hanging=$(cat "/proc/$server/task/$server/children")
+kill -STOP $hanging
+expect 4 'no packet in time' --gdb ":$port" --gdb-option timeout=300ms info
+"$tool" --gdb ":$port" --gdb-option timeout=60s info >said 2>&1 </dev/null &
+client=$!
+sleep 0.5
+kill -INT "$client"
+status=0
+wait "$client" || status=$?
+kill -CONT $hanging
+[ "$status" = 130 ] || { echo "Ctrl-C -> $status"; cat said; exit 1; }
+
 kill "$server"
 wait "$server" || { echo "the server ended with $?"; exit 1; }
 server=
