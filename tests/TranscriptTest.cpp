@@ -97,6 +97,10 @@ const Scenario Scenarios[] = {
          Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0x3FFFF, &within));
          Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0, -1, &within));
          Returned(host, "special region", plugin->AddressWithinSpecialRegion(0, &within));
+         RecordingHost other("dorna,id=0x801A0000");
+         other.transcribe = true;
+         const Plugin created(other);
+         std::ranges::move(other.transcript, std::back_inserter(host.transcript));
      }},
     // What belongs to a load and what is left of it: a reset of the target is allowed once, an
     // erase is made once, and mode 4 keeps it. The clock begins with none of its bits set.
