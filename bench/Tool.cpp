@@ -16,6 +16,7 @@ using Seconds = ToolTime::Seconds;
 
 constexpr std::uint32_t kSizeBytes = 1 << 20;
 constexpr std::uint32_t kChunkBytes = 2048;
+constexpr std::uint32_t kChunks = kSizeBytes / kChunkBytes;
 constexpr std::uint32_t kHandshakeBytes = 12 + 4;  ///< a chunk's parameters and its status
 
 /// Counts the chunks that were seen done.
@@ -103,7 +104,7 @@ ToolTime MeasureTool(const Link& link) {
     time.looks = board.device.AccessCount() - accessesBefore - 2 * time.chunks;
     const Seconds perChunk = 3 * std::chrono::microseconds(link.latencyUs) +
                              Seconds((kChunkBytes + kHandshakeBytes) / (link.bandwidthKB * 1000.0));
-    time.limit = static_cast<double>(kSizeBytes / kChunkBytes) *
+    time.limit = static_cast<double>(kChunks) *
                      std::max(perChunk, Seconds(std::chrono::milliseconds(link.chunkMs))) +
                  Seconds(std::chrono::milliseconds(host.counts.pausedMs));
     time.polling = Polling(link);

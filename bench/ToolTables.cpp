@@ -33,8 +33,8 @@ Table StartsTable() {
     for (const auto& [kind, sector] :
          {std::pair{"tolva,flash=2M", 0x400U}, {"dorna,flash=2M,sector=8K", 0x2000U}}) {
         for (const Link& link : {Link{30, 1000, 5}, {30, 1000, 20}, {1000, 64, 10}}) {
-            const auto ms = [&](const char* option, const Sections& sections) {
-                return LoadTime(link, kind, option, sections).count() * 1e3;
+            const auto ms = [&, device = kind](const char* option, const Sections& sections) {
+                return LoadTime(link, device, option, sections).count() * 1e3;
             };
             const double erased =
                 (ms(kNecessary, {{0, 17 * sector}}) - ms(kNecessary, {{0, sector}}) -

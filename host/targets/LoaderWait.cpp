@@ -111,7 +111,7 @@ void LoaderWait::Halt() {
     next_.Halt();
     Forget();
     loaderRuns_ = false;
-    if (unfinished) throw *unfinished;
+    if (unfinished) throw target::TargetError(*unfinished);
 }
 
 void LoaderWait::Reset(bool flag) {
