@@ -11,16 +11,17 @@ cmake --install "$1" --prefix "$trial/installed" >/dev/null
 kit=$trial/moved
 mv "$trial/installed" "$kit"
 
-# With sanitizers, as the libraries were built: by Clang. Those for C++ have to be in a C program, too.
-[ -z "${2:-}" ] || export CC=clang CXX=clang++ LDFLAGS="-fsanitize-link-c++-runtime -lstdc++"
+# With sanitizers, as the libraries were built: by Clang. They know no object that was made in C.
+examples=(minimal-host c-host)
+[ -z "${2:-}" ] || { export CXX=clang++; examples=(minimal-host); }
 flags="-Wall -Wextra -Werror ${2:+-fsanitize=${2#fuzzer-no-link,}}"
-for example in minimal-host c-host; do
+for example in "${examples[@]}"; do
     cmake --no-warn-unused-cli -G Ninja -S "$kit/share/doc/corvane-flash/examples/$example" -B "$trial/$example" \
         -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_{C,CXX}_FLAGS="$flags" >/dev/null
     cmake --build "$trial/$example" >/dev/null
 done
 diff "$here/minimal-host.txt" <("$trial/minimal-host/minimal-host")
-diff - <("$trial/c-host/c-host") <<'END'
+[ -n "${2:-}" ] || diff - <("$trial/c-host/c-host") <<'END'
 Dorna, 64KB
 progress: Performing Blank Check
 END
@@ -31,17 +32,16 @@ found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 # The hosts of the kit keep the contract. The check programs nothing, which the examples find out.
 check=$(echo "$kit"/lib*/flash_corvane/libflash_host_check.so)
 head -c 100 /dev/zero >"$trial/image.bin"
+passes() { "$@" >>"$trial/told" 2>&1 || { cat "$trial/told"; exit 1; }; }
 tool=("$kit/bin/corvane-flash" --plugin "$check")
-"${tool[@]}" operation CheckProgress >"$trial/told" 2>&1 &&
-    "${tool[@]}" program "$trial/image.bin" --base 0 --erase none --no-verify >>"$trial/told" 2>&1 &&
-    "$trial/minimal-host/minimal-host" "$check" CheckProgress >>"$trial/told" 2>&1 &&
-    "$trial/c-host/c-host" "$check" CheckProgress >>"$trial/told" 2>&1 ||
-    { cat "$trial/told"; exit 1; }
-for example in minimal-host c-host; do
+passes "${tool[@]}" operation CheckProgress
+passes "${tool[@]}" program "$trial/image.bin" --base 0 --erase none --no-verify
+for example in "${examples[@]}"; do
+    passes "$trial/$example/$example" "$check" CheckProgress
     "$trial/$example/$example" "$check" >>"$trial/told" 2>&1 && exit 1
 done
 grep 'expected' "$trial/told" && exit 1
-[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = 3 ] || exit 1
+[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
 
 share=$kit/share
 bash -n "$share/bash-completion/completions/corvane-flash"
