@@ -141,6 +141,9 @@ const Row kDone[] = {
      "would erase 0x0-0x3ff: 1 sector, 1 KiB; 255 KiB of flash are left as they are\nDry run: "
      "nothing was touched\n",
      ""},
+    {"tool -q program data.bin@400 data.bin@800 - --sim-file d < small.hex && tool -q verify "
+     "small.hex data.bin@800 --range 10+7f4 --sim-file d",
+     0, "The flash holds the image\n", ""},
     {"tool -q blank-check --range 5-5", 0, "0x5-0x5 is blank\n", nullptr},
     {"tool -q checksum", 0, "0xb7094978\n", ""},
     {"tool checksum --range 0-3", 0, "0xffffffff\n", ""},
@@ -206,20 +209,33 @@ const Row kFailing[] = {
      "was; the target couldn't be halted; "},
     {"tool mac program 021bc3040506 --sim quen,fail-access=8", 1, "", "registers are as they were"},
     {"tool register read 0 --sim ravik", 1, "", "does not have user reigsters"},
-    {"tool operation Nonsense", 1, "", "'Nonsense' is none of the plug-in's operations: Erase |"},
+    {"tool operation BlankChek", 2, "",
+     "'BlankChek' is none of the plug-in's operations: Erase | "},
     // The command line.
     {"tool", 2, "", "which command?"},
     {"tool help nonsense", 2, "", "there is no help on 'nonsense'"},
-    {"tool nonsense", 2, "", "unknown command or option: nonsense"},
+    {"tool porgram small.hex", 2, "",
+     "unknown command or option: porgram small.hex; did you mean 'program'?"},
     {"tool mac", 2, "", "mac what? read or program"},
     {"tool info --nonsense", 2, "", "--nonsense; 'corvane-flash info --help'"},
+    {"tool info x --qiet y", 2, "", "not expected here: x --qiet y"},
+    {"tool info --qiet", 2, "", "--qiet; did you mean '--quiet'?"},
     {"tool program", 2, "", "FILE is required"},
     {"tool program small.hex --erase some", 2, "", "necessary, none, all or a range A-B"},
+    {"tool program small.hex --base 400", 2, "", "and there is none"},
+    {"tool program data.bin far.srec data.bin --base 400", 2, "", "write FILE@ADDRESS for each"},
+    {"tool program small.hex@400", 2, "", "no raw binary (ihex)"},
+    {"tool verify small.hex --range 20+4", 2, "", "no bytes in the range 0x20-0x23"},
+    {"tool erase --range 20+0", 2, "", "the range '20+0' has no bytes"},
     {"tool program small.hex --base xyz", 2, "", "--base 'xyz' is no hexadecimal number"},
     {"tool info --progress fast", 2, "", "--progress: fast not in"},
-    {"tool info --sim nonsense", 2, "", "nonsense"},
+    {"tool info --sim tovla", 2, "", "did you mean 'tolva'?"},
     {"tool info --sim tolva,colour=red", 2, "", "colour"},
-    {"tool info --set FlashNonsense=1", 2, "", "--set: unknown setting 'FlashNonsense'"},
+    {"tool info --set FlashTimoutValue=1", 2, "",
+     "--set: unknown setting 'FlashTimoutValue'; did you mean 'FlashTimeoutValue'?"},
+    {"tool info --set flashtimeoutvalue=1e3", 2, "", "FlashTimeoutValue can't be '1e3'; it takes"},
+    {"for n in 0x10 -1 0 1.5 ''; do tool info --set FlashTimeoutValue=$n || exit; done", 2, "",
+     "can't be '0x10'"},
     {"tool info --set FlashEraseEndAddr=xyz", 2, "", "FlashEraseEndAddr can't be 'xyz'"},
     {"tool info --set FlashEraseEndAddr", 2, "", "write KEY=TEXT"},
     {"CORVANE_SET_FlashTimeoutValue=x tool info", 2, "", "variable CORVANE_SET_FlashTimeoutValue:"},
@@ -245,6 +261,10 @@ const Row kFailing[] = {
     // Files.
     {"tool program none.elf", 3, "", "none.elf"},
     {"tool program data.bin", 3, "", "--base"},
+    {"tool program /bin/true", 3, "", "program, 64-bit found, a 32-bit little-endian executable"},
+    {"for f in /dev/zero -; do yes | tool program $f --base 0 || exit; done", 3, "",
+     "/dev/zero: it is larger than 128 MiB, and no image file is"},
+    {"truncate -s 1T data.bin; tool program data.bin --base 0", 3, "", "larger than 128 MiB"},
     {"tool program bad.hex", 3, "", "bad.hex"},
     {"head -c 3000 $ELF > cut.elf; tool program cut.elf", 3, "", "cut.elf"},
     {"tool program small.hex other.srec", 3, "", "other.srec"},
@@ -313,7 +333,7 @@ TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
 /// The first "tool" of the commands, or the tool's path, with --json behind it.
 std::string WithJson(std::string commands) {
     const std::string name =
-        commands.find("timeout") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
+        commands.find("timeout -") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
     return commands.insert(commands.find(name) + name.size(), " --json");
 }
 
@@ -355,7 +375,8 @@ const Row kStories[] = {
      "tool -q --sim-file d checksum; done",
      0, "0xfe9214a8\n0xfe9214a8\n0xfe9214a8\n", ""},
     {"export CORVANE_SIM_FILE=d; tool -q program $ELF\n"
-     "for f in a.bin a.hex a.srec; do tool -q read $f && tool -q verify $f --base 0; done\n"
+     "for f in a.bin a.hex a.srec; do tool -q read $f; done\n"
+     "for f in a.bin@0 a.hex a.srec; do tool -q verify $f; done\n"
      "tool -q read p.bin --range 10-1f && cmp -n 16 -i 0:16 p.bin a.bin && wc -c < p.bin",
      0, "The flash holds the image\nThe flash holds the image\nThe flash holds the image\n16\n",
      ""},

@@ -142,11 +142,13 @@ TEST(Settings, TakeWhatThePluginTakesAndNothingElse) {
         std::vector<const char*> accepted;
         std::vector<const char*> refused;
     } cases[] = {
-        {keys::kReset, {"0", "1", "+1", "0001", "-0"}, {"", "2", "-1", "true", " 1", "10"}},
+        {keys::kReset, {"0", "1"}, {"", "2", "-1", "true", " 1", "10", "+1", "01"}},
         {keys::kVerbose,
-         {"0", "-1", "+7", "2147483647", "-2147483648"},
-         {"", "x", "1.0", " 1", "2147483648", "+"}},
-        {keys::kTimeout, {"30", "30s", "-1"}, {"", "s", "2147483648"}},
+         {"0", "-1", "2147483647", "-2147483648"},
+         {"", "x", "1.0", " 1", "2147483648", "+", "+7"}},
+        {keys::kTimeout,
+         {"30", "1"},
+         {"", "s", "30s", "2147483648", "0x10", "-1", "0", "1.5", "1e3"}},
         {keys::kEraseStart, {"0", "0x3FFFF", "ffffffff"}, {"", "xyz", "12-34", "100000000"}},
         {keys::kEraseType, {"Entire Flash", "By Address Range"}, {"entire flash", "", "x"}},
         {keys::kChecksumValue, {}, {"", "--", "ffff"}},

@@ -160,62 +160,62 @@ struct Segment {
     std::uint64_t offset, address, fileSize;
 };
 
-/// An ELF file with these segments, and `bytes` behind its tables.
-std::string MakeElf(bool wide, bool bigEndian, const std::vector<Segment>& segments,
-                    const std::string& bytes) {
-    std::string elf{0x7F, 'E', 'L', 'F', wide ? '\2' : '\1', bigEndian ? '\2' : '\1', 1};
+/// A 32-bit little-endian ELF file of a type (2: an executable) with these segments, and `bytes`
+/// behind its tables.
+std::string MakeElf(const std::vector<Segment>& segments, const std::string& bytes, int type = 2) {
+    std::string elf{0x7F, 'E', 'L', 'F', 1, 1, 1};
     elf.resize(16);
-    const int word = wide ? 8 : 4;
-    const std::uint64_t headerSize = wide ? 64 : 52;
-    const std::uint64_t entrySize = wide ? 56 : 32;
+    const std::uint64_t headerSize = 52;
+    const std::uint64_t entrySize = 32;
     const auto put = [&](std::uint64_t value, int size) {
-        for (int i = 0; i < size; ++i) {
-            elf += static_cast<char>(value >> 8 * (bigEndian ? size - 1 - i : i));
-        }
+        for (int i = 0; i < size; ++i)
+            elf += static_cast<char>(value >> 8 * i);
     };
-    put(2, 2), put(40, 2), put(1, 4), put(0, word), put(headerSize, word), put(0, word), put(0, 4);
-    put(headerSize, 2), put(entrySize, 2), put(segments.size(), 2), put(0, 6);
-    for (const auto& [type, offset, address, fileSize] : segments) {
-        put(type, 4), put(5, wide ? 4 : 0);
-        put(headerSize + segments.size() * entrySize + offset, word);
-        put(0x20000000, word), put(address, word), put(fileSize, word), put(fileSize + 8, word);
-        put(5, wide ? 0 : 4), put(4, word);
+    put(static_cast<std::uint64_t>(type), 2), put(40, 2), put(1, 4), put(0, 4);
+    put(headerSize, 4), put(0, 4), put(0, 4), put(headerSize, 2), put(entrySize, 2);
+    put(segments.size(), 2), put(0, 6);
+    for (const auto& [kind, offset, address, fileSize] : segments) {
+        put(kind, 4), put(headerSize + segments.size() * entrySize + offset, 4);
+        put(0x20000000, 4), put(address, 4), put(fileSize, 4), put(fileSize + 8, 4);
+        put(5, 4), put(4, 4);
     }
     return elf + bytes;
 }
 
-constexpr bool kBoth[] = {false, true};
-
 TEST(ImageFile, LoadsElfSegmentsWithBytesAtTheirPhysicalAddresses) {
     const std::vector<Segment> segments{
         {1, 0, 0x8000, 3}, {1, 0, 0x20000000, 0}, {6, 0, 0x30, 1}, {1, 3, 0xFFFFFFFF, 1}};
-    for (const bool wide : kBoth) {
-        for (const bool bigEndian : kBoth) {
-            EXPECT_EQ(MakeImage({{0x8000, {'a', 'b', 'c'}}, {0xFFFFFFFF, {'d'}}}),
-                      ParseImage(MakeElf(wide, bigEndian, segments, "abcd"), "f", {}));
-        }
-    }
+    EXPECT_EQ(MakeImage({{0x8000, {'a', 'b', 'c'}}, {0xFFFFFFFF, {'d'}}}),
+              ParseImage(MakeElf(segments, "abcd"), "f", {}));
 }
 
 TEST(ImageFile, RefusesElfFilesThatAreCutOffOrUnfit) {
-    const std::string whole = MakeElf(true, false, {{1, 0, 0x8000, 4}}, "abcd");
-    std::string badEntrySize = whole, noSections = whole;
-    badEntrySize[54] = 40;
-    noSections[40] = 61, noSections[58] = 64, noSections[60] = 1;  // offset, entry size and count
+    const std::vector<Segment> segments{{1, 0, 0x8000, 4}};
+    const std::string whole = MakeElf(segments, "abcd");
+    std::string badEntrySize = whole, noSections = whole, bigEndian = whole;
+    badEntrySize[42] = 40;
+    noSections[32] = 61, noSections[46] = 40, noSections[48] = 1;  // offset, entry size and count
+    bigEndian[5] = 2, bigEndian[16] = 0, bigEndian[17] = 2, bigEndian[23] = 1;
+    bigEndian.replace(28, 20, 20, 0);
+    const std::string expected = " found, a 32-bit little-endian executable expected";
     const std::pair<std::string, std::string> cases[] = {
         {whole.substr(0, 30), "f: ELF header can't be read (invalid ELF file data)"},
-        {whole.substr(0, 100),
-         "f: program header table: 56 bytes expected at offset 64, but the file ends at 100"},
-        {whole.substr(0, 123),
-         "f: segment 0: 4 bytes expected at offset 120, but the file ends at 123"},
-        {badEntrySize, "f: program header table: entries of 40 bytes found, 56 expected"},
+        {whole.substr(0, 70),
+         "f: program header table: 32 bytes expected at offset 52, but the file ends at 70"},
+        {whole.substr(0, 87),
+         "f: segment 0: 4 bytes expected at offset 84, but the file ends at 87"},
+        {badEntrySize, "f: program header table: entries of 40 bytes found, 32 expected"},
         {noSections,
-         "f: section header table: 64 bytes expected at offset 61, but the file ends at 124"},
-        {MakeElf(true, true, {{1, 0, 0x100000000, 1}}, "a"),
-         "f: segment 0: physical address 0x100000000 found, at most 0xFFFFFFFF expected"},
-        {MakeElf(false, true, {{1, 0, 0, 0}}, ""), "f: no bytes to load found (read as elf)"},
-        {MakeElf(false, false, {{1, 0, 8, 2}, {1, 1, 9, 1}, {1, 0, 9, 1}}, "ab"),
+         "f: section header table: 40 bytes expected at offset 61, but the file ends at 88"},
+        {MakeElf({{1, 0, 0, 0}}, ""), "f: no bytes to load found (read as elf)"},
+        {MakeElf({{1, 0, 8, 2}, {1, 1, 9, 1}, {1, 0, 9, 1}}, "ab"),
          "f: segment 2 puts 0x61 at address 0x00000009, where 0x62 stands already"},
+        {MakeElf(segments, "abcd", 1), "f: a relocatable object" + expected},
+        {MakeElf(segments, "abcd", 3),
+         "f: a shared object or a position-independent program" + expected},
+        {MakeElf(segments, "abcd", 4), "f: a core" + expected},
+        {MakeElf(segments, "abcd", 9), "f: a file of type 9" + expected},
+        {bigEndian, "f: an executable, big-endian" + expected},
     };
     for (const auto& [contents, text] : cases)
         EXPECT_EQ(text, Complaint(contents));
@@ -236,8 +236,8 @@ bool RefusedOrSame(const Image& image, const std::string& contents, Format forma
 TEST(ImageFile, NeverTakesADamagedFileForAnother) {
     const Image image = MakeImage({{0xFFF8, Bytes(20, 'Z')}, {0x20000, {1, 2, 3}}});
     const std::pair<Format, std::string> files[] = {
-        {Format::Elf, MakeElf(false, true, {{1, 0, 0xFFF8, 20}, {1, 20, 0x20000, 3}},
-                              std::string(20, 'Z') + "\1\2\3")},
+        {Format::Elf,
+         MakeElf({{1, 0, 0xFFF8, 20}, {1, 20, 0x20000, 3}}, std::string(20, 'Z') + "\1\2\3")},
         {Format::IntelHex, FormatImage(image, Format::IntelHex)},
         {Format::SRecord, FormatImage(image, Format::SRecord)}};
     for (const auto& [format, whole] : files) {
@@ -325,17 +325,18 @@ TEST_F(ImageFiles, AgreeWithOtherTools) {
     };
     for (const auto& [command, image] : cases) {
         ASSERT_EQ(0, std::system(("cd '" + directory_.string() + "' && " + command).c_str()));
-        EXPECT_TRUE(image == ReadImageFile((directory_ / "out").string(), {{}, 0})) << command;
+        EXPECT_TRUE(image == ReadImageFile((directory_ / "out").string(), {{}, 0}).image)
+            << command;
         std::filesystem::remove(directory_ / "out");
     }
 }
 
 TEST_F(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
     const std::string firmware = "/usr/lib/firmware-tomu/toboot";
-    const Image image = ReadImageFile(firmware + ".bin", {{}, 0});
+    const Image image = ReadImageFile(firmware + ".bin", {{}, 0}).image;
     EXPECT_EQ(5664U, image.ByteCount());
-    EXPECT_EQ(image, ReadImageFile(firmware + ".elf", {}));
-    EXPECT_EQ(image, ReadImageFile(firmware + ".ihex", {}));
+    EXPECT_EQ(image, ReadImageFile(firmware + ".elf", {}).image);
+    EXPECT_EQ(image, ReadImageFile(firmware + ".ihex", {}).image);
 }
 
 TEST_F(ImageFiles, SayWhyTheyCannotBeRead) {

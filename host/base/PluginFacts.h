@@ -4,11 +4,13 @@
 
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <chrono>
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace host::plugin {
 
@@ -41,7 +43,17 @@ inline constexpr const char* kOperations[] = {
 };
 
 /// What stands between the names in the list of operations.
-inline constexpr char kOperationSeparator[] = " | ";
+inline constexpr std::string_view kOperationSeparator = " | ";
+
+inline std::vector<std::string> OperationNames(const std::string& joined) {
+    std::vector<std::string> names;
+    for (std::size_t start = 0; start <= joined.size();) {
+        const std::size_t end = std::min(joined.find(kOperationSeparator, start), joined.size());
+        names.push_back(joined.substr(start, end - start));
+        start = end + kOperationSeparator.size();
+    }
+    return names;
+}
 
 /// What ends a step of an operation: the whole text, and the end of the other one.
 inline constexpr char kStepDone[] = "Operation completed successfully.";

@@ -30,12 +30,29 @@ std::uint32_t ParseHexArgument(const std::string& text, const std::string& what)
                               what, text));
 }
 
+namespace {
+
+/// "START+LENGTH".
+AddressRange ParseStartAndLength(const std::string& text, std::size_t plus) {
+    const std::uint64_t first = ParseHexArgument(text.substr(0, plus), "the range's start");
+    const std::uint64_t length = ParseHexArgument(text.substr(plus + 1), "the range's length");
+    if (length == 0 || first + length > std::uint64_t{1} << 32)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("the range '{}' {}", text,
+                                  length == 0 ? "has no bytes" : "ends beyond 0xffffffff"));
+    return {static_cast<std::uint32_t>(first), static_cast<std::uint32_t>(first + length - 1)};
+}
+
+}  // namespace
+
 AddressRange ParseRange(const std::string& text) {
+    if (const auto plus = text.find('+'); plus != std::string::npos)
+        return ParseStartAndLength(text, plus);
     const auto dash = text.find('-');
     if (dash == std::string::npos)
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("'{}' is no address range; write the first and the last address, "
-                                  "as in 0x1000-0x1fff",
+                                  "as in 0x1000-0x1fff, or start and length, as in 0x1000+0x1000",
                                   text));
     const AddressRange range{ParseHexArgument(text.substr(0, dash), "the range's first address"),
                              ParseHexArgument(text.substr(dash + 1), "the range's last address")};

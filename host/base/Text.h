@@ -24,7 +24,8 @@ std::optional<std::uint32_t> HexNumber(const std::string& text);
 /// The same from the command line: a Failure (WrongUsage) that names `what` for any other text.
 std::uint32_t ParseHexArgument(const std::string& text, const std::string& what);
 
-/// "A-B", two hexadecimal addresses. Failure (WrongUsage) for any other text and for A > B.
+/// "A-B", two hexadecimal addresses, or "START+LENGTH". Failure (WrongUsage) for any other text and
+/// for one without bytes.
 AddressRange ParseRange(const std::string& text);
 
 std::string HexText(std::uint32_t value);          ///< "0x3ffff"

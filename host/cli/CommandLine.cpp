@@ -11,6 +11,7 @@
 #include <type_traits>
 
 #include "host/base/Errors.h"
+#include "host/base/Suggestion.h"
 #include "host/cli/Help.h"
 #include "host/cli/ManPage.h"
 #include "host/cli/Words.h"
@@ -115,25 +116,43 @@ struct Parser {
     }
 };
 
+/// What could stand in the place of a word: options, or commands.
+std::vector<std::string> KnownWords(const CommandRows& commands, const std::string& command,
+                                    const std::string& word) {
+    if (!word.starts_with('-'))
+        return command.empty() ? FirstWords(commands) : std::vector<std::string>();
+    std::vector<std::string> known{"--help", "--version", "--man"};
+    const auto add = [&](const std::vector<OptionRow>& rows) {
+        for (const OptionRow& row : rows)
+            if (!row.IsArgument()) known.push_back(SplitNames(row).back());
+    };
+    add(GlobalOptions());
+    for (const CommandRow& row : commands)
+        if (command == row.name) add(row.options);
+    return known;
+}
+
 /// CLI11 speaks in several lines and of subcommands; people want one line and commands.
 std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
-                    const std::string& command) {
-    const bool surplus = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+                    const std::string& command, const std::vector<std::string>& surplus) {
     const auto below = SecondWords(commands, command);
     if (!below.empty()) return fmt::format("{} what? {}", command, fmt::join(below, " or "));
     std::string text = error.what();
     std::replace(text.begin(), text.end(), '\n', ' ');
-    if (surplus && command.empty())
-        return "unknown command or option" + text.substr(text.find(':'));
-    return text;
+    if (dynamic_cast<const CLI::ExtrasError*>(&error) == nullptr || surplus.empty()) return text;
+    return fmt::format("{}: {}{}",
+                       command.empty() ? "unknown command or option" : "not expected here",
+                       fmt::join(surplus, " "),
+                       Suggestion(surplus.front(), KnownWords(commands, command, surplus.front())));
 }
 
 [[noreturn]] void Refuse(const CommandRows& commands, const CLI::ParseError& error,
-                         const std::string& command) {
-    throw Failure(
-        ExitStatus::WrongUsage,
-        fmt::format("{}; 'corvane-flash {}{}--help' shows what there is",
-                    OneLine(commands, error, command), command, command.empty() ? "" : " "));
+                         const CLI::App& app) {
+    const std::string command = CommandWords(app);
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("{}; 'corvane-flash {}{}--help' shows what there is",
+                              OneLine(commands, error, command, app.remaining(true)), command,
+                              command.empty() ? "" : " "));
 }
 
 }  // namespace
@@ -148,7 +167,7 @@ ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string
     } catch (const CLI::CallForVersion& version) {
         return {{}, nullptr, std::string(version.what()) + "\n"};
     } catch (const CLI::ParseError& error) {
-        Refuse(commands, error, CommandWords(parser.app));
+        Refuse(commands, error, parser.app);
     }
     if (parser.man) return {{}, nullptr, ManPage(commands)};
     if (parser.chosen == nullptr)

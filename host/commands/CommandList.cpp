@@ -18,11 +18,17 @@ const CommandRows& AllCommands() {
 namespace commands {
 
 OptionRow RangeOption(const char* help) {
-    return {"--range", "A-B", help, &Options::range};
+    return {"--range", "A-B|A+LENGTH", help, &Options::range};
 }
 
 OptionRow ImagesArgument() {
-    return {"FILE", "", "Image files, joined before use", &Options::files, Offers::Files, {}, true};
+    return {"FILE",
+            "",
+            "Image files, joined before use; raw binary as FILE@ADDRESS; - is standard input",
+            &Options::files,
+            Offers::Files,
+            {},
+            true};
 }
 
 OptionRow FormatOption() {
@@ -35,7 +41,7 @@ OptionRow FormatOption() {
 }
 
 OptionRow BaseOption() {
-    return {"--base", "ADDRESS", "Where a raw binary goes (hexadecimal)", &Options::base};
+    return {"--base", "ADDRESS", "Where the raw binary goes (hexadecimal)", &Options::base};
 }
 
 OptionRow DryRunOption() {

@@ -67,8 +67,8 @@ FilesInUse InputFiles(const Context& context) {
     const Options& options = context.options;
     FilesInUse files;
     for (const std::string& file : options.files)
-        files.Add(file, "an image file");
-    files.Add(options.imageOf.value_or(""), "the image file");
+        files.Add(SplitAddress(file).path, "an image file");
+    files.Add(SplitAddress(options.imageOf.value_or("")).path, "the image file");
     files.Add(options.simFile.value_or(""), "the device file");
     files.Add(options.loader.value_or(""), "the loader");
     files.Add(context.settings.Paths().user, "the settings file");

@@ -9,17 +9,6 @@ namespace host::commands {
 
 namespace {
 
-Json OperationNames(const std::string& joined) {
-    Json names = Json::array();
-    constexpr std::string_view separator = plugin::kOperationSeparator;
-    for (std::size_t start = 0; start <= joined.size();) {
-        const std::size_t end = std::min(joined.find(separator, start), joined.size());
-        names.push_back(joined.substr(start, end - start));
-        start = end + separator.size();
-    }
-    return names;
-}
-
 Outcome Show(Context& context, FlashDevice& device) {
     const DeviceInfo& info = device.Info();
     Reporter& reporter = context.reporter;
@@ -39,7 +28,7 @@ Outcome Show(Context& context, FlashDevice& device) {
                        {"flashBytes", info.flashBytes},
                        {"sectorBytes", info.sectorBytes},
                        {"ramBytes", info.ramBytes},
-                       {"operations", OperationNames(info.operations)},
+                       {"operations", plugin::OperationNames(info.operations)},
                        {"plugin", device.LibraryPath()}}};
 }
 

@@ -3,7 +3,12 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+#include <string>
+#include <vector>
+
 #include "host/base/MacAddress.h"
+#include "host/base/Suggestion.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/RangeOperation.h"
@@ -35,12 +40,6 @@ void RequireMacSetting(const Context& context) {
                               keys::kMacInput, text, objection));
 }
 
-bool IsListed(const std::string& operations, const std::string& name) {
-    const std::string separator = plugin::kOperationSeparator;
-    return (separator + operations + separator).find(separator + name + separator) !=
-           std::string::npos;
-}
-
 void RequireInput(const Context& context, const std::string& name) {
     if (name == plugin::kProgramMac) RequireMacSetting(context);
     for (const unsigned index : {0U, 1U})
@@ -67,11 +66,12 @@ Outcome Run(Context& context) {
         try {
             return RunOn(device, name);
         } catch (const DeviceFailure& failure) {
-            if (IsListed(device.Info().operations, name)) throw;
-            throw DeviceFailure(failure.Status(), failure.what(),
-                                fmt::format("'{}' is none of the plug-in's operations: {}", name,
-                                            device.Info().operations),
-                                failure.Result());
+            const std::vector<std::string> names = plugin::OperationNames(device.Info().operations);
+            if (std::find(names.begin(), names.end(), name) != names.end()) throw;
+            const std::string text =
+                fmt::format("'{}' is none of the plug-in's operations: {}{}", name,
+                            device.Info().operations, Suggestion(name, names));
+            throw DeviceFailure(ExitStatus::WrongUsage, text, text, failure.Result());
         }
     });
 }

@@ -201,7 +201,7 @@ Outcome RunOn(Context& context, FlashDevice& device, LoadedImages images) {
 }
 
 void CheckEraseOption(const Options& options) {
-    if (!options.erase || options.erase->find('-') != std::string::npos) return;
+    if (!options.erase || options.erase->find_first_of("-+") != std::string::npos) return;
     for (const char* word : {"necessary", "none", "all"})
         if (*options.erase == word) return;
     throw Failure(

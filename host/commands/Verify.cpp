@@ -10,7 +10,9 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
+Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& all) {
+    const auto& range = context.options.range;
+    const LoadedImages images = range ? Within(all, device.RangeInFlash(range)) : all;
     RequireFit(device, images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
     const Differences differences = CompareWithFlash(device, images.image);
@@ -36,7 +38,8 @@ CommandRow Verify() {
             "Compare flash with image files",
             "The exit status is 5 when a byte differs.",
             "  corvane-flash verify firmware.elf",
-            {ImagesArgument(), FormatOption(), BaseOption()},
+            {ImagesArgument(), FormatOption(), BaseOption(),
+             RangeOption("Compare only these addresses; default: all of the image")},
             Run};
 }
 

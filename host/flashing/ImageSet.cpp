@@ -5,6 +5,8 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <filesystem>
+#include <system_error>
 
 #include "host/base/Errors.h"
 #include "host/driver/FlashDevice.h"
@@ -29,10 +31,66 @@ std::string LoadedImages::Name() const {
     return origins.empty() || several ? "the images" : origins.front().file;
 }
 
+NamedFile SplitAddress(const std::string& text) {
+    const std::size_t at = text.rfind('@');
+    std::error_code ignored;
+    if (at == std::string::npos || std::filesystem::exists(text, ignored)) return {text, {}};
+    return {text.substr(0, at), ParseHexArgument(text.substr(at + 1), "the address of " + text)};
+}
+
+LoadedImages Within(const LoadedImages& images, const AddressRange& range) {
+    LoadedImages within;
+    for (const image::Section& section : images.image.Sections()) {
+        const std::uint32_t first = std::max(section.address, range.first);
+        const std::uint32_t last = std::min(section.Last(), range.last);
+        if (first > last) continue;
+        const auto begin = section.bytes.begin() + (first - section.address);
+        const auto end = section.bytes.begin() + (last - section.address) + 1;
+        within.image.Add(first, {begin, end}, images.Name());
+    }
+    if (within.image.Empty())
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{}: no bytes in the range {}", images.Name(), RangeText(range)));
+    for (const auto& [file, part] : images.origins)
+        if (part.first <= range.last && range.first <= part.last)
+            within.origins.push_back(
+                {file, {std::max(part.first, range.first), std::min(part.last, range.last)}});
+    return within;
+}
+
+namespace {
+
+/// --base goes with one raw binary: two would lie on each other, and the others have addresses of
+/// their own.
+void RequireOneBase(const std::vector<std::string>& raw) {
+    if (raw.size() == 1) return;
+    throw Failure(ExitStatus::WrongUsage,
+                  raw.empty() ? "--base says where a raw binary goes, and there is none; leave it "
+                                "out, or say --format bin"
+                              : fmt::format("--base is for one raw binary, not for {} and {}; "
+                                            "write FILE@ADDRESS for each",
+                                            raw[0], raw[1]));
+}
+
+}  // namespace
+
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
     LoadedImages images;
-    for (const std::string& path : paths)
-        images.Add(image::ReadImageFile(path, options), path);
+    std::vector<std::string> raw;
+    for (const std::string& text : paths) {
+        const auto [path, address] = SplitAddress(text);
+        const auto [image, format] =
+            image::ReadImageFile(path, {options.format, address ? address : options.base});
+        const bool binary = format == image::Format::Binary;
+        if (address && !binary)
+            throw Failure(ExitStatus::WrongUsage,
+                          fmt::format("{}: the file is no raw binary ({}) and has addresses of its "
+                                      "own; leave the address out, or say --format bin",
+                                      text, image::FormatName(format)));
+        if (!address && binary) raw.push_back(path);
+        images.Add(image, path);
+    }
+    if (options.base) RequireOneBase(raw);
     return images;
 }
 

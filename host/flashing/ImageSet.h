@@ -2,6 +2,8 @@
 
 #pragma once
 
+#include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -32,7 +34,19 @@ struct LoadedImages {
     std::string Name() const;
 };
 
-/// Reads the files and joins them.
+/// A file as the command line names it: "FILE", or "FILE@ADDRESS" for raw binary with a place of
+/// its own. A file whose name has that form is taken as it is.
+struct NamedFile {
+    std::string path;
+    std::optional<std::uint32_t> address;
+};
+NamedFile SplitAddress(const std::string& text);
+
+/// What of the images lies in a range. Failure (WrongUsage) when it is nothing.
+LoadedImages Within(const LoadedImages& images, const AddressRange& range);
+
+/// Reads the files and joins them. Failure (WrongUsage) for an address that isn't that of one raw
+/// binary.
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options);
 
 /// Asks the plug-in about the first and the last byte of every section. Failure (BadFile) names

@@ -7,7 +7,6 @@
 #include <libelf.h>
 
 #include <algorithm>
-#include <limits>
 #include <memory>
 
 #include "host/base/Errors.h"
@@ -25,6 +24,7 @@ class ElfReader {
             Fail("no ELF header found; give an ELF file or the format that this one has");
         }
         if (gelf_getehdr(elf_.get(), &header_) == nullptr) FailInLibrary("ELF header");
+        RequireProgramOfDevice();
     }
 
     Image Read() const {
@@ -44,6 +44,22 @@ class ElfReader {
     static Elf* Open(const std::string& contents) {
         elf_version(EV_CURRENT);
         return elf_memory(const_cast<char*>(contents.data()), contents.size());
+    }
+
+    /// The devices are 32-bit and little-endian, and run what is linked to fixed addresses.
+    void RequireProgramOfDevice() const {
+        const char* const kinds[] = {nullptr, "a relocatable object", "an executable",
+                                     "a shared object or a position-independent program", "a core"};
+        const bool known = header_.e_type > ET_NONE && header_.e_type <= ET_CORE;
+        const std::string kind =
+            known ? kinds[header_.e_type] : fmt::format("a file of type {}", header_.e_type);
+        const bool wide = header_.e_ident[EI_CLASS] != ELFCLASS32;
+        const bool bigEndian = header_.e_ident[EI_DATA] != ELFDATA2LSB;
+        if (!wide && !bigEndian && header_.e_type == ET_EXEC) return;
+        Fail(
+            fmt::format("{}{}{} found, a 32-bit little-endian executable expected; give the "
+                        "program that is linked for the device",
+                        kind, wide ? ", 64-bit" : "", bigEndian ? ", big-endian" : ""));
     }
 
     std::size_t SegmentCount() const {
@@ -82,12 +98,6 @@ class ElfReader {
         }
         if (segment.p_type != PT_LOAD || segment.p_filesz == 0) return;
         RequireInFile(what, segment.p_offset, segment.p_filesz);
-        if (segment.p_paddr > std::numeric_limits<std::uint32_t>::max()) {
-            Fail(
-                fmt::format("{}: physical address 0x{:X} found, at most 0xFFFFFFFF expected; link "
-                            "the program for a 32-bit device",
-                            what, segment.p_paddr));
-        }
         const auto begin = contents_.begin() + static_cast<std::ptrdiff_t>(segment.p_offset);
         image.Add(static_cast<std::uint32_t>(segment.p_paddr),
                   {begin, begin + static_cast<std::ptrdiff_t>(segment.p_filesz)},

@@ -70,12 +70,17 @@ struct ReadOptions {
     std::optional<std::uint32_t> base;  ///< load address of raw binary; the others have their own
 };
 
-/// Reads an image file. The format is told from the contents; raw binary has no mark of its own
-/// and is assumed for a file of no known format only when `options.base` is given. A missing,
-/// unreadable, truncated or contradictory file, and one without any bytes to load, is a Failure
-/// (BadFile) that names the file, the line or segment, and what to do. Asking for raw binary
-/// without a base is a Failure (WrongUsage).
-Image ReadImageFile(const std::string& path, const ReadOptions& options);
+struct ImageFile {
+    Image image;
+    Format format;
+};
+
+/// Reads an image file; "-" is standard input. The format is told from the contents; raw binary has
+/// no mark of its own and is assumed for a file of no known format only when `options.base` is
+/// given. A missing, unreadable, truncated or contradictory file, and one without any bytes to
+/// load, is a Failure (BadFile) that names the file, the line or segment, and what to do. Asking
+/// for raw binary without a base is a Failure (WrongUsage).
+ImageFile ReadImageFile(const std::string& path, const ReadOptions& options);
 
 /// The same from a file's contents; `name` stands for the file in error texts.
 Image ParseImage(const std::string& contents, const std::string& name, const ReadOptions& options);

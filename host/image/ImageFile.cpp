@@ -75,13 +75,15 @@ Image ParseImage(const std::string& contents, const std::string& name, const Rea
     return image;
 }
 
-Image ReadImageFile(const std::string& path, const ReadOptions& options) {
+ImageFile ReadImageFile(const std::string& path, const ReadOptions& options) {
     InputFile file(kImageFile, path);
     const std::string& name = path == "-" ? kStandardInput : path;
+    const Format format =
+        file.Beginning().empty() ? Format::Binary : ChooseFormat(file.Beginning(), name, options);
     // What isn't known to be text or ELF holds no more than the bytes themselves.
-    const bool binary = !file.Beginning().empty() &&
-                        ChooseFormat(file.Beginning(), name, options) == Format::Binary;
-    return ParseImage(file.Contents(binary ? kFlashBytesMax : kImageFile.maxBytes), name, options);
+    const bool binary = format == Format::Binary;
+    const std::string contents = file.Contents(binary ? kFlashBytesMax : kImageFile.maxBytes);
+    return {ParseImage(contents, name, {format, options.base}), format};
 }
 
 }  // namespace host::image

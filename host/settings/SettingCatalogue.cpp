@@ -8,11 +8,12 @@
 
 #include <algorithm>
 #include <charconv>
+#include <limits>
 #include <stdexcept>
-#include <string_view>
 #include <system_error>
 
 #include "host/base/MacAddress.h"
+#include "host/base/Suggestion.h"
 #include "host/base/Text.h"
 #include "host/settings/SettingKeys.h"
 
@@ -71,30 +72,21 @@ const SettingInfo kCatalogue[] = {
     {keys::kChecksumValue, Form::Published, "--", "the last CRC-32"},
 };
 
-template <typename Number>
-bool StartsWithNumber(std::string text, bool whole) {
-    if (text.starts_with('+')) text.erase(0, 1);
-    Number value = 0;
+/// A whole number as people write it, whose every reader agrees on it.
+bool IsDecimal(const std::string& text, std::int32_t least) {
+    std::int32_t value = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-    return error == std::errc() && (!whole || end == text.data() + text.size());
-}
-
-/// Zeros and a last digit, which may be 1 except behind a minus sign.
-bool IsSwitch(std::string_view text) {
-    const bool negative = text.starts_with('-');
-    if (negative || text.starts_with('+')) text.remove_prefix(1);
-    if (!text.ends_with('0') && (negative || !text.ends_with('1'))) return false;
-    return text.find_first_not_of('0') >= text.size() - 1;
+    return error == std::errc() && end == text.data() + text.size() && value >= least;
 }
 
 bool Accepts(const SettingInfo& info, const std::string& text) {
     switch (info.form) {
         case Form::Switch:
-            return IsSwitch(text);
+            return text == "0" || text == "1";
         case Form::Integer:
-            return StartsWithNumber<std::int32_t>(text, true);
+            return IsDecimal(text, std::numeric_limits<std::int32_t>::min());
         case Form::Seconds:
-            return StartsWithNumber<std::int32_t>(text, false);
+            return IsDecimal(text, 1);
         case Form::Hex:
             return HexNumber(text).has_value();
         case Form::Mac:
@@ -114,8 +106,9 @@ std::span<const SettingInfo> SettingCatalogue() {
 }
 
 const SettingInfo* FindSetting(const std::string& key) {
-    const auto found = std::find_if(std::begin(kCatalogue), std::end(kCatalogue),
-                                    [&](const SettingInfo& info) { return key == info.key; });
+    const auto found =
+        std::find_if(std::begin(kCatalogue), std::end(kCatalogue),
+                     [&](const SettingInfo& info) { return EqualButForCase(key, info.key); });
     return found == std::end(kCatalogue) ? nullptr : found;
 }
 
@@ -125,6 +118,14 @@ bool IsOfOneBoard(const std::string& key) {
            std::find(std::begin(inputs), std::end(inputs), key) != std::end(inputs);
 }
 
+std::string UnknownSetting(const std::string& key) {
+    std::vector<std::string> keys;
+    for (const SettingInfo& info : kCatalogue)
+        keys.emplace_back(info.key);
+    return fmt::format("unknown setting '{}'{}; 'corvane-flash settings' lists all keys", key,
+                       Suggestion(key, keys));
+}
+
 std::string AcceptedTexts(const SettingInfo& info) {
     switch (info.form) {
         case Form::Switch:
@@ -132,7 +133,7 @@ std::string AcceptedTexts(const SettingInfo& info) {
         case Form::Integer:
             return "a whole decimal number";
         case Form::Seconds:
-            return "a whole decimal number of seconds";
+            return "a whole decimal number of seconds, at least 1";
         case Form::Hex:
             return "a hexadecimal number up to ffffffff";
         case Form::Mac:

@@ -21,12 +21,15 @@ struct SettingInfo {
 
 std::span<const SettingInfo> SettingCatalogue();
 
-/// The row of a key, or null.
+/// The row of a key in any case of its letters, or null.
 const SettingInfo* FindSetting(const std::string& key);
 
 /// Whether a setting is the MAC address or a register value of one board. Such a text is never
 /// kept, or it would become the input for the next board.
 bool IsOfOneBoard(const std::string& key);
+
+/// What to say of a key that has no row.
+std::string UnknownSetting(const std::string& key);
 
 /// The accepted texts, for people: "0 or 1", "hexadecimal, up to ffffffff".
 std::string AcceptedTexts(const SettingInfo& info);

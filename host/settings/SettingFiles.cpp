@@ -66,14 +66,19 @@ std::string ReadEntry(const std::string& key, const toml::node& node, bool kept)
     const SettingInfo* info = FindSetting(key);
     // The plug-in may keep what this host knows nothing of.
     if (info == nullptr && kept) return node.value_or(std::string());
-    if (info == nullptr)
-        throw std::invalid_argument(
-            fmt::format("unknown setting '{}'; 'corvane-flash settings' lists all keys", key));
+    if (info == nullptr) throw std::invalid_argument(UnknownSetting(key));
     const auto text = TextOf(node, info->form);
     if (!text)
         throw std::invalid_argument(fmt::format("{} must be a text between quotes; it takes {}",
                                                 key, AcceptedTexts(*info)));
     return kept && info->form == SettingForm::Published ? *text : CheckedText(*info, *text);
+}
+
+void AddEntry(SettingTexts& texts, const std::string& key, const toml::node& node, bool kept) {
+    const std::string text = ReadEntry(key, node, kept);
+    const SettingInfo* info = FindSetting(key);
+    if (!texts.emplace(info == nullptr ? key : info->key, text).second)
+        throw std::invalid_argument(fmt::format("{} is there twice; leave one out", key));
 }
 
 }  // namespace
@@ -98,7 +103,7 @@ SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept)
         const toml::table table = toml::parse(Contents(path, mustExist), path);
         for (const auto& [key, node] : table)
             try {
-                texts[std::string(key.str())] = ReadEntry(std::string(key.str()), node, kept);
+                AddEntry(texts, std::string(key.str()), node, kept);
             } catch (const std::invalid_argument& error) {
                 Refuse(path, fmt::format("line {}: {}", node.source().begin.line, error.what()),
                        kept);

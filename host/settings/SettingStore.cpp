@@ -94,9 +94,7 @@ std::string EnvironmentName(const std::string& key) {
 
 const SettingInfo& RequireSetting(const std::string& key, const std::string& where) {
     if (const SettingInfo* info = FindSetting(key)) return *info;
-    throw Failure(ExitStatus::WrongUsage,
-                  fmt::format("{}: unknown setting '{}'; 'corvane-flash settings' lists all keys",
-                              where, key));
+    throw Failure(ExitStatus::WrongUsage, fmt::format("{}: {}", where, UnknownSetting(key)));
 }
 
 std::string RequireText(const SettingInfo& info, const std::string& text,

@@ -4,12 +4,14 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <system_error>
 
 #include "host/base/Errors.h"
 #include "host/base/InputFile.h"
 #include "host/base/OutputFile.h"
+#include "host/base/Suggestion.h"
 #include "target/simulated/Contents.h"
 #include "target/simulated/DeviceOptions.h"
 
@@ -23,6 +25,21 @@ constexpr FileKind kContentsFile{"contents file of the simulated device", ExitSt
 bool IsThere(const std::string& path) {
     std::error_code error;
     return std::filesystem::exists(path, error) || error;
+}
+
+/// The class or option that the first unknown name in an option text probably stands for.
+std::string NearestName(const std::string& text) {
+    const std::vector<std::string>* known = &target::DeviceClassNames();
+    for (std::size_t start = 0; start < text.size();) {
+        const std::size_t end = std::min(text.find(',', start), text.size());
+        const std::string item = text.substr(start, end - start);
+        const std::string name = item.substr(0, item.find('='));
+        if (std::find(known->begin(), known->end(), name) == known->end())
+            return Suggestion(name, *known);
+        known = &target::DeviceOptionNames();
+        start = end + 1;
+    }
+    return {};
 }
 
 std::unique_ptr<target::SimulatedDevice> Open(const TargetOptions& options) {
@@ -41,7 +58,8 @@ SimulatedTarget::SimulatedTarget(const TargetOptions& options, const WaitNotice&
     try {
         device_ = Open(options);
     } catch (const target::OptionError& error) {
-        throw Failure(ExitStatus::WrongUsage, fmt::format("--sim: {}", error.what()));
+        throw Failure(ExitStatus::WrongUsage, fmt::format("--sim: {}{}", error.what(),
+                                                          NearestName(options.sim.value_or(""))));
     } catch (const target::ContentsError& error) {
         throw Failure(ExitStatus::Unreachable,
                       fmt::format("the {} {} can't be used: {}; name another file, or remove it to "

@@ -1,0 +1,16 @@
+// The word that somebody probably meant.
+
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace host {
+
+/// "; did you mean 'program'?" for "porgram"; empty when none of the known words is near.
+std::string Suggestion(const std::string& word, const std::vector<std::string>& known);
+
+/// Whether two words differ in the case of their letters at most.
+bool EqualButForCase(const std::string& one, const std::string& other);
+
+}  // namespace host
