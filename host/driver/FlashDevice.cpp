@@ -52,6 +52,8 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
       host_(loader_, settings, reporter, watch_, ExecutableDirectory()),
       trace_(options.trace),
       library_(options.plugin.value_or("")) {
+    if (target_->Get().SimulatesTime())
+        meter_.SetSimulatedClock([this] { return target_->Get().Now(); });
     if (trace_) {
         tracingHost_.emplace(host_, *trace_);
         pluginTrace_.emplace(*trace_, library_.Handle());
@@ -263,7 +265,7 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
         text = fmt::format("can't reach the target: {}; {}", text, kCheckConnection);
         throw DeviceFailure(ExitStatus::Unreachable, text, text, known);
     }
-    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text, known);
+    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text, state, known);
     const std::string rest = fmt::format("; {}; {}", state, Advice());
     std::string remark = text;
     if (shown && cause.empty())
@@ -273,12 +275,18 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
     throw DeviceFailure(ExitStatus::DeviceFailed, text + rest, remark + rest, known);
 }
 
-void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error, Json known) {
-    std::string remark = fmt::format("the flash isn't blank: {:#x} holds {:#04x}, not 0xff",
-                                     found.address, found.actual);
-    if (watch_.FlashTouched()) remark += "; " + StateOfFlash();
+void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error,
+                                 const std::string& state, Json known) {
+    const bool erased = watch_.Work().erased.BytesIn({found.address, found.address}) != 0;
+    const std::string rest =
+        std::string(erased ? "; it was erased just now, so the cell is worn out or protected"
+                           : "") +
+        (watch_.FlashTouched() ? "; " + state : "");
     known.update({{"blank", false}, {"address", found.address}, {"actual", found.actual}});
-    throw DeviceFailure(ExitStatus::ContentsDiffer, error, remark, known);
+    throw DeviceFailure(ExitStatus::ContentsDiffer, error + rest,
+                        fmt::format("the flash isn't blank: {:#x} holds {:#04x}, not 0xff{}",
+                                    found.address, found.actual, rest),
+                        known);
 }
 
 std::string FlashDevice::State(const RegisterValues& registers) const {
@@ -291,14 +299,24 @@ std::string FlashDevice::State(const RegisterValues& registers) const {
 std::string FlashDevice::StateOfFlash() const {
     const FlashWork& work = watch_.Work();
     if (work.attempted.Empty()) return "the flash is as it was";
-    const std::uint64_t toWrite = meter_.Of(Phase::Program).totalBytes;
-    const std::uint64_t written = work.programmed.Bytes();
-    const std::uint64_t handedOver = work.handedOver.Bytes();
-    if (toWrite != 0 && written == toWrite) return "the image is programmed, but not compared";
+    const PhaseProgress& erase = meter_.Of(Phase::Erase);
+    const PhaseProgress& program = meter_.Of(Phase::Program);
+    AddressSet seen = work.erased;
+    for (const AddressRange& range : work.programmed.Ranges())
+        seen.Add(range);
+    // All that was to be done was done, and nothing else was begun: an erase that failed isn't made
+    // good by what was programmed over it.
+    if (seen == work.attempted && erase.doneBytes >= erase.totalBytes &&
+        program.doneBytes >= program.totalBytes)
+        return program.totalBytes != 0
+                   ? "the image is programmed, but not compared"
+                   : SizeText(work.erased.Bytes()) + " are erased, but not compared";
     std::string text = "the flash is incomplete: " + SizeText(work.erased.Bytes()) + " erased";
-    if (toWrite != 0)
-        text += fmt::format(", {} of {} written", SizeText(written), SizeText(toWrite));
-    if (handedOver > written)
+    if (program.totalBytes != 0)
+        text += fmt::format(", {} of {} written", SizeText(program.doneBytes),
+                            SizeText(program.totalBytes));
+    const std::uint64_t written = work.programmed.Bytes();
+    if (const std::uint64_t handedOver = work.handedOver.Bytes(); handedOver > written)
         text += fmt::format(", {} handed to the loader and not seen to be finished",
                             SizeText(handedOver - written));
     return text + "; run the command again before the device is used";

@@ -132,7 +132,8 @@ class FlashDevice {
     template <typename Action>
     void Call(const std::string& doing, const std::string& traced, Action&& action);
     [[noreturn]] void Fail(const std::string& error, const std::string& doing);
-    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error, Json known);
+    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error,
+                                     const std::string& state, Json known);
     RegisterValues TryUserRegisters();
     std::string State(const RegisterValues& registers) const;
     std::string AwaitLoader();

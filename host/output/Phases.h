@@ -34,6 +34,7 @@ struct PhaseProgress {
     std::uint64_t doneBytes = 0;
     std::uint64_t totalBytes = 0;  ///< 0 until the phase is expected
     double seconds = 0;
+    double simulatedSeconds = 0;  ///< of a target that simulates its time
 
     unsigned Percent() const {
         return totalBytes == 0 ? 0 : static_cast<unsigned>(doneBytes * 100 / totalBytes);

@@ -14,6 +14,7 @@ void WorkMeter::Begin(Phase phase) {
     TakeTime();
     current_ = phase;
     since_ = Clock::now();
+    if (simulatedNow_) simulatedSince_ = simulatedNow_();
     reporter_.Progress(phase, At(phase));
 }
 
@@ -38,6 +39,11 @@ void WorkMeter::TakeTime() {
     const auto now = Clock::now();
     At(*current_).seconds += std::chrono::duration<double>(now - since_).count();
     since_ = now;
+    if (!simulatedNow_) return;
+    const auto simulated = simulatedNow_();
+    At(*current_).simulatedSeconds +=
+        std::chrono::duration<double>(simulated - simulatedSince_).count();
+    simulatedSince_ = simulated;
 }
 
 }  // namespace host

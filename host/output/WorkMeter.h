@@ -5,6 +5,7 @@
 #include <array>
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <optional>
 
 #include "host/output/Phases.h"
@@ -15,6 +16,12 @@ namespace host {
 class WorkMeter {
   public:
     explicit WorkMeter(Reporter& reporter) : reporter_(reporter) {}
+
+    /// The time of a target that simulates it; the phases then have that as well.
+    void SetSimulatedClock(std::function<std::chrono::nanoseconds()> now) {
+        simulatedNow_ = std::move(now);
+    }
+    bool SimulatesTime() const { return simulatedNow_ != nullptr; }
 
     /// Announces work to come, so that its total is known before it starts.
     void Expect(Phase phase, std::uint64_t bytes);
@@ -38,6 +45,8 @@ class WorkMeter {
     std::array<PhaseProgress, kPhaseNames.size()> phases_{};
     std::optional<Phase> current_;
     Clock::time_point since_;
+    std::function<std::chrono::nanoseconds()> simulatedNow_;
+    std::chrono::nanoseconds simulatedSince_{0};
 };
 
 }  // namespace host

@@ -1,0 +1,266 @@
+// What the tool says about a device is compared with what the device holds: for every command that
+// changes it, with each access failing in turn, once and from then on, and with the simulated
+// device's other faults.
+
+#include <fmt/format.h>
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <algorithm>
+#include <array>
+#include <filesystem>
+#include <fstream>
+#include <nlohmann/json.hpp>
+#include <sstream>
+
+#include "host/Tool.h"
+#include "host/targets/SimulatedTarget.h"
+#include "tests/support/VirtualTime.h"
+
+namespace host {
+namespace {
+
+namespace fs = std::filesystem;
+using nlohmann::json;
+using Words = std::vector<std::string>;
+
+constexpr std::uint32_t kFlashBytes = 0x4000;
+constexpr std::uint32_t kSectorBytes = 0x400;
+constexpr std::uint32_t kImageAddress = 0x400;
+constexpr std::uint32_t kImageBytes = 4700;  // three chunks
+constexpr char kDevice[] = "quen,flash=16K";
+
+/// A command with what it may touch and what it leaves when it's done. The flash holds zeros
+/// before, which are neither erased nor in the image.
+struct Work {
+    Words words;
+    std::uint32_t first = 0;  ///< the sectors that it erases
+    std::uint32_t end = 0;
+    bool programs = false;
+    std::array<std::uint32_t, 2> committed = {0xABC, 0xDEF};
+};
+
+const Work kWorks[] = {
+    {{"program", "new.bin", "--base", "400"}, 0x400, 0x1800, true},
+    {{"program", "new.bin", "--base", "400", "--erase", "all", "--blank-check", "--crc"},
+     0,
+     kFlashBytes,
+     true},
+    {{"program", "new.bin", "--base", "400", "--no-verify"}, 0x400, 0x1800, true},
+    {{"erase", "--range", "400-bff"}, 0x400, 0xC00},
+    {{"erase", "--all", "--no-verify"}, 0, kFlashBytes},
+    {{"operation", "Erase", "--set", "FlashEraseType=Entire Flash"}, 0, kFlashBytes},
+    {{"register", "program", "1", "12ab", "--commit"}, 0, 0, false, {0xABC, 0x12AB}},
+    {{"mac", "program", "02-1b-c3-04-05-06", "--commit"}, 0, 0, false, {0xC31B02, 0x060504}},
+    {{"mac", "program", "02-1b-c3-04-05-06"}},
+    {{"operation", "ProgramUserRegister0", "--set", "FlashUserRegister0Input=77", "--set",
+      "FlashUserRegister0Commit=1"},
+     0,
+     0,
+     false,
+     {0x77, 0xDEF}},
+};
+
+struct Contents {
+    std::vector<std::uint8_t> flash = std::vector<std::uint8_t>(kFlashBytes);
+    std::array<std::uint32_t, 2> committed{};  ///< the user registers after a power cycle
+};
+
+/// What one run said.
+struct Said {
+    int status = 0;
+    json end;
+    std::string text;                      ///< what people read
+    std::array<std::uint32_t, 2> written;  ///< what the user registers hold until power goes
+};
+
+std::string Slurp(const std::string& path) {
+    std::ostringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
+}
+
+class Bench {
+  public:
+    Bench() {
+        std::string name = fs::temp_directory_path() / "truth-test-XXXXXX";
+        directory_ = mkdtemp(name.data());
+        fs::current_path(directory_);
+        setenv("XDG_CONFIG_HOME", directory_.c_str(), 1);
+        for (std::uint32_t i = 0; i < kImageBytes; ++i)
+            image_ += static_cast<char>(1 + i % 251);
+        std::ofstream("new.bin").write(image_.data(), kImageBytes);
+        std::ofstream("old.bin") << std::string(kFlashBytes, '\0');
+        Run({"program", "old.bin", "--base", "0"}, "");
+        Run({"register", "program", "0", "abc", "--commit"}, "");
+        Run({"register", "program", "1", "def", "--commit"}, "");
+        device_ = Slurp("device");
+    }
+    ~Bench() {
+        fs::current_path("/");
+        fs::remove_all(directory_);
+    }
+
+    void PutBack() const { std::ofstream("device", std::ios::binary) << device_; }
+
+    Said Run(Words words, const std::string& fault) const {
+        fs::remove("trace");
+        for (const std::string& word :
+             Words{"--json", "--sim", kDevice + fault, "--sim-file", "device", "--plugin",
+                   FLASH_CORVANE_LIBRARY, "--trace", "trace", "--set", "FlashTimeoutValue=2"})
+            words.push_back(word);
+        testing::internal::CaptureStdout();
+        testing::internal::CaptureStderr();
+        Said said{RunTool(words), {}, "", {0xABC, 0xDEF}};
+        said.text = testing::internal::GetCapturedStderr();
+        const std::string lines = testing::internal::GetCapturedStdout();
+        said.end = json::parse(lines.substr(lines.rfind('\n', lines.size() - 2) + 1));
+        std::ifstream trace("trace");
+        for (std::string line; std::getline(trace, line);)
+            for (const std::size_t index : {0U, 1U})
+                if (const auto at = line.find(fmt::format("WriteMemory 0x400fe1e{}", 4 * index));
+                    at != std::string::npos && line.find("-> error") == std::string::npos)
+                    said.written.at(index) = static_cast<std::uint32_t>(
+                        std::stoul(line.substr(line.find("= 0x", at) + 2), nullptr, 16));
+        return said;
+    }
+
+    /// The device as it is without the tool; a cell that is stuck stays so.
+    static Contents Look(const std::string& fault) {
+        TargetOptions options;
+        options.sim = kDevice + (fault.starts_with(",stuck") ? fault : "");
+        options.simFile = "device";
+        SimulatedTarget opened(options, [](const std::string&) {});
+        target::Target& device = opened.Get();
+        Contents contents;
+        device.Halt();
+        device.Read(contents.flash.data(), kFlashBytes, 0, 0, 1);
+        for (const std::uint32_t index : {0U, 1U})
+            device.Read(&contents.committed.at(index), 1, 0x400FE1E0 + 4 * index, 1, 4);
+        return contents;
+    }
+
+    /// Whether flash holds the first bytes of the image.
+    bool HoldsImage(const Contents& now, std::uint64_t bytes = kImageBytes) const {
+        const auto* image = reinterpret_cast<const std::uint8_t*>(image_.data());
+        return std::equal(image, image + std::min<std::uint64_t>(bytes, kImageBytes),
+                          now.flash.begin() + kImageAddress);
+    }
+
+    std::vector<std::string> Lies(const Work& work, const Said& said, const Contents& now) const;
+
+  private:
+    fs::path directory_;
+    std::string image_;
+    std::string device_;
+};
+
+std::uint64_t Bytes(const json& result, const char* phase) {
+    return result.value("/phases"_json_pointer / phase / "bytes", std::uint64_t{0});
+}
+
+/// Every sentence, status and member that isn't true.
+std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
+                                     const Contents& now) const {
+    std::vector<std::string> lies;
+    const auto claim = [&](bool made, bool isTrue, const char* what) {
+        if (made && !isTrue) lies.emplace_back(what);
+    };
+    const auto says = [&](const char* part) { return said.text.find(part) != std::string::npos; };
+    const json& result = said.end["result"];
+    const auto holds = [&](std::uint32_t first, std::uint32_t end, std::uint8_t byte) {
+        return std::all_of(now.flash.begin() + first, now.flash.begin() + end,
+                           [=](std::uint8_t found) { return found == byte; });
+    };
+    const bool flashSame = holds(0, kFlashBytes, 0);
+    const bool erased = holds(work.first, work.end, 0xFF);
+    std::uint64_t newSectors = 0;
+    for (std::uint32_t at = work.first; at < work.end; at += kSectorBytes)
+        newSectors +=
+            std::count(now.flash.begin() + at, now.flash.begin() + at + kSectorBytes, 0) == 0;
+
+    claim(true, holds(0, work.first, 0) && holds(work.end, kFlashBytes, 0), "left the rest alone");
+    claim(said.status == 0 && work.programs, HoldsImage(now), "done: programmed");
+    claim(said.status == 0 && !work.programs, erased, "done: erased");
+    claim(said.status == 0, now.committed == work.committed, "done: committed");
+    claim(said.status >= 2 && said.status <= 4, flashSame, "not begun");
+    claim(says("the flash is as it was"), flashSame, "the flash is as it was");
+    claim(!result.value("flashChanged", true), flashSame, "flashChanged");
+    claim(said.status == 5, !HoldsImage(now) && !erased, "differs");
+    claim(says("the image is programmed") || says("the flash holds the image"), HoldsImage(now),
+          "the image is programmed");
+    claim(says("are erased, but") || says("is blank") || result.value("blank", false), erased,
+          "erased");
+    claim(said.status != 5, newSectors * kSectorBytes >= Bytes(result, "erase"), "bytes erased");
+    claim(said.status != 5 && Bytes(result, "program") > 0,
+          HoldsImage(now, Bytes(result, "program")), "bytes written");
+    claim(said.status == 1 && !flashSame,
+          says("the flash is incomplete") || says("the image is programmed") ||
+              says("are erased, but"),
+          "the state of the flash is told");
+
+    for (const std::size_t index : {0U, 1U}) {
+        const bool changed =
+            now.committed.at(index) != Contents{{}, {0xABC, 0xDEF}}.committed.at(index);
+        claim(says("registers are as they were") || !result.contains("registers"), !changed,
+              "the registers are as they were");
+        if (!result.contains("registers")) continue;
+        const json& entry = result["registers"][index];
+        claim(!entry["value"].is_null(), entry["value"] == said.written.at(index), "value");
+        claim(entry["committed"] == true, now.committed.at(index) == said.written.at(index),
+              "committed");
+        claim(entry["committed"] == false, !changed, "not committed");
+        claim(says("registers are as they were"),
+              said.written.at(index) == (index == 0 ? 0xABC : 0xDEF), "not written");
+    }
+
+    claim(true, said.end["status"] == said.status && said.end["ok"] == (said.status == 0),
+          "the same status");
+    if (said.status == 0) return lies;
+    const std::string error = said.end["error"];
+    for (const char* part : {"the flash is as it was", "registers are as they were", "incomplete",
+                             "the image is programmed", "are erased, but", "couldn't be halted",
+                             "(committed)", "(perhaps committed)", "(not committed)"})
+        claim(true, says(part) == (error.find(part) != std::string::npos), part);
+    return lies;
+}
+
+void Check(const Bench& bench, const Work& work, const std::string& fault, Said& said) {
+    bench.PutBack();
+    said = bench.Run(work.words, fault);
+    for (const std::string& lie : bench.Lies(work, said, Bench::Look(fault)))
+        ADD_FAILURE() << "not true: " << lie << "\n--sim " << kDevice << fault << ' '
+                      << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
+                      << said.text << said.end;
+}
+
+TEST(Truth, HoldsWhateverAccessFails) {
+    const Bench bench;
+    for (const Work& work : kWorks)
+        for (const char* fault : {"fail-access", "fail-from"}) {
+            // A fault that is swallowed doesn't end the sweep; one that comes too late does.
+            int done = 0;
+            for (int access = 1; done < 3 && !testing::Test::HasFailure(); ++access) {
+                Said said;
+                Check(bench, work, fmt::format(",{}={}", fault, access), said);
+                done = said.status == 0 ? done + 1 : 0;
+                EXPECT_TRUE(said.status == 0 || access > 6 || said.status == 4);
+            }
+        }
+}
+
+TEST(Truth, HoldsOfFaultyDevices) {
+    const Bench bench;
+    for (const Work& work : kWorks)
+        for (const char* fault : {"", ",stuck-cell=0x500", ",erase=never", ",loader=hangs",
+                                  ",loader=dead", ",commit=never"}) {
+            // What isn't read back isn't known.
+            const bool compares = work.words.back() != "--no-verify";
+            if (!compares && std::string(fault).starts_with(",stuck")) continue;
+            Said said;
+            Check(bench, work, fault, said);
+        }
+}
+
+}  // namespace
+}  // namespace host
