@@ -36,8 +36,7 @@ void Core::Attach() {
     if (reply && reply->kind == StopReply::Kind::Exited)
         throw ProtocolError(fmt::format(
             "has no running target (\"{}\"); it may have to be told to attach to one", *state));
-    if (state && !reply)
-        throw ProtocolError(fmt::format("answered \"{}\" to \"?\"", Shown(*state)));
+    if (state && !reply) throw ProtocolError(fmt::format(R"(answered "{}" to "?")", Shown(*state)));
     if (reply && reply->signal != kNoSignal) return;
     // No reply, or a stop without a cause: the target probably runs. One that is stopped already
     // may not answer.
@@ -52,7 +51,7 @@ void Core::Resume() {
     if (nonStop_) {
         const std::string reply = connection_.Ask("vCont;c");
         if (reply != "OK")
-            throw ProtocolError(fmt::format("answered \"{}\" to \"vCont;c\"", Shown(reply)));
+            throw ProtocolError(fmt::format(R"(answered "{}" to "vCont;c")", Shown(reply)));
     } else {
         if (!asked_ && OffersContinue(connection_.Ask("vCont?"))) continue_ = "vCont;c";
         asked_ = true;

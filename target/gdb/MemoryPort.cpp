@@ -50,7 +50,7 @@ std::string MemoryPort::Read(std::uint32_t address, std::size_t count) {
         const std::string reply = connection_.Ask(request);
         const auto block = FromHex(reply);
         if (!block || block->size() != size)
-            throw ProtocolError(fmt::format("answered \"{}\" to \"{}\"", Shown(reply), request));
+            throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), request));
         bytes += *block;
         return size;
     });
@@ -97,7 +97,7 @@ bool MemoryPort::TakesBinary(std::uint32_t address) {
 void MemoryPort::RequireOk(const std::string& request) {
     const std::string reply = connection_.Ask(request);
     if (reply != "OK")
-        throw ProtocolError(fmt::format("answered \"{}\" to \"{}\"", Shown(reply), Shown(request)));
+        throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request)));
 }
 
 }  // namespace target::gdb

@@ -95,7 +95,7 @@ void GdbTarget::WriteRegister(unsigned number, std::uint32_t value) {
     const std::string request = fmt::format("P{:x}={}", number, ToHex(RegisterBytes(value)));
     const std::string reply = connection_.Ask(request);
     if (reply != "OK")
-        throw ProtocolError(fmt::format("answered \"{}\" to \"{}\"", Shown(reply), request));
+        throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), request));
 }
 
 std::string GdbTarget::ReadDocument(const std::string& name) {
@@ -108,7 +108,7 @@ std::string GdbTarget::ReadDocument(const std::string& name) {
         const auto piece = ParseDocumentPiece(reply);
         if (!piece)
             throw ProtocolError(
-                fmt::format("answered \"{}\" to \"{}\"", Shown(reply), Shown(request)));
+                fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request)));
         document += piece->bytes;
         if (piece->last) return document;
         if (piece->bytes.empty() || document.size() > kDocumentSizeMax)

@@ -28,7 +28,7 @@ std::string MemoryMapDocument(const std::vector<MemoryRegion>& regions) {
         "Map V1.0//EN\" \"http://sourceware.org/gdb/gdb-memory-map.dtd\">\n<memory-map>\n";
     for (const MemoryRegion& region : regions) {
         const bool flash = region.sectorSizeBytes != 0;
-        text += fmt::format("<memory type=\"{}\" start=\"0x{:x}\" length=\"0x{:x}\"",
+        text += fmt::format(R"(<memory type="{}" start="0x{:x}" length="0x{:x}")",
                             flash ? "flash" : "ram", region.address, region.sizeBytes);
         text += flash ? fmt::format("><property name=\"blocksize\">0x{:x}</property></memory>\n",
                                     region.sectorSizeBytes)

@@ -144,7 +144,8 @@ void Socket::Close() {
     if (IsOpen()) close(std::exchange(descriptor_, -1));
 }
 
-Socket Socket::Connect(const Address& address, Deadline deadline, InterruptCheck interrupted) {
+Socket Socket::Connect(const Address& address, Deadline deadline,
+                       const InterruptCheck& interrupted) {
     const AddressList list = LookUpBefore(deadline, address, interrupted);
     if (list.error != 0) throw SocketError(gai_strerror(list.error));
     int error = 0;

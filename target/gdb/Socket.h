@@ -42,7 +42,8 @@ class Socket {
     Socket& operator=(Socket&& other) noexcept;
 
     /// A connection to the first of the host's addresses that takes one.
-    static Socket Connect(const Address& address, Deadline deadline, InterruptCheck interrupted);
+    static Socket Connect(const Address& address, Deadline deadline,
+                          const InterruptCheck& interrupted);
 
     /// A listening socket. SocketError when the address can't be had.
     static Socket Listen(const Address& address, InterruptCheck interrupted);
