@@ -104,7 +104,7 @@ TEST(Text, ReadsRangesAndNamesWhatIsWrong) {
         {"800-7ff", "2: the range '800-7ff' ends before it starts"},
     };
     for (const auto& [text, expected] : wrong)
-        EXPECT_TRUE(FailureOf([&] { ParseRange(text); }).starts_with(expected)) << text;
+        EXPECT_TRUE(FailureOf([range = text] { ParseRange(range); }).starts_with(expected)) << text;
 }
 
 TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {
