@@ -62,12 +62,15 @@ const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
     }
 }
 
+// People may type a key in any case; to the plug-in another case is another key.
 const char* FlashHost::GetProperty(const char* name) {
     if (std::strcmp(name, keys::kSimulatesTime) == 0) return target_.SimulatesTime() ? "1" : "0";
     bool known = false;
     const char* error = Slot(AfterInterrupt::GoOn, [&] {
         property_ = settings_.Text(name);
-        known = FindSetting(name) != nullptr || !settings_.Kept(name).empty();
+        const SettingInfo* info = FindSetting(name);
+        known =
+            (info != nullptr && std::strcmp(name, info->key) == 0) || !settings_.Kept(name).empty();
     });
     return error == nullptr && known ? property_.c_str() : nullptr;
 }
