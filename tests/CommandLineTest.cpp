@@ -280,6 +280,10 @@ const Row kFailing[] = {
     // Plug-in and target.
     {"tool info --plugin none.so", 4, "", "none.so: cannot open shared object file"},
     {"tool info --plugin broken.so", 4, "", "broken.so"},
+    {"head -c 9000 " CORVANE_FLASH_DIRECTORY
+     "/../lib/libflash_corvane.so > cut.so; tool info --plugin cut.so",
+     4, "", "./cut.so is cut short"},
+    {"mkfifo pipe; tool info --plugin pipe", 4, "", "./pipe is no regular file"},
     {"tool info --plugin $(ldconfig -p | sed -n 's/.* //; /libz\\.so\\.1$/p' | head -1)", 4, "",
      "is no flash plug-in: it exports no CreateFlashDevice2"},
     {"tool info --sim-file data.bin", 4, "", "data.bin"},
