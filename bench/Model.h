@@ -5,15 +5,12 @@
 #include <chrono>
 #include <cstdint>
 
+#include "tests/support/WholeLoads.h"
 #include "tests/support/Workloads.h"
 
 namespace bench {
 
-struct Link {
-    std::uint32_t latencyUs;
-    std::uint32_t bandwidthKB;  ///< thousands of bytes a second
-    std::uint32_t chunkMs;      ///< flash time of a loader chunk
-};
+using test::Link;
 
 struct ModelledTime {
     using Seconds = std::chrono::duration<double>;

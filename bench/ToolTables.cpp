@@ -1,9 +1,11 @@
 // The tables of whole loads.
 
 #include "bench/Measurements.h"
-#include "bench/Tool.h"
+#include "tests/support/WholeLoads.h"
 
 namespace bench {
+
+using namespace test;
 
 Table ToolTable() {
     Table table("tool",

@@ -4,13 +4,13 @@
 #include <fmt/format.h>
 #include <gtest/gtest.h>
 
-#include "bench/Tool.h"
+#include "tests/support/WholeLoads.h"
 
 namespace {
 
 TEST(ToolTime, IsNearTheLimitOnEveryLink) {
-    for (const bench::Link& link : bench::ToolLinks()) {
-        const bench::ToolTime time = bench::MeasureTool(link);
+    for (const test::Link& link : test::ToolLinks()) {
+        const test::ToolTime time = test::MeasureTool(link);
         const auto where = fmt::format("{} us, {} KB/s, {} ms a chunk: {} of {} s, {} looks",
                                        link.latencyUs, link.bandwidthKB, link.chunkMs,
                                        time.waiting.count(), time.limit.count(), time.looks);

@@ -8,9 +8,13 @@
 #include <utility>
 #include <vector>
 
-#include "bench/Model.h"
+namespace test {
 
-namespace bench {
+struct Link {
+    std::uint32_t latencyUs;
+    std::uint32_t bandwidthKB;  ///< thousands of bytes a second
+    std::uint32_t chunkMs;      ///< flash time of a loader chunk
+};
 
 struct ToolTime {
     using Seconds = std::chrono::duration<double>;
@@ -40,4 +44,4 @@ ToolTime::Seconds LoadTime(const Link& link, const char* device, const char* opt
 /// Latencies, bandwidths and chunk times of real probes and devices, all combined.
 std::vector<Link> ToolLinks();
 
-}  // namespace bench
+}  // namespace test

@@ -1,4 +1,4 @@
-#include "bench/Tool.h"
+#include "tests/support/WholeLoads.h"
 
 #include <fmt/format.h>
 
@@ -7,8 +7,10 @@
 #include "host/flashing/Unchanged.h"
 #include "host/targets/LoaderWait.h"
 #include "target/simulated/SimulatedDevice.h"
+#include "tests/support/LeanHost.h"
+#include "tests/support/VirtualTime.h"
 
-namespace bench {
+namespace test {
 
 namespace {
 
@@ -38,16 +40,16 @@ struct Board {
 
     Seconds Now() const { return device.Now(); }
 
-    test::VirtualClock clock;
+    VirtualClock clock;
     target::SimulatedDevice device;
 };
 
 /// A load of erased flash, until the loader is done as far as the host looks.
-void Load(test::LeanHost& host, const char* option, const Sections& sections) {
+void Load(LeanHost& host, const char* option, const Sections& sections) {
     static const std::vector<unsigned char> image(kSizeBytes, 0x5A);
     host.settings["FlashProgramOption"] = option;
     host.settings["FlashTimeoutValue"] = "100000";  // for all waits together
-    test::Plugin plugin(host);
+    Plugin plugin(host);
     plugin->ResetSettings(0);
     for (const auto& [address, sizeBytes] : sections) {
         plugin->WriteDataToFlash(image.data(), address, sizeBytes, 1);
@@ -57,7 +59,7 @@ void Load(test::LeanHost& host, const char* option, const Sections& sections) {
 
 Seconds Polling(const Link& link) {
     Board board(link);
-    test::LeanHost host(board.device);
+    LeanHost host(board.device);
     const Seconds before = board.Now();
     Load(host, kNoErase, {{0, kSizeBytes}});
     return board.Now() - before;
@@ -83,7 +85,7 @@ ToolTime::Seconds LoadTime(const Link& link, const char* device, const char* opt
     Board board(link, device);
     Chunks chunks;
     host::LoaderWait wait(board.device, chunks);
-    test::LeanHost host(wait);
+    LeanHost host(wait);
     const Seconds before = board.Now();
     Load(host, option, sections);
     return board.Now() - before;
@@ -94,7 +96,7 @@ ToolTime MeasureTool(const Link& link) {
     Board board(link);
     Chunks chunks;
     host::LoaderWait wait(board.device, chunks);
-    test::LeanHost host(wait);
+    LeanHost host(wait);
     const Seconds before = board.Now();
     const std::uint64_t accessesBefore = board.device.AccessCount();
     Load(host, kNoErase, {{0, kSizeBytes}});
@@ -121,4 +123,4 @@ std::vector<Link> ToolLinks() {
     return links;
 }
 
-}  // namespace bench
+}  // namespace test
