@@ -7,7 +7,7 @@
 #include <set>
 
 #include "bench/Measurements.h"
-#include "tests/support/Workloads.h"
+#include "bench/support/Workloads.h"
 
 namespace bench {
 

@@ -5,8 +5,8 @@
 #include <chrono>
 #include <cstdint>
 
-#include "tests/support/WholeLoads.h"
-#include "tests/support/Workloads.h"
+#include "bench/support/WholeLoads.h"
+#include "bench/support/Workloads.h"
 
 namespace bench {
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/support/LeanHost.h"
+#include "bench/support/LeanHost.h"
 
 namespace bench {
 

@@ -9,7 +9,7 @@
 
 #include "bench/Measurements.h"
 #include "bench/ReplayHost.h"
-#include "tests/support/Workloads.h"
+#include "bench/support/Workloads.h"
 
 namespace bench {
 

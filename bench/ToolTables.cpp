@@ -1,7 +1,7 @@
 // The tables of whole loads.
 
 #include "bench/Measurements.h"
-#include "tests/support/WholeLoads.h"
+#include "bench/support/WholeLoads.h"
 
 namespace bench {
 

@@ -9,7 +9,7 @@
 #include <fstream>
 #include <sstream>
 
-#include "tests/support/Workloads.h"
+#include "bench/support/Workloads.h"
 
 namespace {
 

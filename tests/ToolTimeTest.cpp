@@ -4,7 +4,7 @@
 #include <fmt/format.h>
 #include <gtest/gtest.h>
 
-#include "tests/support/WholeLoads.h"
+#include "bench/support/WholeLoads.h"
 
 namespace {
 

@@ -1,4 +1,4 @@
-#include "tests/support/LeanHost.h"
+#include "bench/support/LeanHost.h"
 
 #include <cstring>
 #include <numeric>

@@ -1,13 +1,13 @@
-#include "tests/support/WholeLoads.h"
+#include "bench/support/WholeLoads.h"
 
 #include <fmt/format.h>
 
 #include <algorithm>
 
+#include "bench/support/LeanHost.h"
 #include "host/flashing/Unchanged.h"
 #include "host/targets/LoaderWait.h"
 #include "target/simulated/SimulatedDevice.h"
-#include "tests/support/LeanHost.h"
 #include "tests/support/VirtualTime.h"
 
 namespace test {

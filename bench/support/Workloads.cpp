@@ -1,4 +1,4 @@
-#include "tests/support/Workloads.h"
+#include "bench/support/Workloads.h"
 
 #include <fmt/format.h>
 
