@@ -1,4 +1,4 @@
-// See CheckedHost.h.
+// One function for each slot, around which exceptions are caught.
 
 #include "hostcheck/CheckedHost.h"
 
@@ -15,7 +15,7 @@ constexpr std::size_t kMargin = 64;
 
 std::optional<std::string> CheckedHost::Text(const char* text) {
     if (text == nullptr) return std::nullopt;
-    const auto read = ReadableText(text);
+    auto read = ReadableText(text);
     if (!read) throw Breach("a pointer that leads to no NUL-terminated text");
     return read;
 }

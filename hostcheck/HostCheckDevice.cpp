@@ -1,4 +1,4 @@
-// See HostCheckDevice.h. Here is how checks are run and told; the calls are in HostCalls.cpp.
+// Here is how checks are run and told; the calls are in HostCalls.cpp.
 
 #include "hostcheck/HostCheckDevice.h"
 

@@ -1,4 +1,4 @@
-// See ReadableMemory.h. The operating system is asked to copy: it looks before it reads.
+// The operating system is asked to copy: it looks before it reads.
 
 #include "hostcheck/ReadableMemory.h"
 

@@ -1,4 +1,4 @@
-// See SettingForms.h. The conversions are the plug-in's own.
+// The conversions are the plug-in's own.
 
 #include "hostcheck/SettingForms.h"
 
@@ -107,7 +107,7 @@ const char* FormText(Form form) {
             return "\"Necessary Pages Only\", \"Do Not Erase Flash Memory\" or "
                    "\"Use the Erase Options Specified Below\"";
         case Form::Selection:
-            return "\"Entire Flash\" or \"By Address Range\"";
+            return R"("Entire Flash" or "By Address Range")";
     }
     return "";
 }

@@ -1,4 +1,4 @@
-// See Connection.h.
+// Sending, acknowledging, resending once, and giving a connection up.
 
 #include "target/gdb/Connection.h"
 

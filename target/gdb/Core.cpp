@@ -1,4 +1,4 @@
-// See Core.h.
+// Starting and stopping a core, and reading what stopped it.
 
 #include "target/gdb/Core.h"
 

@@ -1,4 +1,4 @@
-// See Frame.h.
+// Checksums, escapes and shortened runs.
 
 #include "target/gdb/Frame.h"
 

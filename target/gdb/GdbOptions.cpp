@@ -1,4 +1,4 @@
-// See GdbOptions.h.
+// The table of options and its parser.
 
 #include "target/gdb/GdbOptions.h"
 

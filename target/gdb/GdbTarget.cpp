@@ -1,4 +1,4 @@
-// See GdbTarget.h.
+// From the calls of a target to requests, and from replies to errors that say what was asked.
 
 #include "target/gdb/GdbTarget.h"
 

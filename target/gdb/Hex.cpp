@@ -1,4 +1,4 @@
-// See Hex.h.
+// Digits to bytes and back.
 
 #include "target/gdb/Hex.h"
 

@@ -1,4 +1,4 @@
-// See LoaderFile.h.
+// The loadable segments of an ELF file, and its entry point.
 
 #include "target/gdb/LoaderFile.h"
 

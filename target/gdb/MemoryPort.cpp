@@ -1,4 +1,4 @@
-// See MemoryPort.h.
+// Cutting transfers into packets, in the form that the server takes.
 
 #include "target/gdb/MemoryPort.h"
 

@@ -1,4 +1,4 @@
-// See Replies.h.
+// One function for each kind of reply.
 
 #include "target/gdb/Replies.h"
 

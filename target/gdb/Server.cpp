@@ -1,4 +1,4 @@
-// See Server.h.
+// Listening, and moving bytes between a socket and a session.
 
 #include "target/gdb/Server.h"
 

@@ -1,4 +1,4 @@
-// See ServerDocuments.h.
+// Writing the two documents.
 
 #include "target/gdb/ServerDocuments.h"
 

@@ -1,4 +1,4 @@
-// See Session.h.
+// One function for each kind of request.
 
 #include "target/gdb/Session.h"
 

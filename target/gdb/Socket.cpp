@@ -1,4 +1,4 @@
-// See Socket.h.
+// Connecting, listening, and waiting with poll.
 
 #include "target/gdb/Socket.h"
 

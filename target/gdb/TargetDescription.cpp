@@ -1,4 +1,4 @@
-// See TargetDescription.h.
+// Following includes, and counting registers that have no number.
 
 #include "target/gdb/TargetDescription.h"
 

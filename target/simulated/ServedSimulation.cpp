@@ -1,4 +1,4 @@
-// See ServedSimulation.h.
+// Memory by the rules of the flash cells, registers kept for their own sake.
 
 #include "target/simulated/ServedSimulation.h"
 
