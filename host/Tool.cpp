@@ -53,6 +53,8 @@ Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
     Outcome outcome;
     try {
         outcome = line.command->run(context);
+    } catch (const FileBusy&) {
+        throw;  // it has been waited for; nobody wants to wait once more
     } catch (...) {
         if (const auto busy = SaveSettings(context)) reporter.Error(busy->what());
         throw;
