@@ -69,7 +69,7 @@ std::string DisplaysAgain(CheckedHost& host) {
     return "";
 }
 
-constexpr Check kChecks[] = {
+constexpr Check kDisplayChecks[] = {
     {Stage::Initialize, "ShowMessage", "null for a text with percent signs and UTF-8",
      TakesAwkwardMessages},
     {Stage::Initialize, "ShowMessage", "null for a text of 300 characters", TakesLongMessages},
@@ -83,7 +83,7 @@ constexpr Check kChecks[] = {
 }  // namespace
 
 std::span<const Check> DisplayChecks() {
-    return kChecks;
+    return kDisplayChecks;
 }
 
 }  // namespace hostcheck

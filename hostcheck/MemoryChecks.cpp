@@ -124,7 +124,7 @@ std::string RefusesUnmappedWrites(CheckedHost& host) {
     });
 }
 
-constexpr Check kChecks[] = {
+constexpr Check kMemoryChecks[] = {
     {Stage::Creation, "ReadMemory", "the identification register at 0x400FE000", ReadsARegister},
     {Stage::Creation, "ReadMemory", "a word of RAM during CreateFlashDevice2", ReadsAWord},
     {Stage::Initialize, "WriteMemory", "the same bytes in all widths, in the order of the buffer",
@@ -142,7 +142,7 @@ constexpr Check kChecks[] = {
 }  // namespace
 
 std::span<const Check> MemoryChecks() {
-    return kChecks;
+    return kMemoryChecks;
 }
 
 }  // namespace hostcheck

@@ -100,7 +100,7 @@ std::string KeepsLongTexts(CheckedHost& host) {
     return "";
 }
 
-constexpr Check kChecks[] = {
+constexpr Check kSettingChecks[] = {
     {Stage::Initialize, "GetProperty", "null for a setting that the host hasn't", UnknownIsNull},
     {Stage::Initialize, "GetProperty", "keys told apart by upper and lower case", CaseMatters},
     {Stage::Initialize, "GetProperty", "a value for each setting that a load needs",
@@ -116,7 +116,7 @@ constexpr Check kChecks[] = {
 }  // namespace
 
 std::span<const Check> SettingChecks() {
-    return kChecks;
+    return kSettingChecks;
 }
 
 }  // namespace hostcheck

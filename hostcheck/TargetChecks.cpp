@@ -95,7 +95,7 @@ std::string LoaderIsIdle(CheckedHost& host) {
     return "";
 }
 
-constexpr Check kChecks[] = {
+constexpr Check kTargetChecks[] = {
     {Stage::Creation, "HaltTarget", "null", Halts},
     {Stage::Creation, "HaltTarget", "null for a target that is halted already", Halts},
     {Stage::Initialize, "Sleep", "a pause of at least 50 ms", SleepsLongEnough},
@@ -114,7 +114,7 @@ constexpr Check kChecks[] = {
 }  // namespace
 
 std::span<const Check> TargetChecks() {
-    return kChecks;
+    return kTargetChecks;
 }
 
 }  // namespace hostcheck

@@ -6,9 +6,6 @@
 #include <cmath>
 #include <nlohmann/json.hpp>
 
-// Compiled once, in Json.cpp, and not in each source that makes a line.
-extern template class nlohmann::basic_json<nlohmann::ordered_map>;
-
 namespace host {
 
 using Json = nlohmann::ordered_json;

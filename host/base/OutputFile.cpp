@@ -135,8 +135,8 @@ void WriteWholeFile(const FileKind& kind, const std::string& path, std::string_v
 }
 
 Descriptor OpenForWriting(const FileKind& kind, const std::string& path) {
-    constexpr std::chrono::milliseconds kLook{50};
-    for (;; std::this_thread::sleep_for(kLook)) {
+    constexpr std::chrono::milliseconds kBetweenLooks{50};
+    for (;; std::this_thread::sleep_for(kBetweenLooks)) {
         ThrowIfInterrupted();
         Descriptor file(
             open(path.c_str(), O_WRONLY | O_CREAT | O_NONBLOCK | O_NOCTTY | O_CLOEXEC, 0666));

@@ -10,7 +10,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunOn(Context& context, FlashDevice& device) {
+Outcome BlankCheckOn(Context& context, FlashDevice& device) {
     const AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
     Outcome outcome = RunOperation(device, plugin::kBlankCheck, Talk::Verbose);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
@@ -18,8 +18,8 @@ Outcome RunOn(Context& context, FlashDevice& device) {
     return outcome;
 }
 
-Outcome Run(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device); });
+Outcome RunBlankCheck(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return BlankCheckOn(context, device); });
 }
 
 }  // namespace
@@ -30,7 +30,7 @@ CommandRow BlankCheck() {
             "The exit status is 5 when a byte isn't 0xFF.",
             "  corvane-flash blank-check --range 0x8000-0x8fff",
             {RangeOption("The addresses to check; default: the whole flash")},
-            Run};
+            RunBlankCheck};
 }
 
 }  // namespace host::commands

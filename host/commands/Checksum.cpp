@@ -66,7 +66,7 @@ Outcome OfFlash(Context& context) {
     });
 }
 
-Outcome Run(Context& context) {
+Outcome RunChecksum(Context& context) {
     return context.options.imageOf ? OfImage(context) : OfFlash(context);
 }
 
@@ -84,7 +84,7 @@ CommandRow Checksum() {
          {"--of", "FILE", "Of this image file, not of the flash", &Options::imageOf, Offers::Files},
          FormatOption(),
          BaseOption()},
-        Run};
+        RunChecksum};
 }
 
 }  // namespace host::commands

@@ -27,7 +27,7 @@ Outcome Answer(Context& context) {
                 {"filesBehind", offered.filesBehind ? Json(*offered.filesBehind) : Json(nullptr)}}};
 }
 
-Outcome Run(Context& context) {
+Outcome RunCompletion(Context& context) {
     const std::string& shell = *context.options.argument;
     if (shell == kWords) return Answer(context);
     std::string text;
@@ -60,7 +60,7 @@ CommandRow Completion() {
             {{"SHELL", "", "bash, zsh, fish, or words", &Options::argument, Offers::Nothing,
               Choices(), true},
              {"WORD", "", "The words of a command line up to the cursor", &Options::words}},
-            Run,
+            RunCompletion,
             false};
 }
 

@@ -11,7 +11,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunOn(Context& context, FlashDevice& device) {
+Outcome EraseOn(Context& context, FlashDevice& device) {
     const AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
     const DeviceInfo& info = device.Info();
     const AddressRange covered = SectorsCovering(range, info.sectorBytes);
@@ -35,14 +35,14 @@ Outcome RunOn(Context& context, FlashDevice& device) {
     return outcome;
 }
 
-Outcome Run(Context& context) {
+Outcome RunErase(Context& context) {
     if (context.options.all == context.options.range.has_value())
         throw Failure(ExitStatus::WrongUsage,
                       context.options.all
                           ? "erase takes --all or --range A-B, not both"
                           : "erase what? --all for the whole flash, or --range A-B for the sectors "
                             "that hold these addresses");
-    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device); });
+    return WithDevice(context, [&](FlashDevice& device) { return EraseOn(context, device); });
 }
 
 }  // namespace
@@ -57,7 +57,7 @@ CommandRow Erase() {
              RangeOption("Erase the sectors that hold these addresses"),
              NoVerifyOption(),
              DryRunOption()},
-            Run};
+            RunErase};
 }
 
 }  // namespace host::commands

@@ -11,7 +11,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome Run(Context& context) {
+Outcome RunHelp(Context& context) {
     const std::string about = fmt::format("{}", fmt::join(context.options.words, " "));
     std::string text = HelpText(AllCommands(), about);
     text.pop_back();  // the last line break comes with the result
@@ -30,7 +30,7 @@ CommandRow Help() {
             "  corvane-flash help sim",
             {{"COMMAND", "", "A command or a topic; default: what there is", &Options::words,
               Offers::HelpWords}},
-            Run,
+            RunHelp,
             false};
 }
 

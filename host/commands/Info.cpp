@@ -9,7 +9,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome Show(Context& context, FlashDevice& device) {
+Outcome ShowInfo(Context& context, FlashDevice& device) {
     const DeviceInfo& info = device.Info();
     Reporter& reporter = context.reporter;
     const std::string flash =
@@ -32,8 +32,8 @@ Outcome Show(Context& context, FlashDevice& device) {
                        {"plugin", device.LibraryPath()}}};
 }
 
-Outcome Run(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+Outcome RunInfo(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return ShowInfo(context, device); });
 }
 
 }  // namespace
@@ -41,7 +41,7 @@ Outcome Run(Context& context) {
 CommandRow Info() {
     return {"info", "Show the device: family, id, flash, sectors, RAM, operations",
             "",     "  corvane-flash --sim quen,flash=512K info",
-            {},     Run};
+            {},     RunInfo};
 }
 
 }  // namespace host::commands

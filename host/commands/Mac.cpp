@@ -18,7 +18,7 @@ std::string ReadMac(FlashDevice& device) {
     return device.Published(keys::kMacInput);
 }
 
-Outcome Show(Context& context, FlashDevice& device) {
+Outcome ShowMac(Context& context, FlashDevice& device) {
     const std::string mac = ReadMac(device);
     context.reporter.Result(mac);
     return {.result = {{"mac", mac}}};
@@ -56,11 +56,11 @@ MacAddress RequireMac(const Options& options) {
     return *mac;
 }
 
-Outcome RunRead(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+Outcome RunReadMac(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return ShowMac(context, device); });
 }
 
-Outcome RunProgram(Context& context) {
+Outcome RunProgramMac(Context& context) {
     const MacAddress mac = RequireMac(context.options);
     return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, mac); });
 }
@@ -68,7 +68,7 @@ Outcome RunProgram(Context& context) {
 }  // namespace
 
 CommandRow MacRead() {
-    return {"mac read", "Read the MAC address", "", "  corvane-flash mac read", {}, RunRead};
+    return {"mac read", "Read the MAC address", "", "  corvane-flash mac read", {}, RunReadMac};
 }
 
 CommandRow MacProgram() {
@@ -86,7 +86,7 @@ CommandRow MacProgram() {
           true},
          CommitOption(),
          {"--force", "", "Program a multicast, all-zeros or all-ones address", &Options::force}},
-        RunProgram};
+        RunProgramMac};
 }
 
 }  // namespace host::commands

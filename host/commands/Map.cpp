@@ -10,7 +10,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images) {
+Outcome MapOn(Context& context, FlashDevice& device, const LoadedImages& images) {
     device.RequireFlash();
     RequireFit(device, images);
     const DeviceInfo& info = device.Info();
@@ -23,9 +23,9 @@ Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& images)
                        {"runs", std::move(runs)}}};
 }
 
-Outcome Run(Context& context) {
+Outcome RunMap(Context& context) {
     const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
-    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
+    return WithDevice(context, [&](FlashDevice& device) { return MapOn(context, device, images); });
 }
 
 }  // namespace
@@ -55,7 +55,7 @@ CommandRow Map() {
             "  corvane-flash map\n"
             "  corvane-flash map firmware.elf",
             {images, FormatOption(), BaseOption()},
-            Run};
+            RunMap};
 }
 
 }  // namespace host::commands

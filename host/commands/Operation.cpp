@@ -46,7 +46,7 @@ void RequireInput(const Context& context, const std::string& name) {
         if (name == plugin::ProgramRegisterOperation(index)) RequireRegisterSetting(context, index);
 }
 
-Outcome RunOn(FlashDevice& device, const std::string& name) {
+Outcome OperationOn(FlashDevice& device, const std::string& name) {
     Outcome outcome = RunOperation(device, name, Talk::Normal);
     const RegisterValues written{device.Registers().Of(0).written,
                                  device.Registers().Of(1).written};
@@ -59,12 +59,12 @@ Outcome RunOn(FlashDevice& device, const std::string& name) {
     return outcome;
 }
 
-Outcome Run(Context& context) {
+Outcome RunNamed(Context& context) {
     const std::string& name = *context.options.argument;
     RequireInput(context, name);
     return WithDevice(context, [&](FlashDevice& device) {
         try {
-            return RunOn(device, name);
+            return OperationOn(device, name);
         } catch (const DeviceFailure& failure) {
             const std::vector<std::string> names = plugin::OperationNames(device.Info().operations);
             if (std::find(names.begin(), names.end(), name) != names.end()) throw;
@@ -91,7 +91,7 @@ CommandRow Operation() {
               Offers::SomeChoices,
               {std::begin(plugin::kOperations), std::end(plugin::kOperations)},
               true}},
-            Run};
+            RunNamed};
 }
 
 }  // namespace host::commands

@@ -174,7 +174,7 @@ void ShowPlan(Context& context, const ProgramPlan& plan, const FlashGeometry& fl
     }
 }
 
-Outcome RunOn(Context& context, FlashDevice& device, LoadedImages images) {
+Outcome ProgramOn(Context& context, FlashDevice& device, LoadedImages images) {
     RequireFit(device, images);
     ApplyOptions(context, device);
     const DeviceInfo& info = device.Info();
@@ -209,11 +209,12 @@ void CheckEraseOption(const Options& options) {
         fmt::format("--erase takes necessary, none, all or a range A-B, not '{}'", *options.erase));
 }
 
-Outcome Run(Context& context) {
+Outcome RunProgram(Context& context) {
     CheckEraseOption(context.options);
     LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
-    return WithDevice(
-        context, [&](FlashDevice& device) { return RunOn(context, device, std::move(images)); });
+    return WithDevice(context, [&](FlashDevice& device) {
+        return ProgramOn(context, device, std::move(images));
+    });
 }
 
 }  // namespace
@@ -248,7 +249,7 @@ CommandRow Program() {
              NoVerifyOption(),
              RunOption("Reset the device afterwards and let it run its program"),
              DryRunOption()},
-            Run};
+            RunProgram};
 }
 
 }  // namespace host::commands

@@ -36,8 +36,8 @@ bool WantsDump(const std::string& path, image::Format format) {
     return path == "-" && format == image::Format::Binary && isatty(STDOUT_FILENO) != 0;
 }
 
-Outcome RunOn(Context& context, FlashDevice& device, const std::string& path,
-              image::Format format) {
+Outcome ReadOn(Context& context, FlashDevice& device, const std::string& path,
+               image::Format format) {
     const AddressRange range = device.RangeInFlash(context.options.range);
     device.Halt();
     device.Meter().Expect(Phase::Read, range.Size());
@@ -60,11 +60,11 @@ Outcome RunOn(Context& context, FlashDevice& device, const std::string& path,
                        {"phases", PhasesJson(device.Meter())}}};
 }
 
-Outcome Run(Context& context) {
+Outcome RunRead(Context& context) {
     const std::string path = context.options.argument.value_or("");
     const image::Format format = CheckTarget(context, path);
     return WithDevice(context,
-                      [&](FlashDevice& device) { return RunOn(context, device, path, format); });
+                      [&](FlashDevice& device) { return ReadOn(context, device, path, format); });
 }
 
 }  // namespace
@@ -91,7 +91,7 @@ CommandRow Read() {
               &Options::format,
               Offers::Nothing,
               {"ihex", "srec", "bin"}}},
-            Run};
+            RunRead};
 }
 
 }  // namespace host::commands

@@ -19,7 +19,7 @@ OptionRow IndexArgument() {
     return {"INDEX", "", "0 or 1", &Options::index, Offers::Nothing, {"0", "1"}, true};
 }
 
-Outcome Show(Context& context, FlashDevice& device) {
+Outcome ShowRegister(Context& context, FlashDevice& device) {
     const unsigned index = Index(context);
     const std::uint32_t value = ReadRegister(device, index);
     context.reporter.Result(fmt::format("{:#010x}", value));
@@ -43,11 +43,11 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     return outcome;
 }
 
-Outcome RunRead(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return Show(context, device); });
+Outcome RunReadRegister(Context& context) {
+    return WithDevice(context, [&](FlashDevice& device) { return ShowRegister(context, device); });
 }
 
-Outcome RunProgram(Context& context) {
+Outcome RunProgramRegister(Context& context) {
     const std::uint32_t value = ParseHexArgument(*context.options.value, "the value");
     return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, value); });
 }
@@ -55,12 +55,8 @@ Outcome RunProgram(Context& context) {
 }  // namespace
 
 CommandRow RegisterRead() {
-    return {"register read",
-            "Read a user register",
-            "",
-            "  corvane-flash register read 0",
-            {IndexArgument()},
-            RunRead};
+    return {"register read",   "Read a user register", "", "  corvane-flash register read 0",
+            {IndexArgument()}, RunReadRegister};
 }
 
 CommandRow RegisterProgram() {
@@ -72,7 +68,7 @@ CommandRow RegisterProgram() {
         {IndexArgument(),
          {"VALUE", "", "Hexadecimal, up to 32 bits", &Options::value, Offers::Nothing, {}, true},
          CommitOption()},
-        RunProgram};
+        RunProgramRegister};
 }
 
 }  // namespace host::commands

@@ -15,7 +15,7 @@ Outcome Reset(Context& context, FlashDevice& device) {
     return {.result = {{"running", context.options.run}}};
 }
 
-Outcome Run(Context& context) {
+Outcome RunReset(Context& context) {
     return WithDevice(context, [&](FlashDevice& device) { return Reset(context, device); });
 }
 
@@ -27,7 +27,7 @@ CommandRow Reset() {
             "",
             "  corvane-flash --gdb :3333 reset --run",
             {RunOption("Let the device run its program afterwards")},
-            Run};
+            RunReset};
 }
 
 }  // namespace host::commands

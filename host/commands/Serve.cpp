@@ -9,7 +9,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome Run(Context& context) {
+Outcome RunServe(Context& context) {
     Reporter& reporter = context.reporter;
     TargetServer server(
         TargetOf(context.options), *context.options.argument,
@@ -32,7 +32,7 @@ CommandRow Serve() {
             "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
             "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
             {{"[HOST:]PORT", "", "Where to listen", &Options::argument, Offers::Nothing, {}, true}},
-            Run,
+            RunServe,
             false};
 }
 

@@ -73,7 +73,7 @@ Outcome Forget(Context& context, const std::string& key) {
     return {.result = ToJson(context, info)};
 }
 
-Outcome Run(Context& context) {
+Outcome RunSettings(Context& context) {
     if (context.options.forget) return Forget(context, *context.options.forget);
     if (!context.options.argument) return List(context);
     const std::string& argument = *context.options.argument;
@@ -99,7 +99,7 @@ CommandRow Settings() {
               &Options::argument, Offers::Settings},
              {"--forget", "KEY", "Drop the kept value of a setting", &Options::forget,
               Offers::Settings}},
-            Run};
+            RunSettings};
 }
 
 }  // namespace host::commands

@@ -10,7 +10,7 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& all) {
+Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all) {
     const auto& range = context.options.range;
     const LoadedImages images = range ? Within(all, device.RangeInFlash(range)) : all;
     RequireFit(device, images);
@@ -26,9 +26,10 @@ Outcome RunOn(Context& context, FlashDevice& device, const LoadedImages& all) {
     return outcome;
 }
 
-Outcome Run(Context& context) {
+Outcome RunVerify(Context& context) {
     const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
-    return WithDevice(context, [&](FlashDevice& device) { return RunOn(context, device, images); });
+    return WithDevice(context,
+                      [&](FlashDevice& device) { return VerifyOn(context, device, images); });
 }
 
 }  // namespace
@@ -40,7 +41,7 @@ CommandRow Verify() {
             "  corvane-flash verify firmware.elf",
             {ImagesArgument(), FormatOption(), BaseOption(),
              RangeOption("Compare only these addresses; default: all of the image")},
-            Run};
+            RunVerify};
 }
 
 }  // namespace host::commands

@@ -17,12 +17,12 @@ namespace {
 constexpr std::size_t kPieceBytes = std::size_t{1024} * 1024;
 
 /// Equal bytes that don't end a range: some are equal by chance.
-constexpr std::uint32_t kGapBytesMax = 15;
+constexpr std::uint32_t kJoinedGapBytesMax = 15;
 
 void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
          std::uint8_t actual) {
     const bool joins =
-        differences.rangeCount != 0 && address - differences.lastAddress <= kGapBytesMax + 1;
+        differences.rangeCount != 0 && address - differences.lastAddress <= kJoinedGapBytesMax + 1;
     if (!joins && ++differences.rangeCount <= Differences::kRangesShown)
         differences.ranges.push_back({{address, address}, expected, actual});
     if (differences.rangeCount <= Differences::kRangesShown)

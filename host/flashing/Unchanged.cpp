@@ -14,7 +14,7 @@ namespace host {
 namespace {
 
 /// So much is read before it is compared; an image can be as large as the flash.
-constexpr std::uint64_t kPieceBytes = std::uint64_t{1} << 20;
+constexpr std::uint64_t kReadBytes = std::uint64_t{1} << 20;
 
 constexpr std::uint64_t kSamplesMin = 2;
 constexpr std::uint64_t kSamplesMax = 8;
@@ -145,7 +145,7 @@ AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
     WorkMeter& meter = device.Meter();
     meter.Expect(Phase::Look, sectors.Bytes());
     meter.Begin(Phase::Look);
-    const std::uint64_t step = std::max<std::uint64_t>(kPieceBytes / sectorBytes, 1) * sectorBytes;
+    const std::uint64_t step = std::max<std::uint64_t>(kReadBytes / sectorBytes, 1) * sectorBytes;
     for (const AddressRange& run : sectors.Ranges()) {
         const std::uint64_t end = std::min(std::uint64_t{run.last} + 1, device.Info().flashBytes);
         for (std::uint64_t first = run.first; first < end; first += step) {

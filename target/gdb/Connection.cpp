@@ -14,10 +14,6 @@ namespace {
 
 using std::chrono::milliseconds;
 
-Deadline After(milliseconds timeout) {
-    return std::chrono::steady_clock::now() + timeout;
-}
-
 bool IsStopReply(const std::string& packet) {
     const auto reply = ParseStopReply(packet);
     return reply && reply->kind == StopReply::Kind::Stopped;

@@ -48,7 +48,7 @@ bool SetDetach(GdbOptions& options, string_view text) {
     return text == "yes" || text == "no";
 }
 
-const GdbOptionRow kRows[] = {
+const GdbOptionRow kOptionRows[] = {
     {"init", "a command", "monitor command to send after connecting; may be repeated", true,
      [](GdbOptions& o, string_view t) {
          o.init.emplace_back(t);
@@ -76,10 +76,10 @@ const GdbOptionRow kRows[] = {
 };
 
 const GdbOptionRow& FindRow(string_view name) {
-    for (const GdbOptionRow& row : kRows)
+    for (const GdbOptionRow& row : kOptionRows)
         if (name == row.name) return row;
     std::string names;
-    for (const GdbOptionRow& row : kRows)
+    for (const GdbOptionRow& row : kOptionRows)
         names += fmt::format("{}{}", names.empty() ? "" : ", ", row.name);
     throw GdbOptionError(fmt::format("there is no option '{}'; there are: {}", name, names));
 }
@@ -87,7 +87,7 @@ const GdbOptionRow& FindRow(string_view name) {
 }  // namespace
 
 std::span<const GdbOptionRow> GdbOptionTable() {
-    return kRows;
+    return kOptionRows;
 }
 
 void ParseGdbOption(const std::string& text, GdbOptions& options) {

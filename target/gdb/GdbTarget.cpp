@@ -20,15 +20,8 @@ using std::chrono::milliseconds;
 // What a program needs before it takes its first order, on a slow clock and through a slow probe.
 constexpr milliseconds kStartUp(20);
 
-std::string WordBytes(std::uint32_t word) {
-    std::string bytes;
-    for (int i = 0; i < 4; ++i)
-        bytes += static_cast<char>(word >> (8 * i));
-    return bytes;
-}
-
 bool HoldsWord(std::string_view bytes, std::uint32_t word) {
-    const std::string wanted = WordBytes(word);
+    const std::string wanted = LittleEndian(word);
     for (std::size_t i = 0; i + 4 <= bytes.size(); i += 4)
         if (bytes.substr(i, 4) == wanted) return true;
     return false;

@@ -35,6 +35,13 @@ std::optional<std::string> FromHex(std::string_view digits) {
     return bytes;
 }
 
+std::string LittleEndian(std::uint32_t value) {
+    std::string bytes;
+    for (int i = 0; i < 4; ++i)
+        bytes += static_cast<char>(value >> (8 * i));
+    return bytes;
+}
+
 std::optional<std::uint64_t> HexNumber(std::string_view digits) {
     if (digits.empty() || digits.size() > 16) return std::nullopt;
     std::uint64_t number = 0;

@@ -18,6 +18,9 @@ std::string ToHex(std::string_view bytes);
 /// The bytes of a whole text of digit pairs, which may be empty; nothing for any other text.
 std::optional<std::string> FromHex(std::string_view digits);
 
+/// The four bytes of a word or register, which the protocol hands on least significant byte first.
+std::string LittleEndian(std::uint32_t value);
+
 /// A number of up to 64 bits, most significant digit first, with nothing around it.
 std::optional<std::uint64_t> HexNumber(std::string_view digits);
 

@@ -24,13 +24,6 @@ std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
     return std::filesystem::path(directory + fileName).lexically_normal().string();
 }
 
-std::string RegisterBytes(std::uint32_t value) {
-    std::string bytes;
-    for (int i = 0; i < 4; ++i)
-        bytes += static_cast<char>(value >> (8 * i));
-    return bytes;
-}
-
 }  // namespace
 
 void GdbTarget::LoadProgram(const std::string& fileName, const std::string& directory) {
@@ -92,7 +85,7 @@ unsigned GdbTarget::RegisterNumber(const std::string& name,
 }
 
 void GdbTarget::WriteRegister(unsigned number, std::uint32_t value) {
-    const std::string request = fmt::format("P{:x}={}", number, ToHex(RegisterBytes(value)));
+    const std::string request = fmt::format("P{:x}={}", number, ToHex(LittleEndian(value)));
     const std::string reply = connection_.Ask(request);
     if (reply != "OK")
         throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), request));

@@ -41,7 +41,7 @@ bool HexData(string_view rest, Request& request) {
     return StoreHex(rest, request.data);
 }
 
-bool Number(string_view rest, Request& request) {
+bool RegisterNumber(string_view rest, Request& request) {
     return Store(rest, request.address);
 }
 
@@ -94,14 +94,14 @@ bool FirstAction(string_view rest, Request& request) {
     return what == 's' || what == 'S' || what == 'c' || what == 'C';
 }
 
-struct Row {
+struct RequestRow {
     string_view name;
     Kind kind;
     bool (*arguments)(string_view rest, Request& request);
 };
 
 // A name that another one begins with stands behind that.
-constexpr Row kRows[] = {
+constexpr RequestRow kRequestRows[] = {
     {"qSupported", Kind::Supported, Anything},
     {"QStartNoAckMode", Kind::StartNoAckMode, Nothing},
     {"qXfer:", Kind::ReadDocument, Document},
@@ -121,7 +121,7 @@ constexpr Row kRows[] = {
     {"?", Kind::WhyStopped, Nothing},
     {"g", Kind::ReadRegisters, Nothing},
     {"G", Kind::WriteRegisters, HexData},
-    {"p", Kind::ReadRegister, Number},
+    {"p", Kind::ReadRegister, RegisterNumber},
     {"P", Kind::WriteRegister, RegisterValue},
     {"m", Kind::ReadMemory, Range},
     {"M", Kind::WriteMemory, HexBytes},
@@ -137,7 +137,7 @@ constexpr Row kRows[] = {
 }  // namespace
 
 Request ParseRequest(string_view payload) {
-    for (const Row& row : kRows) {
+    for (const RequestRow& row : kRequestRows) {
         if (!payload.starts_with(row.name)) continue;
         Request request;
         request.kind = row.kind;

@@ -17,10 +17,6 @@ using std::chrono::milliseconds;
 constexpr milliseconds kBetweenLooks(200);
 constexpr milliseconds kToTakeAReply(10000);
 
-Deadline After(milliseconds time) {
-    return std::chrono::steady_clock::now() + time;
-}
-
 /// One client's bytes, from frames to replies.
 class Client {
   public:

@@ -34,14 +34,7 @@ std::size_t WidthOf(std::uint32_t address, std::size_t sizeBytes) {
     return address % 4 == 0 && sizeBytes % 4 == 0 ? 4 : 1;
 }
 
-std::string RegisterBytes(std::uint32_t value) {
-    std::string bytes;
-    for (int i = 0; i < 4; ++i)
-        bytes += static_cast<char>(value >> (8 * i));
-    return bytes;
-}
-
-std::uint32_t RegisterValue(std::string_view bytes) {
+std::uint32_t LittleEndianValue(std::string_view bytes) {
     std::uint32_t value = 0;
     for (std::size_t i = 4; i-- > 0;)
         value = value << 8 | static_cast<unsigned char>(bytes[i]);
@@ -89,7 +82,7 @@ std::vector<std::string> Session::Carry(const Request& request) {
         case Kind::ReadRegisters: {
             std::string bytes;
             for (const std::uint32_t value : device_.Registers().values)
-                bytes += RegisterBytes(value);
+                bytes += LittleEndian(value);
             return {ToHex(bytes)};
         }
         case Kind::WriteRegisters:
@@ -203,12 +196,12 @@ std::string Session::ReadDocument(const Request& request) const {
 
 std::string Session::ReadRegister(const Request& request) {
     if (request.address >= CoreRegisters::kCount) return kRefused;
-    return ToHex(RegisterBytes(device_.Registers().values[request.address]));
+    return ToHex(LittleEndian(device_.Registers().values[request.address]));
 }
 
 std::string Session::WriteRegister(const Request& request) {
     if (request.address >= CoreRegisters::kCount || request.data.size() != 4) return kRefused;
-    device_.Registers().values[request.address] = RegisterValue(request.data);
+    device_.Registers().values[request.address] = LittleEndianValue(request.data);
     return kOk;
 }
 
@@ -216,7 +209,7 @@ std::string Session::WriteRegisters(const Request& request) {
     CoreRegisters& registers = device_.Registers();
     if (request.data.size() != sizeof registers.values) return kRefused;
     for (std::size_t i = 0; i < CoreRegisters::kCount; ++i)
-        registers.values[i] = RegisterValue(std::string_view(request.data).substr(4 * i, 4));
+        registers.values[i] = LittleEndianValue(std::string_view(request.data).substr(4 * i, 4));
     return kOk;
 }
 

@@ -14,6 +14,10 @@ namespace target::gdb {
 
 using Deadline = std::chrono::steady_clock::time_point;
 
+inline Deadline After(std::chrono::milliseconds time) {
+    return std::chrono::steady_clock::now() + time;
+}
+
 /// Whether the user has had enough; asked about ten times a second during a wait. Empty: never.
 using InterruptCheck = std::function<bool()>;
 

@@ -8,8 +8,6 @@ namespace target {
 
 namespace {
 
-constexpr std::uint32_t kKiB = 1024;
-
 std::uint32_t ClassField(const DeviceOptions& options) {
     return (options.identification >> 16) & 0xFFU;
 }

@@ -14,10 +14,6 @@ namespace {
 
 constexpr std::uint64_t kAddressSpaceBytes = 0x100000000;
 
-// Flash can be reached on either page, everything else on the general one only.
-constexpr int kFlashPage = 0;
-constexpr int kGeneralPage = 1;
-
 constexpr std::uint32_t kRegisterSizeBytes = 4;
 
 // What can be told from the transfer alone.

@@ -15,6 +15,10 @@
 
 namespace target {
 
+// Flash can be reached on either page, everything else on the general one only.
+inline constexpr int kFlashPage = 0;
+inline constexpr int kGeneralPage = 1;
+
 struct Transfer {
     std::size_t count;
     std::uint32_t address;

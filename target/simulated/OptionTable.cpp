@@ -15,8 +15,6 @@ namespace {
 
 using std::string_view;
 
-constexpr std::uint64_t kKiB = 1024;
-
 bool Store(std::optional<std::uint32_t> parsed, std::uint32_t& member) {
     if (parsed) member = *parsed;
     return parsed.has_value();

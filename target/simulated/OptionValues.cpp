@@ -9,11 +9,11 @@
 #include <limits>
 #include <utility>
 
+#include "target/simulated/DeviceOptions.h"
+
 namespace target {
 
 namespace {
-
-constexpr std::uint64_t kKiB = 1024;
 
 std::optional<std::uint64_t> ParseDigits(std::string_view digits, int base) {
     std::uint64_t value = 0;

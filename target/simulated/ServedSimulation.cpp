@@ -14,10 +14,8 @@ namespace target {
 
 namespace {
 
-constexpr int kGeneralPage = 1;
-
-constexpr std::uint32_t kRegisterStart = 0x40000000;
-constexpr std::uint32_t kRegisterSizeBytes = 0x20000000;
+constexpr std::uint32_t kPeripheralStart = 0x40000000;
+constexpr std::uint32_t kPeripheralSizeBytes = 0x20000000;
 
 // Behind its first instruction the loader is in its loop, so that nobody takes it for unstarted.
 constexpr std::uint32_t kInsideLoader = 4;
@@ -38,7 +36,7 @@ std::vector<gdb::MemoryRegion> ServedSimulation::Regions() const {
     const DeviceOptions& options = device_.Options();
     return {{0, options.flashSizeBytes, options.sectorSizeBytes},
             {Ram::kStart, options.ramSizeBytes, 0},
-            {kRegisterStart, kRegisterSizeBytes, 0}};
+            {kPeripheralStart, kPeripheralSizeBytes, 0}};
 }
 
 std::string ServedSimulation::Read(std::uint32_t address, std::size_t sizeBytes,

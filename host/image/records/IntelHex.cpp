@@ -12,6 +12,8 @@
 #include "host/image/records/RecordWriter.h"
 
 namespace host::image {
+
+namespace intelhex {
 namespace {
 
 enum Type : std::uint8_t {
@@ -147,12 +149,14 @@ void AppendRecord(std::string& text, const Record& record) {
 }
 
 }  // namespace
+}  // namespace intelhex
 
 Image ParseIntelHex(const std::string& contents, const std::string& name) {
-    return IntelHexReader(contents, name).Read();
+    return intelhex::IntelHexReader(contents, name).Read();
 }
 
 std::string FormatIntelHex(const Image& image) {
+    using namespace intelhex;
     std::string text;
     std::uint32_t upperHalf = 0;
     ForEachRecord(image, [&](std::uint32_t address, Bytes data) {

@@ -12,6 +12,8 @@
 #include "host/image/records/RecordWriter.h"
 
 namespace host::image {
+
+namespace srecord {
 namespace {
 
 enum class Kind { Header, Data, Reserved, Count, Termination };
@@ -166,13 +168,15 @@ void AppendRecord(std::string& text, const Record& record) {
 }
 
 }  // namespace
+}  // namespace srecord
 
 Image ParseSRecord(const std::string& contents, const std::string& name) {
-    return SRecordReader(contents, name).Read();
+    return srecord::SRecordReader(contents, name).Read();
 }
 
 /// S3 records throughout, between a header and a count as far as a count record can hold it.
 std::string FormatSRecord(const Image& image) {
+    using namespace srecord;
     static constexpr std::array<std::uint8_t, 3> kHeaderText{'H', 'D', 'R'};
     std::string text;
     std::uint32_t count = 0;
