@@ -2,6 +2,7 @@
 
 #include "host/base/Interrupt.h"
 
+#include <chrono>
 #include <csignal>
 
 #include "host/base/Errors.h"
@@ -14,11 +15,27 @@ constexpr int kSignals[] = {SIGINT, SIGTERM, SIGHUP};
 
 volatile std::sig_atomic_t interrupted = 0;
 
-void Remember(int) {
-    interrupted = 1;
-    // Whichever comes next is not caught any more.
+// `timeout`, for one, signals the process and then its whole group: that is one wish, not two.
+constexpr std::chrono::milliseconds kOneWish{200};
+
+sigset_t AllSignals() {
+    sigset_t all;
+    sigemptyset(&all);
     for (const int number : kSignals)
+        sigaddset(&all, number);
+    return all;
+}
+
+void Remember(int number) {
+    static constinit std::chrono::steady_clock::time_point first;
+    const auto now = std::chrono::steady_clock::now();
+    if (interrupted == 0) {
+        first = now;
+        interrupted = 1;
+    } else if (now - first > kOneWish) {
         std::signal(number, SIG_DFL);
+        std::raise(number);
+    }
 }
 
 }  // namespace
@@ -27,6 +44,7 @@ void CatchSignals() {
     struct sigaction action {};
     action.sa_handler = Remember;
     action.sa_flags = SA_RESTART;
+    action.sa_mask = AllSignals();
     for (const int number : kSignals) {
         struct sigaction before {};
         sigaction(number, &action, &before);
@@ -45,10 +63,7 @@ void ThrowIfInterrupted() {
 }
 
 SignalsHeld::SignalsHeld() {
-    sigset_t held;
-    sigemptyset(&held);
-    for (const int number : kSignals)
-        sigaddset(&held, number);
+    const sigset_t held = AllSignals();
     sigprocmask(SIG_BLOCK, &held, &before_);
 }
 

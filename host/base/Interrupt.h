@@ -1,5 +1,5 @@
-// Ctrl-C as a flag. The first one is only remembered, so that the work can end in order; the second
-// one ends the process at once.
+// Ctrl-C as a flag. The first one is only remembered, so that the work can end in order; the next
+// one, unless it comes with the first, ends the process at once.
 
 #pragma once
 
