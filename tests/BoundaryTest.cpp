@@ -8,10 +8,32 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
+#include <cstdlib>
 #include <locale>
+#include <new>
 
 #include "logger/ostrel_logger.h"
 #include "tests/support/RecordingHost.h"
+
+namespace {
+
+int failingAllocation = 0;  // which one from now on fails, the plug-in's included; 0: none
+
+}  // namespace
+
+[[gnu::noinline]] void* operator new(std::size_t size) {
+    void* memory = failingAllocation > 0 && --failingAllocation == 0 ? nullptr : std::malloc(size);
+    if (memory == nullptr) throw std::bad_alloc();
+    return memory;
+}
+
+[[gnu::noinline]] void operator delete(void* memory) noexcept {
+    std::free(memory);
+}
+
+[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept {
+    std::free(memory);
+}
 
 namespace {
 
@@ -144,6 +166,23 @@ TEST(ErrorTexts, StayReadableUntilTheNextFailure) {
     EXPECT_EQ(operations, nullptr);
     EXPECT_EQ(plugin->Initialize(&flash, &operations), nullptr);
     EXPECT_EQ(kept, longText);
+}
+
+TEST(ErrorTexts, ComeOutWhenMemoryHasRunOut) {
+    RecordingHost host;
+    std::vector<std::string> texts;
+    for (int allocation = 1; allocation <= 3; ++allocation) {
+        Plugin plugin(host);
+        OstrelLoggerSetSink(nullptr, nullptr);
+        bool within = false;
+        failingAllocation = allocation;
+        const char* text = plugin->AddressWithinFlash(~0ull, &within);
+        failingAllocation = 0;
+        texts.push_back(TextOf(text));
+    }
+    const std::vector<std::string> expected{"std::bad_alloc", "Out of memory.",
+                                            "Address value is too big"};
+    EXPECT_EQ(texts, expected);
 }
 
 // What a setting's text is taken for shows in what the device is told. The second run is under a

@@ -97,10 +97,12 @@ const Scenario Scenarios[] = {
          Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0x3FFFF, &within));
          Returned(host, "AddressWithinFlash", plugin->AddressWithinFlash(0, -1, &within));
          Returned(host, "special region", plugin->AddressWithinSpecialRegion(0, &within));
-         RecordingHost other("dorna,id=0x801A0000");
-         other.transcribe = true;
-         const Plugin created(other);
-         std::ranges::move(other.transcript, std::back_inserter(host.transcript));
+         for (const char* device : {"dorna,id=0x801A0000", "quen"}) {
+             RecordingHost other(device);
+             other.transcribe = true;
+             const Plugin created(other);
+             std::ranges::move(other.transcript, std::back_inserter(host.transcript));
+         }
      }},
     // What belongs to a load and what is left of it: a reset of the target is allowed once, an
     // erase is made once, and mode 4 keeps it. The clock begins with none of its bits set.
@@ -177,6 +179,8 @@ const Scenario Scenarios[] = {
      "orrin",
      {{"FlashProgramOption", "Do Not Erase Flash Memory"}},
      [](RecordingHost& host, Plugin& plugin) {
+         const std::uint32_t clock2 = ~0U;
+         host.Device().Write(&clock2, 1, 0x400FE070, 1, 4);
          Load(host, plugin, 0x800, 0);
          host.settings.erase("FlashProgramOption");  // no longer asked for
          Load(host, plugin, 0x800, 2048);
@@ -313,7 +317,7 @@ const Scenario Scenarios[] = {
          host.settings["FlashResetSetting"] = "0";
          OnDevices(host, {"quen"}, Reset<1>);
          host.settings["FlashResetSetting"] = "1";
-         OnDevices(host, {"ravik"}, Reset<0>);
+         OnDevices(host, {"ravik", "tolva,id=0x12010000", "tolva,id=0x12010101"}, Reset<0>);
      }},
     {"settings-reset-without-flash",
      "velk",
@@ -367,6 +371,7 @@ const Scenario Scenarios[] = {
      [](RecordingHost& host, Plugin& plugin) {
          Perform(host, plugin, "Test");
          Perform(host, plugin, "erase");
+         Perform(host, plugin, nullptr);
          host.fault = {host.calls + 1, 1, ""};
          Perform(host, plugin, "Test");
          host.fault = {host.calls + 1, 2, "injected failure"};
