@@ -2,33 +2,15 @@
 # of debuggers; the man page and the completions come out of the tool itself, so that they can't
 # drift from its help.
 
-include(CMakePackageConfigHelpers)
 include(cmake/Package.cmake)
 
 # The libraries are loaded, not linked, and the maker's logger has the file name of the stand-in:
 # they stay out of the directory that everybody's libraries lie in.
 set(plugin_directory ${CMAKE_INSTALL_LIBDIR}/flash_corvane)
-set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
-
-# The headers as a target of their own: a host sees the plug-in through them and dlopen alone.
-add_library(corvane_headers INTERFACE)
-set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
-target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
-
-include(cmake/Headers.cmake)
-install(TARGETS flash_corvane flash_host_check ostrel_logger corvane_headers EXPORT FlashCorvane
+include(cmake/Kit.cmake)
+install(TARGETS flash_corvane flash_host_check ostrel_logger EXPORT FlashCorvane
         LIBRARY DESTINATION ${plugin_directory})
 install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
-
-install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake
-        DESTINATION ${package_directory})
-configure_package_config_file(cmake/FlashCorvaneConfig.cmake.in
-        ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake INSTALL_DESTINATION ${package_directory})
-write_basic_package_version_file(
-        ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake COMPATIBILITY SameMajorVersion)
-install(FILES ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake
-              ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake
-        DESTINATION ${package_directory})
 
 # corvane_generate(FILE ARGUMENT...): writes what the tool prints to generated/FILE.
 set(generated ${PROJECT_BINARY_DIR}/generated)
@@ -55,10 +37,8 @@ install(FILES ${generated}/corvane-flash.zsh RENAME _corvane-flash
         DESTINATION ${data}/zsh/vendor-completions)
 install(FILES ${generated}/corvane-flash.fish DESTINATION ${data}/fish/vendor_completions.d)
 install(FILES ${generated}/corvane-flash.1.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
-install(FILES README.md CHANGELOG.md DESTINATION ${data}/doc/corvane-flash)
-install(DIRECTORY docs/ DESTINATION ${data}/doc/corvane-flash FILES_MATCHING PATTERN *.md)
-install(DIRECTORY examples/minimal-host examples/c-host
-        DESTINATION ${data}/doc/corvane-flash/examples)
+install(FILES ${documents} DESTINATION ${data}/doc/corvane-flash)
+install(DIRECTORY docs examples DESTINATION ${data}/doc/corvane-flash)
 
 # All that `cmake --install` needs, without the tests.
 add_custom_target(kit ALL DEPENDS flash_corvane flash_host_check ostrel_logger corvane-flash

@@ -7,7 +7,7 @@
  * function takes the object as its first argument. A host makes such an object by putting a
  * CorvaneHost first in a structure of its own:
  *
- *     struct MyHost { CorvaneHost interface; int mine; };
+ *     struct MyHost { CorvaneHost base; int mine; };
  *     static const char* FLASH_CORVANE_CALL Halt(CorvaneHost* host) {
  *         struct MyHost* self = (struct MyHost*)host;
  *         ...
@@ -15,7 +15,7 @@
  *     static const CorvaneHostSlots slots = { .HaltTarget = Halt, ... };
  *     struct MyHost host = { { &slots }, 0 };
  *
- * and hands &host.interface to CreateFlashDevice2. Every slot of the table has to be filled but
+ * and hands &host.base to CreateFlashDevice2. Every slot of the table has to be filled but
  * the reserved ones, which are never called.
  *
  * This holds for the Itanium and for the Microsoft C++ ABI, which give the slots the same order.
@@ -81,6 +81,7 @@ struct CorvaneHostSlots {
     /* 7 */ const char*(FLASH_CORVANE_CALL* ResetTarget)(CorvaneHost* host, bool flag);
     /* 8 */ const char*(FLASH_CORVANE_CALL* Reserved8)(CorvaneHost* host);
     /* 9 */ const char*(FLASH_CORVANE_CALL* Reserved9)(CorvaneHost* host);
+    /* One call reads at most 32752 bytes and writes at most 2048; the target may be running. */
     /* 10 */ const char*(FLASH_CORVANE_CALL* ReadMemory)(CorvaneHost* host, void* buffer,
                                                          size_t count, uint64_t address,
                                                          int16_t page, size_t width);
@@ -107,8 +108,9 @@ typedef struct CorvaneDevice {
     const CorvaneDeviceSlots* slots;
 } CorvaneDevice;
 
-/* Each returns null for success or an error text, Destroy excepted. The overloads of the C++
- * interface have names of their own here. */
+/* Each returns null for success or an error text, Destroy excepted. WriteDataToFlash,
+ * PerformOperation and ResetSettings also return null after a failure that they have shown through
+ * ShowError. The overloads of the C++ interface have names of their own here. */
 struct CorvaneDeviceSlots {
     /* 0 */ const char*(FLASH_CORVANE_CALL* Initialize)(CorvaneDevice* device, bool* flashAvailable,
                                                         const char** operations);

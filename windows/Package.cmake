@@ -1,9 +1,10 @@
 # The archive for makers of debuggers on Windows, made by script/package windows: the libraries, the
-# headers and the documents.
+# headers with their CMake package, and the documents.
 
-include(cmake/Headers.cmake)
-install(TARGETS flash_corvane flash_host_check ostrel_logger RUNTIME DESTINATION bin)
-install(FILES README.md CHANGELOG.md DESTINATION .)
+include(cmake/Kit.cmake)
+install(TARGETS flash_corvane flash_host_check ostrel_logger EXPORT FlashCorvane
+        RUNTIME DESTINATION bin)
+install(FILES ${documents} DESTINATION .)
 install(DIRECTORY docs examples DESTINATION .)
 
 set(CPACK_GENERATOR ZIP)

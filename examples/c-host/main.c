@@ -6,12 +6,17 @@
  * A real host has its debug probe in the place of memory, Move and the four functions behind it.
  */
 
-#include <dlfcn.h>
 #include <flash_corvane/flash_corvane.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
 #include <time.h>
+
+#ifdef _WIN32
+#include <windows.h>
+#else
+#include <dlfcn.h>
+#endif
 
 enum { FlashSize = 0x10000, SectorSize = 0x400, RamSize = 0x4000, RegisterCount = 64 };
 
@@ -25,7 +30,7 @@ struct Setting {
 };
 
 struct Host {
-    CorvaneHost interface; /* comes first, so that the two pointers are the same */
+    CorvaneHost base; /* comes first, so that the two pointers are the same */
     unsigned char flash[FlashSize];
     unsigned char ram[RamSize];
     struct {
@@ -134,7 +139,10 @@ static const char* FLASH_CORVANE_CALL WriteMemory(CorvaneHost* host, const void*
 
 static const char* FLASH_CORVANE_CALL LoadProgram(CorvaneHost* host, const char* fileName,
                                                   const char* second, const char* directory) {
-    (void)host, (void)fileName, (void)second, (void)directory;
+    /* The loader must not find a chunk in the RAM that nobody has handed over. */
+    memset(Self(host)->ram + 0x100C, 0, 4);
+    memset(Self(host)->ram + 0x101C, 0, 4);
+    (void)fileName, (void)second, (void)directory;
     return NULL;
 }
 static const char* FLASH_CORVANE_CALL RunTarget(CorvaneHost* host) {
@@ -181,11 +189,15 @@ static const char* FLASH_CORVANE_CALL GetDirectory(CorvaneHost* host) {
     (void)host;
     return "./";
 }
-static const char* FLASH_CORVANE_CALL Sleep(CorvaneHost* host, uint32_t milliseconds) {
-    struct timespec left = {milliseconds / 1000, milliseconds % 1000 * 1000000L};
+static const char* FLASH_CORVANE_CALL Pause(CorvaneHost* host, uint32_t milliseconds) {
     (void)host;
+#ifdef _WIN32
+    Sleep(milliseconds + 16); /* it may wake a tick of the clock early */
+#else
+    struct timespec left = {milliseconds / 1000, milliseconds % 1000 * 1000000L};
     while (nanosleep(&left, &left) != 0) {
     }
+#endif
     return NULL;
 }
 
@@ -205,7 +217,7 @@ static const CorvaneHostSlots slots = {
     .ShowError = ShowError,
     .ShowMessage = ShowMessage,
     .GetDirectory = GetDirectory,
-    .Sleep = Sleep,
+    .Sleep = Pause,
 };
 
 static struct Host* NewHost(void) {
@@ -219,7 +231,7 @@ static struct Host* NewHost(void) {
     };
     struct Host* self = calloc(1, sizeof *self);
     if (self == NULL) Fail("starting", "out of memory");
-    self->interface.slots = &slots;
+    self->base.slots = &slots;
     memcpy(self->settings, settings, sizeof settings);
     *Register(self, 0x400FE000) = 0x000A0000; /* class field 10, Dorna */
     *Register(self, 0x400FDFC0) = 31;         /* flash: (31 + 1) * 2 KiB, in sectors of 1 KiB */
@@ -246,18 +258,49 @@ static void Program(struct Host* host, CorvaneDevice* device) {
         Fail("comparing", "flash differs from what was programmed");
 }
 
-int main(int argc, char** argv) {
-    void* library = dlopen(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
+/* Loading the plug-in. The logger is found beside it. */
+
+#ifdef _WIN32
+static void* Load(const char* path) {
+    char full[MAX_PATH] = ""; /* absolute and with backslashes, or the logger isn't found */
+    void* library = NULL;
+    GetFullPathNameA(path, sizeof full, full, NULL);
+    library = LoadLibraryExA(full, NULL, LOAD_WITH_ALTERED_SEARCH_PATH);
+    if (library == NULL) Fail("can't load", path);
+    return library;
+}
+static CorvaneCreateFlashDevice2 Exported(void* library) {
+    return (CorvaneCreateFlashDevice2)(void*)GetProcAddress(library, "CreateFlashDevice2");
+}
+static void Unload(void* library) {
+    FreeLibrary(library);
+}
+#else
+static void* Load(const char* path) {
+    void* library = dlopen(path, RTLD_NOW | RTLD_LOCAL);
+    if (library == NULL) Fail("loading", dlerror());
+    return library;
+}
+static CorvaneCreateFlashDevice2 Exported(void* library) {
     CorvaneCreateFlashDevice2 create = NULL;
+    *(void**)&create = dlsym(library, "CreateFlashDevice2");
+    return create;
+}
+static void Unload(void* library) {
+    dlclose(library);
+}
+#endif
+
+int main(int argc, char** argv) {
+    void* library = Load(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY);
+    const CorvaneCreateFlashDevice2 create = Exported(library);
     struct Host* host = NewHost();
     CorvaneDevice* device = NULL;
     bool flashAvailable = false;
     const char* operations = NULL;
-    if (library == NULL) Fail("loading", dlerror());
-    *(void**)&create = dlsym(library, "CreateFlashDevice2");
-    if (create == NULL) Fail("loading", dlerror());
+    if (create == NULL) Fail("loading", "the library exports no CreateFlashDevice2");
 
-    Check("creating", create("", "", "", &host->interface, &device));
+    Check("creating", create("", "", "", &host->base, &device));
     Check("initialising", device->slots->Initialize(device, &flashAvailable, &operations));
     printf("%s, %s\n", Find(host, "DeviceInfoFamily")->value,
            Find(host, "DeviceInfoFlashSize")->value);
@@ -267,7 +310,7 @@ int main(int argc, char** argv) {
         Program(host, device);
     device->slots->Destroy(device);
     if (host->errors != 0) Fail("working", "the plug-in has shown an error, see above");
-    dlclose(library);
+    Unload(library);
     free(host);
     return 0;
 }

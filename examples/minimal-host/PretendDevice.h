@@ -21,7 +21,7 @@ class PretendDevice {
 
     bool Write(const void* buffer, std::uint32_t address, std::size_t bytes) {
         void* memory = At(address, bytes);
-        if (memory == nullptr || memory == flash_.data() + address) return false;
+        if (memory == nullptr || address < flash_.size()) return false;
         std::memcpy(memory, buffer, bytes);
         EraseIfCommanded();
         if (running_) ServeLoader();
@@ -42,9 +42,10 @@ class PretendDevice {
 
     // Flash from 0, RAM from 0x20000000; every other word address is a register.
     void* At(std::uint32_t address, std::size_t bytes) {
-        if (address + bytes <= flash_.size()) return flash_.data() + address;
+        if (address < flash_.size() && bytes <= flash_.size() - address)
+            return flash_.data() + address;
         const std::uint32_t offset = address - RamStart;
-        if (address >= RamStart && offset + bytes <= ram_.size()) return ram_.data() + offset;
+        if (offset < ram_.size() && bytes <= ram_.size() - offset) return ram_.data() + offset;
         return bytes == 4 ? &registers_[address] : nullptr;
     }
 

@@ -3,10 +3,9 @@
 //
 //     minimal-host [LIBRARY [OPERATION]]
 //
-// To make a host of your own, put your debug
-// probe in the place of PretendDevice and your user interface in the place of printf.
+// To make a host of your own, put your debug probe in the place of PretendDevice and your user
+// interface in the place of printf.
 
-#include <dlfcn.h>
 #include <flash_corvane/IFlashDevice2.h>
 #include <flash_corvane/IFlashHost.h>
 
@@ -19,6 +18,12 @@
 #include <thread>
 
 #include "PretendDevice.h"
+
+#ifdef _WIN32
+#include <windows.h>
+#else
+#include <dlfcn.h>
+#endif
 
 // Every slot answers null for success or an error text. Exceptions must not leave a slot.
 class MinimalHost final : public IFlashHost {
@@ -33,9 +38,14 @@ class MinimalHost final : public IFlashHost {
         return nullptr;
     }
 
-    // A real host loads directory + fileName into the target here, and starts it in RunTarget.
+    // A real host loads directory + fileName into the target here, and starts it in RunTarget. The
+    // loader must not find a chunk in the RAM that nobody has handed over.
     const char* LoadProgram(const char*, const char*, const char*) override {
-        return AwaitLoader();
+        if (const char* error = AwaitLoader()) return error;
+        const uint32_t idle = 0;
+        for (const uint32_t statusWord : StatusWords)
+            if (!device_.Write(&idle, statusWord, sizeof idle)) return "can't write a status word";
+        return nullptr;
     }
     const char* RunTarget() override {
         device_.Run();
@@ -94,13 +104,15 @@ class MinimalHost final : public IFlashHost {
     const std::string& Setting(const std::string& name) const { return settings_.at(name); }
 
   private:
+    static constexpr uint32_t StatusWords[] = {0x2000100C, 0x2000101C};
+
     // The plug-in doesn't wait for the last chunk, and a halt would lose it. So wait until no
     // status word says "to do", but only if a loader was started: the words are arbitrary before.
     const char* AwaitLoader() {
         using Clock = std::chrono::steady_clock;
         const auto until =
             Clock::now() + std::chrono::seconds(std::stoi(settings_["FlashTimeoutValue"]));
-        for (const uint32_t statusWord : {0x2000100C, 0x2000101C})
+        for (const uint32_t statusWord : StatusWords)
             for (uint32_t status = 0; loaderRuns_; Sleep(5)) {
                 if (!device_.Read(&status, statusWord, sizeof status))
                     return "can't read a status word";
@@ -176,27 +188,61 @@ static void UseDevice(MinimalHost& host, IFlashDevice2& device, const char* oper
         ProgramAndReadBack(host, device);
 }
 
+// The plug-in's library. Its logger is found beside it.
+class Library {
+  public:
+#ifdef _WIN32
+    explicit Library(const char* path) {
+        char full[MAX_PATH] = "";  // absolute and with backslashes, or the logger isn't found
+        GetFullPathNameA(path, sizeof full, full, nullptr);
+        handle_ = LoadLibraryExA(full, nullptr, LOAD_WITH_ALTERED_SEARCH_PATH);
+        if (handle_ == nullptr) throw std::runtime_error(std::string("can't load ") + path);
+    }
+    ~Library() {
+        FreeLibrary(handle_);
+    }
+    void* Find(const char* name) const {
+        return reinterpret_cast<void*>(GetProcAddress(handle_, name));
+    }
+
+  private:
+    HMODULE handle_;
+#else
+    explicit Library(const char* path) : handle_(dlopen(path, RTLD_NOW | RTLD_LOCAL)) {
+        if (handle_ == nullptr) throw std::runtime_error(dlerror());
+    }
+    ~Library() {
+        dlclose(handle_);
+    }
+    void* Find(const char* name) const {
+        return dlsym(handle_, name);
+    }
+
+  private:
+    void* handle_;
+#endif
+    Library(const Library&) = delete;
+};
+
 // Only Destroy ends a device, and it must have run before the library is unloaded.
 struct Destroyer {
     void operator()(IFlashDevice2* device) const { device->Destroy(); }
 };
 using Device = std::unique_ptr<IFlashDevice2, Destroyer>;
 
-static Device CreateDevice(void* library, MinimalHost& host) {
+static Device CreateDevice(const Library& library, MinimalHost& host) {
     const auto create =
-        reinterpret_cast<CreateFlashDevice2Function>(dlsym(library, "CreateFlashDevice2"));
-    if (create == nullptr) throw std::runtime_error(dlerror());
+        reinterpret_cast<CreateFlashDevice2Function>(library.Find("CreateFlashDevice2"));
+    if (create == nullptr) throw std::runtime_error("the library has no CreateFlashDevice2");
     IFlashDevice2* device = nullptr;
     Check("creating the device", create("", "", "", &host, &device));
     return Device(device);
 }
 
 int main(int argc, char** argv) try {
-    void* library = dlopen(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY, RTLD_NOW | RTLD_LOCAL);
-    if (library == nullptr) throw std::runtime_error(dlerror());
+    const Library library(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY);
     MinimalHost host;
     UseDevice(host, *CreateDevice(library, host), argc > 2 ? argv[2] : nullptr);
-    dlclose(library);
 } catch (const std::exception& error) {
     std::fprintf(stderr, "minimal-host: %s\n", error.what());
     return 1;

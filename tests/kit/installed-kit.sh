@@ -20,11 +20,9 @@ for example in "${examples[@]}"; do
         -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_{C,CXX}_FLAGS="$flags" >/dev/null
     cmake --build "$trial/$example" >/dev/null
 done
-diff "$here/minimal-host.txt" <("$trial/minimal-host/minimal-host")
-[ -n "${2:-}" ] || diff - <("$trial/c-host/c-host") <<'END'
-Dorna, 64KB
-progress: Performing Blank Check
-END
+for example in "${examples[@]}"; do
+    diff "$here/$example.txt" <("$trial/$example/$example")
+done
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 [ "$found" -ef "$kit"/lib*/flash_corvane/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
@@ -44,6 +42,10 @@ grep 'expected' "$trial/told" && exit 1
 [ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
 
 share=$kit/share
+cd "$share/doc/corvane-flash"
+grep -oE '\]\([^):#]+[)#]' -r --include='*.md' . | tr -d ']()#' | while IFS=: read -r document link; do
+    [ -f "$(dirname "$document")/$link" ] || { echo "$document links to $link"; exit 1; }
+done
 bash -n "$share/bash-completion/completions/corvane-flash"
 zsh -n "$share/zsh/vendor-completions/_corvane-flash"
 fish -n "$share/fish/vendor_completions.d/corvane-flash.fish"

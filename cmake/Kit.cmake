@@ -1,0 +1,39 @@
+# What makers of hosts find in the kit of every system: headers, CMake package, documents. Whoever
+# includes this installs the libraries with EXPORT FlashCorvane, and the documents.
+
+include(CMakePackageConfigHelpers)
+include(GNUInstallDirs)
+
+install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h
+              logger/ostrel_logger.h
+        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
+
+# The headers tell the kit's version; they are no templates, so that they compile where they lie.
+foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
+  file(STRINGS ${header} version REGEX "^#define FLASH_CORVANE_VERSION")
+  list(TRANSFORM version REPLACE "^.* " "")
+  if(NOT version STREQUAL "${PROJECT_VERSION_MAJOR};${PROJECT_VERSION_MINOR};${PROJECT_VERSION_PATCH};\"${PROJECT_VERSION}\"")
+    message(FATAL_ERROR "${header} tells another version than ${PROJECT_VERSION}: ${version}")
+  endif()
+  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${header})
+endforeach()
+
+# The headers as a target of their own: a host sees the plug-in through them alone, and loads it.
+add_library(corvane_headers INTERFACE)
+set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
+target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+install(TARGETS corvane_headers EXPORT FlashCorvane)
+
+set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
+install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake
+        DESTINATION ${package_directory})
+configure_package_config_file(cmake/FlashCorvaneConfig.cmake.in
+        ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake INSTALL_DESTINATION ${package_directory})
+write_basic_package_version_file(
+        ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake COMPATIBILITY SameMajorVersion)
+install(FILES ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake
+              ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake
+        DESTINATION ${package_directory})
+
+# They link to each other and into docs/, which lies beside them.
+set(documents README.md CHANGELOG.md CONTRIBUTING.md)
