@@ -110,7 +110,8 @@ const char* HostCheckDevice::WriteDataToFlash(const unsigned char* data, uint64_
         host_.page = page;
         host_.loaderLoaded = host_.loaderRuns = false;
         Examine(Stage::Load);
-        Note(true, std::string(call) + ": taken, and nothing programmed: flash is as it was");
+        Note(Verdict::Holds,
+             std::string(call) + ": taken, and nothing programmed: flash is as it was");
     });
 }
 
@@ -122,7 +123,7 @@ const char* HostCheckDevice::PerformOperation(const char* operation) {
         if (name == kReturnedError)
             throw std::runtime_error("This error is returned, 100 % of it.");
         if (name == kShownError)
-            Note(false, "This error is shown, 100 % of it, and the operation has failed.");
+            Note(Verdict::Fails, "This error is shown, 100 % of it, and the operation has failed.");
         else if (std::ranges::find(kProgressOperations, name) != std::end(kProgressOperations))
             Examine(Stage::Operation);
         else

@@ -34,8 +34,9 @@ class HostCheckDevice final : public IFlashDevice2 {
     void Destroy() override;
 
   private:
+    enum class Verdict { Holds, Fails, NotChecked };
     struct Finding {
-        bool holds;
+        Verdict verdict;
         std::string text;
     };
 
@@ -44,10 +45,11 @@ class HostCheckDevice final : public IFlashDevice2 {
 
     /// The checks of a stage, in order.
     void Examine(Stage stage);
-    void Note(bool holds, std::string text);
+    void Note(Verdict verdict, std::string text);
     /// A finding about the call that the host is making.
     void Require(bool holds, const char* call, const char* expected, const std::string& came);
-    /// Shows the findings, and how many of them hold. Throws what the host can't even be shown.
+    /// Shows the findings, and how many of those that were checked hold. Throws what the host can't
+    /// even be shown.
     void Tell(const char* call);
     void Show(const Finding& finding);
 

@@ -1,5 +1,5 @@
-// Memory accesses, in the RAM behind the loader's buffers and parameter blocks alone but for one
-// register that is read. What lies there is put back.
+// Memory accesses: writes in the RAM behind the loader's buffers and parameter blocks alone, where
+// what lies there is put back; reads also of flash and of one register.
 
 #include <algorithm>
 #include <numeric>
@@ -103,6 +103,28 @@ std::string MovesAWholeChunk(CheckedHost& host) {
     return "";
 }
 
+// A blank check and a checksum read flash so, on a page of its own.
+constexpr std::int16_t kFlashPage = 0;
+constexpr std::uint32_t kLargestRead = 32752;
+
+std::string ReadsFlash(CheckedHost& host) {
+    host.Read(0, 2048, 1, kFlashPage);
+    return "";
+}
+
+// A host that moves only part of it leaves the end of the buffer as it was.
+std::string ReadsTheLargestAmount(CheckedHost& host) {
+    Bytes end;
+    try {
+        end = host.Read(kLargestRead - 16, 16, 1, kFlashPage);
+    } catch (const Breach& breach) {
+        throw NotChecked(std::string("the last 16 of them alone can't be read: ") + breach.what());
+    }
+    const Bytes came = host.Read(0, kLargestRead, 1, kFlashPage);
+    RequireEqual({came.end() - 16, came.end()}, end, "in the last 16");
+    return "";
+}
+
 template <typename Access>
 std::string RefusedWithAText(CheckedHost& host, Access access) {
     const auto error = host.Ask(access);
@@ -132,6 +154,8 @@ constexpr Check kMemoryChecks[] = {
     {Stage::Initialize, "WriteMemory", "no change beside what is written", LeavesNeighbours},
     {Stage::Initialize, "WriteMemory", "writes in the order of the calls", WritesInOrder},
     {Stage::Initialize, "WriteMemory", "2048 bytes in one call", MovesAWholeChunk},
+    {Stage::Initialize, "ReadMemory", "2048 bytes of flash on page 0", ReadsFlash},
+    {Stage::Initialize, "ReadMemory", "32752 bytes of flash in one call", ReadsTheLargestAmount},
     {Stage::Initialize, "ReadMemory", "an error text at 0x10000000, where nothing is",
      RefusesUnmappedReads},
     {Stage::Initialize, "WriteMemory", "an error text at 0x10000000, where nothing is",

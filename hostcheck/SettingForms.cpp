@@ -77,7 +77,7 @@ bool HasForm(Form form, const std::string& text) {
         case Form::Integer:
             return Converts(ParseInteger, text);
         case Form::Seconds:
-            return Converts(ParseDecimal, text);
+            return Converts(ParseDecimal, text) && ParseDecimal(text) >= 1;
         case Form::Hex:
             return IsHex(text);
         case Form::Mac:
@@ -98,7 +98,7 @@ const char* FormText(Form form) {
         case Form::Integer:
             return "a whole decimal number";
         case Form::Seconds:
-            return "a whole decimal number of seconds";
+            return "a whole decimal number of seconds, at least 1";
         case Form::Hex:
             return "a hexadecimal number up to ffffffff";
         case Form::Mac:

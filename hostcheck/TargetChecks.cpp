@@ -9,7 +9,7 @@ namespace hostcheck {
 
 namespace {
 
-constexpr std::uint32_t kStatusOfBlock1 = 0x2000101C;
+constexpr std::uint32_t kStatusWords[] = {0x2000100C, 0x2000101C};
 constexpr std::uint8_t kToDo = 0xFF;  // in all four bytes
 constexpr char kLoaderFile[] = "FlashLoaderMerrow.out";
 constexpr char kLoaderSubdirectory[] = R"(..\..\merrow\)";
@@ -70,6 +70,7 @@ std::string DirectoryEndsInASeparator(CheckedHost& host) {
     return "";
 }
 
+// RAM may hold "to do" from the last load, so here it does.
 std::string LoadsTheLoader(CheckedHost& host) {
     std::string directory;
     try {
@@ -77,8 +78,23 @@ std::string LoadsTheLoader(CheckedHost& host) {
     } catch (const Breach&) {
         throw NotChecked("there is no directory");
     }
+    for (const std::uint32_t word : kStatusWords)
+        host.Write(word, Bytes(4, kToDo), 4);
     host.Do([&](IFlashHost& h) { return h.LoadProgram(kLoaderFile, "", directory.c_str()); });
     host.loaderLoaded = true;
+    return "";
+}
+
+// A loader that starts with "to do" programs what nobody has handed over; this one doesn't.
+std::string ClearsTheStatusWords(CheckedHost& host) {
+    std::size_t left = 0;
+    for (const std::uint32_t word : kStatusWords) {
+        if (host.Read(word, 4, 4) != Bytes(4, kToDo)) continue;
+        host.Write(word, Bytes(4), 4);
+        ++left;
+    }
+    if (!host.loaderLoaded) throw NotChecked("the loader isn't loaded");
+    if (left != 0) throw Breach("0xFFFFFFFF still in " + std::to_string(left) + " of them");
     return "";
 }
 
@@ -91,7 +107,7 @@ std::string StartsTheLoader(CheckedHost& host) {
 
 std::string LoaderIsIdle(CheckedHost& host) {
     if (!host.loaderRuns) throw NotChecked("the loader doesn't run");
-    if (host.Read(kStatusOfBlock1, 4, 4) == Bytes(4, kToDo)) throw Breach("0xFFFFFFFF");
+    if (host.Read(kStatusWords[1], 4, 4) == Bytes(4, kToDo)) throw Breach("0xFFFFFFFF");
     return "";
 }
 
@@ -105,6 +121,7 @@ constexpr Check kTargetChecks[] = {
     {Stage::Load, "GetDirectory", "a text that ends in a path separator",
      DirectoryEndsInASeparator},
     {Stage::Load, "LoadProgram", "null for the loader", LoadsTheLoader},
+    {Stage::Load, "LoadProgram", "0 in both status words, whatever RAM held", ClearsTheStatusWords},
     {Stage::Load, "RunTarget", "null for the loader", StartsTheLoader},
     {Stage::Load, "ReadMemory", "a status of block 1 other than 0xFFFFFFFF while the loader runs",
      LoaderIsIdle},

@@ -194,7 +194,7 @@ const Row kFailing[] = {
     {"tool program small.hex --sim tolva,fail-access=30", 1, "",
      "corvane-flash: programming 0x10-0x13: "},
     {"tool program small.hex --sim tolva,loader=dead --set FlashTimeoutValue=1", 1, "",
-     "Flash programming timed out.\n"},
+     "the loader hasn't finished the chunk for 0x0-0x7f within 1 s"},
     {"tool program small.hex --sim mesk,flash=256K --erase all", 1, "",
      "erased 0 bytes of 256 KiB and gave no reason"},
     {"tool erase --all --sim mesk,flash=256K", 1, "", "Error erasing flash..\n"},

@@ -28,7 +28,10 @@ struct Transfer {
     size_t count;
     uint64_t address;
     size_t width;
+    int16_t page = 1;
 };
+
+constexpr uint64_t kNowhere = 0x10000000;
 
 /// A host without fault. Each slot is a function that a row of the table may replace.
 class Host final : public test::StrictHost {
@@ -39,6 +42,7 @@ class Host final : public test::StrictHost {
                                          {"FlashResetSetting", "0"},
                                          {"FlashTimeoutValue", "5"},
                                          {"FlashVerboseMode", "0"}};
+    std::vector<unsigned char> flash = std::vector<unsigned char>(32768);
     std::vector<unsigned char> ram = std::vector<unsigned char>(16384);
     std::vector<string> lines;
     std::function<const char*(const char*)> get = [this](const char* name) {
@@ -49,7 +53,12 @@ class Host final : public test::StrictHost {
         settings[name] = value;
         return nullptr;
     };
-    std::function<const char*()> load, run, halt, begin, update, end = [] { return nullptr; };
+    std::function<const char*()> run, halt, begin, update, end = [] { return nullptr; };
+    std::function<const char*()> load = [this] {
+        for (const size_t status : {0x100Cu, 0x101Cu})
+            std::fill_n(&ram[status], 4, 0);
+        return nullptr;
+    };
     std::function<const char*(bool)> reset = [](bool) { return nullptr; };
     std::function<void(Transfer&)> bend = [](Transfer&) {};  ///< what becomes of a memory access
     std::function<const char*(const char*)> message = [](const char*) { return nullptr; };
@@ -68,13 +77,13 @@ class Host final : public test::StrictHost {
     const char* RunTarget() override { return Run(run); }
     const char* HaltTarget() override { return Run(halt); }
     const char* ResetTarget(bool flag) override { return reset(flag); }
-    const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t,
+    const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
                            size_t width) override {
-        return Move({buffer, nullptr, count, address, width});
+        return Move({buffer, nullptr, count, address, width, page});
     }
-    const char* WriteMemory(const void* buffer, size_t count, uint64_t address, int16_t,
+    const char* WriteMemory(const void* buffer, size_t count, uint64_t address, int16_t page,
                             size_t width) override {
-        return Move({nullptr, buffer, count, address, width});
+        return Move({nullptr, buffer, count, address, width, page});
     }
     const char* BeginProgress(const char*) override { return Run(begin); }
     const char* UpdateProgress(uint32_t, const char*) override { return Run(update); }
@@ -121,13 +130,14 @@ class Host final : public test::StrictHost {
     const char* Move(Transfer t) {
         bend(t);
         if (t.address == 0x400FE000) t.address = 0x20000000;  // any word does for the register
-        const uint64_t offset = t.address - 0x20000000;
+        std::vector<unsigned char>& memory = t.address < 0x10000000 ? flash : ram;
+        const uint64_t offset = t.address - (&memory == &ram ? 0x20000000 : 0);
         const size_t bytes = t.count * t.width;
-        if (offset >= ram.size() || bytes > ram.size() - offset) return "no memory";
+        if (offset >= memory.size() || bytes > memory.size() - offset) return "no memory";
         if (t.to != nullptr)
-            std::memcpy(t.to, &ram[offset], bytes);
+            std::memcpy(t.to, &memory[offset], bytes);
         else
-            std::memcpy(&ram[offset], t.from, bytes);
+            std::memcpy(&memory[offset], t.from, bytes);
         return nullptr;
     }
     static const char* Run(const std::function<const char*()>& slot) {
@@ -159,6 +169,9 @@ const FaultyHost kFaultyHosts[] = {
      [](Host& h) { h.settings.erase("FlashTimeoutValue"); }},
     {"GetProperty: expected values that the plug-in can read; came \"true\" for FlashResetSetting",
      [](Host& h) { h.settings["FlashResetSetting"] = "true"; }},
+    {"GetProperty: expected values that the plug-in can read; came \"0x10\" for FlashTimeoutValue, "
+     "which takes a whole decimal number of seconds, at least 1",
+     [](Host& h) { h.settings["FlashTimeoutValue"] = "0x10"; }},
     {"GetProperty: expected values that the plug-in can read; came \"16 MHz\" for FlashCrystalFreq",
      [](Host& h) { h.settings["FlashCrystalFreq"] = "16 MHz"; }},
     {"GetProperty: expected values that the plug-in can read; came \"zz-zz-zz-zz-zz-zz\"",
@@ -214,6 +227,18 @@ const FaultyHost kFaultyHosts[] = {
      }},
     {"ReadMemory: expected the identification register at 0x400FE000; came bytes beside the buffer",
      [](Host& h) { h.bend = [](Transfer& t) { t.count += t.to != nullptr ? 1 : 0; }; }},
+    {"ReadMemory: expected the identification register at 0x400FE000; came the error text \"no mem",
+     [](Host& h) {
+         h.halt = [&h] {
+             h.bend = [](Transfer&) {};
+             return nullptr;
+         };
+         h.bend = [](Transfer& t) { t.address = kNowhere; };
+     }},
+    {"ReadMemory: expected 2048 bytes of flash on page 0; came the error text \"no memory\"",
+     [](Host& h) { h.bend = [](Transfer& t) { t.address = t.page ? t.address : kNowhere; }; }},
+    {"ReadMemory: expected 32752 bytes of flash in one call; came a5 a5",
+     [](Host& h) { h.bend = [](Transfer& t) { t.count = std::min<size_t>(t.count, 16384); }; }},
     {"ReadMemory: expected an error text at 0x10000000, where nothing is; came null",
      [](Host& h) {
          h.bend = [](Transfer& t) {
@@ -244,7 +269,7 @@ const FaultyHost kFaultyHosts[] = {
      [](Host& h) {
          h.message = [](const char* text) { return strchr(text, '%') ? "no format" : nullptr; };
      }},
-    {"ShowMessage: expected null for \"HaltTarget: ok: null\"; came an exception",
+    {"ShowMessage: expected null for \"ReadMemory: ok: the identification",
      [](Host& h) {
          h.message = [](const char* text) -> const char* {
              if (strstr(text, "ok") != nullptr) throw 1;
@@ -257,6 +282,8 @@ const FaultyHost kFaultyHosts[] = {
      [](Host& h) { Fail(h.directory, nullptr); }},
     {"LoadProgram: expected null for the loader; came the error text \"no file\"",
      [](Host& h) { Fail(h.load, "no file"); }},
+    {"LoadProgram: expected 0 in both status words, whatever RAM held; came 0xFFFFFFFF still in 2",
+     [](Host& h) { h.load = nullptr; }},
     {"ReadMemory: expected a status of block 1 other than 0xFFFFFFFF while the loader runs; came",
      [](Host& h) {
          h.run = [&h] {

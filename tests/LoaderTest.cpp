@@ -39,7 +39,8 @@ class Board final : public target::Target, public LoaderObserver {
         const bool pending = now < ends_.at(address == plugin::kParameterBlocks[1] + 12);
         static_cast<std::uint32_t*>(buffer)[0] = pending ? plugin::kStatusPending : 0;
     }
-    void Write(const void*, std::size_t, std::uint32_t address, int, std::size_t) override {
+    void Write(const void*, std::size_t count, std::uint32_t address, int, std::size_t) override {
+        if (count == 1) return;  // a status word alone hands nothing over
         now += 30us;
         const std::size_t block = address == plugin::kParameterBlocks[1] + 4;
         ends_.at(block) = std::max(now, ends_.at(1 - block)) + chunkTime;

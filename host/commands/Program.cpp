@@ -102,9 +102,12 @@ void WriteSections(Context& context, FlashDevice& device, const ProgramPlan& pla
     const std::uint64_t erased = device.Meter().Of(Phase::Erase).doneBytes;
     if (erased < plan.erasedBytes)
         throw Failure(ExitStatus::DeviceFailed,
-                      fmt::format("the plug-in erased {} of {} and gave no reason; the image was "
-                                  "programmed over what was there; try --erase necessary",
-                                  SizeText(erased), SizeText(plan.erasedBytes)));
+                      fmt::format("the plug-in erased {} of {} and gave no reason; {}",
+                                  SizeText(erased), SizeText(plan.erasedBytes),
+                                  device.Work().handedOver.Empty()
+                                      ? "nothing was programmed"
+                                      : "the image was programmed over what was there; try "
+                                        "--erase necessary"));
 }
 
 void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {

@@ -73,6 +73,7 @@ class FlashDevice {
     SettingStore& Settings() { return settings_; }
     Reporter& Output() { return reporter_; }
     WorkMeter& Meter() { return meter_; }
+    const FlashWork& Work() const { return watch_.Work(); }
     const RegisterWatch& Registers() const { return host_.Registers(); }
 
     /// Whether the byte at an address lies in flash, by the plug-in's own answer.

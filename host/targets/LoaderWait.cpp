@@ -93,6 +93,10 @@ LoaderWait::Chunk* LoaderWait::NoteHandOver(const void* buffer, std::size_t byte
 void LoaderWait::LoadProgram(const std::string& fileName, const std::string& directory) {
     AwaitIdle();
     next_.LoadProgram(fileName, directory);
+    // RAM may hold "to do" from power-up or from the last load.
+    constexpr std::uint32_t idle = 0;
+    for (std::size_t block = 0; block < chunks_.size(); ++block)
+        next_.Write(&idle, 1, StatusWord(block), plugin::kRamPage, sizeof idle);
     programLoaded_ = true;
 }
 

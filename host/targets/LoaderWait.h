@@ -57,8 +57,8 @@ class LoaderWait final : public target::Target {
     void Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
                std::size_t width) override;
 
-    // These await the loader first. Halt halts the target even when the loader isn't done, and
-    // throws afterwards.
+    // These await the loader first. LoadProgram leaves 0 in both status words. Halt halts the
+    // target even when the loader isn't done, and throws afterwards.
     void LoadProgram(const std::string& fileName, const std::string& directory) override;
     void Halt() override;
     void Reset(bool flag) override;

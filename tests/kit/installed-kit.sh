@@ -39,7 +39,7 @@ for example in "${examples[@]}"; do
     "$trial/$example/$example" "$check" >>"$trial/told" 2>&1 && exit 1
 done
 grep 'expected' "$trial/told" && exit 1
-[ "$(grep -c 'Host check, WriteDataToFlash: 9 of 9 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
+[ "$(grep -c 'Host check, WriteDataToFlash: 10 of 10 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
 
 share=$kit/share
 cd "$share/doc/corvane-flash"
