@@ -65,7 +65,8 @@ extern "C" {
 // Additions of the stand-in; the maker's library does not have them, so a host looks them up at
 // run time and does without them where they are missing.
 
-// Receives one finished line: its level, and its text without a line break, valid during the call.
+// Receives one finished line: its level, and its text, valid during the call. The text has no line
+// break of its own; texts of the host in it, such as the variant, may have some.
 typedef void (*OstrelLoggerSink)(void* context, int level, const char* text);
 
 // Hands every line from now on to sink, together with context, instead of writing it. A null sink

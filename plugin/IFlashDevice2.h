@@ -122,7 +122,8 @@ class IFlashDevice2 {
     //         the end of a load
     //     4   a load's erase that has been done still counts as done
     // Any other mode is as 0. When the call fails, the state of the load has been reset all the
-    // same.
+    // same. A checksum of mode 2 that failed has been shown to the user through
+    // IFlashHost::ShowError, and the call returns null.
     // [device implements; any time after creation]
     virtual const char* ResetSettings(int32_t mode) = 0;
 

@@ -46,8 +46,8 @@ class IFlashHost {
     // fileName is a file name without a directory; second is always the empty text; directory is
     // the text of GetDirectory with "..\..\merrow\" behind it, on every system. All three are valid
     // during the call. The host sets the program counter, and the stack pointer where the program
-    // doesn't; the plug-in touches no register of the core. The host does well to write 0 to the
-    // loader's two status words, 0x2000100C and 0x2000101C, before the program starts.
+    // doesn't; the plug-in touches no register of the core. The host leaves 0 in the loader's two
+    // status words, 0x2000100C and 0x2000101C, whatever RAM held before.
     // [host implements; during WriteDataToFlash]
     virtual const char* LoadProgram(const char* fileName, const char* second,
                                     const char* directory) = 0;
@@ -87,14 +87,17 @@ class IFlashHost {
     // address is a byte address in the target, below 2^32. page numbers the target's memory
     // space: 1 for registers and other single values, 0 for flash contents, and the page given to
     // WriteDataToFlash for the bytes around a section. What buffer holds after a failure is of no
-    // interest. A register access (width 4) must reach the target as one access of that width.
+    // interest. A register access (width 4) must reach the target as one access of that width. One
+    // call reads at most 32752 bytes. The target may be running: it is as the host left it when
+    // CreateFlashDevice2 first reads, and runs the loader during WriteDataToFlash.
     // [host implements; during CreateFlashDevice2 and any time after creation]
     virtual const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
                                    size_t width) = 0;
 
     // Slot 11. Writes count elements of width bytes each from buffer to the target. Arguments as
     // for ReadMemory. The bytes go out as they lie in buffer: a 32-bit value goes to the target
-    // least significant byte first. Writes must reach the target in the order of the calls.
+    // least significant byte first. Writes must reach the target in the order of the calls. One
+    // call writes at most 2048 bytes; the target may be running the loader.
     // [host implements; any time after creation]
     virtual const char* WriteMemory(const void* buffer, size_t count, uint64_t address,
                                     int16_t page, size_t width) = 0;
