@@ -264,7 +264,7 @@ const Row kFailing[] = {
     {"tool program /bin/true", 3, "", "program, 64-bit found, a 32-bit little-endian executable"},
     {"for f in /dev/zero -; do yes | tool program $f --base 0 || exit; done", 3, "",
      "/dev/zero: it is larger than 128 MiB, and no image file is"},
-    {"truncate -s 1T data.bin; tool program data.bin --base 0", 3, "", "larger than 128 MiB"},
+    {"truncate -s 1G data.bin; tool program data.bin --base 0", 3, "", "larger than 128 MiB"},
     {"tool program bad.hex", 3, "", "bad.hex"},
     {"head -c 3000 $ELF > cut.elf; tool program cut.elf", 3, "", "cut.elf"},
     {"tool program small.hex other.srec", 3, "", "other.srec"},
