@@ -183,7 +183,7 @@ const Row kDone[] = {
     {"tool help | awk 'NR > 23 || length > 79'", 0, "", ""},
     {"tool help mac read", 0, "Usage: corvane-flash mac read\n", ""},
     {"tool help sim", 0, "  quen                  flash=512K,ram=64K,", ""},
-    {"tool --man", 0, "\\fBcorvane\\-flash settings\\fR [\\fIKEY\\fR] [\\fIOPTION\\fR]...", ""},
+    {"tool --man", 0, R"(\fBcorvane\-flash settings\fR [\fIKEY\fR] [\fIOPTION\fR]...)", ""},
     {"tool --version", 0, "corvane-flash 1.", ""},
 };
 
@@ -470,8 +470,7 @@ const Row kStories[] = {
     {"tool program small.hex --keep --erase all", 2, "", "--keep goes with --erase necessary"},
     {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL
      " --json -q program $ELF --sim tolva,loader=hangs | sed -n '$p'",
-     0, "\"clearedBytes\":480,\"keptBytes\":0,\"flashChanged\":true,\"phases\":{\"erase\"",
-     nullptr},
+     0, R"("clearedBytes":480,"keptBytes":0,"flashChanged":true,"phases":{"erase")", nullptr},
     // What the shells make of it: bash has taken the word apart, zsh would show what is added.
     {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
      ":$PATH bash -c '. "

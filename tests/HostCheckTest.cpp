@@ -100,7 +100,7 @@ class Host final : public test::StrictHost {
     const char* Sleep(uint32_t milliseconds) override { return sleep(milliseconds); }
 
     /// What the host was told to be wrong, and what calls returned, with a blank line between two.
-    string Faults(std::function<const char*(IFlashDevice2&)> extra = {}) {
+    string Faults(const std::function<const char*(IFlashDevice2&)>& extra = {}) {
         void* library = dlopen(FLASH_HOST_CHECK_LIBRARY, RTLD_NOW | RTLD_LOCAL);
         const auto create =
             reinterpret_cast<CreateFlashDevice2Function>(dlsym(library, "CreateFlashDevice2"));
@@ -159,7 +159,7 @@ void Fail(Slot& slot, const char* text) {
 }
 
 const FaultyHost kFaultyHosts[] = {
-    {"GetProperty: expected null for a setting that the host hasn't; came \"\" for \"FlashHost",
+    {R"(GetProperty: expected null for a setting that the host hasn't; came "" for "FlashHost)",
      [](Host& h) {
          h.get = [get = h.get](const char* name) { return get(name) ? get(name) : ""; };
      }},
@@ -176,7 +176,7 @@ const FaultyHost kFaultyHosts[] = {
      [](Host& h) { h.settings["FlashCrystalFreq"] = "16 MHz"; }},
     {"GetProperty: expected values that the plug-in can read; came \"zz-zz-zz-zz-zz-zz\"",
      [](Host& h) { h.settings["FlashMACAddrInput"] = "zz-zz-zz-zz-zz-zz"; }},
-    {"GetProperty: expected the same text when it is asked twice; came \"3\", then \"4\"",
+    {R"(GetProperty: expected the same text when it is asked twice; came "3", then "4")",
      [](Host& h) {
          h.get = [&h, count = 0, get = h.get](const char* name) mutable {
              if (string(name) == "FlashTimeoutValue") h.settings[name] = std::to_string(++count);
@@ -189,7 +189,7 @@ const FaultyHost kFaultyHosts[] = {
      [](Host& h) {
          h.get = [](const char*) -> const char* { throw std::out_of_range("no key"); };
      }},
-    {"SetProperty: expected a copy of the value, which GetProperty returns; came \"?\" after \"1\"",
+    {R"(SetProperty: expected a copy of the value, which GetProperty returns; came "?" after "1")",
      [](Host& h) {
          h.get = [get = h.get](const char* name) {
              return string(name) == "FlashChecksumValue" ? "?" : get(name);
@@ -260,7 +260,7 @@ const FaultyHost kFaultyHosts[] = {
     {"ResetTarget: expected null for either flag; came the error text \"100 % no\"",
      [](Host& h) { Fail(h.reset, "100 % no"); }},
     {"Sleep: expected a pause of at least 50 ms; came 0.", [](Host& h) { Fail(h.sleep, nullptr); }},
-    {"BeginProgress: expected null; came the error text \"\\xb5\\x0a\"",
+    {R"(BeginProgress: expected null; came the error text "\xb5\x0a")",
      [](Host& h) { Fail(h.begin, "\xB5\n"); }},
     {"UpdateProgress: expected null for 0 to 100 percent; came an exception",
      [](Host& h) { h.update = []() -> const char* { throw 1; }; }},
