@@ -2,6 +2,8 @@
 
 #include "host/cli/Completion.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
 #include <cstddef>
 #include <string_view>
@@ -26,13 +28,11 @@ class Completer {
     void Follow(const std::string& word) {
         if (awaiting_ != nullptr) {
             awaiting_ = nullptr;
-        } else if (onlyArguments_) {
-            arguments_.push_back(word);
-        } else if (word == "--") {
+        } else if (word == "--" && !onlyArguments_) {
             onlyArguments_ = true;
-        } else if (IsOption(word)) {
+        } else if (IsOption(word) && !onlyArguments_) {
             FollowOption(word);
-        } else if (command_ != nullptr) {
+        } else if (onlyArguments_ || command_ != nullptr) {
             arguments_.push_back(word);
         } else {
             name_ += (name_.empty() ? "" : " ") + word;
@@ -104,7 +104,8 @@ class Completer {
             for (const std::string& word : FirstWords(commands_))
                 offered.words.push_back({word, FirstWordHelp(commands_, word)});
         for (const std::string& word : SecondWords(commands_, before))
-            offered.words.push_back({word, FirstWordHelp(commands_, before + " " + word)});
+            offered.words.push_back(
+                {word, FirstWordHelp(commands_, fmt::format("{} {}", before, word))});
         return offered;
     }
 

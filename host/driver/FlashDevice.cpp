@@ -160,7 +160,7 @@ void FlashDevice::Perform(const std::string& operation, Talk level) {
 }
 
 std::string FlashDevice::Published(const std::string& key) const {
-    const std::string text = settings_.Published(key);
+    std::string text = settings_.Published(key);
     if (!text.empty()) return text;
     throw Failure(ExitStatus::DeviceFailed,
                   fmt::format("the plug-in reported success, but has published no {}", key));
