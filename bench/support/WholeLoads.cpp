@@ -71,7 +71,7 @@ Seconds Samples(const Link& link) {
     host::image::Image image;
     image.Add(0, std::vector<std::uint8_t>(kSizeBytes, 0x5A), "bench");
     const Seconds before = board.Now();
-    for (const host::AddressRange& block : host::SampleBlocks(image, 0x2000)) {
+    for (const host::AddressRange& block : host::SampleBlocks(image, {kSizeBytes, 0x2000})) {
         std::vector<std::uint8_t> bytes(block.Size());
         board.device.Read(bytes.data(), bytes.size(), block.first, 0, 1);
     }

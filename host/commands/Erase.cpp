@@ -4,7 +4,7 @@
 
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/ProgramPlan.h"
+#include "host/flashing/DevicePlan.h"
 #include "host/flashing/RangeOperation.h"
 
 namespace host::commands {
@@ -13,15 +13,16 @@ namespace {
 
 Outcome EraseOn(Context& context, FlashDevice& device) {
     const AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
-    const DeviceInfo& info = device.Info();
-    const AddressRange covered = SectorsCovering(range, info.sectorBytes);
-    const std::uint64_t sectors = covered.Size() / info.sectorBytes;
+    if (context.options.all) RequireWholeErase(device, "--range");
+    const FlashGeometry flash = GeometryOf(device);
+    const AddressRange covered = SectorsCovering(range, flash);
+    const std::uint64_t sectors = SectorCount(covered, flash);
     Json members{{"address", covered.first}, {"bytes", covered.Size()}, {"sectors", sectors}};
     if (context.options.dryRun) {
         context.reporter.Result(
             fmt::format("would erase {}: {}, {}; {} of flash are left as they are",
                         RangeText(covered), CountText(sectors, "sector"), SizeText(covered.Size()),
-                        SizeText(info.flashBytes - covered.Size())));
+                        SizeText(flash.flashBytes - covered.Size())));
         return NothingTouched(context, members);
     }
     device.Know(members);

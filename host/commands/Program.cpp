@@ -68,8 +68,7 @@ void Expect(Context& context, WorkMeter& meter, const ProgramPlan& plan, std::ui
     meter.Expect(Phase::Program, plan.transferBytes);
     if (IsOn(context, keys::kProgramBlankCheck))
         for (const image::Section& section : plan.sections)
-            meter.Expect(Phase::BlankCheck,
-                         SectorsCovering({section.address, section.Last()}, 4).Size());
+            meter.Expect(Phase::BlankCheck, Widened({section.address, section.Last()}, 4).Size());
     if (IsOn(context, keys::kProgramCrc)) meter.Expect(Phase::Checksum, flashBytes);
     if (!context.options.noVerify) meter.Expect(Phase::Verify, plan.imageBytes);
 }

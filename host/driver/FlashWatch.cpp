@@ -58,9 +58,11 @@ void FlashWatch::NoteCommand(std::uint32_t command) {
     commanded_ = true;
     pendingErase_ = command & (plugin::kEraseSectorBit | plugin::kEraseAllBit);
     if (pendingErase_ == 0) return;
-    erasing_ = pendingErase_ == plugin::kEraseAllBit
-                   ? AddressRange{0, static_cast<std::uint32_t>(flashBytes_ - 1)}
-                   : AddressRange{addressRegister_, addressRegister_ + sectorBytes_ - 1};
+    const auto last = static_cast<std::uint32_t>(flashBytes_ - 1);
+    erasing_ =
+        pendingErase_ == plugin::kEraseAllBit
+            ? AddressRange{0, last}
+            : AddressRange{addressRegister_, std::min(addressRegister_ + (sectorBytes_ - 1), last)};
     work_.attempted.Add(erasing_);
     meter_.Begin(Phase::Erase);
 }

@@ -5,7 +5,7 @@
 #include <algorithm>
 
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/Sectors.h"
+#include "host/flashing/DevicePlan.h"
 
 namespace host {
 
@@ -47,16 +47,13 @@ image::Image KeptBytes(const image::Image& image, const image::Image& contents) 
 }
 
 image::Image ReadSectors(FlashDevice& device, const image::Image& image) {
-    const DeviceInfo& info = device.Info();
-    const AddressSet sectors = SectorsOf(image, info.sectorBytes);
+    const AddressSet sectors = SectorsOf(image, GeometryOf(device));
     device.Halt();
     device.Meter().Expect(Phase::Read, sectors.Bytes());
     device.Meter().Begin(Phase::Read);
     image::Image contents;
-    for (const AddressRange& run : sectors.Ranges()) {
-        const AddressRange inFlash{run.first, std::min(run.last, info.Flash().last)};
-        contents.Add(run.first, device.ReadFlash(inFlash), "the flash");
-    }
+    for (const AddressRange& run : sectors.Ranges())
+        contents.Add(run.first, device.ReadFlash(run), "the flash");
     device.Meter().End();
     return contents;
 }

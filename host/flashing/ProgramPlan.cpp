@@ -26,8 +26,8 @@ std::vector<AddressRange> ErasedRuns(const image::Image& image, const FlashGeome
     if (erase.kind == Kind::Everything)
         return {{0, static_cast<std::uint32_t>(flash.flashBytes - 1)}};
     if (erase.kind == Kind::Range && erase.range.first <= erase.range.last)
-        return {SectorsCovering(erase.range, flash.sectorBytes)};
-    if (erase.kind == Kind::Necessary) return SectorsOf(image, flash.sectorBytes).Ranges();
+        return {SectorsCovering(erase.range, flash)};
+    if (erase.kind == Kind::Necessary) return SectorsOf(image, flash).Ranges();
     return {};
 }
 
@@ -37,7 +37,7 @@ bool ErasesWhole(const std::vector<AddressRange>& erased, const FlashGeometry& f
     if (erase.kind == EraseChoice::Kind::Everything) return true;
     return erase.kind == EraseChoice::Kind::Necessary && flash.erasesWhole &&
            flash.flashBytes > flash.sectorBytes && erased.size() == 1 && erased[0].first == 0 &&
-           std::uint64_t{erased[0].last} + 1 >= flash.flashBytes;
+           std::uint64_t{erased[0].last} + 1 == flash.flashBytes;
 }
 
 /// How many bytes of a range are erased. The runs are either one, or whole sectors of which each
@@ -105,12 +105,13 @@ ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
     plan.unchangedBytes = plan.imageBytes - changed.ByteCount();
     for (const image::Section& section : plan.sections)
         plan.transferBytes += WidenedBytes(section);
-    for (const AddressRange& run : plan.erased)
+    for (const AddressRange& run : plan.erased) {
         plan.erasedBytes += run.Size();
+        plan.sectorCount += SectorCount(run, flash);
+    }
     plan.clearedBytes = plan.erasedBytes;
     for (const image::Section& section : changed.Sections())
         plan.clearedBytes -= ErasedBytes({section.address, section.Last()}, plan.erased);
-    plan.sectorCount = plan.erasedBytes / flash.sectorBytes;
     return plan;
 }
 
@@ -118,7 +119,7 @@ std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& 
     std::vector<std::string> lines;
     for (const AddressRange& run : plan.erased)
         lines.push_back(fmt::format("erase    {:<23} {}{}", RangeText(run),
-                                    CountText(run.Size() / flash.sectorBytes, "sector"),
+                                    CountText(SectorCount(run, flash), "sector"),
                                     plan.erasesWhole ? ", all at once" : ""));
     if (plan.erased.empty()) lines.emplace_back("erase    nothing");
     for (const image::Section& section : plan.sections)
@@ -127,7 +128,7 @@ std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& 
                                     SizeText(section.bytes.size())));
     for (const AddressRange& run : plan.unchanged.Ranges())
         lines.push_back(fmt::format("leave    {:<23} {} with the image in place", RangeText(run),
-                                    CountText(run.Size() / flash.sectorBytes, "sector")));
+                                    CountText(SectorCount(run, flash), "sector")));
     lines.push_back(
         fmt::format("{} of the image; {} more are cleared with its sectors; {} of "
                     "flash are not erased",

@@ -44,9 +44,9 @@ struct ProgramPlan {
 /// The erase step of a load, from the settings as they are.
 EraseChoice ChosenErase(const SettingStore& settings);
 
-/// The image must lie in flash. The sectors in `unchanged` hold what they should. Sections whose
-/// gap is short and erased anyway are joined. Where the necessary sectors are all of the flash, it
-/// is erased whole.
+/// Image and chosen range must lie in flash. The sectors in `unchanged` hold what they should.
+/// Sections whose gap is short and erased anyway are joined. Where the necessary sectors are all of
+/// the flash, it is erased whole.
 ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
                         const FlashGeometry& flash, const EraseChoice& erase);
 

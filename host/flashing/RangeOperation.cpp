@@ -7,7 +7,7 @@
 #include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/Comparison.h"
-#include "host/flashing/ProgramPlan.h"
+#include "host/flashing/DevicePlan.h"
 #include "host/output/Summary.h"
 
 namespace host {
@@ -35,8 +35,8 @@ std::optional<AddressRange> CoveredRange(FlashDevice& device, const RangeOperati
     const AddressRange range =
         SelectedRange(device.Settings(), operation.keys).value_or(info.Flash());
     if (range.first > range.last || range.last >= info.flashBytes) return std::nullopt;
-    return SectorsCovering(range,
-                           operation.unitBytes == 0 ? info.sectorBytes : operation.unitBytes);
+    return operation.unitBytes == 0 ? SectorsCovering(range, GeometryOf(device))
+                                    : Widened(range, operation.unitBytes);
 }
 
 /// Returns what is to be read back afterwards.
@@ -47,9 +47,8 @@ std::optional<AddressRange> Announce(FlashDevice& device, const RangeOperation& 
     device.Meter().Expect(operation.phase, covered->Size());
     if (operation.phase != Phase::Erase) return std::nullopt;
     device.Output().Say(
-        Talk::Normal,
-        fmt::format("Erase covers {}: {}", RangeText(*covered),
-                    CountText(covered->Size() / device.Info().sectorBytes, "sector")));
+        Talk::Normal, fmt::format("Erase covers {}: {}", RangeText(*covered),
+                                  CountText(SectorCount(*covered, GeometryOf(device)), "sector")));
     if (!verifyErase) return std::nullopt;
     device.Meter().Expect(Phase::Verify, covered->Size());
     return covered;

@@ -9,16 +9,23 @@
 
 namespace host {
 
+/// The last sector may be cut short by the end of the flash.
 struct FlashGeometry {
     std::uint64_t flashBytes = 0;
     std::uint32_t sectorBytes = 0;
     bool erasesWhole = false;  ///< one command can erase all of it
 };
 
-/// The whole sectors that hold a byte of the range.
-AddressRange SectorsCovering(const AddressRange& range, std::uint32_t sectorBytes);
+/// A range widened to whole units of so many bytes.
+AddressRange Widened(const AddressRange& range, std::uint32_t unitBytes);
+
+/// The sectors that hold a byte of the range, which lies in the flash.
+AddressRange SectorsCovering(const AddressRange& range, const FlashGeometry& flash);
 
 /// The same for a whole image.
-AddressSet SectorsOf(const image::Image& image, std::uint32_t sectorBytes);
+AddressSet SectorsOf(const image::Image& image, const FlashGeometry& flash);
+
+/// How many sectors a run of them has.
+std::uint64_t SectorCount(const AddressRange& run, const FlashGeometry& flash);
 
 }  // namespace host

@@ -7,7 +7,7 @@
 
 #include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/Sectors.h"
+#include "host/flashing/DevicePlan.h"
 
 namespace host {
 
@@ -30,28 +30,27 @@ AddressRange BlockOf(std::uint32_t address) {
 }
 
 /// The sector with that number, counted over the ranges of whole sectors.
-AddressRange Sector(const AddressSet& sectors, std::uint64_t number, std::uint32_t sectorBytes) {
+AddressRange Sector(const AddressSet& sectors, std::uint64_t number, const FlashGeometry& flash) {
     for (const AddressRange& run : sectors.Ranges()) {
-        const std::uint64_t count = run.Size() / sectorBytes;
+        const std::uint64_t count = SectorCount(run, flash);
         if (number >= count) {
             number -= count;
             continue;
         }
-        const auto first = static_cast<std::uint32_t>(run.first + number * sectorBytes);
-        return {first, first + (sectorBytes - 1)};
+        const auto first = static_cast<std::uint32_t>(run.first + number * flash.sectorBytes);
+        return SectorsCovering({first, first}, flash);
     }
     return {};
 }
 
-/// Adds the sectors of a piece of flash that hold what they should. The last one may be cut short
-/// by the end of the flash.
+/// Adds the sectors of a piece of flash that hold what they should.
 void AddEqualSectors(AddressSet& unchanged, std::uint32_t address,
                      std::span<const std::uint8_t> actual, std::span<const std::uint8_t> expected,
                      std::uint32_t sectorBytes) {
     while (!actual.empty()) {
         const std::size_t size = std::min<std::size_t>(sectorBytes, actual.size());
         if (std::ranges::equal(actual.first(size), expected.first(size)))
-            unchanged.Add({address, address + (sectorBytes - 1)});
+            unchanged.Add({address, address + static_cast<std::uint32_t>(size - 1)});
         actual = actual.subspan(size);
         expected = expected.subspan(size);
         address += sectorBytes;
@@ -62,7 +61,7 @@ bool HoldsASample(FlashDevice& device, const image::Image& image) {
     const auto holds = [&](const AddressRange& block) {
         return device.ReadFlash(block) == ContentsAfterLoad(image, block);
     };
-    return std::ranges::any_of(SampleBlocks(image, device.Info().sectorBytes), holds);
+    return std::ranges::any_of(SampleBlocks(image, GeometryOf(device)), holds);
 }
 
 }  // namespace
@@ -81,14 +80,16 @@ std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const Add
     return contents;
 }
 
-std::vector<AddressRange> SampleBlocks(const image::Image& image, std::uint32_t sectorBytes) {
-    const AddressSet sectors = SectorsOf(image, sectorBytes);
-    const std::uint64_t count = sectors.Bytes() / sectorBytes;
+std::vector<AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash) {
+    const AddressSet sectors = SectorsOf(image, flash);
+    std::uint64_t count = 0;
+    for (const AddressRange& run : sectors.Ranges())
+        count += SectorCount(run, flash);
     const std::uint64_t samples = std::min(count, std::clamp(count / 4, kSamplesMin, kSamplesMax));
     std::vector<AddressRange> blocks;
     for (std::uint64_t i = 0; i < samples; ++i) {
         const std::uint64_t number = samples == 1 ? 0 : i * (count - 1) / (samples - 1);
-        const AddressRange sector = Sector(sectors, number, sectorBytes);
+        const AddressRange sector = Sector(sectors, number, flash);
         const auto contents = ContentsAfterLoad(image, sector);
         const auto found = std::ranges::find_if(contents, [](auto byte) { return byte != 0xFF; });
         if (found != contents.end())
@@ -137,8 +138,9 @@ image::Image Without(const image::Image& image, const AddressSet& addresses) {
 }
 
 AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
-    const std::uint32_t sectorBytes = device.Info().sectorBytes;
-    const AddressSet sectors = SectorsOf(image, sectorBytes);
+    const FlashGeometry flash = GeometryOf(device);
+    const std::uint32_t sectorBytes = flash.sectorBytes;
+    const AddressSet sectors = SectorsOf(image, flash);
     device.Halt();
     if (!HoldsASample(device, image)) return {};
     AddressSet unchanged;
@@ -147,7 +149,7 @@ AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
     meter.Begin(Phase::Look);
     const std::uint64_t step = std::max<std::uint64_t>(kReadBytes / sectorBytes, 1) * sectorBytes;
     for (const AddressRange& run : sectors.Ranges()) {
-        const std::uint64_t end = std::min(std::uint64_t{run.last} + 1, device.Info().flashBytes);
+        const std::uint64_t end = std::uint64_t{run.last} + 1;
         for (std::uint64_t first = run.first; first < end; first += step) {
             const AddressRange piece{static_cast<std::uint32_t>(first),
                                      static_cast<std::uint32_t>(std::min(first + step, end) - 1)};

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "host/base/AddressSet.h"
+#include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
 
 namespace host {
@@ -17,7 +18,7 @@ class FlashDevice;
 std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const AddressRange& range);
 
 /// A few blocks spread over the image that erased flash doesn't hold, as far as there are any.
-std::vector<AddressRange> SampleBlocks(const image::Image& image, std::uint32_t sectorBytes);
+std::vector<AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash);
 
 /// Of the sectors that hold what they should, those that are worth leaving alone. Others lie
 /// between two that must be programmed, and take less time than one more start of the loader.
