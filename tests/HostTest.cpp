@@ -107,6 +107,13 @@ TEST(Text, ReadsRangesAndNamesWhatIsWrong) {
         EXPECT_TRUE(FailureOf([range = text] { ParseRange(range); }).starts_with(expected)) << text;
 }
 
+TEST(Text, NeverRoundsUpToAThousandOfAUnit) {
+    EXPECT_EQ(SizeText(1047552) + SizeText(1048575) + SizeText(1048576), "1023 KiB1.0 MiB1 MiB");
+    EXPECT_EQ(DurationText(0.9994) + DurationText(0.9996) + DurationText(59.94),
+              "999 ms1.0 s59.9 s");
+    EXPECT_EQ(DurationText(59.96) + DurationText(119.6), "1:002:00");
+}
+
 TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {
     const std::pair<const char*, const char*> cases[] = {
         {"02-1B-C3-04-05-06", "02-1b-c3-04-05-06"},
@@ -365,7 +372,7 @@ TEST(Comparison, JoinsWhatLiesCloseAndKeepsTheFirstRanges) {
     };
     differ(0x0FF, 0x0F, 0xFF);
     differ(0x10F, 0x03, 0x02);  // 15 equal bytes lie in between
-    EXPECT_EQ(found, (Differences{2, 1, {{{0x100, 0x110}, 0x0F, 0xFF}}, 0x110, true}));
+    EXPECT_EQ(found, (Differences{2, 1, {{{0x100, 0x110}, 0x0F, 0xFF}}, 0x110, 0x110}));
     differ(0x120, 0x00, 0x01);  // 16
     EXPECT_EQ(found.ranges.back(), (DifferentRange{{0x121, 0x121}, 0x00, 0x01}));
     for (std::uint32_t i = 2; i < 20; ++i)

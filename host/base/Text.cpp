@@ -77,7 +77,8 @@ std::string SizeText(std::uint64_t bytes) {
     constexpr std::array units{"KiB", "MiB", "GiB"};
     double amount = static_cast<double>(bytes) / 1024;
     std::size_t unit = 0;
-    for (; amount >= 1024 && unit + 1 < units.size(); ++unit)
+    // What would be shown as 1024.0 belongs to the next unit.
+    for (; amount >= 1023.95 && unit + 1 < units.size(); ++unit)
         amount /= 1024;
     const bool whole = amount == static_cast<double>(static_cast<std::uint64_t>(amount));
     return fmt::format("{:.{}f} {}", amount, whole ? 0 : 1, units[unit]);
@@ -89,9 +90,9 @@ std::string CountText(std::uint64_t count, const char* thing) {
 
 std::string DurationText(double seconds) {
     if (seconds < 0.001) return "under 1 ms";
-    if (seconds < 1) return fmt::format("{:.0f} ms", seconds * 1000);
-    if (seconds < 60) return fmt::format("{:.1f} s", seconds);
-    const auto whole = static_cast<std::uint64_t>(seconds);
+    if (seconds < 0.9995) return fmt::format("{:.0f} ms", seconds * 1000);
+    if (seconds < 59.95) return fmt::format("{:.1f} s", seconds);
+    const auto whole = static_cast<std::uint64_t>(seconds + 0.5);
     return fmt::format("{}:{:02}", whole / 60, whole % 60);
 }
 

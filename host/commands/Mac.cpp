@@ -75,7 +75,7 @@ CommandRow MacProgram() {
     return {
         "mac program",
         "Program the MAC address",
-        "Without --commit the address is gone after the next reset of the device.",
+        "Without --commit the next reset of the device brings back what was committed last.",
         "  corvane-flash mac program 02-1b-c3-04-05-06 --commit",
         {{"ADDRESS",
           "",

@@ -115,9 +115,12 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
 }
 
 /// What can still be tried depends on what was erased.
-std::string Advice(const Differences& differences, const EraseChoice& erase) {
-    if (!differences.notErased) return "these bytes were not programmed";
-    if (erase.kind == EraseChoice::Kind::Necessary || erase.kind == EraseChoice::Kind::Everything)
+std::string Advice(const Differences& differences, const ProgramPlan& plan) {
+    const auto& address = differences.notErased;
+    if (!address) return "these bytes were not programmed";
+    if (std::any_of(plan.erased.begin(), plan.erased.end(), [&](const AddressRange& run) {
+            return run.first <= *address && *address <= run.last;
+        }))
         return "some bits stay 0 although their sectors were erased: the cells are worn out or "
                "protected";
     return "some bits were not erased first: program it with --erase necessary";
@@ -143,8 +146,7 @@ Outcome LoadAndCompare(Context& context, FlashDevice& device, const LoadedImages
         outcome.result["checksum"] = "0x" + device.Published(keys::kChecksumValue);
     if (!context.options.noVerify) {
         if (const auto differences = CompareWithFlash(device, images.image); !differences.Empty())
-            FailAsDifferent(outcome, differences, images,
-                            Advice(differences, ChosenErase(context.settings)));
+            FailAsDifferent(outcome, differences, images, Advice(differences, plan));
     }
     outcome.result["phases"] = PhasesJson(device.Meter());
     ShowSummary(context.reporter, device.Meter());

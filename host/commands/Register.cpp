@@ -63,7 +63,7 @@ CommandRow RegisterProgram() {
     return {
         "register program",
         "Program a user register",
-        "Without --commit the value is gone after the next reset of the device.",
+        "Without --commit the next reset of the device brings back what was committed last.",
         "  corvane-flash register program 0 0x12ab --commit",
         {IndexArgument(),
          {"VALUE", "", "Hexadecimal, up to 32 bits", &Options::value, Offers::Nothing, {}, true},

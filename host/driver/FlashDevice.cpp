@@ -265,11 +265,13 @@ void FlashDevice::Fail(const std::string& error, const std::string& doing) {
         text = fmt::format("can't reach the target: {}; {}", text, kCheckConnection);
         throw DeviceFailure(ExitStatus::Unreachable, text, text, known);
     }
-    if (const auto& found = watch_.FirstNotBlank()) FailAsNotBlank(*found, text, state, known);
+    // A blank check that follows on a failed access finds what that has left.
+    if (const auto& found = watch_.FirstNotBlank(); found && cause.empty())
+        FailAsNotBlank(*found, text, state, known);
     const std::string rest = fmt::format("; {}; {}", state, Advice());
     std::string remark = text;
     if (shown && cause.empty())
-        remark = doing + " ended with " + (error.empty() ? "the errors above" : error);
+        remark = doing + (error.empty() ? " ended with the errors above" : ": " + error);
     else if (shown)
         remark = doing + " failed: " + cause;
     throw DeviceFailure(ExitStatus::DeviceFailed, text + rest, remark + rest, known);

@@ -29,7 +29,7 @@ void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
         differences.ranges.back().range.last = address;
     ++differences.byteCount;
     differences.lastAddress = address;
-    if ((expected & ~actual) != 0) differences.notErased = true;
+    if ((expected & ~actual) != 0 && !differences.notErased) differences.notErased = address;
 }
 
 /// Calls `compare` for each piece of a range that was read.
@@ -75,7 +75,7 @@ Json ToJson(const Differences& differences, const LoadedImages* images) {
             {"bytes", differences.byteCount},
             {"ranges", ranges},
             {"rangeCount", differences.rangeCount},
-            {"notErased", differences.notErased}};
+            {"notErased", differences.notErased.has_value()}};
 }
 
 void Fail(Outcome& outcome, const Differences& differences, const LoadedImages* images,

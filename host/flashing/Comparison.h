@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 #include <vector>
@@ -33,7 +34,9 @@ struct Differences {
     std::uint64_t rangeCount = 0;
     std::vector<DifferentRange> ranges;  ///< the first of them
     std::uint32_t lastAddress = 0;       ///< of the last byte that differs
-    bool notErased = false;  ///< some bit that should be 1 is 0: only an erase can mend that
+
+    /// The first byte of which a bit that should be 1 is 0: only an erase can mend that.
+    std::optional<std::uint32_t> notErased = {};
 
     bool Empty() const { return byteCount == 0; }
     bool operator==(const Differences&) const = default;

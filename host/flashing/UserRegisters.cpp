@@ -49,11 +49,11 @@ void SayWhetherCommitted(FlashDevice& device, Outcome& outcome) {
     }
     outcome.result["committed"] = committed;
     if (outcome.status != ExitStatus::Done) return;
-    device.Output().Say(Talk::Normal,
-                        committed
-                            ? "Committed: the value stays after a reset."
-                            : "Not committed: the value is gone after the next reset of the device "
-                              "(a simulated one is reset after each run); --commit keeps it.");
+    device.Output().Say(
+        Talk::Normal, committed ? "Committed: the value stays after a reset."
+                                : "Not committed: the next reset of the device (a simulated one is "
+                                  "reset after each run) brings back what was committed last; "
+                                  "--commit keeps the value.");
 }
 
 }  // namespace host
