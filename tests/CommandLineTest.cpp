@@ -229,7 +229,13 @@ const Row kFailing[] = {
     {"tool program", 2, "", "FILE is required"},
     {"tool program small.hex --erase some", 2, "", "necessary, none, all or a range A-B"},
     {"tool program small.hex --base 400", 2, "", "and there is none"},
-    {"tool program data.bin far.srec data.bin --base 400", 2, "", "write FILE@ADDRESS for each"},
+    {"echo > b; tool program data.bin far.srec b --base 400", 2, "", "write FILE@ADDRESS for each"},
+    {"tool program data.bin@400 --base 400", 2, "", "data.bin has its address behind the @"},
+    {"tool program none@here", 2, "", "there is no file none@here, and 'here' behind its @"},
+    {"tool checksum --format bin", 2, "", "and none is named"},
+    {"tool map small.hex --set FlashEraseType='By Address Range' --set FlashEraseEndAddr=ffffffff "
+     "--set FlashProgramOption='Use the Erase Options Specified Below'",
+     2, "", "0x0 and 0xffffffff, don't lie in the device's flash, 0x0-0x3ffff"},
     {"tool program small.hex@400", 2, "", "no raw binary (ihex)"},
     {"tool verify small.hex --range 20+4", 2, "", "no bytes in the range 0x20-0x23"},
     {"tool erase --range 20+0", 2, "", "the range '20+0' has no bytes"},
@@ -267,6 +273,7 @@ const Row kFailing[] = {
     // Files.
     {"tool program none.elf", 3, "", "none.elf"},
     {"tool program data.bin", 3, "", "--base"},
+    {"tool settings --forget FlashResetSetting FlashResetSetting=1", 2, "", "are two wishes"},
     {"tool program /bin/true", 3, "", "program, 64-bit found, a 32-bit little-endian executable"},
     {"for f in /dev/zero -; do yes | tool program $f --base 0 || exit; done", 3, "",
      "/dev/zero: it is larger than 128 MiB, and no image file is"},
@@ -417,7 +424,7 @@ const Row kStories[] = {
      "tolva,fail-access=50; tool -q blank-check --range 0-3ff",
      0, "0x0-0x3ff is blank", "the flash is incomplete: 1 KiB erased"},
     {"tool settings FlashVerboseMode=1 >/dev/null; tool -q settings FlashVerboseMode; tool -q "
-     "checksum; tool -q settings FlashChecksumValue; tool -q settings --forget FlashVerboseMode",
+     "checksum; tool -q settings FlashChecksumValue; tool -q settings --forget flashverbosemode",
      0, "1\n0xb7094978\nb7094978\n0\n", ""},
     {"(unset XDG_CONFIG_HOME HOME; tool -q info >/dev/null && tool settings FlashVerboseMode=1)", 3,
      "", "corvane-flash: no place to keep settings"},

@@ -46,9 +46,7 @@ Outcome Answer(Context& context, const AddressRange& range, const std::string& c
     return {.result = {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}}};
 }
 
-Outcome OfImage(Context& context) {
-    const LoadedImages images =
-        ReadImages({*context.options.imageOf}, ImageOptions(context.options));
+Outcome OfImage(Context& context, const LoadedImages& images) {
     return WithDevice(context, [&](FlashDevice& device) {
         RequireFit(device, images);
         const AddressRange range = device.RangeInFlash(context.options.range);
@@ -67,7 +65,10 @@ Outcome OfFlash(Context& context) {
 }
 
 Outcome RunChecksum(Context& context) {
-    return context.options.imageOf ? OfImage(context) : OfFlash(context);
+    std::vector<std::string> files;
+    if (context.options.imageOf) files = {*context.options.imageOf};
+    const LoadedImages images = ReadImages(files, ImageOptions(context.options));
+    return files.empty() ? OfFlash(context) : OfImage(context, images);
 }
 
 }  // namespace

@@ -67,13 +67,17 @@ Outcome Keep(Context& context, const SettingInfo& info, const std::string& text)
 
 Outcome Forget(Context& context, const std::string& key) {
     const SettingInfo& info = RequireSetting(key, "settings");
-    context.settings.Forget(key);
+    context.settings.Forget(info.key);
     Save(context);
     ShowOne(context, info);
     return {.result = ToJson(context, info)};
 }
 
 Outcome RunSettings(Context& context) {
+    if (context.options.forget && context.options.argument)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("--forget {} and {} are two wishes; say one at a time",
+                                  *context.options.forget, *context.options.argument));
     if (context.options.forget) return Forget(context, *context.options.forget);
     if (!context.options.argument) return List(context);
     const std::string& argument = *context.options.argument;

@@ -35,7 +35,13 @@ NamedFile SplitAddress(const std::string& text) {
     const std::size_t at = text.rfind('@');
     std::error_code ignored;
     if (at == std::string::npos || std::filesystem::exists(text, ignored)) return {text, {}};
-    return {text.substr(0, at), ParseHexArgument(text.substr(at + 1), "the address of " + text)};
+    const std::string behind = text.substr(at + 1);
+    if (const auto address = HexNumber(behind)) return {text.substr(0, at), address};
+    throw Failure(
+        ExitStatus::WrongUsage,
+        fmt::format("there is no file {}, and '{}' behind its @ is no hexadecimal address "
+                    "of up to 32 bits",
+                    text, behind));
 }
 
 LoadedImages Within(const LoadedImages& images, const AddressRange& range) {
@@ -60,23 +66,40 @@ LoadedImages Within(const LoadedImages& images, const AddressRange& range) {
 
 namespace {
 
-/// --base goes with one raw binary: two would lie on each other, and the others have addresses of
-/// their own.
-void RequireOneBase(const std::vector<std::string>& raw) {
-    if (raw.size() == 1) return;
+/// The raw binaries among the files, by whether they have an address of their own.
+struct RawBinaries {
+    std::vector<std::string> placed;
+    std::vector<std::string> unplaced;
+};
+
+/// Two would lie on each other.
+void RequireNoSecond(const RawBinaries& raw) {
+    if (raw.unplaced.size() > 1)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("--base is for one raw binary, not for {} and {}; write "
+                                  "FILE@ADDRESS for each",
+                                  raw.unplaced[0], raw.unplaced[1]));
+}
+
+void RequireUseForBase(const RawBinaries& raw) {
+    if (!raw.unplaced.empty()) return;
     throw Failure(ExitStatus::WrongUsage,
-                  raw.empty() ? "--base says where a raw binary goes, and there is none; leave it "
-                                "out, or say --format bin"
-                              : fmt::format("--base is for one raw binary, not for {} and {}; "
-                                            "write FILE@ADDRESS for each",
-                                            raw[0], raw[1]));
+                  raw.placed.empty()
+                      ? "--base says where a raw binary goes, and there is none; leave it out, or "
+                        "say --format bin"
+                      : fmt::format("--base says where a raw binary goes, and {} has its address "
+                                    "behind the @ already; leave one of the two out",
+                                    raw.placed.front()));
 }
 
 }  // namespace
 
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
+    if (paths.empty() && (options.base || options.format))
+        throw Failure(ExitStatus::WrongUsage,
+                      "--base and --format say how an image file is read, and none is named");
     LoadedImages images;
-    std::vector<std::string> raw;
+    RawBinaries raw;
     for (const std::string& text : paths) {
         const auto [path, address] = SplitAddress(text);
         const auto [image, format] =
@@ -87,10 +110,11 @@ LoadedImages ReadImages(const std::vector<std::string>& paths, const image::Read
                           fmt::format("{}: the file is no raw binary ({}) and has addresses of its "
                                       "own; leave the address out, or say --format bin",
                                       text, image::FormatName(format)));
-        if (!address && binary) raw.push_back(path);
+        if (binary) (address ? raw.placed : raw.unplaced).push_back(path);
+        RequireNoSecond(raw);
         images.Add(image, path);
     }
-    if (options.base) RequireOneBase(raw);
+    if (options.base) RequireUseForBase(raw);
     return images;
 }
 
