@@ -25,16 +25,17 @@ using Clock = std::chrono::steady_clock;
 constexpr std::chrono::seconds kPatience{10};
 constexpr std::chrono::milliseconds kLook{20};
 
-std::string LockPath(const std::string& path) {
-    std::error_code ignored;
-    return std::filesystem::weakly_canonical(FollowLinks(path), ignored).string() + ".lock";
-}
-
 bool IsStillThere(const Descriptor& file, const std::string& path) {
     struct stat locked {};
     struct stat named {};
     return fstat(file.Get(), &locked) == 0 && stat(path.c_str(), &named) == 0 &&
            locked.st_dev == named.st_dev && locked.st_ino == named.st_ino;
+}
+
+/// Somebody may have a file of that name which is no lock of ours.
+bool IsEmptyFile(const Descriptor& file) {
+    struct stat status {};
+    return fstat(file.Get(), &status) == 0 && S_ISREG(status.st_mode) && status.st_size == 0;
 }
 
 enum class Attempt { Locked, Busy, Impossible };
@@ -55,6 +56,11 @@ Attempt TryLock(Descriptor& file, const std::string& path) {
 
 }  // namespace
 
+std::string LockPath(const std::string& path) {
+    std::error_code ignored;
+    return std::filesystem::weakly_canonical(FollowLinks(path), ignored).string() + ".lock";
+}
+
 FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNotice& say)
     : path_(LockPath(path)) {
     const auto start = Clock::now();
@@ -73,7 +79,7 @@ FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNoti
 }
 
 FileLock::~FileLock() {
-    if (file_.IsOpen()) unlink(path_.c_str());
+    if (file_.IsOpen() && IsEmptyFile(file_) && IsStillThere(file_, path_)) unlink(path_.c_str());
 }
 
 }  // namespace host

@@ -20,6 +20,9 @@ class FileBusy : public Failure {
     using Failure::Failure;
 };
 
+/// Where the lock of a file lies.
+std::string LockPath(const std::string& path);
+
 class FileLock {
   public:
     /// Takes the lock of a file that need not exist, whatever the name that leads to it. Another

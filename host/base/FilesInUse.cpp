@@ -8,6 +8,7 @@
 #include <filesystem>
 
 #include "host/base/Errors.h"
+#include "host/base/FileLock.h"
 #include "host/base/OutputFile.h"
 
 namespace host {
@@ -35,6 +36,11 @@ bool IsSameFile(const std::string& one, const std::string& other) {
 
 void FilesInUse::Add(const std::string& path, const std::string& what) {
     if (!path.empty() && path != "-") files_.push_back({path, what});
+}
+
+void FilesInUse::AddLocked(const std::string& path, const std::string& what) {
+    Add(path, what);
+    if (!path.empty()) Add(LockPath(path), "the lock of " + what);
 }
 
 void FilesInUse::RequireOther(const std::string& path, const std::string& output) const {

@@ -12,6 +12,9 @@ class FilesInUse {
     /// `what` says what the file is to the run: "the image file". An empty path and "-" add none.
     void Add(const std::string& path, const std::string& what);
 
+    /// The same for a file that is locked: its lock is in use as well.
+    void AddLocked(const std::string& path, const std::string& what);
+
     /// Failure (WrongUsage) when `path`, where `output` is to be written, is one of them under any
     /// name, links included.
     void RequireOther(const std::string& path, const std::string& output) const;

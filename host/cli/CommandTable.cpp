@@ -42,7 +42,10 @@ const std::vector<OptionRow>& GlobalOptions() {
         {"--loader", "FILE",
          "The flash loader's ELF file, for a target behind --gdb; default: where the plug-in looks",
          &Options::loader, Offers::Files},
-        {"--settings", "FILE", "Settings file instead of ~/.config/corvane-flash/settings.toml",
+        {"--settings", "FILE",
+         "Settings file instead of ~/.config/corvane-flash/settings.toml; kept values go beside "
+         "it, "
+         "for x.toml into x.kept.toml",
          &Options::settingsFile, Offers::Files},
         {"--set", "KEY=TEXT", "Set one of the plug-in's settings for this run; may be repeated",
          &Options::set, Offers::SettingAssignments},

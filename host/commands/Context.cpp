@@ -69,10 +69,10 @@ FilesInUse InputFiles(const Context& context) {
     for (const std::string& file : options.files)
         files.Add(SplitAddress(file).path, "an image file");
     files.Add(SplitAddress(options.imageOf.value_or("")).path, "the image file");
-    files.Add(options.simFile.value_or(""), "the device file");
+    files.AddLocked(options.simFile.value_or(""), "the device file");
     files.Add(options.loader.value_or(""), "the loader");
     files.Add(context.settings.Paths().user, "the settings file");
-    files.Add(context.settings.Paths().kept, "the file of kept settings");
+    files.AddLocked(context.settings.Paths().kept, "the file of kept settings");
     files.Add(PluginFile(options.plugin.value_or("")), "the plug-in");
     return files;
 }

@@ -92,6 +92,8 @@ SettingPaths FindSettingPaths(const std::string& chosen) {
         if (directory.empty()) return paths;
         paths.user = directory + "/corvane-flash/settings.toml";
     }
+    std::error_code ignored;
+    if (fs::exists(paths.user, ignored) && !fs::is_regular_file(paths.user, ignored)) return paths;
     paths.kept = fs::path(paths.user).replace_extension(".kept.toml").string();
     return paths;
 }

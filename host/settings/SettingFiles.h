@@ -22,7 +22,8 @@ struct SettingPaths {
 };
 
 /// `chosen` is the file that the command line names. Without one, the user's file lies in
-/// corvane-flash/settings.toml below XDG_CONFIG_HOME or ~/.config.
+/// corvane-flash/settings.toml below XDG_CONFIG_HOME or ~/.config. Beside a chosen one that is no
+/// regular file (a pipe, a device) nothing is kept.
 SettingPaths FindSettingPaths(const std::string& chosen);
 
 /// Reads and checks a settings file. A missing one is empty unless `mustExist`. Failure (BadFile)

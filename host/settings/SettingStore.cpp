@@ -66,9 +66,14 @@ void SettingStore::Forget(const std::string& key) {
 void SettingStore::Save(const WaitNotice& say) {
     if (changed_.empty()) return;
     if (paths_.kept.empty())
-        throw Failure(ExitStatus::BadFile,
-                      "no place to keep settings: neither XDG_CONFIG_HOME nor HOME is set; name a "
-                      "file with --settings");
+        throw Failure(
+            ExitStatus::BadFile,
+            paths_.user.empty()
+                ? "no place to keep settings: neither XDG_CONFIG_HOME nor HOME is set; name a file "
+                  "with --settings"
+                : fmt::format("no place to keep settings: {} is no regular file; name another with "
+                              "--settings",
+                              paths_.user));
     MakeDirectoryOf(paths_.kept);
     const FileLock lock(kSettingsFile, paths_.kept, say);
     SettingTexts texts = ReadSettingFile(paths_.kept, false, true);
