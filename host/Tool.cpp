@@ -68,20 +68,20 @@ Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
 template <typename Action>
 Outcome Guarded(Reporter& reporter, Action&& action) try {
     Outcome outcome = action();
-    if (!outcome.error.empty()) reporter.Error(outcome.error);
+    if (!outcome.error.empty()) reporter.ClosingError(outcome.error);
     for (const std::string& line : outcome.details)
         reporter.ErrorDetail(line);
     return outcome;
 } catch (const DeviceFailure& failure) {
-    reporter.Error(failure.Remark());
+    reporter.ClosingError(failure.Remark());
     return {failure.Status(), failure.what(), failure.Result()};
 } catch (const Failure& failure) {
-    reporter.Error(failure.what());
+    reporter.ClosingError(failure.what());
     return {failure.Status(), failure.what()};
 } catch (const std::exception& error) {
     const std::string text =
         fmt::format("an error of corvane-flash itself: {}; please report it", error.what());
-    reporter.Error(text);
+    reporter.ClosingError(text);
     return {ExitStatus::InternalError, text};
 }
 
@@ -90,7 +90,7 @@ Outcome CheckOutput(Outcome outcome, int error, Reporter& reporter) {
     if (error == 0 || error == EPIPE || outcome.status != ExitStatus::Done) return outcome;
     const std::string text =
         "can't write to standard output: " + std::generic_category().message(error);
-    reporter.Error(text);
+    reporter.ClosingError(text);
     const auto status = Interrupted() ? ExitStatus::Interrupted : ExitStatus::BadFile;
     return {status, text, outcome.result};
 }

@@ -46,8 +46,20 @@ void RequireInput(const Context& context, const std::string& name) {
         if (name == plugin::ProgramRegisterOperation(index)) RequireRegisterSetting(context, index);
 }
 
+/// What the operation was run for, under the names that the command for it has.
+Json Found(const FlashDevice& device, const std::string& name) {
+    if (name == plugin::kReadMac) return {{"mac", device.Published(keys::kMacInput)}};
+    if (name == plugin::kCalculateChecksum)
+        return {{"checksum", "0x" + device.Published(keys::kChecksumValue)}};
+    for (const unsigned index : {0U, 1U})
+        if (name == plugin::ReadRegisterOperation(index))
+            return {{"register", index}, {"value", PublishedRegister(device, index)}};
+    return Json::object();
+}
+
 Outcome OperationOn(FlashDevice& device, const std::string& name) {
     Outcome outcome = RunOperation(device, name, Talk::Normal);
+    outcome.result.update(Found(device, name));
     const RegisterValues written{device.Registers().Of(0).written,
                                  device.Registers().Of(1).written};
     if (written[0] || written[1]) {

@@ -12,6 +12,10 @@ namespace host {
 
 std::uint32_t ReadRegister(FlashDevice& device, unsigned index) {
     device.Perform(plugin::ReadRegisterOperation(index), Talk::Verbose);
+    return PublishedRegister(device, index);
+}
+
+std::uint32_t PublishedRegister(const FlashDevice& device, unsigned index) {
     return ParseHexArgument(device.Published(keys::kRegisterInputs[index]),
                             "what the plug-in has read");
 }

@@ -15,6 +15,9 @@ class FlashDevice;
 /// The register's value, by the plug-in's own read operation.
 std::uint32_t ReadRegister(FlashDevice& device, unsigned index);
 
+/// The value that the read operation just run has published.
+std::uint32_t PublishedRegister(const FlashDevice& device, unsigned index);
+
 /// Whether the programming to come commits its value: when that was `asked` for, or else when the
 /// setting `key` says so, which is then shown with where it comes from.
 void ChooseCommit(FlashDevice& device, const char* key, bool asked);

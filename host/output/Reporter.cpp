@@ -68,10 +68,15 @@ void Reporter::PluginMessage(Talk level, const std::string& text) {
 
 void Reporter::PluginError(Talk level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "error"}, {"text", text}});
-    if (Hears(level)) Error(text);
+    if (Hears(level)) ClosingError(text);
 }
 
 void Reporter::Error(const std::string& text) {
+    JsonLine("message", {{"from", "host"}, {"level", "error"}, {"text", text}});
+    ClosingError(text);
+}
+
+void Reporter::ClosingError(const std::string& text) {
     const char* form = colour_ ? "\033[1;31mcorvane-flash:\033[0m {}" : "corvane-flash: {}";
     Line(stderr, fmt::format(fmt::runtime(form), text));
 }

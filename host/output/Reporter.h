@@ -57,9 +57,13 @@ class Reporter {
     void PluginMessage(Talk level, const std::string& text);
     void PluginError(Talk level, const std::string& text);
 
+    /// An error beside the one that the command ends with.
     void Error(const std::string& text);
 
-    /// A line of an error that takes several.
+    /// What the command ends with; the JSON's end line has it.
+    void ClosingError(const std::string& text);
+
+    /// A line of a closing error that takes several.
     void ErrorDetail(const std::string& text) { Line(stderr, text); }
     void Progress(Phase phase, const PhaseProgress& progress);
     void End(const Outcome& outcome);
