@@ -99,7 +99,8 @@ Outcome CheckOutput(Outcome outcome, int error, Reporter& reporter) {
 
 int RunTool(const std::vector<std::string>& words) {
     // Whoever asked for JSON gets the end line of a command line that can't be read, too.
-    const bool json = std::find(words.begin(), words.end(), "--json") != words.end();
+    const auto optionsEnd = std::find(words.begin(), words.end(), "--");
+    const bool json = std::find(words.begin(), optionsEnd, "--json") != optionsEnd;
     ParsedLine line;
     Reporter early({Talk::Normal, json, "none"});
     Outcome outcome = Guarded(early, [&] {

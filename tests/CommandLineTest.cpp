@@ -64,7 +64,7 @@ class Workplace {
             "cd '" + path_.string() +
             "' && exec >.out 2>.err </dev/null\n"
             "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
-            "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_PLUGIN\n"
+            "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_PLUGIN\n"
             "ELF=/usr/lib/firmware-tomu/toboot.elf HEX=/usr/lib/firmware-tomu/toboot.ihex\n"
             "BIN=/usr/lib/firmware-tomu/toboot.bin\n"
             "tool() { \"" CORVANE_FLASH_TOOL "\" \"$@\"; }\n" +
@@ -225,6 +225,10 @@ const Row kFailing[] = {
     {"tool mac", 2, "", "mac what? read or program"},
     {"tool info --nonsense", 2, "", "--nonsense; 'corvane-flash info --help'"},
     {"tool info x --qiet y", 2, "", "not expected here: x --qiet y"},
+    {"tool mac read -- --json", 2, "", "not expected here: --json; 'corvane"},
+    {"tool program --trace -- small.hex", 2, "", "--trace: its value is missing"},
+    {"tool --sim-file= info", 2, "", "--sim-file: the name of the file is empty"},
+    {"CORVANE_GDB=:1 CORVANE_SIM=quen tool info", 2, "", "with CORVANE_SIM and CORVANE_GDB; unset"},
     {"tool info --qiet", 2, "", "--qiet; did you mean '--quiet'?"},
     {"tool program", 2, "", "FILE is required"},
     {"tool program small.hex --erase some", 2, "", "necessary, none, all or a range A-B"},
@@ -269,15 +273,18 @@ const Row kFailing[] = {
     {"tool mac program 03-1b-c3-04-05-06", 2, "", "is a multicast address"},
     {"tool operation ProgramMACAddress", 2, "", "is all ones"},
     {"tool operation ProgramUserRegister1", 2, "", "set FlashUserRegister1Input with --set"},
+    {"tool settings --forget FlashResetSetting FlashResetSetting=1", 2, "", "are two wishes"},
     {"tool settings FlashMACAddrInput=021bc3040506", 2, "", "belongs to one board and isn't kept"},
     // Files.
     {"tool program none.elf", 3, "", "none.elf"},
     {"tool program data.bin", 3, "", "--base"},
-    {"tool settings --forget FlashResetSetting FlashResetSetting=1", 2, "", "are two wishes"},
     {"tool program /bin/true", 3, "", "program, 64-bit found, a 32-bit little-endian executable"},
     {"for f in /dev/zero -; do yes | tool program $f --base 0 || exit; done", 3, "",
      "/dev/zero: it is larger than 128 MiB, and no image file is"},
     {"truncate -s 1G data.bin; tool program data.bin --base 0", 3, "", "larger than 128 MiB"},
+    {"tool program small.hex -- --dry-run", 3, "", "can't read the image file --dry-run: No such"},
+    {"tool --settings /dev/null settings FlashVerboseMode=1", 3, "",
+     "/dev/null is no regular file"},
     {"tool program bad.hex", 3, "", "bad.hex"},
     {"head -c 3000 $ELF > cut.elf; tool program cut.elf", 3, "", "cut.elf"},
     {"tool program small.hex other.srec", 3, "", "other.srec"},
@@ -314,6 +321,8 @@ const Row kFailing[] = {
      "  0x40-0x16b              data.bin: first expected 0x42, actual 0xff\n"},
     {"tool program small.hex --sim tolva,stuck-cell=0x12", 5, "Written",
      "1 byte in 1 range; some bits stay 0 although their sectors were erased: "},
+    {"tool program small.hex --erase 0-0 --sim tolva,stuck-cell=0x12", 5, "Written",
+     "some bits stay 0 although their sectors were erased: "},
     {"tool erase --range 0-0 --sim tolva,stuck-cell=0x12", 5, "Erased        1 KiB",
      "reported the erase done: 0x12 holds 0x00, not 0xff; 1 byte in 1 range not blank; the cells"},
     {"tool operation Erase --sim tolva,stuck-cell=0x12", 5, "Compared      1 KiB", "not blank"},
@@ -328,8 +337,6 @@ const Row kFailing[] = {
      130, "", "interrupted"},
 };
 
-    {"tool program small.hex --erase 0-0 --sim tolva,stuck-cell=0x12", 5, "Written",
-     "some bits stay 0 although their sectors were erased: "},
 /// That a stream holds a part; that it is empty for ""; nothing for null.
 void ExpectPart(const std::string& stream, const char* part) {
     if (part == nullptr) return;
@@ -431,6 +438,18 @@ const Row kStories[] = {
     {"XDG_CONFIG_HOME=/proc/none tool -q blank-check && XDG_CONFIG_HOME=/proc/none tool settings "
      "FlashVerboseMode=1",
      3, "is blank", "can't write the settings file /proc/none"},
+    {"export CORVANE_SIM_FILE=d; tool -q program small.hex --sim quen\n"
+     "tool program data.bin --base 3 --erase all --blank-check --sim quen,fail-access=21",
+     1, "", "programming 0x3-0x12e failed: Writing 1 x 4 bytes at 0x400FD000 on page 1"},
+    {"export CORVANE_SIM_FILE=d; echo mine >d.lock; tool info >&2; cat d.lock; tool read d.lock "
+     "--force",
+     2, "mine\n", "that is the lock of the device file of this run"},
+    {"tool --json info --trace /dev/full --sim-file none/d --sim tolva,fail-access=9", 4,
+     "\"from\":\"host\",\"level\":\"error\",\"text\":\"", nullptr},
+    {"for o in ReadMACAddress ReadUserRegister1 CalculateChecksum; do tool --json -q operation $o "
+     "|\n"
+     "grep -E 'mac.:.ff-ff-ff|register.:1,.value.:4294967295|checksum.:.0xb7094978'; done | wc -l",
+     0, "3\n", ""},
     {"tool read a.bin; ln a.bin old; tool -q read a.bin --force --range 0-f && wc -c < a.bin; wc "
      "-c "
      "< old",

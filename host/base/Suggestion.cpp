@@ -44,7 +44,7 @@ std::size_t Distance(const std::string& one, const std::string& other) {
 
 std::string Suggestion(const std::string& word, const std::vector<std::string>& known) {
     constexpr std::size_t kLongestWord = 64;
-    if (word.size() > kLongestWord) return {};
+    if (word.size() > kLongestWord || std::count(known.begin(), known.end(), word) != 0) return {};
     const std::string* nearest = nullptr;
     std::size_t least = std::max<std::size_t>(1, word.size() / 3) + 1;
     for (const std::string& candidate : known) {

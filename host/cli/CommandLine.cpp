@@ -7,6 +7,7 @@
 
 #include <CLI/CLI.hpp>
 #include <algorithm>
+#include <cstdlib>
 #include <memory>
 #include <type_traits>
 
@@ -19,6 +20,34 @@
 namespace host {
 
 namespace {
+
+// What stands behind "--" is an argument, whatever it begins with. CLI11 would make an option of it
+// again where the command has no place for it, so that it gets a mark that no typed word can hold.
+constexpr char kMark = '\0';
+
+bool IsMarked(const std::string& word) {
+    return word.starts_with(kMark);
+}
+
+std::string Unmarked(const std::string& word) {
+    return IsMarked(word) ? word.substr(1) : word;
+}
+
+/// CLI11 would also look for the value of "--option=" in the next word.
+std::vector<std::string> WordsForParser(const std::vector<std::string>& words) {
+    std::vector<std::string> prepared;
+    bool behind = false;
+    for (const std::string& word : words) {
+        if (behind)
+            prepared.push_back(kMark + word);
+        else if (word.size() > 3 && word.starts_with("--") && word.find('=') == word.size() - 1)
+            prepared.insert(prepared.end(), {word.substr(0, word.size() - 1), ""});
+        else if (word != "--")
+            prepared.push_back(word);
+        behind = behind || word == "--";
+    }
+    return prepared;
+}
 
 /// Texts are taken as they come, an empty one too, and the last of several counts.
 template <typename Text>
@@ -58,16 +87,34 @@ bool HasTypedRival(const OptionRow& row, const std::vector<std::string>& words) 
                        [&](const std::string& rival) { return IsTyped(rival, words); });
 }
 
+std::string NoValue(const std::string& text) {
+    return IsMarked(text) ? "its value is missing" : "";
+}
+
+std::string NoFileName(const std::string& text) {
+    return text.empty() ? "the name of the file is empty" : "";
+}
+
 void Define(CLI::App& app, const OptionRow& row, Options& options) {
     CLI::Option* option = DefineMember(app, row, options);
     option->required(row.required);
     if (!row.choices.empty() && row.offers != Offers::SomeChoices)
         option->check(CLI::IsMember(row.choices));
+    if (row.offers == Offers::Files) option->check(NoFileName);
+    if (row.IsArgument())
+        option->transform(Unmarked);
+    else if (!row.IsSwitch())
+        option->check(NoValue);
 }
 
-void TakeEnvironment(CLI::App& app, const OptionRow& row, const std::vector<std::string>& words) {
-    if (*row.environment != '\0' && !HasTypedRival(row, words))
-        app.get_option(SplitNames(row).back())->envname(row.environment);
+void TakeEnvironment(CLI::App& app, const OptionRow& row, const std::vector<std::string>& words,
+                     Options& options) {
+    const std::string name = SplitNames(row).back();
+    if (*row.environment == '\0' || HasTypedRival(row, words)) return;
+    app.get_option(name)->envname(row.environment);
+    const char* text = std::getenv(row.environment);
+    if (!row.rivals.empty() && !IsTyped(name, words) && text != nullptr && *text != '\0')
+        options.targetVariables.emplace_back(row.environment);
 }
 
 /// The app of a command; for one of two words, below the app of the first word.
@@ -105,7 +152,7 @@ struct Parser {
         app.require_subcommand(0, 1);
         for (const OptionRow& row : GlobalOptions()) {
             Define(app, row, options);
-            TakeEnvironment(app, row, words);
+            TakeEnvironment(app, row, words, options);
         }
         for (const CommandRow& row : commands) {
             CLI::App* command = AddCommand(app, row);
@@ -140,10 +187,13 @@ std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
     std::string text = error.what();
     std::replace(text.begin(), text.end(), '\n', ' ');
     if (dynamic_cast<const CLI::ExtrasError*>(&error) == nullptr || surplus.empty()) return text;
-    return fmt::format("{}: {}{}",
-                       command.empty() ? "unknown command or option" : "not expected here",
-                       fmt::join(surplus, " "),
-                       Suggestion(surplus.front(), KnownWords(commands, command, surplus.front())));
+    const std::string& first = surplus.front();
+    std::vector<std::string> words(surplus.size());
+    std::transform(surplus.begin(), surplus.end(), words.begin(), Unmarked);
+    return fmt::format(
+        "{}: {}{}", command.empty() ? "unknown command or option" : "not expected here",
+        fmt::join(words, " "),
+        IsMarked(first) ? "" : Suggestion(first, KnownWords(commands, command, first)));
 }
 
 [[noreturn]] void Refuse(const CommandRows& commands, const CLI::ParseError& error,
@@ -158,6 +208,7 @@ std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
 }  // namespace
 
 ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words) {
+    words = WordsForParser(words);
     Parser parser(commands, words);
     std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
     try {

@@ -27,6 +27,8 @@ struct Options {
     bool quiet = false;
     int verbose = 0;
 
+    std::vector<std::string> targetVariables;  ///< environment variables that name a target
+
     // Some commands.
     std::vector<std::string> files;
     std::vector<std::string> words;  ///< that the help is about, or to complete

@@ -2,11 +2,21 @@
 
 #include "host/commands/Context.h"
 
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+
 #include <utility>
 
 namespace host {
 
+// What is typed beats the variables of the other kind, so that two kinds without a typed option
+// stem from variables alone.
 TargetOptions TargetOf(const Options& options) {
+    if (options.gdb && (options.sim || options.simFile) && !options.targetVariables.empty())
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("the environment names a simulated target and a real one, with "
+                                  "{}; unset one of them, or say --sim or --gdb",
+                                  fmt::join(options.targetVariables, " and ")));
     return {options.sim, options.simFile, options.gdb, options.gdbOptions, options.loader};
 }
 

@@ -20,7 +20,8 @@ struct Context {
     SettingStore& settings;
 };
 
-/// The target that the options ask for.
+/// The target that the options ask for. Failure (WrongUsage) when variables of the environment ask
+/// for two.
 TargetOptions TargetOf(const Options& options);
 
 /// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
