@@ -10,30 +10,10 @@
 #include <cstdio>
 #include <cstdlib>
 #include <locale>
-#include <new>
 
 #include "logger/ostrel_logger.h"
+#include "tests/support/FailingMemory.h"
 #include "tests/support/RecordingHost.h"
-
-namespace {
-
-int failingAllocation = 0;  // which one from now on fails, the plug-in's included; 0: none
-
-}  // namespace
-
-[[gnu::noinline]] void* operator new(std::size_t size) {
-    void* memory = failingAllocation > 0 && --failingAllocation == 0 ? nullptr : std::malloc(size);
-    if (memory == nullptr) throw std::bad_alloc();
-    return memory;
-}
-
-[[gnu::noinline]] void operator delete(void* memory) noexcept {
-    std::free(memory);
-}
-
-[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept {
-    std::free(memory);
-}
 
 namespace {
 
@@ -175,9 +155,9 @@ TEST(ErrorTexts, ComeOutWhenMemoryHasRunOut) {
         Plugin plugin(host);
         OstrelLoggerSetSink(nullptr, nullptr);
         bool within = false;
-        failingAllocation = allocation;
+        test::failingAllocation = allocation;
         const char* text = plugin->AddressWithinFlash(~0ull, &within);
-        failingAllocation = 0;
+        test::failingAllocation = 0;
         texts.push_back(TextOf(text));
     }
     const std::vector<std::string> expected{"std::bad_alloc", "Out of memory.",

@@ -132,7 +132,7 @@ struct Work {
         for (std::size_t i = 0; i < inUse.size(); ++i)
             inUse[i] = (i * 7 + 1) & 0xFF;
         for (std::size_t i = 0; i < size; i += inUse.size())
-            std::copy_n(&inUse[0], std::min(inUse.size(), size - i), &flash[i]);
+            std::copy_n(inUse.data(), std::min(inUse.size(), size - i), &flash[i]);
         if (!Erases()) std::ranges::fill(MayChange(flash), 0xFF);
         return flash;
     }

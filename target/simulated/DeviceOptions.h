@@ -13,7 +13,7 @@
 
 namespace target {
 
-inline constexpr std::uint32_t kKiB = 1024;
+inline constexpr std::uint64_t kKiB = 1024;
 
 /// An option text that names no device. One line: which class or option, and what is accepted.
 class OptionError : public std::invalid_argument {
