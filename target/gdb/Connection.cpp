@@ -69,8 +69,7 @@ void Connection::Send(const std::string& request) {
     const std::string frame = Framed(request);
     const Deadline deadline = After(timeout_);
     ++sentCount_;
-    // A packet that was refused hasn't been acted upon. One that got no answer may have been, so
-    // it isn't sent again.
+    // A packet that got no answer may have been acted upon, so it isn't sent again.
     for (int tries = 0; tries < 2; ++tries) {
         Write(frame);
         if (!acknowledged_ || AwaitAck(deadline)) return;
@@ -78,18 +77,16 @@ void Connection::Send(const std::string& request) {
     Lose(fmt::format("refused \"{}\" twice as garbled", Shown(request)));
 }
 
-/// False when the packet was refused. A reply in place of the acknowledgement says as much.
+/// False when the packet was refused. A packet in front of the acknowledgement answers something
+/// older: one that was sent twice, since an acknowledgement was garbled on its way.
 bool Connection::AwaitAck(Deadline deadline) {
     for (;;) {
         auto frame = NextFrame(deadline);
         if (!frame) Lose("acknowledged no packet in time");
         if (frame->kind == Frame::Kind::Ack) return true;
         if (frame->kind == Frame::Kind::Nak) return false;
-        const bool late =
-            !stopExpected_ && frame->kind == Frame::Kind::Packet && IsStopReply(frame->payload);
         Take(std::move(*frame));
-        if (late) packet_.reset();
-        if (packet_ || damageSeen_) return true;
+        packet_.reset();
     }
 }
 

@@ -82,7 +82,11 @@ void FrameDecoder::Feed(std::string_view bytes) {
 
 std::optional<Frame> FrameDecoder::Next() {
     while (taken_ < arrived_.size()) {
-        if (auto frame = Take(arrived_[taken_++])) return frame;
+        auto frame = Take(arrived_[taken_++]);
+        // Nobody sends a damaged notification again, and so nobody is to be asked for it.
+        const bool lost =
+            frame && frame->kind == Frame::Kind::Damaged && kind_ == Frame::Kind::Notification;
+        if (frame && !lost) return frame;
     }
     return std::nullopt;
 }

@@ -34,7 +34,7 @@ struct Frame {
 };
 
 /// Takes the bytes that have arrived, however they were cut, and gives the frames in them. Noise
-/// between frames is skipped.
+/// between frames is skipped, and so are damaged notifications.
 class FrameDecoder {
   public:
     /// A server shortens runs; a client doesn't, and may send the mark of a run as a plain byte.

@@ -52,6 +52,8 @@ TEST(GdbFrames, AreReadAsTheyStandOnTheWire) {
         {Sender::Server, "+-\x03noise+", "ack()nak()interrupt()ack()"},
         {Sender::Server, "$m4$OK#9a", "packet(OK)"},
         {Sender::Server, "%Stop:T05#99", "note(Stop:T05)"},
+        {Sender::Server, "%Stop:T05#00$OK#9a$OK#00",
+         "packet(OK)damage(a packet with a wrong checksum)"},
         {Sender::Server, "$0* #7a", "packet(0000)"},
         {Sender::Server, "$0*\"0#ac", "packet(0000000)"},
         {Sender::Client, "$0* #7a", "packet(0* )"},
@@ -221,11 +223,12 @@ struct Quirk {
 
 TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
     const Quirk quirks[] = {
-        // Acknowledgements: refused once, twice, lost, garbled reply, late stop reply.
+        // Acknowledgements: refused once, twice, accepted but garbled, lost, garbled reply, late
+        // stop reply.
         {"qSupported", "-", "done"},
         {"qSupported", "-", "refused \"qSupported", 2},
-        {"qSupported", "$PacketSize=100#c1",
-         "number of the register sp; --gdb-option sp=NUMBER does"},
+        {"qSupported", "-$PacketSize=10#91", "done"},
+        {"qSupported", "$PacketSize=100#c1", "acknowledged no packet"},
         {"qSupported", "+$PacketSize=100#16", "sent no reply"},
         {"qSupported", "", "acknowledged no packet"},
         {"?", "$T05#b9", "done", 9},
@@ -296,7 +299,7 @@ bool IsOptional(const std::string& payload) {
 // error, and nobody waits for long.
 TEST(GdbClient, ReportsAFailureOfAnyRequest) {
     std::size_t count = 0;
-    for (const char* wire : {"$E01#a6", "$zz#f4", "", Peer::kClose}) {
+    for (const char* wire : {"+$E01#a6", "+$zz#f4", "", Peer::kClose}) {
         for (const bool forGood : {false, true}) {
             for (std::size_t failing = 0; failing == 0 || failing < count; ++failing) {
                 std::size_t index = 0;
