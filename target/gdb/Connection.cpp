@@ -19,6 +19,11 @@ bool IsStopReply(const std::string& packet) {
     return reply && reply->kind == StopReply::Kind::Stopped;
 }
 
+bool IsOutput(const std::string& packet) {
+    const auto reply = ParseStopReply(packet);
+    return reply && reply->kind == StopReply::Kind::Output;
+}
+
 bool AnsweredByStopReply(const std::string& request) {
     return request == "?" || request == "c" || request == "vCont;c" || request == "vStopped" ||
            request.starts_with("vAttach;");
@@ -43,21 +48,39 @@ Connection::Connection(Socket socket, milliseconds timeout, PacketTrace trace)
     : socket_(std::move(socket)), timeout_(timeout), trace_(std::move(trace)) {}
 
 std::string Connection::Ask(const std::string& request) {
-    return Ask(request, timeout_);
+    Send(request);
+    Deadline deadline = After(timeout_);
+    return AwaitReply(request, deadline);
 }
 
-std::string Connection::Ask(const std::string& request, milliseconds timeout) {
-    Send(request);
-    const Deadline deadline = After(timeout);
+std::string Connection::AwaitReply(const std::string& request, Deadline& deadline) {
+    const bool outputExpected = request.starts_with("qRcmd,");
     for (;;) {
-        const auto left = deadline - std::chrono::steady_clock::now();
-        const auto reply = Receive(std::chrono::ceil<milliseconds>(left));
+        const auto reply = Receive(deadline);
         if (!reply)
             Lose(fmt::format("sent no reply to \"{}\" within {} s", Shown(request),
-                             std::chrono::duration<double>(timeout).count()));
+                             std::chrono::duration<double>(timeout_).count()));
+        if (!outputExpected && IsOutput(*reply)) continue;
         // An interrupt may have crossed a stop, which is then told twice.
         if (stopExpected_ || !IsStopReply(*reply)) return *reply;
     }
+}
+
+void Connection::RequireOk(const std::string& request) {
+    const std::string reply = Ask(request);
+    if (reply != "OK") Reject(request, reply);
+}
+
+bool Connection::Agrees(const std::string& request) {
+    const std::string reply = Ask(request);
+    if (reply != "OK" && !IsRefusal(reply)) Reject(request, reply);
+    return reply == "OK";
+}
+
+void Connection::Reject(const std::string& request, const std::string& reply) {
+    const std::string why = fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request));
+    if (!IsRefusal(reply)) Lose(why);
+    throw ProtocolError(why);
 }
 
 void Connection::Send(const std::string& request) {
@@ -67,7 +90,7 @@ void Connection::Send(const std::string& request) {
     damageSeen_ = false;
     stopExpected_ = AnsweredByStopReply(request);
     const std::string frame = Framed(request);
-    const Deadline deadline = After(timeout_);
+    Deadline deadline = After(timeout_);
     ++sentCount_;
     // A packet that got no answer may have been acted upon, so it isn't sent again.
     for (int tries = 0; tries < 2; ++tries) {
@@ -79,7 +102,7 @@ void Connection::Send(const std::string& request) {
 
 /// False when the packet was refused. A packet in front of the acknowledgement answers something
 /// older: one that was sent twice, since an acknowledgement was garbled on its way.
-bool Connection::AwaitAck(Deadline deadline) {
+bool Connection::AwaitAck(Deadline& deadline) {
     for (;;) {
         auto frame = NextFrame(deadline);
         if (!frame) Lose("acknowledged no packet in time");
@@ -98,10 +121,18 @@ void Connection::Interrupt() {
     Write(std::string_view(&kInterrupt, 1));
 }
 
-std::optional<std::string> Connection::Receive(milliseconds timeout) {
+void Connection::TakeArrived() {
     if (IsLost()) throw ProtocolError(lost_);
-    if (timeout <= milliseconds(0)) FeedBefore({});
-    const Deadline deadline = After(timeout);
+    FeedBefore({});
+}
+
+std::optional<std::string> Connection::Receive(milliseconds timeout) {
+    Deadline deadline = After(timeout);
+    return Receive(deadline);
+}
+
+std::optional<std::string> Connection::Receive(Deadline& deadline) {
+    if (IsLost()) throw ProtocolError(lost_);
     while (!packet_) {
         auto frame = NextFrame(deadline);
         if (!frame) return std::nullopt;
@@ -111,10 +142,8 @@ std::optional<std::string> Connection::Receive(milliseconds timeout) {
 }
 
 std::optional<std::string> Connection::ReceiveNotification(const std::string& name,
-                                                           milliseconds timeout) {
+                                                           Deadline& deadline) {
     if (IsLost()) throw ProtocolError(lost_);
-    if (timeout <= milliseconds(0)) FeedBefore({});
-    const Deadline deadline = After(timeout);
     for (;;) {
         while (!notification_) {
             auto frame = NextFrame(deadline);
@@ -132,10 +161,11 @@ void Connection::Lose(const std::string& why) {
     throw ProtocolError(lost_);
 }
 
-std::optional<Frame> Connection::NextFrame(Deadline deadline) {
+std::optional<Frame> Connection::NextFrame(Deadline& deadline) {
     for (;;) {
         if (auto frame = decoder_.Next()) return frame;
         // A server that never stops talking keeps nobody either.
+        deadline = socket_.Until(deadline);
         if (std::chrono::steady_clock::now() >= deadline || !FeedBefore(deadline))
             return std::nullopt;
     }

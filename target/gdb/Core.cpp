@@ -5,6 +5,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <utility>
 
 #include "target/gdb/Hex.h"
 
@@ -49,9 +50,7 @@ void Core::Attach() {
 
 void Core::Resume() {
     if (nonStop_) {
-        const std::string reply = connection_.Ask("vCont;c");
-        if (reply != "OK")
-            throw ProtocolError(fmt::format(R"(answered "{}" to "vCont;c")", Shown(reply)));
+        connection_.RequireOk("vCont;c");
     } else {
         if (!asked_ && OffersContinue(connection_.Ask("vCont?"))) continue_ = "vCont;c";
         asked_ = true;
@@ -70,8 +69,10 @@ void Core::Stop() {
 }
 
 void Core::RequireRunning() {
-    const auto news = nonStop_ ? connection_.ReceiveNotification("Stop", milliseconds(0))
-                               : connection_.Receive(milliseconds(0));
+    connection_.TakeArrived();
+    Deadline past{};
+    const auto news =
+        nonStop_ ? connection_.ReceiveNotification("Stop", past) : connection_.Receive(past);
     if (!news) return;
     const auto reply = ParseStopReply(*news);
     if (reply && reply->kind == StopReply::Kind::Output) return;
@@ -82,12 +83,8 @@ void Core::RequireRunning() {
 }
 
 StopReply Core::AwaitStop(milliseconds timeout) {
-    const auto deadline = std::chrono::steady_clock::now() + timeout;
-    for (;;) {
-        const auto left = deadline - std::chrono::steady_clock::now();
-        if (left <= left.zero()) break;
-        const auto packet = connection_.Receive(std::chrono::ceil<milliseconds>(left));
-        if (!packet) break;
+    Deadline deadline = After(timeout);
+    while (const auto packet = connection_.Receive(deadline)) {
         auto reply = ParseStopReply(*packet);
         if (!reply)
             connection_.Lose(fmt::format("answered \"{}\" to an interrupt", Shown(*packet)));
@@ -97,16 +94,19 @@ StopReply Core::AwaitStop(milliseconds timeout) {
                                  std::chrono::duration<double>(timeout).count()));
 }
 
-// The reply to an earlier request may still come in between.
 StopReply Core::StopNonStop() {
-    connection_.Send("vCont;t");
-    std::optional<std::string> reply;
-    do {
-        reply = connection_.Receive(connection_.Timeout());
-    } while (reply && *reply != "OK");
-    const auto stop = connection_.ReceiveNotification("Stop", connection_.Timeout());
+    constexpr char kStop[] = "vCont;t";
+    connection_.Send(kStop);
+    Deadline deadline = After(connection_.Timeout());
+    std::string reply = connection_.AwaitReply(kStop, deadline);
+    if (std::exchange(lookPending_, false) && reply != "OK")
+        reply = connection_.AwaitReply(kStop, deadline);
+    // Whatever was answered, the target isn't known to have stopped.
+    if (reply != "OK")
+        connection_.Lose(fmt::format(R"(answered "{}" to "{}")", Shown(reply), kStop));
+    const auto stop = connection_.ReceiveNotification("Stop", deadline);
     const auto parsed = stop ? ParseStopReply(*stop) : std::nullopt;
-    if (!reply || !parsed) connection_.Lose("didn't stop the target in time");
+    if (!parsed) connection_.Lose("didn't stop the target in time");
     DrainStops();
     return *parsed;
 }
@@ -120,7 +120,7 @@ void Core::DrainStops() {
 }
 
 void Core::TryLive(std::uint32_t address) {
-    if (connection_.Ask("QNonStop:1") != "OK") return;
+    if (!connection_.Agrees("QNonStop:1")) return;
     nonStop_ = true;
     try {
         Resume();
@@ -140,6 +140,7 @@ void Core::TryLive(std::uint32_t address) {
 bool Core::ReadsWhileRunning(std::uint32_t address) {
     connection_.Send(fmt::format("m{:x},4", address));
     const auto reply = connection_.Receive(std::min(connection_.Timeout(), kSilence));
+    lookPending_ = !reply || ParseStopReply(*reply);
     const auto bytes = reply ? FromHex(*reply) : std::nullopt;
     return bytes && bytes->size() == 4;
 }

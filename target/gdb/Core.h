@@ -55,6 +55,7 @@ class Core {
     const char* continue_ = "c";
     bool nonStop_ = false;
     bool live_ = false;
+    bool lookPending_ = false;  ///< the reply to what was asked as the target ran may still come
 };
 
 }  // namespace target::gdb

@@ -80,7 +80,7 @@ void GdbTarget::Attach() {
         throw ProtocolError(fmt::format("takes packets of {} bytes only, too few for any access",
                                         features_.packetSize));
     memory_.SetPacketSize(features_.packetSize);
-    if (features_.noAckMode && connection_.Ask("QStartNoAckMode") == "OK")
+    if (features_.noAckMode && connection_.Agrees("QStartNoAckMode"))
         connection_.StopAcknowledging();
     for (const std::string& command : options_.init)
         Monitor(command);

@@ -49,8 +49,7 @@ std::string MemoryPort::Read(std::uint32_t address, std::size_t count) {
         const std::string request = fmt::format("m{:x},{:x}", at, size);
         const std::string reply = connection_.Ask(request);
         const auto block = FromHex(reply);
-        if (!block || block->size() != size)
-            throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), request));
+        if (!block || block->size() != size) connection_.Reject(request, reply);
         bytes += *block;
         return size;
     });
@@ -70,7 +69,8 @@ void MemoryPort::WriteHex(std::uint32_t address, std::string_view bytes) {
         const std::size_t head = fmt::format("M{:x},{:x}:", at, bytes.size()).size();
         const std::size_t room = (packetSize_ - kFrameSize - head) / 2;
         const std::size_t size = BlockSize(at, bytes.size() - done, room);
-        RequireOk(fmt::format("M{:x},{:x}:{}", at, size, ToHex(bytes.substr(done, size))));
+        connection_.RequireOk(
+            fmt::format("M{:x},{:x}:{}", at, size, ToHex(bytes.substr(done, size))));
         return size;
     });
 }
@@ -81,23 +81,17 @@ void MemoryPort::WriteBinary(std::uint32_t address, std::string_view bytes) {
         const std::size_t head = fmt::format("X{:x},{:x}:", at, left.size()).size();
         const std::size_t room = FittingEscaped(left, packetSize_ - kFrameSize - head);
         const std::size_t size = BlockSize(at, left.size(), room);
-        RequireOk(fmt::format("X{:x},{:x}:", at, size) + Escaped(left.substr(0, size)));
+        connection_.RequireOk(fmt::format("X{:x},{:x}:", at, size) + Escaped(left.substr(0, size)));
         return size;
     });
 }
 
 bool MemoryPort::TakesBinary(std::uint32_t address) {
     if (binary_ == Binary::Unknown) {
-        const bool taken = connection_.Ask(fmt::format("X{:x},0:", address)) == "OK";
+        const bool taken = connection_.Agrees(fmt::format("X{:x},0:", address));
         binary_ = taken ? Binary::Taken : Binary::Refused;
     }
     return binary_ == Binary::Taken;
-}
-
-void MemoryPort::RequireOk(const std::string& request) {
-    const std::string reply = connection_.Ask(request);
-    if (reply != "OK")
-        throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request)));
 }
 
 }  // namespace target::gdb

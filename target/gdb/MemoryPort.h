@@ -32,7 +32,6 @@ class MemoryPort {
     void WriteHex(std::uint32_t address, std::string_view bytes);
     void WriteBinary(std::uint32_t address, std::string_view bytes);
     bool TakesBinary(std::uint32_t address);
-    void RequireOk(const std::string& request);
 
     Connection& connection_;
     std::size_t packetSize_ = kPacketSizeMin;

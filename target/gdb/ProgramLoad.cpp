@@ -85,10 +85,7 @@ unsigned GdbTarget::RegisterNumber(const std::string& name,
 }
 
 void GdbTarget::WriteRegister(unsigned number, std::uint32_t value) {
-    const std::string request = fmt::format("P{:x}={}", number, ToHex(LittleEndian(value)));
-    const std::string reply = connection_.Ask(request);
-    if (reply != "OK")
-        throw ProtocolError(fmt::format(R"(answered "{}" to "{}")", Shown(reply), request));
+    connection_.RequireOk(fmt::format("P{:x}={}", number, ToHex(LittleEndian(value))));
 }
 
 std::string GdbTarget::ReadDocument(const std::string& name) {
@@ -99,9 +96,7 @@ std::string GdbTarget::ReadDocument(const std::string& name) {
             fmt::format("qXfer:features:read:{}:{:x},{:x}", name, document.size(), pieceSize);
         const std::string reply = connection_.Ask(request);
         const auto piece = ParseDocumentPiece(reply);
-        if (!piece)
-            throw ProtocolError(
-                fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request)));
+        if (!piece) connection_.Reject(request, reply);
         document += piece->bytes;
         if (piece->last) return document;
         if (piece->bytes.empty() || document.size() > kDocumentSizeMax)
@@ -113,7 +108,7 @@ std::string GdbTarget::Monitor(const std::string& command) {
     const std::string asked = fmt::format("the monitor command \"{}\"", Shown(command));
     std::string output;
     std::string reply = connection_.Ask("qRcmd," + ToHex(command));
-    const auto deadline = std::chrono::steady_clock::now() + connection_.Timeout();
+    Deadline deadline = After(connection_.Timeout());
     for (;;) {
         const auto line = ParseStopReply(reply);
         const auto last = FromHex(reply);
@@ -125,10 +120,7 @@ std::string GdbTarget::Monitor(const std::string& command) {
         if (last) return output + *last;
         if (!line) throw ProtocolError(fmt::format("answered \"{}\" to {}", Shown(reply), asked));
         if (output.size() < kMonitorOutputMax) output += line->text;
-        const auto left = deadline - std::chrono::steady_clock::now();
-        auto next = left > left.zero()
-                        ? connection_.Receive(std::chrono::ceil<std::chrono::milliseconds>(left))
-                        : std::nullopt;
+        auto next = connection_.Receive(deadline);
         if (!next) connection_.Lose(fmt::format("didn't end {} in time", asked));
         reply = std::move(*next);
     }

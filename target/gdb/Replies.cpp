@@ -22,6 +22,10 @@ bool IsError(std::string_view reply) {
     return reply.size() == 3 && reply[0] == 'E' && HexNumber(reply.substr(1)).has_value();
 }
 
+bool IsRefusal(std::string_view reply) {
+    return reply.empty() || IsError(reply);
+}
+
 std::optional<StopReply> ParseStopReply(std::string_view reply) {
     if (reply.empty()) return std::nullopt;
     const auto number = HexNumber(reply.substr(1, 2));

@@ -13,6 +13,9 @@ namespace target::gdb {
 /// "E01" or "E.text".
 bool IsError(std::string_view reply);
 
+/// An error, or the empty reply to a request that the server doesn't know.
+bool IsRefusal(std::string_view reply);
+
 /// Why the core isn't running, or what else a server says instead.
 struct StopReply {
     enum class Kind {

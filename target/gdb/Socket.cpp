@@ -223,14 +223,14 @@ void Socket::Write(std::string_view bytes, Deadline deadline) {
     }
 }
 
+Deadline Socket::Until(Deadline deadline) const {
+    return interrupted_ && interrupted_() ? std::min(deadline, After(kAfterInterrupt)) : deadline;
+}
+
 // In slices, for a signal may come between the check and the wait.
 bool Socket::Await(short events, Deadline deadline) const {
-    bool interruptSeen = false;
     for (;;) {
-        if (!interruptSeen && interrupted_ && interrupted_()) {
-            interruptSeen = true;
-            deadline = std::min(deadline, Clock::now() + kAfterInterrupt);
-        }
+        deadline = Until(deadline);
         const auto left = std::chrono::ceil<milliseconds>(deadline - Clock::now());
         const auto slice = std::clamp(left, milliseconds(0), kBetweenInterruptChecks);
         pollfd waiting{descriptor_, events, 0};

@@ -58,6 +58,10 @@ class Socket {
     /// The next client; an unconnected socket when none came before the deadline.
     Socket Accept(Deadline deadline);
 
+    /// When to end a wait that is made of several: the deadline, or soon if the user has
+    /// interrupted the work.
+    Deadline Until(Deadline deadline) const;
+
     bool IsOpen() const { return descriptor_ >= 0; }
     void Close();
 

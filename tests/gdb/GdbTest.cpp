@@ -268,6 +268,7 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         {"qXfer:features", "$l<target><xi:include href='a'/></target>#f6", "without end", 99},
         {"qXfer:features", "$m#6d", "sends its document target.xml without end"},
         {"m20002000", "$fee7fee600000000#4d", "0x20002003 doesn't hold what was written there"},
+        {"P10", "$O48#bb$OK#9a", "done"},
         {"P10", "$E01#a6", "answered \"E01\" to \"P10=00000001\""},
         {"P", "$#00", "Loading the program"},
         // The monitor.
@@ -381,11 +382,14 @@ TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
         const char* news;  ///< sent along with it
         const char* result;
         bool live;
+        const char* stop = "+$OK#9a%Stop:T00#94";  ///< the answer to the request to stop
     } rows[] = {
         {nullptr, "", "done", true},
         {"$E01#a6", "", "done", false},
         {"", "", "done", false},
+        {"", "", "done", false, "+$E01#a6$OK#9a%Stop:T00#94"},
         {nullptr, "%Stop:T0bthread:1;#e4", "stopped by itself: SIGSEGV", true},
+        {nullptr, "", "answered \"E22\" to \"vCont;t\"", true, "+$E22#a9"},
     };
     for (const auto& row : rows) {
         bool nonStop = false;
@@ -404,7 +408,7 @@ TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
             }
             if (payload == "vCont;t") {
                 running = false;
-                return "+$OK#9a%Stop:T00#94";
+                return row.stop;
             }
             if (payload == "vStopped") return "+$OK#9a";
             if (!running || payload[0] != 'm') return std::nullopt;
