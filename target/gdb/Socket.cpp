@@ -151,7 +151,10 @@ Socket Socket::Connect(const Address& address, Deadline deadline,
     int error = 0;
     for (const addrinfo* each = list.first.get(); each != nullptr; each = each->ai_next) {
         const int descriptor = socket(each->ai_family, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        if (descriptor < 0) continue;
+        if (descriptor < 0) {
+            error = errno;
+            continue;
+        }
         Socket connection(descriptor, interrupted);
         SetUpConnection(descriptor);
         error = 0;
