@@ -26,7 +26,9 @@ constexpr std::uint64_t kLoadedSizeMax = std::uint64_t{16} * 1024 * 1024;
 
 class File {
   public:
-    explicit File(const std::string& path) : descriptor_(open(path.c_str(), O_RDONLY | O_CLOEXEC)) {
+    /// Doesn't wait for the writer of a pipe, which is no loader anyway.
+    explicit File(const std::string& path)
+        : descriptor_(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
         if (descriptor_ < 0)
             Refuse(path, "can't be opened: " + std::generic_category().message(errno));
     }
