@@ -96,12 +96,12 @@ std::vector<std::string> Session::Carry(const Request& request) {
         case Kind::WriteMemory:
             return {WriteMemory(request)};
         case Kind::Continue:
-            if (request.hasAddress)
-                device_.Registers().values[CoreRegisters::kPc] = request.address;
+            GoTo(request);
             device_.Start();
             awaitsStop_ = true;
             return {};
         case Kind::Step:
+            GoTo(request);
             return {kStopped};
         case Kind::ResumeKinds:
             return {"vCont;c;C;s;S"};
@@ -153,6 +153,10 @@ std::vector<std::string> Session::Interrupt() {
         return {Refuse(error.what())};
     }
     return {kInterrupted};
+}
+
+void Session::GoTo(const Request& request) {
+    if (request.hasAddress) device_.Registers().values[CoreRegisters::kPc] = request.address;
 }
 
 std::string Session::ReadMemory(const Request& request) {

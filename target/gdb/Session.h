@@ -37,6 +37,7 @@ class Session {
 
   private:
     std::vector<std::string> Carry(const Request& request);
+    void GoTo(const Request& request);
     std::string ReadMemory(const Request& request);
     std::string WriteMemory(const Request& request);
     std::string Checksum(const Request& request);

@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <stdexcept>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace target {
@@ -55,6 +56,9 @@ class RuleLog {
     void Record(const char* ruleName, const std::string& what);
     void Record(const std::string& text);
     const std::vector<std::string>& Texts() const { return texts_; }
+
+    /// The texts, which are forgotten.
+    std::vector<std::string> Take() { return std::exchange(texts_, {}); }
 
   private:
     std::vector<std::string> texts_;

@@ -56,12 +56,16 @@ void ServedSimulation::Write(std::uint32_t address, std::string_view bytes, std:
 }
 
 void ServedSimulation::EraseFlash(std::uint32_t address, std::uint32_t sizeBytes) {
-    RequireFlash(address, sizeBytes);
     const std::uint32_t sector = device_.Options().sectorSizeBytes;
     if (address % sector != 0 || sizeBytes % sector != 0)
         throw TargetError(
             fmt::format("Erasing {} bytes at 0x{:08X}: the device erases whole sectors of {} bytes",
                         sizeBytes, address, sector));
+    // The flash may end inside its last sector, which clients erase whole.
+    const std::uint64_t end = std::uint64_t{address} + sizeBytes;
+    const std::uint64_t beyond = end - std::min<std::uint64_t>(end, device_.Flash().SizeBytes());
+    if (beyond < std::min(sector, sizeBytes)) sizeBytes -= static_cast<std::uint32_t>(beyond);
+    RequireFlash(address, sizeBytes);
     device_.Flash().Erase(address, sizeBytes);
 }
 
@@ -97,13 +101,18 @@ void ServedSimulation::Reset() {
     ResetRegisters();
 }
 
-/// What the device lets pass and a real one would ignore is worth a word as well.
+/// What the device lets pass and a real one would ignore is worth a word as well. A refusal is for
+/// the caller.
 void ServedSimulation::Do(const std::function<void()>& action) {
-    const std::size_t known = device_.Violations().size();
-    action();
-    const auto& texts = device_.Violations();
-    for (std::size_t i = known; i < texts.size(); ++i)
-        complain_(texts[i]);
+    std::string refusal;
+    try {
+        action();
+    } catch (const TargetError& error) {
+        refusal = error.what();
+    }
+    for (const std::string& text : device_.TakeViolations())
+        if (text != refusal) complain_(text);
+    if (!refusal.empty()) throw TargetError(refusal);
 }
 
 void ServedSimulation::RequireFlash(std::uint32_t address, std::size_t sizeBytes) const {

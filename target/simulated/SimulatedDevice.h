@@ -80,6 +80,9 @@ class SimulatedDevice final : public Target {
     /// done, where, and the rule's name in brackets. At most RuleLog::kTextsMax are kept.
     const std::vector<std::string>& Violations() const { return rules_.Texts(); }
 
+    /// The same, and forgets them.
+    std::vector<std::string> TakeViolations() { return rules_.Take(); }
+
     std::uint64_t AccessCount() const { return accessCount_; }
     bool IsRunning() const { return running_; }
 

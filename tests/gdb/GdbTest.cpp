@@ -422,4 +422,22 @@ TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
     }
 }
 
+// A flash of one sector and an eighth; what a real device would ignore is told without end.
+TEST(GdbServer, ErasesToTheEndAndTellsWhatIsIgnored) {
+    SimulatedDevice device(ParseDeviceOptions("dorna,flash=18K"));
+    std::size_t told = 0;
+    ServedSimulation served(
+        device, [&](const std::string&) { ++told; }, [] {});
+    Session session(served, [](const std::string&) {});
+    std::string replies;
+    for (const char* request :
+         {"?", "vFlashErase:0,8000", "vFlashErase:4000,4000", "vFlashErase:0,4800",
+          "vFlashErase:0,c000", "vFlashErase:8000,0", "vFlashErase:8000,4000", "s100", "pf"})
+        replies += session.Answer(request).at(0) + " ";
+    EXPECT_EQ(replies, "T05thread:1; OK OK E01 E01 E01 E01 T05thread:1; 00010000 ");
+    for (int i = 0; i < 1500; ++i)
+        session.Answer("M400fd008,4:02000000");
+    EXPECT_EQ(told, 1500U);
+}
+
 }  // namespace
