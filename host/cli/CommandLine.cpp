@@ -210,6 +210,7 @@ std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
 ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words) {
     words = WordsForParser(words);
     Parser parser(commands, words);
+    const bool gdbTyped = IsTyped("--gdb", words);
     std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
     try {
         parser.app.parse(words);
@@ -226,6 +227,7 @@ ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string
                       "which command? 'corvane-flash --help' lists them, for example "
                       "'corvane-flash program firmware.elf'");
     parser.options.command = parser.chosen->name;
+    if (parser.chosen->isForSimulated && !gdbTyped) parser.options.gdb.reset();
     return {parser.options, parser.chosen, ""};
 }
 

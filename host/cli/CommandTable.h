@@ -60,6 +60,7 @@ struct CommandRow {
     std::vector<OptionRow> options;
     Outcome (*run)(Context&);
     bool readsSettings = true;
+    bool isForSimulated = false;  ///< devices only: a GDB server in the environment isn't meant
 };
 
 /// All commands, in the order in which the help lists them.

@@ -15,9 +15,10 @@ Outcome RunServe(Context& context) {
         TargetOf(context.options), *context.options.argument,
         [&](const std::string& text) { reporter.Error(text); },
         [&](const std::string& text) { reporter.Say(Talk::Normal, text); });
-    reporter.Listening(server.Host(), server.Port());
+    const Json where{{"host", server.Where().host}, {"port", server.Port()}};
+    reporter.Listening(server.Where().Text(), where);
     server.Run();
-    return {.result = {{"host", server.Host()}, {"port", server.Port()}}};
+    return {.result = where};
 }
 
 }  // namespace
@@ -33,7 +34,8 @@ CommandRow Serve() {
             "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
             {{"[HOST:]PORT", "", "Where to listen", &Options::argument, Offers::Nothing, {}, true}},
             RunServe,
-            false};
+            false,
+            true};
 }
 
 }  // namespace host::commands

@@ -55,9 +55,9 @@ void Reporter::Say(Talk level, const std::string& text) {
     Line(stderr, text);
 }
 
-void Reporter::Listening(const std::string& host, unsigned port) {
-    JsonLine("listening", {{"host", host}, {"port", port}});
-    Result(fmt::format("Listening at {}:{}; Ctrl-C ends it", host, port));
+void Reporter::Listening(const std::string& address, const Json& parts) {
+    JsonLine("listening", parts);
+    Result(fmt::format("Listening at {}; Ctrl-C ends it", address));
     std::fflush(out_);
 }
 

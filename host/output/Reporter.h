@@ -50,8 +50,8 @@ class Reporter {
         if (Hears(Talk::Normal)) Result(text);
     }
 
-    /// Where clients may connect from now on.
-    void Listening(const std::string& host, unsigned port);
+    /// Where clients may connect from now on: as text, and its parts for JSON.
+    void Listening(const std::string& address, const Json& parts);
 
     /// A message or an error that the plug-in shows its user.
     void PluginMessage(Talk level, const std::string& text);

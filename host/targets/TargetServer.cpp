@@ -33,8 +33,9 @@ gdb::Server Listen(target::ServedSimulation& device, const gdb::Address& address
                    const TargetServer::Complaint& complain) try {
     return {device, address, Interrupted, complain};
 } catch (const gdb::SocketError& error) {
-    throw Failure(ExitStatus::Unreachable, fmt::format("can't listen at {}: {}; try another port",
-                                                       address.Text(), error.what()));
+    throw Failure(ExitStatus::Unreachable,
+                  fmt::format("can't listen at {}: {}; try another address or port", address.Text(),
+                              error.what()));
 }
 
 }  // namespace
@@ -51,6 +52,8 @@ TargetServer::TargetServer(const TargetOptions& options, const std::string& addr
                       complain(failure.what());
                   }
               }),
-      server_(Listen(served_, address_, complain)) {}
+      server_(Listen(served_, address_, complain)) {
+    address_.port = std::to_string(server_.Port());
+}
 
 }  // namespace host

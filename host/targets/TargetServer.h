@@ -21,7 +21,8 @@ class TargetServer {
     TargetServer(const TargetOptions& options, const std::string& address,
                  const Complaint& complain, const WaitNotice& say);
 
-    std::string Host() const { return address_.host; }
+    /// Where clients connect, with the port that was got.
+    const target::gdb::Address& Where() const { return address_; }
     std::uint16_t Port() const { return server_.Port(); }
 
     /// Serves until Ctrl-C.

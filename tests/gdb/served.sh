@@ -19,7 +19,7 @@ echo '.globl _start; _start: b _start' |
     clang --target=armv7m-none-eabi -mthumb -nostdlib -fuse-ld=lld -Wl,-N,-Ttext=0x20002000 \
         -x assembler - -o loader.out
 
-timeout 300 "$tool" --sim "$sim" --sim-file served.sim serve 0 >listening 2>refused &
+CORVANE_SIM=$sim CORVANE_GDB=:1 timeout 300 "$tool" --sim-file served.sim serve 0 >listening 2>refused &
 server=$!
 for _ in $(seq 100); do
     port=$(sed -n 's/.*:\([0-9]*\);.*/\1/p' listening)
@@ -84,6 +84,8 @@ expect 2 'give one of them' --gdb ":$port" --sim quen info
 expect 2 'pc takes a number' --gdb ":$port" --gdb-option pc=x info
 expect 4 'refused; is it running' --gdb :1 info
 expect 3 'nowhere.out can.t be opened: No such file' --gdb ":$port" --loader nowhere.out program "$elf" --rewrite
+mkfifo pipe.out
+expect 3 'pipe.out is no regular file' --gdb ":$port" --loader pipe.out program "$elf" --rewrite
 CORVANE_SIM=velk expect 0 'Quen' --gdb ":$port" info
 CORVANE_GDB=:1 expect 0 'Velk\|none' --sim velk info
 hanging=$(cat "/proc/$server/task/$server/children")
