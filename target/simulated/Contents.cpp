@@ -94,8 +94,8 @@ void Decoder::CheckFrame() {
     Take(kMagic.size());
     version_ = TakeWord();
     if (version_ != kVersion && version_ != kVersionWithoutCounts) {
-        throw ContentsError(fmt::format("it has version {}, and this program reads version {}",
-                                        version_, kVersion));
+        throw ContentsError(fmt::format("it has version {}, and this program reads {} and {}",
+                                        version_, kVersionWithoutCounts, kVersion));
     }
     if (rest_.size() < 4) throw ContentsError("it ends too early");
     const std::size_t checkedSize = whole.size() - 4;
@@ -109,6 +109,7 @@ DeviceOptions Decoder::Definition() {
     const auto text = Take(TakeWord());
     try {
         DeviceOptions options = ParseDeviceOptions(std::string(text.begin(), text.end()));
+        CheckDeviceOptions(options);
         options.given.clear();
         return options;
     } catch (const OptionError& error) {
@@ -130,12 +131,16 @@ void Decoder::Fill(SimulatedDevice& device) {
 }
 
 void Decoder::FillEraseCounts(FlashArray& flash) {
+    std::uint64_t end = 0;
     for (std::uint32_t runs = TakeWord(); runs > 0; --runs) {
         const std::uint64_t first = TakeWord();
         const std::uint64_t length = TakeWord();
         const std::uint32_t count = TakeWord();
-        if (first + length > flash.PageCount()) throw ContentsError("it has too much flash");
-        for (std::uint64_t page = first; page < first + length; ++page)
+        // Each page once, or they could take for ever.
+        if (first < end) throw ContentsError("it counts the erases of some flash twice");
+        end = first + length;
+        if (end > flash.PageCount()) throw ContentsError("it has too much flash");
+        for (std::uint64_t page = first; page < end; ++page)
             flash.PresetEraseCount(page, count);
     }
 }
