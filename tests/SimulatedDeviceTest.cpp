@@ -399,10 +399,11 @@ TEST(Options, BadOnesAreNamed) {
         {"quen,fail-access=0", "Option \"fail-access=0\""},
         {"quen,erase=maybe", "Option \"erase=maybe\""},
         {"quen,stuck-cell=512K", "Option \"stuck-cell=512K\""},
-        {"quen,stuck-cell=0x80000", "the flash ends at 0x80000."},
+        {"quen,stuck-cell=80000", "the flash ends at 0x80000."},
     };
     for (const auto& [text, expected] : cases) {
-        const std::string error = ErrorOf([&, &t = text] { target::ParseDeviceOptions(t); });
+        const std::string error = ErrorOf(
+            [&, &t = text] { target::SimulatedDevice(target::ParseDeviceOptions(t)); });
         EXPECT_NE(error.find(expected), std::string::npos) << error;
     }
 }
@@ -466,18 +467,20 @@ TEST(Contents, MustAgreeWithTheOptions) {
     EXPECT_EQ(Decode(ravik, "ravik")->CommittedUserRegisters(),
               (std::array{0xFFFFFFFFU, 0xFFFFFFFFU}));
     const std::string contents = EncodeContents(
-        target::SimulatedDevice(target::ParseDeviceOptions("velk,flash=512K,revision=B")));
+        target::SimulatedDevice(target::ParseDeviceOptions("velk,flash=1M,revision=B")));
     const struct {
         const char* options;
         const char* error;
     } cases[] = {
-        {"velk,flash=0x80000,sector=4096,fail-access=7", "no error"},
+        {"velk,flash=0x100000,sector=4096,fail-access=7,stuck-cell=fffff", "no error"},
         {"dorna",
          "Option \"class\" of the simulated device: dorna is asked for, but the kept device has "
          "velk;"},
         {"velk,flash=256K",
          "Option \"flash\" of the simulated device: 256K is asked for, but the kept device has "
-         "512K;"},
+         "1M;"},
+        {"velk,stuck-cell=100000",
+         "Option \"stuck-cell=0x00100000\" of the simulated device: the flash ends at 0x100000."},
         {"velk,revision=A",
          "Option \"revision\" of the simulated device: 0 is asked for, but the kept device has 1;"},
     };

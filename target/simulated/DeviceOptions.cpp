@@ -25,17 +25,21 @@ constexpr char kClass[] = "class";
         fmt::format("Option \"{}={}\" of the simulated device: {}.", name, value, why));
 }
 
-// What only shows once all options are known.
+// The identification holds the revision; the rest of the device has no say in that.
+void RequireOneRevision(const DeviceOptions& options) {
+    if (options.given.contains("id") && options.given.contains("revision")) {
+        ThrowBadValue("id", HexText(options.identification),
+                      "the identification holds the revision already; leave \"revision\" out");
+    }
+}
+
+// What only shows once it is known which device the options are for.
 void CheckTogether(const DeviceOptions& options) {
     if (options.given.contains("sector") && !HasSizeRegisters(options)) {
         ThrowBadValue("sector", FormatSize(options.sectorSizeBytes),
                       fmt::format("a {} has sectors of 1K and no register to report others; leave "
                                   "it out, or use class velk or dorna",
                                   options.className));
-    }
-    if (options.given.contains("id") && options.given.contains("revision")) {
-        ThrowBadValue("id", HexText(options.identification),
-                      "the identification holds the revision already; leave \"revision\" out");
     }
     const auto& stuck = options.faults.stuckCell;
     if (stuck && stuck->address >= options.flashSizeBytes) {
@@ -79,7 +83,7 @@ DeviceOptions ParseDeviceOptions(const std::string& text) {
     options.given.insert(kClass);
     while (!rest.empty())
         ParseOption(options, nextItem());
-    CheckTogether(options);
+    RequireOneRevision(options);
     return options;
 }
 
@@ -133,7 +137,6 @@ DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& toda
     reopened.timings = today.timings;
     reopened.faults = today.faults;
     reopened.given = today.given;
-    CheckTogether(reopened);
     return reopened;
 }
 

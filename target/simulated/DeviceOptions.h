@@ -74,7 +74,7 @@ struct DeviceOptions {
 };
 
 /// Parses "CLASS[,OPTION=VALUE...]", for example "quen,flash=256K,keyconfig=0xFFFFFFEF".
-/// Throws OptionError.
+/// Throws OptionError. Whether a device can have them together is for CheckDeviceOptions.
 DeviceOptions ParseDeviceOptions(const std::string& text);
 
 /// The options of a class with nothing given, so that they contradict no kept device.
@@ -88,7 +88,7 @@ std::string DefinitionText(const DeviceOptions& options);
 
 /// What results when a device that was kept is opened with options for today: the kept one's
 /// definition with today's timings and faults. Throws OptionError, naming the option and both
-/// values, when a given option contradicts the kept device.
+/// values, when a given option contradicts the kept device. The result is unchecked.
 DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& today);
 
 /// Lines for a help text: each class with its defaults, each option with its meaning.

@@ -5,7 +5,6 @@
 #include <fmt/format.h>
 
 #include <bit>
-#include <limits>
 
 #include "target/simulated/OptionValues.h"
 
@@ -85,12 +84,10 @@ bool SetRegisterFault(DeviceOptions& options, string_view text) {
 
 bool SetStuckCell(DeviceOptions& options, string_view text) {
     const std::size_t colon = text.find(':');
-    const auto address = ParseNumber(text.substr(0, colon));
-    const auto value = colon == string_view::npos ? 0 : ParseNumber(text.substr(colon + 1));
-    if (!address || *address > std::numeric_limits<std::uint32_t>::max()) return false;
-    if (!value || *value > 0xFF) return false;
-    options.faults.stuckCell =
-        StuckCell{static_cast<std::uint32_t>(*address), static_cast<std::uint8_t>(*value)};
+    const auto address = ParseHex32(text.substr(0, colon));
+    const auto value = colon == string_view::npos ? 0 : ParseHex32(text.substr(colon + 1));
+    if (!address || !value || *value > 0xFF) return false;
+    options.faults.stuckCell = StuckCell{*address, static_cast<std::uint8_t>(*value)};
     return true;
 }
 
@@ -163,8 +160,8 @@ const OptionRow kRows[] = {
      SetRegisterFault,
      nullptr,
      {"ones", "zeros"}},
-    {"stuck-cell", "ADDRESS or ADDRESS:BYTE", "fault: this byte of flash always reads BYTE, or 0",
-     SetStuckCell, nullptr},
+    {"stuck-cell", "ADDRESS or ADDRESS:BYTE, hexadecimal",
+     "fault: this byte of flash always reads BYTE, or 0", SetStuckCell, nullptr},
 };
 
 }  // namespace
