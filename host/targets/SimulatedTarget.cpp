@@ -42,6 +42,11 @@ std::string NearestName(const std::string& text) {
     return {};
 }
 
+std::string WithSuggestion(std::string text, const std::string& suggestion) {
+    if (!suggestion.empty() && text.ends_with('.')) text.pop_back();
+    return text + suggestion;
+}
+
 std::unique_ptr<target::SimulatedDevice> Open(const TargetOptions& options) {
     const target::DeviceOptions device =
         options.sim ? target::ParseDeviceOptions(*options.sim) : target::DefaultDeviceOptions();
@@ -58,8 +63,9 @@ SimulatedTarget::SimulatedTarget(const TargetOptions& options, const WaitNotice&
     try {
         device_ = Open(options);
     } catch (const target::OptionError& error) {
-        throw Failure(ExitStatus::WrongUsage, fmt::format("--sim: {}{}", error.what(),
-                                                          NearestName(options.sim.value_or(""))));
+        throw Failure(
+            ExitStatus::WrongUsage,
+            "--sim: " + WithSuggestion(error.what(), NearestName(options.sim.value_or(""))));
     } catch (const target::ContentsError& error) {
         throw Failure(ExitStatus::Unreachable,
                       fmt::format("the {} {} can't be used: {}; name another file, or remove it to "
