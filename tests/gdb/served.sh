@@ -19,10 +19,10 @@ echo '.globl _start; _start: b _start' |
     clang --target=armv7m-none-eabi -mthumb -nostdlib -fuse-ld=lld -Wl,-N,-Ttext=0x20002000 \
         -x assembler - -o loader.out
 
-CORVANE_SIM=$sim CORVANE_GDB=:1 timeout 300 "$tool" --sim-file served.sim serve 0 >listening 2>refused &
+CORVANE_SIM=$sim CORVANE_SIM_FILE=served.sim CORVANE_GDB=:1 timeout 300 "$tool" serve 0 >listening 2>refused &
 server=$!
 for _ in $(seq 100); do
-    port=$(sed -n 's/.*:\([0-9]*\);.*/\1/p' listening)
+    port=$(sed -n 's/.*:\([0-9]*\);.*/\1/p' listening 2>/dev/null || true)
     [ -z "$port" ] || break
     sleep 0.1
 done
