@@ -402,8 +402,8 @@ TEST(Options, BadOnesAreNamed) {
         {"quen,stuck-cell=80000", "the flash ends at 0x80000."},
     };
     for (const auto& [text, expected] : cases) {
-        const std::string error = ErrorOf(
-            [&, &t = text] { target::SimulatedDevice(target::ParseDeviceOptions(t)); });
+        const std::string error =
+            ErrorOf([&, &t = text] { target::SimulatedDevice(target::ParseDeviceOptions(t)); });
         EXPECT_NE(error.find(expected), std::string::npos) << error;
     }
 }
