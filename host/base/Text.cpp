@@ -6,6 +6,7 @@
 
 #include <array>
 #include <charconv>
+#include <cmath>
 #include <system_error>
 
 #include "host/base/Errors.h"
@@ -92,7 +93,7 @@ std::string DurationText(double seconds) {
     if (seconds < 0.001) return "under 1 ms";
     if (seconds < 0.9995) return fmt::format("{:.0f} ms", seconds * 1000);
     if (seconds < 59.95) return fmt::format("{:.1f} s", seconds);
-    const auto whole = static_cast<std::uint64_t>(seconds + 0.5);
+    const auto whole = std::llround(seconds);
     return fmt::format("{}:{:02}", whole / 60, whole % 60);
 }
 

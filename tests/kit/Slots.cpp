@@ -9,7 +9,7 @@ struct Implementation : Interface {
     Implementation();
 };
 template <typename Interface>
-Implementation<Interface>::Implementation() {}
+Implementation<Interface>::Implementation() = default;
 
 template struct Implementation<IFlashHost>;
 template struct Implementation<IFlashDevice2>;
