@@ -15,6 +15,7 @@ struct AddressRange {
     std::uint32_t last = 0;
 
     std::uint64_t Size() const { return std::uint64_t{last} - first + 1; }
+    bool Contains(std::uint32_t address) const { return first <= address && address <= last; }
     bool operator==(const AddressRange&) const = default;
 };
 

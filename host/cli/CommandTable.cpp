@@ -44,8 +44,7 @@ const std::vector<OptionRow>& GlobalOptions() {
          &Options::loader, Offers::Files},
         {"--settings", "FILE",
          "Settings file instead of ~/.config/corvane-flash/settings.toml; kept values go beside "
-         "it, "
-         "for x.toml into x.kept.toml",
+         "it, for x.toml into x.kept.toml",
          &Options::settingsFile, Offers::Files},
         {"--set", "KEY=TEXT", "Set one of the plug-in's settings for this run; may be repeated",
          &Options::set, Offers::SettingAssignments},

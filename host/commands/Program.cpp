@@ -116,11 +116,11 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
 
 /// What can still be tried depends on what was erased.
 std::string Advice(const Differences& differences, const ProgramPlan& plan) {
-    const auto& address = differences.notErased;
-    if (!address) return "these bytes were not programmed";
-    if (std::any_of(plan.erased.begin(), plan.erased.end(), [&](const AddressRange& run) {
-            return run.first <= *address && *address <= run.last;
-        }))
+    if (!differences.notErased) return "these bytes were not programmed";
+    const auto holdsIt = [&](const AddressRange& run) {
+        return run.Contains(*differences.notErased);
+    };
+    if (std::any_of(plan.erased.begin(), plan.erased.end(), holdsIt))
         return "some bits stay 0 although their sectors were erased: the cells are worn out or "
                "protected";
     return "some bits were not erased first: program it with --erase necessary";

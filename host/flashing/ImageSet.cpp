@@ -21,7 +21,7 @@ void LoadedImages::Add(const image::Image& added, const std::string& file) {
 
 std::string LoadedImages::FileOf(std::uint32_t address) const {
     for (const auto& [file, range] : origins)
-        if (range.first <= address && address <= range.last) return file;
+        if (range.Contains(address)) return file;
     return Name();
 }
 

@@ -41,8 +41,7 @@ std::size_t CheckedSize(std::size_t count, std::uint32_t address, std::size_t wi
 
 Connection Connect(const Address& address, const GdbOptions& options,
                    const InterruptCheck& interrupted, const PacketTrace& trace) try {
-    const auto deadline = std::chrono::steady_clock::now() + options.timeout;
-    return {Socket::Connect(address, deadline, interrupted), options.timeout, trace};
+    return {Socket::Connect(address, After(options.timeout), interrupted), options.timeout, trace};
 } catch (const SocketError& error) {
     throw TargetError(fmt::format(
         "can't connect to the GDB server at {}: {}; is it running, and is that its port?",
@@ -201,9 +200,9 @@ void GdbTarget::Pause(std::uint32_t pauseMs) {
                 if (started_ && !core_.IsRunning()) Resume();
             });
     constexpr milliseconds kSlice(50);
-    const auto end = std::chrono::steady_clock::now() + milliseconds(pauseMs);
+    const Deadline end = After(milliseconds(pauseMs));
     while (std::chrono::steady_clock::now() < end && !(interrupted_ && interrupted_()))
-        std::this_thread::sleep_until(std::min(end, std::chrono::steady_clock::now() + kSlice));
+        std::this_thread::sleep_until(std::min(end, After(kSlice)));
 }
 
 void GdbTarget::Release(bool start) {
