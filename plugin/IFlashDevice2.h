@@ -36,9 +36,9 @@
 // interface and wants exactly that IFlashHost. A change of either would be a new function.
 #ifndef FLASH_CORVANE_VERSION
 #define FLASH_CORVANE_VERSION_MAJOR 1
-#define FLASH_CORVANE_VERSION_MINOR 0
+#define FLASH_CORVANE_VERSION_MINOR 1
 #define FLASH_CORVANE_VERSION_PATCH 0
-#define FLASH_CORVANE_VERSION "1.0.0"
+#define FLASH_CORVANE_VERSION "1.1.0"
 #endif
 
 class IFlashHost;

@@ -38,15 +38,20 @@
  * loaded: whatever exports CreateFlashDevice2 has exactly these two interfaces. */
 #ifndef FLASH_CORVANE_VERSION
 #define FLASH_CORVANE_VERSION_MAJOR 1
-#define FLASH_CORVANE_VERSION_MINOR 0
+#define FLASH_CORVANE_VERSION_MINOR 1
 #define FLASH_CORVANE_VERSION_PATCH 0
-#define FLASH_CORVANE_VERSION "1.0.0"
+#define FLASH_CORVANE_VERSION "1.1.0"
 #endif
 
 #if !defined(_WIN32) || !(defined(_M_IX86) || defined(__i386__))
 #define FLASH_CORVANE_CALL
 #elif defined(__GNUC__)
 #define FLASH_CORVANE_CALL __attribute__((thiscall))
+#ifndef __clang__
+/* With -pedantic, GCC warns of thiscall on a function that is no member. It is meant, in the slots
+ * below as in yours, so the warning is off up to the end of your file. */
+#pragma GCC diagnostic ignored "-Wattributes"
+#endif
 #else
 #define FLASH_CORVANE_CALL __thiscall
 #endif

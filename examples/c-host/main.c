@@ -1,10 +1,15 @@
-/* A host in C: fills the table of slots, loads the plug-in, creates a device, and runs an operation
- * or programs a few bytes into the pretend device below.
+/* A host in C99: fills the table of slots, loads the plug-in, creates a device, and does with the
+ * pretend device below what the words after the library's name say, one after the other:
  *
- *     c-host [LIBRARY [OPERATION]]
+ *     c-host [LIBRARY [WORD]...]
  *
- * A real host has its debug probe in the place of memory, Move and the four functions behind it.
+ * KEY=VALUE changes a setting, Load programs a few bytes and compares them, every other word is the
+ * name of an operation. Without a word it does a Load.
+ *
+ * A real host has its debug probe in the place of the pretend device.
  */
+
+#define _POSIX_C_SOURCE 200112L /* nanosleep */
 
 #include <flash_corvane/flash_corvane.h>
 #include <stdio.h>
@@ -23,6 +28,7 @@ enum { FlashSize = 0x10000, SectorSize = 0x400, RamSize = 0x4000, RegisterCount 
 static const uint32_t RamStart = 0x20000000;
 static const uint32_t FlashAddress = 0x400FD000;
 static const uint32_t FlashCommand = 0x400FD008;
+static const uint32_t UserRegister[2] = {0x400FE1E0, 0x400FE1E4};
 
 struct Setting {
     char name[40];
@@ -36,6 +42,8 @@ struct Host {
     struct {
         uint32_t address, value;
     } registers[RegisterCount];
+    uint32_t committed[2]; /* what a reset puts back into the user registers */
+    bool running;          /* the loader, that is: there is no other program */
     struct Setting settings[32];
     int errors;
 };
@@ -92,16 +100,26 @@ static uint32_t* Register(struct Host* self, uint32_t address) {
     return (uint32_t*)(void*)At(self, address, 4);
 }
 
-static void EraseIfCommanded(struct Host* self) {
-    const uint32_t start = *Register(self, FlashAddress);
-    if (*Register(self, FlashCommand) != 0xA4420002) return;
-    if (start < FlashSize) memset(self->flash + start, 0xFF, SectorSize);
-    *Register(self, FlashCommand) = 0;
+/* A command of the flash controller is done at once. One without the key does nothing. */
+static void CarryOutCommand(struct Host* self) {
+    const uint32_t address = *Register(self, FlashAddress);
+    uint32_t* command = Register(self, FlashCommand);
+    if (*command == 0xA4420002) { /* erase a sector */
+        if (address < FlashSize)
+            memset(self->flash + address / SectorSize * SectorSize, 0xFF, SectorSize);
+    } else if (*command == 0xA4420004) { /* erase everything */
+        memset(self->flash, 0xFF, FlashSize);
+    } else if (*command == 0xA4420008) { /* commit a user register */
+        self->committed[address & 1] = *Register(self, UserRegister[address & 1]);
+    } else {
+        return;
+    }
+    *command = 0;
 }
 
 /* What FlashLoaderMerrow.out does on a real target, done at once. */
 static void ServeLoader(struct Host* self) {
-    for (uint32_t block = 0; block < 2; ++block) {
+    for (uint32_t block = 0; self->running && block < 2; ++block) {
         uint32_t fields[4]; /* the loader's own, flash address, byte count, status */
         memcpy(fields, self->ram + 0x1000 + 16 * block, sizeof fields);
         if (fields[3] != 0xFFFFFFFF) continue;
@@ -129,13 +147,13 @@ static const char* FLASH_CORVANE_CALL WriteMemory(CorvaneHost* host, const void*
     if (memory == NULL || address < FlashSize)
         return "can't write target memory: nothing to write at that address";
     memcpy(memory, buffer, count * width);
-    EraseIfCommanded(self);
+    CarryOutCommand(self);
     ServeLoader(self);
     return NULL;
 }
 
-/* The core. There is none here. A real host waits for the loader's last chunk before it halts,
- * resets or reads the target, as minimal-host does. */
+/* The core. A real host waits for the loader's last chunk before it halts, resets or reads the
+ * target, as minimal-host does. */
 
 static const char* FLASH_CORVANE_CALL LoadProgram(CorvaneHost* host, const char* fileName,
                                                   const char* second, const char* directory) {
@@ -146,15 +164,19 @@ static const char* FLASH_CORVANE_CALL LoadProgram(CorvaneHost* host, const char*
     return NULL;
 }
 static const char* FLASH_CORVANE_CALL RunTarget(CorvaneHost* host) {
-    (void)host;
+    Self(host)->running = true;
     return NULL;
 }
 static const char* FLASH_CORVANE_CALL HaltTarget(CorvaneHost* host) {
-    (void)host;
+    Self(host)->running = false;
     return NULL;
 }
 static const char* FLASH_CORVANE_CALL ResetTarget(CorvaneHost* host, bool flag) {
-    (void)host, (void)flag;
+    struct Host* self = Self(host);
+    self->running = false; /* a reset leaves the target halted */
+    for (int i = 0; i < 2; ++i)
+        *Register(self, UserRegister[i]) = self->committed[i];
+    (void)flag;
     return NULL;
 }
 
@@ -220,19 +242,39 @@ static const CorvaneHostSlots slots = {
     .Sleep = Pause,
 };
 
+/* All that the plug-in reads. What it publishes comes behind them. */
+static const struct Setting defaults[] = {
+    {"FlashProgramOption", "Necessary Pages Only"},
+    {"FlashProgramBlankCheckOption", "1"},
+    {"FlashProgramCRCOption", "1"},
+    {"FlashEraseType", "By Address Range"},
+    {"FlashEraseStartAddr", "0"},
+    {"FlashEraseEndAddr", "0"},
+    {"FlashBlankCheckSelection", "Entire Flash"},
+    {"FlashBlankCheckStartAddr", "0"},
+    {"FlashBlankCheckEndAddr", "0"},
+    {"FlashChecksumSelection", "Entire Flash"},
+    {"FlashChecksumStartAddr", "0"},
+    {"FlashChecksumEndAddr", "0"},
+    {"FlashMACAddrInput", "ff-ff-ff-ff-ff-ff"},
+    {"FlashMACAddrCommit", "0"},
+    {"FlashUserRegister0Input", "ffffffff"},
+    {"FlashUserRegister0Commit", "0"},
+    {"FlashUserRegister1Input", "ffffffff"},
+    {"FlashUserRegister1Commit", "0"},
+    {"FlashCrystalFreq", "8"},
+    {"FlashTimeoutValue", "30"},
+    {"FlashResetSetting", "1"},
+    {"FlashVerboseMode", "0"},
+};
+
 static struct Host* NewHost(void) {
-    static const struct Setting settings[] = {
-        {"FlashProgramOption", "Necessary Pages Only"},
-        {"FlashProgramBlankCheckOption", "1"},
-        {"FlashProgramCRCOption", "0"},
-        {"FlashResetSetting", "0"},
-        {"FlashTimeoutValue", "5"},
-        {"FlashVerboseMode", "0"},
-    };
     struct Host* self = calloc(1, sizeof *self);
     if (self == NULL) Fail("starting", "out of memory");
     self->base.slots = &slots;
-    memcpy(self->settings, settings, sizeof settings);
+    memcpy(self->settings, defaults, sizeof defaults);
+    memset(self->flash, 0xFF, sizeof self->flash);
+    memset(self->committed, 0xFF, sizeof self->committed);
     *Register(self, 0x400FE000) = 0x000A0000; /* class field 10, Dorna */
     *Register(self, 0x400FDFC0) = 31;         /* flash: (31 + 1) * 2 KiB, in sectors of 1 KiB */
     *Register(self, 0x400FDFC4) = 63;         /* RAM: (63 + 1) * 256 bytes */
@@ -245,17 +287,38 @@ static void Check(const char* what, const char* errorText) {
 
 static void Program(struct Host* host, CorvaneDevice* device) {
     static const unsigned char data[] = "Hello, flash";
-    const uint32_t address = 0x1004;
+    const uint32_t address = 0x1004, length = sizeof data - 1;
     bool first = false, last = false;
     Check("address", device->slots->AddressWithinFlash(device, address, &first));
-    Check("address", device->slots->AddressWithinFlash(device, address + sizeof data - 1, &last));
+    Check("address", device->slots->AddressWithinFlash(device, address + length - 1, &last));
     if (!first || !last) Fail("planning", "the data doesn't fit into flash");
 
     Check("start of the load", device->slots->ResetSettings(device, 0));
-    Check("programming", device->slots->WriteDataToFlash(device, data, address, sizeof data, 1));
+    Check("programming", device->slots->WriteDataToFlash(device, data, address, length, 1));
     Check("end of the load", device->slots->ResetSettings(device, 2));
-    if (host->errors == 0 && memcmp(host->flash + address, data, sizeof data) != 0)
+    if (host->errors != 0) return;
+    printf("read back: %.*s\n", (int)length, (const char*)host->flash + address);
+    if (memcmp(host->flash + address, data, length) != 0)
         Fail("comparing", "flash differs from what was programmed");
+}
+
+static void ChangeSetting(struct Host* host, const char* word) {
+    const size_t length = strcspn(word, "=");
+    char name[sizeof((struct Setting*)0)->name] = "";
+    if (length < sizeof name) memcpy(name, word, length);
+    if (*name == '\0' || Find(host, name) == NULL) Fail(word, "there is no such setting");
+    Check(word, SetProperty(&host->base, name, word + length + 1));
+}
+
+/* A call that failed has returned an error text or shown an error: look at both. */
+static void Do(struct Host* host, CorvaneDevice* device, const char* word) {
+    if (strchr(word, '=') != NULL)
+        ChangeSetting(host, word);
+    else if (strcmp(word, "Load") == 0)
+        Program(host, device);
+    else
+        Check(word, device->slots->PerformOperation(device, word));
+    if (host->errors != 0) Fail(word, "the plug-in has shown an error, see above");
 }
 
 /* Loading the plug-in. The logger is found beside it. */
@@ -270,7 +333,7 @@ static void* Load(const char* path) {
     return library;
 }
 static CorvaneCreateFlashDevice2 Exported(void* library) {
-    return (CorvaneCreateFlashDevice2)(void*)GetProcAddress(library, "CreateFlashDevice2");
+    return (CorvaneCreateFlashDevice2)(void (*)(void))GetProcAddress(library, "CreateFlashDevice2");
 }
 static void Unload(void* library) {
     FreeLibrary(library);
@@ -304,12 +367,11 @@ int main(int argc, char** argv) {
     Check("initialising", device->slots->Initialize(device, &flashAvailable, &operations));
     printf("%s, %s\n", Find(host, "DeviceInfoFamily")->value,
            Find(host, "DeviceInfoFlashSize")->value);
-    if (argc > 2)
-        Check(argv[2], device->slots->PerformOperation(device, argv[2]));
-    else if (flashAvailable)
-        Program(host, device);
+    if (!flashAvailable) Fail("starting", "the device has no flash");
+    for (int i = 2; i < argc; ++i)
+        Do(host, device, argv[i]);
+    if (argc <= 2) Do(host, device, "Load");
     device->slots->Destroy(device);
-    if (host->errors != 0) Fail("working", "the plug-in has shown an error, see above");
     Unload(library);
     free(host);
     return 0;

@@ -1,5 +1,5 @@
-// A pretend microcontroller, just good enough for the plug-in to identify, erase and program it.
-// A real host has its debug probe here.
+// A pretend microcontroller, just good enough for all that the plug-in does to one. A real host has
+// its debug probe here.
 
 #pragma once
 
@@ -8,6 +8,16 @@
 #include <cstring>
 #include <map>
 #include <vector>
+
+constexpr std::uint32_t RamStart = 0x20000000;
+constexpr std::uint32_t FlashAddress = 0x400FD000;
+constexpr std::uint32_t FlashCommand = 0x400FD008;
+constexpr std::uint32_t EraseSector = 0xA4420002;  // commands have the key in their upper half
+constexpr std::uint32_t EraseAll = 0xA4420004;
+constexpr std::uint32_t Commit = 0xA4420008;
+constexpr std::uint32_t UserRegisters = 0x400FE1E0;  // two words
+constexpr std::uint32_t SectorSize = 1024;
+constexpr int ChunkMs = 120;
 
 class PretendDevice {
   public:
@@ -23,7 +33,7 @@ class PretendDevice {
         void* memory = At(address, bytes);
         if (memory == nullptr || address < flash_.size()) return false;
         std::memcpy(memory, buffer, bytes);
-        EraseIfCommanded();
+        CarryOutCommand();
         if (running_) ServeLoader();
         return true;
     }
@@ -31,15 +41,14 @@ class PretendDevice {
     void Run() { running_ = true; }
     // The loader doesn't go on with what it was doing.
     void Halt() { running_ = working_[0] = working_[1] = false; }
+    // Leaves the target halted. The user registers lose what was not committed.
+    void Reset() {
+        Halt();
+        for (std::uint32_t i : {0u, 1u})
+            registers_[UserRegisters + 4 * i] = committed_[i];
+    }
 
   private:
-    static constexpr std::uint32_t RamStart = 0x20000000;
-    static constexpr std::uint32_t FlashAddress = 0x400FD000;
-    static constexpr std::uint32_t FlashCommand = 0x400FD008;
-    static constexpr std::uint32_t SectorErase = 0xA4420002;
-    static constexpr std::uint32_t SectorSize = 1024;
-    static constexpr int ChunkMs = 120;
-
     // Flash from 0, RAM from 0x20000000; every other word address is a register.
     void* At(std::uint32_t address, std::size_t bytes) {
         if (address < flash_.size() && bytes <= flash_.size() - address)
@@ -49,11 +58,24 @@ class PretendDevice {
         return bytes == 4 ? &registers_[address] : nullptr;
     }
 
-    void EraseIfCommanded() {
-        if (registers_[FlashCommand] != SectorErase) return;
-        const std::uint32_t start = registers_[FlashAddress];
-        if (start < flash_.size()) std::memset(flash_.data() + start, 0xFF, SectorSize);
-        registers_[FlashCommand] = 0;  // done at once
+    // A command is done at once. One without the key does nothing.
+    void CarryOutCommand() {
+        const std::uint32_t address = registers_[FlashAddress];
+        switch (registers_[FlashCommand]) {
+            case EraseSector:
+                if (address < flash_.size())
+                    std::memset(&flash_[address / SectorSize * SectorSize], 0xFF, SectorSize);
+                break;
+            case EraseAll:
+                std::memset(flash_.data(), 0xFF, flash_.size());
+                break;
+            case Commit:
+                committed_[address & 1] = registers_[UserRegisters + 4 * (address & 1)];
+                break;
+            default:
+                return;
+        }
+        registers_[FlashCommand] = 0;
     }
 
     // What FlashLoaderMerrow.out does on a real target: program the chunk of each block whose
@@ -80,7 +102,10 @@ class PretendDevice {
         {0x400FE000, 0x000A0000},  // identification: class field 10, Dorna
         {0x400FDFC0, 31},          // flash: (31 + 1) * 2 KiB, in sectors of 1 KiB
         {0x400FDFC4, 63},          // RAM: (63 + 1) * 256 bytes
+        {UserRegisters, 0xFFFFFFFF},
+        {UserRegisters + 4, 0xFFFFFFFF},
     };
+    std::uint32_t committed_[2] = {0xFFFFFFFF, 0xFFFFFFFF};
     bool running_ = false;
     bool working_[2] = {};  // on the chunk of that block, since:
     std::chrono::steady_clock::time_point begun_[2];

@@ -1,7 +1,10 @@
-// A complete host for the flash plug-in: loads it, creates a device, prints what it found,
-// programs a few bytes, reads them back, and unloads it; or runs an operation instead:
+// A complete host for the flash plug-in, in C++11: loads it, creates a device, prints what it
+// found, and does what the words after the library's name say, one after the other:
 //
-//     minimal-host [LIBRARY [OPERATION]]
+//     minimal-host [LIBRARY [WORD]...]
+//
+// KEY=VALUE changes a setting, Load programs a few bytes and reads them back, every other word is
+// the name of an operation. Without a word it does a Load.
 //
 // To make a host of your own, put your debug probe in the place of PretendDevice and your user
 // interface in the place of printf.
@@ -9,6 +12,7 @@
 #include <flash_corvane/IFlashDevice2.h>
 #include <flash_corvane/IFlashHost.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <map>
@@ -16,6 +20,7 @@
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "PretendDevice.h"
 
@@ -24,6 +29,8 @@
 #else
 #include <dlfcn.h>
 #endif
+
+constexpr uint32_t StatusWords[] = {0x2000100C, 0x2000101C};  // of the loader's two blocks
 
 // Every slot answers null for success or an error text. Exceptions must not leave a slot.
 class MinimalHost final : public IFlashHost {
@@ -58,7 +65,11 @@ class MinimalHost final : public IFlashHost {
         loaderRuns_ = false;
         return error;
     }
-    const char* ResetTarget(bool) override { return HaltTarget(); }
+    const char* ResetTarget(bool) override {
+        const char* error = HaltTarget();
+        device_.Reset();
+        return error;
+    }
 
     const char* ReadMemory(void* buffer, size_t count, uint64_t address, int16_t,
                            size_t width) override {
@@ -102,10 +113,9 @@ class MinimalHost final : public IFlashHost {
 
     bool Failed() const { return failed_; }
     const std::string& Setting(const std::string& name) const { return settings_.at(name); }
+    bool Has(const std::string& name) const { return settings_.count(name) != 0; }
 
   private:
-    static constexpr uint32_t StatusWords[] = {0x2000100C, 0x2000101C};
-
     // The plug-in doesn't wait for the last chunk, and a halt would lose it. So wait until no
     // status word says "to do", but only if a loader was started: the words are arbitrary before.
     const char* AwaitLoader() {
@@ -135,8 +145,24 @@ class MinimalHost final : public IFlashHost {
         {"FlashProgramOption", "Necessary Pages Only"},
         {"FlashProgramBlankCheckOption", "1"},
         {"FlashProgramCRCOption", "1"},
-        {"FlashResetSetting", "0"},
-        {"FlashTimeoutValue", "5"},
+        {"FlashEraseType", "By Address Range"},
+        {"FlashEraseStartAddr", "0"},
+        {"FlashEraseEndAddr", "0"},
+        {"FlashBlankCheckSelection", "Entire Flash"},
+        {"FlashBlankCheckStartAddr", "0"},
+        {"FlashBlankCheckEndAddr", "0"},
+        {"FlashChecksumSelection", "Entire Flash"},
+        {"FlashChecksumStartAddr", "0"},
+        {"FlashChecksumEndAddr", "0"},
+        {"FlashMACAddrInput", "ff-ff-ff-ff-ff-ff"},
+        {"FlashMACAddrCommit", "0"},
+        {"FlashUserRegister0Input", "ffffffff"},
+        {"FlashUserRegister0Commit", "0"},
+        {"FlashUserRegister1Input", "ffffffff"},
+        {"FlashUserRegister1Commit", "0"},
+        {"FlashCrystalFreq", "8"},
+        {"FlashTimeoutValue", "30"},
+        {"FlashResetSetting", "1"},
         {"FlashVerboseMode", "0"},
     };
 };
@@ -169,23 +195,36 @@ static void ProgramAndReadBack(MinimalHost& host, IFlashDevice2& device) {
     if (readBack != data) throw std::runtime_error("flash differs from what was programmed");
 }
 
-// A user operation that failed and said so has returned no error: look at both.
-static void Perform(MinimalHost& host, IFlashDevice2& device, const char* operation) {
-    Check(operation, device.PerformOperation(operation));
+// An operation that failed and said so has returned no error: look at both.
+static void Perform(MinimalHost& host, IFlashDevice2& device, const std::string& operation) {
+    Check(operation.c_str(), device.PerformOperation(operation.c_str()));
     if (host.Failed()) throw std::runtime_error("the plug-in has shown an error, see above");
 }
 
-static void UseDevice(MinimalHost& host, IFlashDevice2& device, const char* operation) {
+static void Do(MinimalHost& host, IFlashDevice2& device, const std::string& word) {
+    const std::size_t equals = word.find('=');
+    const std::string name = word.substr(0, equals);
+    if (equals != std::string::npos && !host.Has(name))
+        throw std::runtime_error("there is no setting " + name);
+    if (equals != std::string::npos)
+        Check("setting", host.SetProperty(name.c_str(), word.c_str() + equals + 1));
+    else if (word == "Load")
+        ProgramAndReadBack(host, device);
+    else
+        Perform(host, device, word);
+}
+
+static void UseDevice(MinimalHost& host, IFlashDevice2& device,
+                      const std::vector<std::string>& words) {
     bool flashAvailable = false;
     const char* operations = nullptr;
     Check("initialising", device.Initialize(&flashAvailable, &operations));
     for (const char* name : {"DeviceInfoFamily", "DeviceInfoFlashSize", "DeviceInfoSectorSize"})
         std::printf("%s: %s\n", name, host.Setting(name).c_str());
     std::printf("operations: %s\n", operations);
-    if (operation != nullptr)
-        Perform(host, device, operation);
-    else if (flashAvailable)
-        ProgramAndReadBack(host, device);
+    if (!flashAvailable) throw std::runtime_error("the device has no flash");
+    for (const std::string& word : words)
+        Do(host, device, word);
 }
 
 // The plug-in's library. Its logger is found beside it.
@@ -242,7 +281,9 @@ static Device CreateDevice(const Library& library, MinimalHost& host) {
 int main(int argc, char** argv) try {
     const Library library(argc > 1 ? argv[1] : FLASH_CORVANE_LIBRARY);
     MinimalHost host;
-    UseDevice(host, *CreateDevice(library, host), argc > 2 ? argv[2] : nullptr);
+    std::vector<std::string> words(argv + std::min(argc, 2), argv + argc);
+    if (words.empty()) words.push_back("Load");
+    UseDevice(host, *CreateDevice(library, host), words);
 } catch (const std::exception& error) {
     std::fprintf(stderr, "minimal-host: %s\n", error.what());
     return 1;

@@ -14,7 +14,7 @@ mv "$trial/installed" "$kit"
 # With sanitizers, as the libraries were built: by Clang. They know no object that was made in C.
 examples=(minimal-host c-host)
 [ -z "${2:-}" ] || { export CXX=clang++; examples=(minimal-host); }
-flags="-Wall -Wextra -Werror ${2:+-fsanitize=$2}"
+flags="-Wall -Wextra -Wpedantic -Werror ${2:+-fsanitize=$2}"
 for example in "${examples[@]}"; do
     cmake --no-warn-unused-cli -G Ninja -S "$kit/share/doc/corvane-flash/examples/$example" -B "$trial/$example" \
         -DCMAKE_PREFIX_PATH="$kit" -DCMAKE_{C,CXX}_FLAGS="$flags" >/dev/null
@@ -22,6 +22,19 @@ for example in "${examples[@]}"; do
 done
 for example in "${examples[@]}"; do
     diff "$here/$example.txt" <("$trial/$example/$example")
+done
+
+# Every operation works on their pretend devices: a mass erase erases what was loaded, and what was
+# not committed is lost in a reset.
+plugin=$(echo "$kit"/lib*/flash_corvane/libflash_corvane.so)
+words=(BlankCheck Load "FlashEraseType=Entire Flash" Erase BlankCheck CalculateChecksum
+    FlashUserRegister0Input=12ab FlashUserRegister0Commit=1 ProgramUserRegister0
+    FlashUserRegister1Input=34cd ProgramUserRegister1 ReadUserRegister1
+    Erase ReadUserRegister0 ReadUserRegister1
+    FlashMACAddrInput=02-1b-c3-04-05-06 FlashMACAddrCommit=1 ProgramMACAddress Erase ReadMACAddress)
+for example in "${examples[@]}"; do
+    diff "$here/operations.txt" \
+        <("$trial/$example/$example" "$plugin" "${words[@]}" | sed '0,/^operations\|^Dorna/d')
 done
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
