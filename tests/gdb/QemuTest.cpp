@@ -1,6 +1,6 @@
-// The client against a server and a core that are nobody's here: the plug-in streams an image
-// through a loader that QEMU executes, on a generic board with RAM where the flash would be. The
-// board has no Corvane registers; a simulated device lends them.
+// The client and the example of a loader against a server and a core that are nobody's here: the
+// plug-in streams an image through the loader, which QEMU executes, on a generic board with RAM
+// where the flash would be. The board has no Corvane registers; a simulated device lends them.
 
 #include <arpa/inet.h>
 #include <dlfcn.h>
@@ -133,17 +133,7 @@ class BoardHost final : public test::StrictHost {
     std::string error_;
 };
 
-TEST(Qemu, RunsALoaderThroughWhichThePluginProgramsMemory) {
-    ASSERT_EQ(std::system("for tool in qemu-system-arm clang ld.lld; do command -v $tool "
-                          ">/dev/null || { echo \"$tool is missing\" >&2; exit 1; }; done"),
-              0);
-    const std::string loader = testing::TempDir() + "toy-loader-" + std::to_string(getpid());
-    const std::string build =
-        "clang --target=armv7m-none-eabi -mthumb -Os -ffreestanding -nostdlib -fuse-ld=lld "
-        "-fno-delete-null-pointer-checks -Wl,-N,-Ttext=0x20002000,-e,start " TOY_LOADER " -o '" +
-        loader + "'";
-    ASSERT_EQ(std::system(build.c_str()), 0);
-
+void ProgramThrough(const std::string& loader) {
     Qemu qemu;
     gdb::GdbOptions options;
     gdb::ParseGdbOption("timeout=20s,ram-end=20010000,reset=system_reset", options);
@@ -175,7 +165,31 @@ TEST(Qemu, RunsALoaderThroughWhichThePluginProgramsMemory) {
     std::vector<std::uint8_t> held(image.size());
     board.Read(held.data(), held.size(), kStart, 0, 1);
     EXPECT_TRUE(held == image) << packets;
+    std::uint32_t blocks[8];
+    board.Read(blocks, sizeof blocks, 0x20001000, 0, 1);
+    EXPECT_EQ(blocks[3] | blocks[7], 0U) << "the loader reports a failure";
     board.Release(false);
+}
+
+bool Have(const std::string& command) {
+    return std::system(("command -v " + command + " >/dev/null").c_str()) == 0;
+}
+
+// By GCC, too, where there is one for ARM.
+TEST(Qemu, RunsTheExampleOfALoaderThroughWhichThePluginProgramsMemory) {
+    const std::string loader = testing::TempDir() + "loader-" + std::to_string(getpid());
+    for (const char* tool : {"qemu-system-arm", "clang", "ld.lld"})
+        ASSERT_TRUE(Have(tool)) << tool << " is missing";
+    for (const std::string compiler :
+         {"clang --target=arm-none-eabi -fuse-ld=lld", "arm-none-eabi-gcc"}) {
+        SCOPED_TRACE(compiler);
+        if (compiler == "arm-none-eabi-gcc" && !Have(compiler)) continue;
+        const std::string build = "ARM_CC='" + compiler +
+                                  " -Wpedantic -Werror' sh " EXAMPLE_LOADER "/build.sh '" + loader +
+                                  "'";
+        ASSERT_EQ(std::system(build.c_str()), 0);
+        ProgramThrough(loader);
+    }
     unlink(loader.c_str());
 }
 

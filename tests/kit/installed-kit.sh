@@ -36,6 +36,8 @@ for example in "${examples[@]}"; do
     diff "$here/operations.txt" \
         <("$trial/$example/$example" "$plugin" "${words[@]}" | sed '0,/^operations\|^Dorna/d')
 done
+clang=(clang --target=arm-none-eabi -fuse-ld=lld -Wpedantic -Werror)
+ARM_CC="${clang[*]}" sh "$kit/share/doc/corvane-flash/examples/loader/build.sh" "$trial/loader.out"
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 [ "$found" -ef "$kit"/lib*/flash_corvane/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
