@@ -8,8 +8,8 @@
 #include <thread>
 
 #include "bench/Measurements.h"
-#include "target/gdb/GdbTarget.h"
-#include "target/gdb/Server.h"
+#include "target/gdb/client/GdbTarget.h"
+#include "target/gdb/server/Server.h"
 
 namespace bench {
 

@@ -5,12 +5,12 @@
 #include <algorithm>
 
 #include "fuzz/Require.h"
-#include "target/gdb/Frame.h"
-#include "target/gdb/GdbOptions.h"
-#include "target/gdb/Replies.h"
-#include "target/gdb/Session.h"
-#include "target/gdb/Socket.h"
-#include "target/gdb/TargetDescription.h"
+#include "target/gdb/client/GdbOptions.h"
+#include "target/gdb/client/RegisterNumbers.h"
+#include "target/gdb/server/Session.h"
+#include "target/gdb/wire/Frame.h"
+#include "target/gdb/wire/Replies.h"
+#include "target/gdb/wire/Socket.h"
 #include "target/simulated/ServedSimulation.h"
 
 namespace {
@@ -25,7 +25,7 @@ void ReadReply(const std::string& reply) {
     if (const auto piece = ParseDocumentPiece(reply))
         Require(piece->bytes.size() < reply.size(), "a piece lies in its reply");
     try {
-        ReadTargetDescription([&](const std::string&) { return reply; });
+        ReadRegisterNumbers([&](const std::string&) { return reply; });
     } catch (const DescriptionError& error) {
         RequireText(error.what());
     }

@@ -2,7 +2,7 @@
 
 #include "host/Tool.h"
 #include "host/base/Interrupt.h"
-#include "host/base/Streams.h"
+#include "host/files/Streams.h"
 
 int main(int argc, char** argv) {
     host::OccupyStandardStreams();

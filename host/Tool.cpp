@@ -11,12 +11,12 @@
 #include <optional>
 #include <system_error>
 
-#include "host/base/FileLock.h"
 #include "host/base/Interrupt.h"
-#include "host/base/Streams.h"
 #include "host/cli/CommandLine.h"
 #include "host/commands/Commands.h"
-#include "host/settings/SettingKeys.h"
+#include "host/facts/SettingKeys.h"
+#include "host/files/FileLock.h"
+#include "host/files/Streams.h"
 
 namespace host {
 

@@ -24,9 +24,9 @@ constexpr std::uint32_t kHandshakeBytes = 12 + 4;  ///< a chunk's parameters and
 /// Counts the chunks that were seen done.
 class Chunks final : public host::LoaderObserver {
   public:
-    void HandingOver(const host::AddressRange&) override {}
-    void HandedOver(const host::AddressRange&) override {}
-    void Programmed(const host::AddressRange&) override { ++count; }
+    void HandingOver(const base::AddressRange&) override {}
+    void HandedOver(const base::AddressRange&) override {}
+    void Programmed(const base::AddressRange&) override { ++count; }
 
     std::uint64_t count = 0;
 };
@@ -71,7 +71,7 @@ Seconds Samples(const Link& link) {
     host::image::Image image;
     image.Add(0, std::vector<std::uint8_t>(kSizeBytes, 0x5A), "bench");
     const Seconds before = board.Now();
-    for (const host::AddressRange& block : host::SampleBlocks(image, {kSizeBytes, 0x2000})) {
+    for (const base::AddressRange& block : host::SampleBlocks(image, {kSizeBytes, 0x2000})) {
         std::vector<std::uint8_t> bytes(block.Size());
         board.device.Read(bytes.data(), bytes.size(), block.first, 0, 1);
     }

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 
+#include "base/Hex.h"
 #include "host/base/Text.h"
 
 namespace host {
@@ -66,7 +67,8 @@ std::optional<MacAddress> ParseMacAddress(const std::string& text) {
             return std::nullopt;
         const std::size_t digits = DigitsAt(text, position);
         if (digits == 0 || (!separated && digits != 2)) return std::nullopt;
-        address.bytes[i] = static_cast<std::uint8_t>(*HexNumber(text.substr(position, digits)));
+        address.bytes[i] =
+            static_cast<std::uint8_t>(*base::ParseHex32(text.substr(position, digits)));
         position += digits;
     }
     if (position != text.size()) return std::nullopt;

@@ -1,30 +1,19 @@
-// Parsing with std::from_chars, formatting with fmt: neither knows the locale.
+// Neither base/Hex.h nor fmt knows the locale.
 
 #include "host/base/Text.h"
 
 #include <fmt/format.h>
 
 #include <array>
-#include <charconv>
 #include <cmath>
-#include <system_error>
 
+#include "base/Hex.h"
 #include "host/base/Errors.h"
 
 namespace host {
 
-std::optional<std::uint32_t> HexNumber(const std::string& text) {
-    const bool prefixed = text.starts_with("0x") || text.starts_with("0X");
-    const char* first = text.data() + (prefixed ? 2 : 0);
-    const char* last = text.data() + text.size();
-    std::uint32_t value = 0;
-    const auto [end, error] = std::from_chars(first, last, value, 16);
-    if (error != std::errc() || end != last) return std::nullopt;
-    return value;
-}
-
 std::uint32_t ParseHexArgument(const std::string& text, const std::string& what) {
-    if (const auto value = HexNumber(text)) return *value;
+    if (const auto value = base::ParseHex32(text)) return *value;
     throw Failure(ExitStatus::WrongUsage,
                   fmt::format("{} '{}' is no hexadecimal number of up to 32 bits; write it as in "
                               "0x1f00 or 1f00",
@@ -34,7 +23,7 @@ std::uint32_t ParseHexArgument(const std::string& text, const std::string& what)
 namespace {
 
 /// "START+LENGTH".
-AddressRange ParseStartAndLength(const std::string& text, std::size_t plus) {
+base::AddressRange ParseStartAndLength(const std::string& text, std::size_t plus) {
     const std::uint64_t first = ParseHexArgument(text.substr(0, plus), "the range's start");
     const std::uint64_t length = ParseHexArgument(text.substr(plus + 1), "the range's length");
     if (length == 0 || first + length > std::uint64_t{1} << 32)
@@ -46,7 +35,7 @@ AddressRange ParseStartAndLength(const std::string& text, std::size_t plus) {
 
 }  // namespace
 
-AddressRange ParseRange(const std::string& text) {
+base::AddressRange ParseRange(const std::string& text) {
     if (const auto plus = text.find('+'); plus != std::string::npos)
         return ParseStartAndLength(text, plus);
     const auto dash = text.find('-');
@@ -55,8 +44,9 @@ AddressRange ParseRange(const std::string& text) {
                       fmt::format("'{}' is no address range; write the first and the last address, "
                                   "as in 0x1000-0x1fff, or start and length, as in 0x1000+0x1000",
                                   text));
-    const AddressRange range{ParseHexArgument(text.substr(0, dash), "the range's first address"),
-                             ParseHexArgument(text.substr(dash + 1), "the range's last address")};
+    const base::AddressRange range{
+        ParseHexArgument(text.substr(0, dash), "the range's first address"),
+        ParseHexArgument(text.substr(dash + 1), "the range's last address")};
     if (range.first > range.last)
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("the range '{}' ends before it starts; the first address comes "
@@ -65,11 +55,7 @@ AddressRange ParseRange(const std::string& text) {
     return range;
 }
 
-std::string HexText(std::uint32_t value) {
-    return fmt::format("{:#x}", value);
-}
-
-std::string RangeText(const AddressRange& range) {
+std::string RangeText(const base::AddressRange& range) {
     return fmt::format("{:#x}-{:#x}", range.first, range.last);
 }
 

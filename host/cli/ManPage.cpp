@@ -9,8 +9,8 @@
 #include "host/base/Errors.h"
 #include "host/cli/CommandTable.h"
 #include "host/cli/Words.h"
-#include "target/gdb/GdbOptions.h"
-#include "target/simulated/DeviceOptions.h"
+#include "target/gdb/client/GdbOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace host {
 

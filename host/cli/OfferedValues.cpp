@@ -5,9 +5,9 @@
 #include <algorithm>
 
 #include "host/settings/SettingCatalogue.h"
-#include "target/gdb/GdbOptions.h"
-#include "target/simulated/DeviceOptions.h"
-#include "target/simulated/OptionTable.h"
+#include "target/gdb/client/GdbOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
+#include "target/simulated/options/OptionTable.h"
 
 namespace host {
 

@@ -11,7 +11,7 @@ namespace host::commands {
 namespace {
 
 Outcome BlankCheckOn(Context& context, FlashDevice& device) {
-    const AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
+    const base::AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
     Outcome outcome = RunOperation(device, plugin::kBlankCheck, Talk::Verbose);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
     context.reporter.Result(RangeText(range) + " is blank");

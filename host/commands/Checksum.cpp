@@ -6,18 +6,19 @@
 #include <algorithm>
 #include <vector>
 
+#include "base/Hex.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/SettingKeys.h"
 #include "host/flashing/ImageSet.h"
 #include "host/flashing/RangeOperation.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
 namespace {
 
 /// The CRC-32 of the range as flash would hold the image, erased where the image says nothing.
-std::uint32_t ImageChecksum(const image::Image& image, const AddressRange& range) {
+std::uint32_t ImageChecksum(const image::Image& image, const base::AddressRange& range) {
     uLong crc = crc32(0, nullptr, 0);
     std::uint64_t next = range.first;
     const std::vector<std::uint8_t> erased(0x10000, 0xFF);
@@ -41,7 +42,7 @@ std::uint32_t ImageChecksum(const image::Image& image, const AddressRange& range
     return static_cast<std::uint32_t>(crc);
 }
 
-Outcome Answer(Context& context, const AddressRange& range, const std::string& checksum) {
+Outcome Answer(Context& context, const base::AddressRange& range, const std::string& checksum) {
     context.reporter.Result(checksum);
     return {.result = {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}}};
 }
@@ -49,14 +50,14 @@ Outcome Answer(Context& context, const AddressRange& range, const std::string& c
 Outcome OfImage(Context& context, const LoadedImages& images) {
     return WithDevice(context, [&](FlashDevice& device) {
         RequireFit(device, images);
-        const AddressRange range = device.RangeInFlash(context.options.range);
-        return Answer(context, range, HexText(ImageChecksum(images.image, range)));
+        const base::AddressRange range = device.RangeInFlash(context.options.range);
+        return Answer(context, range, base::HexText(ImageChecksum(images.image, range)));
     });
 }
 
 Outcome OfFlash(Context& context) {
     return WithDevice(context, [&](FlashDevice& device) {
-        const AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
+        const base::AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
         const Outcome operation = RunOperation(device, plugin::kCalculateChecksum, Talk::Verbose);
         Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
         outcome.result.update(operation.result);

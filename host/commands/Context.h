@@ -4,10 +4,10 @@
 
 #include <functional>
 
-#include "host/base/FilesInUse.h"
-#include "host/base/OutputFile.h"
 #include "host/cli/Options.h"
 #include "host/driver/FlashDevice.h"
+#include "host/files/FilesInUse.h"
+#include "host/files/OutputFile.h"
 #include "host/flashing/ImageSet.h"
 #include "host/output/Reporter.h"
 #include "host/settings/SettingStore.h"

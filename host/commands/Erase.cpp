@@ -12,10 +12,10 @@ namespace host::commands {
 namespace {
 
 Outcome EraseOn(Context& context, FlashDevice& device) {
-    const AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
+    const base::AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
     if (context.options.all) RequireWholeErase(device, "--range");
     const FlashGeometry flash = GeometryOf(device);
-    const AddressRange covered = SectorsCovering(range, flash);
+    const base::AddressRange covered = SectorsCovering(range, flash);
     const std::uint64_t sectors = SectorCount(covered, flash);
     Json members{{"address", covered.first}, {"bytes", covered.Size()}, {"sectors", sectors}};
     if (context.options.dryRun) {

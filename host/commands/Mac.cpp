@@ -5,8 +5,8 @@
 #include "host/base/MacAddress.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/SettingKeys.h"
 #include "host/flashing/UserRegisters.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 

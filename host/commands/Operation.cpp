@@ -11,9 +11,9 @@
 #include "host/base/Suggestion.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/SettingKeys.h"
 #include "host/flashing/RangeOperation.h"
 #include "host/flashing/UserRegisters.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 

@@ -10,6 +10,7 @@
 
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/LoaderMemory.h"
 #include "host/flashing/Comparison.h"
 #include "host/flashing/DevicePlan.h"
 #include "host/flashing/ImageSet.h"
@@ -53,7 +54,7 @@ Json PlanJson(const ProgramPlan& plan) {
     for (const image::Section& section : plan.sections)
         sections.push_back({{"address", section.address}, {"bytes", section.bytes.size()}});
     Json erased = Json::array();
-    for (const AddressRange& run : plan.erased)
+    for (const base::AddressRange& run : plan.erased)
         erased.push_back({{"address", run.first}, {"bytes", run.Size()}});
     return {{"sections", sections},
             {"erased", erased},
@@ -117,7 +118,7 @@ void Load(Context& context, FlashDevice& device, const ProgramPlan& plan) {
 /// What can still be tried depends on what was erased.
 std::string Advice(const Differences& differences, const ProgramPlan& plan) {
     if (!differences.notErased) return "these bytes were not programmed";
-    const auto holdsIt = [&](const AddressRange& run) {
+    const auto holdsIt = [&](const base::AddressRange& run) {
         return run.Contains(*differences.notErased);
     };
     if (std::any_of(plan.erased.begin(), plan.erased.end(), holdsIt))

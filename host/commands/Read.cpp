@@ -38,7 +38,7 @@ bool WantsDump(const std::string& path, image::Format format) {
 
 Outcome ReadOn(Context& context, FlashDevice& device, const std::string& path,
                image::Format format) {
-    const AddressRange range = device.RangeInFlash(context.options.range);
+    const base::AddressRange range = device.RangeInFlash(context.options.range);
     device.Halt();
     device.Meter().Expect(Phase::Read, range.Size());
     device.Meter().Begin(Phase::Read);

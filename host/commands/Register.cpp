@@ -2,10 +2,11 @@
 
 #include <fmt/format.h>
 
+#include "base/Hex.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/SettingKeys.h"
 #include "host/flashing/UserRegisters.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host::commands {
 
@@ -29,7 +30,7 @@ Outcome ShowRegister(Context& context, FlashDevice& device) {
 Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     const unsigned index = Index(context);
     const std::uint32_t old = ReadRegister(device, index);
-    context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], HexText(value));
+    context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], base::HexText(value));
     ChooseCommit(device, keys::kRegisterCommits[index], context.options.commit);
     device.Perform(plugin::ProgramRegisterOperation(index));
     Outcome outcome;

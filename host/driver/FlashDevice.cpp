@@ -8,9 +8,12 @@
 #include <charconv>
 #include <utility>
 
+#include "base/Hex.h"
 #include "host/base/Interrupt.h"
+#include "host/facts/FlashMemory.h"
+#include "host/facts/LoaderMemory.h"
+#include "host/facts/SettingKeys.h"
 #include "host/output/Summary.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host {
 
@@ -108,10 +111,10 @@ void FlashDevice::RequireFlash() const {
         fmt::format("the device ({}) has no flash that the plug-in can work on", info_.family));
 }
 
-AddressRange FlashDevice::RangeInFlash(const std::optional<std::string>& text) {
+base::AddressRange FlashDevice::RangeInFlash(const std::optional<std::string>& text) {
     RequireFlash();
     if (!text) return info_.Flash();
-    const AddressRange range = ParseRange(*text);
+    const base::AddressRange range = ParseRange(*text);
     if (Contains(range.first) && Contains(range.last)) return range;
     throw Failure(ExitStatus::WrongUsage,
                   fmt::format("the range {} doesn't lie in the device's flash, {}",
@@ -166,12 +169,12 @@ std::string FlashDevice::Published(const std::string& key) const {
                   fmt::format("the plug-in reported success, but has published no {}", key));
 }
 
-std::vector<std::uint8_t> FlashDevice::ReadFlash(const AddressRange& range) {
+std::vector<std::uint8_t> FlashDevice::ReadFlash(const base::AddressRange& range) {
     std::vector<std::uint8_t> bytes(range.Size());
     for (std::size_t done = 0; done < bytes.size();) {
         const std::size_t count = std::min<std::size_t>(kReadBytes, bytes.size() - done);
         const auto address = range.first + static_cast<std::uint32_t>(done);
-        Call("reading flash at " + HexText(address), "", [&] {
+        Call("reading flash at " + base::HexText(address), "", [&] {
             return Host().ReadMemory(bytes.data() + done, count, address, plugin::kFlashPage, 1);
         });
         meter_.Advance(count);
@@ -303,8 +306,8 @@ std::string FlashDevice::StateOfFlash() const {
     if (work.attempted.Empty()) return "the flash is as it was";
     const PhaseProgress& erase = meter_.Of(Phase::Erase);
     const PhaseProgress& program = meter_.Of(Phase::Program);
-    AddressSet seen = work.erased;
-    for (const AddressRange& range : work.programmed.Ranges())
+    base::AddressSet seen = work.erased;
+    for (const base::AddressRange& range : work.programmed.Ranges())
         seen.Add(range);
     // All that was to be done was done, and nothing else was begun: an erase that failed isn't made
     // good by what was programmed over it.

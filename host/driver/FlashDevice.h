@@ -10,13 +10,13 @@
 #include <vector>
 
 #include "host/base/Errors.h"
-#include "host/base/PluginFacts.h"
 #include "host/base/Text.h"
 #include "host/driver/FlashHost.h"
 #include "host/driver/FlashWatch.h"
 #include "host/driver/PluginLibrary.h"
 #include "host/driver/Trace.h"
 #include "host/driver/TracingHost.h"
+#include "host/facts/Operations.h"
 #include "host/image/Image.h"
 #include "host/output/WorkMeter.h"
 #include "host/targets/LoaderWait.h"
@@ -34,7 +34,7 @@ struct DeviceInfo {
     bool hasFlash = false;
     std::string operations;  ///< joined by " | "
 
-    AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
+    base::AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
 };
 
 /// A failure of the device or the plug-in. Part of it may have been shown already: `Remark` is what
@@ -81,7 +81,7 @@ class FlashDevice {
 
     /// The range of a command, the whole flash when none was given. Failure (WrongUsage) when it
     /// doesn't lie in flash, Failure (DeviceFailed) when there is no flash.
-    AddressRange RangeInFlash(const std::optional<std::string>& text);
+    base::AddressRange RangeInFlash(const std::optional<std::string>& text);
 
     /// Failure (DeviceFailed) for a device whose flash the plug-in can't work on.
     void RequireFlash() const;
@@ -105,7 +105,7 @@ class FlashDevice {
     void Know(const Json& members) { known_.update(members); }
 
     /// Reads flash of the halted target, counting the bytes for the running phase.
-    std::vector<std::uint8_t> ReadFlash(const AddressRange& range);
+    std::vector<std::uint8_t> ReadFlash(const base::AddressRange& range);
     std::uint32_t ReadUserRegister(unsigned index);
     void Halt();
 

@@ -12,9 +12,9 @@
 #include <utility>
 
 #include "host/base/Interrupt.h"
-#include "host/base/PluginFacts.h"
+#include "host/facts/Operations.h"
+#include "host/facts/SettingKeys.h"
 #include "host/settings/SettingCatalogue.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host {
 

@@ -5,7 +5,8 @@
 #include <algorithm>
 #include <string_view>
 
-#include "host/base/PluginFacts.h"
+#include "host/facts/FlashMemory.h"
+#include "host/facts/Operations.h"
 
 namespace host {
 
@@ -36,7 +37,7 @@ void FlashWatch::Writing(std::uint32_t address, std::uint32_t word) {
     if (address == plugin::kFlashCommandRegister) NoteCommand(word);
 }
 
-void FlashWatch::Programmed(const AddressRange& chunk) {
+void FlashWatch::Programmed(const base::AddressRange& chunk) {
     work_.programmed.Add(chunk);
     if (meter_.Running() == Phase::Program) meter_.Advance(chunk.Size());
 }
@@ -59,10 +60,10 @@ void FlashWatch::NoteCommand(std::uint32_t command) {
     pendingErase_ = command & (plugin::kEraseSectorBit | plugin::kEraseAllBit);
     if (pendingErase_ == 0) return;
     const auto last = static_cast<std::uint32_t>(flashBytes_ - 1);
-    erasing_ =
-        pendingErase_ == plugin::kEraseAllBit
-            ? AddressRange{0, last}
-            : AddressRange{addressRegister_, std::min(addressRegister_ + (sectorBytes_ - 1), last)};
+    erasing_ = pendingErase_ == plugin::kEraseAllBit
+                   ? base::AddressRange{0, last}
+                   : base::AddressRange{addressRegister_,
+                                        std::min(addressRegister_ + (sectorBytes_ - 1), last)};
     work_.attempted.Add(erasing_);
     meter_.Begin(Phase::Erase);
 }

@@ -9,7 +9,7 @@
 #include <optional>
 #include <string>
 
-#include "host/base/AddressSet.h"
+#include "base/AddressSet.h"
 #include "host/output/WorkMeter.h"
 #include "host/targets/LoaderWait.h"
 
@@ -24,10 +24,11 @@ struct NotBlank {
 /// What a run has done to the flash, so far as it can know. Nothing outside `attempted` has
 /// changed.
 struct FlashWork {
-    AddressSet attempted;   ///< the access that erases or programs it went out, and perhaps arrived
-    AddressSet erased;      ///< the flash controller was seen to be done
-    AddressSet handedOver;  ///< arrived at the loader
-    AddressSet programmed;  ///< the loader was seen to be done
+    base::AddressSet
+        attempted;  ///< the access that erases or programs it went out, and perhaps arrived
+    base::AddressSet erased;      ///< the flash controller was seen to be done
+    base::AddressSet handedOver;  ///< arrived at the loader
+    base::AddressSet programmed;  ///< the loader was seen to be done
 };
 
 class FlashWatch final : public LoaderObserver {
@@ -42,9 +43,9 @@ class FlashWatch final : public LoaderObserver {
     void Writing(std::uint32_t address, std::uint32_t word);
     void Read(std::uint32_t address, std::size_t bytes, const std::uint8_t* data);
 
-    void HandingOver(const AddressRange& chunk) override { work_.attempted.Add(chunk); }
-    void HandedOver(const AddressRange& chunk) override { work_.handedOver.Add(chunk); }
-    void Programmed(const AddressRange& chunk) override;
+    void HandingOver(const base::AddressRange& chunk) override { work_.attempted.Add(chunk); }
+    void HandedOver(const base::AddressRange& chunk) override { work_.handedOver.Add(chunk); }
+    void Programmed(const base::AddressRange& chunk) override;
     void DisplayBegan(const std::string& title);
     void DisplayEnded();
 
@@ -68,7 +69,7 @@ class FlashWatch final : public LoaderObserver {
     FlashWork work_;
     std::uint32_t addressRegister_ = 0;
     std::uint32_t pendingErase_ = 0;  ///< command bits of an erase that is under way
-    AddressRange erasing_;            ///< what it erases
+    base::AddressRange erasing_;      ///< what it erases
     bool commanded_ = false;
     bool displayOpen_ = false;
     std::optional<NotBlank> notBlank_;

@@ -6,7 +6,7 @@
 
 #include <algorithm>
 
-#include "host/base/PluginFacts.h"
+#include "host/facts/FlashMemory.h"
 
 namespace host {
 

@@ -12,8 +12,8 @@
 #include <filesystem>
 #include <system_error>
 
-#include "host/base/InputFile.h"
-#include "host/base/Streams.h"
+#include "host/files/InputFile.h"
+#include "host/files/Streams.h"
 
 namespace host {
 
@@ -34,10 +34,10 @@ bool IsTrace(const std::string& path) {
            InputFile(kTraceFile, path).Beginning().starts_with(kFirstLine);
 }
 
-Descriptor Open(const std::string& path, Existing existing) {
-    if (path == "-") return Descriptor(dup(STDERR_FILENO));
+base::Descriptor Open(const std::string& path, Existing existing) {
+    if (path == "-") return base::Descriptor(dup(STDERR_FILENO));
     RequireWritable(kTraceFile, path, IsTrace(path) ? Existing::Replace : existing);
-    Descriptor file = OpenForWriting(kTraceFile, path);
+    base::Descriptor file = OpenForWriting(kTraceFile, path);
     struct stat status {};
     if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode)) return file;
     if (flock(file.Get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK)

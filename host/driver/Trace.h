@@ -6,8 +6,8 @@
 #include <chrono>
 #include <string>
 
-#include "host/base/Descriptor.h"
-#include "host/base/OutputFile.h"
+#include "base/Descriptor.h"
+#include "host/files/OutputFile.h"
 
 namespace host {
 
@@ -29,7 +29,7 @@ class Trace {
     void Write(const std::string& text);
 
     std::string path_;
-    Descriptor file_;
+    base::Descriptor file_;
     int error_ = 0;
     std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
 };

@@ -34,7 +34,7 @@ void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
 
 /// Calls `compare` for each piece of a range that was read.
 template <typename Action>
-void ReadPieces(FlashDevice& device, const AddressRange& range, const Action& compare) {
+void ReadPieces(FlashDevice& device, const base::AddressRange& range, const Action& compare) {
     std::uint64_t rest = range.Size();
     for (std::uint32_t address = range.first; rest > 0;) {
         const auto size = static_cast<std::uint32_t>(std::min<std::uint64_t>(kPieceBytes, rest));
@@ -114,7 +114,7 @@ Differences CompareWithFlash(FlashDevice& device, const image::Image& image) {
     });
 }
 
-Differences CompareWithErased(FlashDevice& device, const AddressRange& range) {
+Differences CompareWithErased(FlashDevice& device, const base::AddressRange& range) {
     const std::vector<std::uint8_t> erased(std::min<std::uint64_t>(kPieceBytes, range.Size()),
                                            0xFF);
     return Read(device, [&](Differences& differences) {

@@ -20,7 +20,7 @@ struct LoadedImages;
 
 /// Bytes that differ, near enough to each other to be told as one range.
 struct DifferentRange {
-    AddressRange range;
+    base::AddressRange range;
     std::uint8_t expected = 0;  ///< of the first byte, which differs
     std::uint8_t actual = 0;
 
@@ -50,7 +50,7 @@ void Compare(Differences& differences, std::uint32_t address,
 Differences CompareWithFlash(FlashDevice& device, const image::Image& image);
 
 /// The same with what an erase leaves.
-Differences CompareWithErased(FlashDevice& device, const AddressRange& range);
+Differences CompareWithErased(FlashDevice& device, const base::AddressRange& range);
 
 /// Makes the outcome the failure (ContentsDiffer) of a flash that should hold the images, with a
 /// line for each of the first ranges that names the file; `advice` ends the closing line.

@@ -6,10 +6,10 @@
 
 #include <algorithm>
 
-#include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/FlashMemory.h"
+#include "host/facts/SettingKeys.h"
 #include "host/flashing/Unchanged.h"
-#include "host/settings/SettingKeys.h"
 
 namespace host {
 
@@ -31,7 +31,7 @@ void RequireWholeErase(const FlashDevice& device, const std::string& option) {
 namespace {
 
 void RequireErasable(const FlashDevice& device, const EraseChoice& erase) {
-    const AddressRange flash = device.Info().Flash();
+    const base::AddressRange flash = device.Info().Flash();
     if (erase.kind == EraseChoice::Kind::Everything)
         return RequireWholeErase(device, "program --erase");
     if (erase.kind == EraseChoice::Kind::Range &&
@@ -49,7 +49,7 @@ ProgramPlan PlanOnDevice(FlashDevice& device, const image::Image& image, const E
                          bool rewrite) {
     RequireErasable(device, erase);
     const bool look = erase.kind == EraseChoice::Kind::Necessary && !rewrite;
-    return PlanProgram(image, look ? FindUnchanged(device, image) : AddressSet{},
+    return PlanProgram(image, look ? FindUnchanged(device, image) : base::AddressSet{},
                        GeometryOf(device), erase);
 }
 

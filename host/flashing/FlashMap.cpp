@@ -8,7 +8,8 @@
 #include <array>
 #include <utility>
 
-#include "host/base/AddressSet.h"
+#include "base/AddressSet.h"
+#include "base/Hex.h"
 
 namespace host {
 
@@ -37,7 +38,7 @@ class Mapper {
     Mapper(const std::vector<std::uint8_t>& contents, const image::Image& image,
            const ProgramPlan& plan)
         : contents_(contents), image_(image) {
-        for (const AddressRange& run : plan.erased)
+        for (const base::AddressRange& run : plan.erased)
             erased_.Add(run);
         for (const image::Section& section : plan.sections)
             programmed_.Add({section.address, section.Last()});
@@ -54,7 +55,7 @@ class Mapper {
             const std::uint64_t end = covered ? sections[section_].End()
                                       : ends  ? std::uint64_t{last} + 1
                                               : sections[section_].address;
-            const AddressRange piece{
+            const base::AddressRange piece{
                 static_cast<std::uint32_t>(next),
                 static_cast<std::uint32_t>(std::min<std::uint64_t>(end - 1, last))};
             Append(piece, StateOf(piece, covered));
@@ -65,8 +66,8 @@ class Mapper {
     std::vector<MapRun> Runs() { return std::move(runs_); }
 
   private:
-    MapState StateOf(const AddressRange& piece, bool covered) const {
-        const AddressRange start{piece.first, piece.first};
+    MapState StateOf(const base::AddressRange& piece, bool covered) const {
+        const base::AddressRange start{piece.first, piece.first};
         if (covered) return programmed_.BytesIn(start) != 0 ? MapState::Program : MapState::Held;
         const auto begin = contents_.begin() + static_cast<std::ptrdiff_t>(piece.first);
         const bool blank = std::all_of(begin, begin + static_cast<std::ptrdiff_t>(piece.Size()),
@@ -75,7 +76,7 @@ class Mapper {
         return erased_.BytesIn(start) != 0 ? MapState::Cleared : MapState::Used;
     }
 
-    void Append(const AddressRange& piece, MapState state) {
+    void Append(const base::AddressRange& piece, MapState state) {
         if (!runs_.empty() && runs_.back().state == state)
             runs_.back().range.last = piece.last;
         else
@@ -84,8 +85,8 @@ class Mapper {
 
     const std::vector<std::uint8_t>& contents_;
     const image::Image& image_;
-    AddressSet erased_;
-    AddressSet programmed_;
+    base::AddressSet erased_;
+    base::AddressSet programmed_;
     std::size_t section_ = 0;
     std::vector<MapRun> runs_;
 };
@@ -141,7 +142,8 @@ std::vector<MapRun> MapFlash(const std::vector<std::uint8_t>& contents, const Fl
 
 std::vector<std::string> DrawMap(const std::vector<MapRun>& runs, const FlashGeometry& flash,
                                  std::size_t columns) {
-    const std::size_t label = HexText(static_cast<std::uint32_t>(flash.flashBytes - 1)).size();
+    const std::size_t label =
+        base::HexText(static_cast<std::uint32_t>(flash.flashBytes - 1)).size();
     const std::uint64_t perLine = CellsPerLine(columns > label + 3 ? columns - label - 3 : 8);
     std::uint64_t sectors = 1;
     while (RoundUp(flash.flashBytes, sectors * flash.sectorBytes) > perLine * kLinesMax)

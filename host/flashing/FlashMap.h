@@ -25,7 +25,7 @@ enum class MapState {
 };
 
 struct MapRun {
-    AddressRange range;
+    base::AddressRange range;
     MapState state = MapState::Blank;
 
     bool operator==(const MapRun&) const = default;

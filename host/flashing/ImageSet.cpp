@@ -8,6 +8,7 @@
 #include <filesystem>
 #include <system_error>
 
+#include "base/Hex.h"
 #include "host/base/Errors.h"
 #include "host/driver/FlashDevice.h"
 
@@ -36,7 +37,7 @@ NamedFile SplitAddress(const std::string& text) {
     std::error_code ignored;
     if (at == std::string::npos || std::filesystem::exists(text, ignored)) return {text, {}};
     const std::string behind = text.substr(at + 1);
-    if (const auto address = HexNumber(behind)) return {text.substr(0, at), address};
+    if (const auto address = base::ParseHex32(behind)) return {text.substr(0, at), address};
     throw Failure(
         ExitStatus::WrongUsage,
         fmt::format("there is no file {}, and '{}' behind its @ is no hexadecimal address "
@@ -44,7 +45,7 @@ NamedFile SplitAddress(const std::string& text) {
                     text, behind));
 }
 
-LoadedImages Within(const LoadedImages& images, const AddressRange& range) {
+LoadedImages Within(const LoadedImages& images, const base::AddressRange& range) {
     LoadedImages within;
     for (const image::Section& section : images.image.Sections()) {
         const std::uint32_t first = std::max(section.address, range.first);

@@ -20,7 +20,7 @@ struct LoadedImages {
     /// Every section as it stood in its file, for saying which file doesn't fit.
     struct Origin {
         std::string file;
-        AddressRange range;
+        base::AddressRange range;
     };
     std::vector<Origin> origins;
 
@@ -43,7 +43,7 @@ struct NamedFile {
 NamedFile SplitAddress(const std::string& text);
 
 /// What of the images lies in a range. Failure (WrongUsage) when it is nothing.
-LoadedImages Within(const LoadedImages& images, const AddressRange& range);
+LoadedImages Within(const LoadedImages& images, const base::AddressRange& range);
 
 /// Reads the files and joins them. Failure (WrongUsage) for an address that isn't that of one raw
 /// binary.

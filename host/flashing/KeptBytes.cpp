@@ -47,12 +47,12 @@ image::Image KeptBytes(const image::Image& image, const image::Image& contents) 
 }
 
 image::Image ReadSectors(FlashDevice& device, const image::Image& image) {
-    const AddressSet sectors = SectorsOf(image, GeometryOf(device));
+    const base::AddressSet sectors = SectorsOf(image, GeometryOf(device));
     device.Halt();
     device.Meter().Expect(Phase::Read, sectors.Bytes());
     device.Meter().Begin(Phase::Read);
     image::Image contents;
-    for (const AddressRange& run : sectors.Ranges())
+    for (const base::AddressRange& run : sectors.Ranges())
         contents.Add(run.first, device.ReadFlash(run), "the flash");
     device.Meter().End();
     return contents;

@@ -7,7 +7,8 @@
 #include <algorithm>
 #include <iterator>
 
-#include "host/base/PluginFacts.h"
+#include "host/facts/FlashMemory.h"
+#include "host/facts/LoaderMemory.h"
 #include "host/flashing/Unchanged.h"
 #include "host/settings/RangeSettings.h"
 
@@ -20,8 +21,8 @@ using plugin::kBlockBytes;
 /// The longest gap that is cheaper to fill than to start the loader once more for: one chunk.
 constexpr std::uint64_t kGapBytesMax = plugin::kChunkBytes;
 
-std::vector<AddressRange> ErasedRuns(const image::Image& image, const FlashGeometry& flash,
-                                     const EraseChoice& erase) {
+std::vector<base::AddressRange> ErasedRuns(const image::Image& image, const FlashGeometry& flash,
+                                           const EraseChoice& erase) {
     using Kind = EraseChoice::Kind;
     if (erase.kind == Kind::Everything)
         return {{0, static_cast<std::uint32_t>(flash.flashBytes - 1)}};
@@ -32,7 +33,7 @@ std::vector<AddressRange> ErasedRuns(const image::Image& image, const FlashGeome
 }
 
 /// One command in place of one for each of all the sectors.
-bool ErasesWhole(const std::vector<AddressRange>& erased, const FlashGeometry& flash,
+bool ErasesWhole(const std::vector<base::AddressRange>& erased, const FlashGeometry& flash,
                  const EraseChoice& erase) {
     if (erase.kind == EraseChoice::Kind::Everything) return true;
     return erase.kind == EraseChoice::Kind::Necessary && flash.erasesWhole &&
@@ -42,12 +43,13 @@ bool ErasesWhole(const std::vector<AddressRange>& erased, const FlashGeometry& f
 
 /// How many bytes of a range are erased. The runs are either one, or whole sectors of which each
 /// section lies in one run, so that the last run that starts in or before the range is the one.
-std::uint64_t ErasedBytes(const AddressRange& range, const std::vector<AddressRange>& runs) {
+std::uint64_t ErasedBytes(const base::AddressRange& range,
+                          const std::vector<base::AddressRange>& runs) {
     const auto behind = std::upper_bound(
         runs.begin(), runs.end(), range.last,
-        [](std::uint32_t last, const AddressRange& run) { return last < run.first; });
+        [](std::uint32_t last, const base::AddressRange& run) { return last < run.first; });
     if (behind == runs.begin()) return 0;
-    const AddressRange& run = *std::prev(behind);
+    const base::AddressRange& run = *std::prev(behind);
     const std::uint64_t first = std::max(run.first, range.first);
     const std::uint64_t end = std::uint64_t{std::min(run.last, range.last)} + 1;
     return end > first ? end - first : 0;
@@ -56,13 +58,13 @@ std::uint64_t ErasedBytes(const AddressRange& range, const std::vector<AddressRa
 /// Whether the bytes between two sections are few and hold 0xFF when the load begins. Writing 0xFF
 /// over them then leaves the same flash with one loader start less.
 bool CanFill(const image::Section& section, const image::Section& next,
-             const std::vector<AddressRange>& erased) {
-    const AddressRange gap{section.Last() + 1, next.address - 1};
+             const std::vector<base::AddressRange>& erased) {
+    const base::AddressRange gap{section.Last() + 1, next.address - 1};
     return gap.Size() <= kGapBytesMax && ErasedBytes(gap, erased) == gap.Size();
 }
 
 std::vector<image::Section> Join(const image::Image& image,
-                                 const std::vector<AddressRange>& erased) {
+                                 const std::vector<base::AddressRange>& erased) {
     std::vector<image::Section> joined;
     for (const image::Section& section : image.Sections()) {
         if (joined.empty() || !CanFill(joined.back(), section, erased)) {
@@ -93,7 +95,7 @@ EraseChoice ChosenErase(const SettingStore& settings) {
     return range ? EraseChoice{Kind::Range, *range} : EraseChoice{Kind::Everything, {}};
 }
 
-ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
+ProgramPlan PlanProgram(const image::Image& image, const base::AddressSet& unchanged,
                         const FlashGeometry& flash, const EraseChoice& erase) {
     const image::Image changed = Without(image, unchanged);
     ProgramPlan plan;
@@ -105,7 +107,7 @@ ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
     plan.unchangedBytes = plan.imageBytes - changed.ByteCount();
     for (const image::Section& section : plan.sections)
         plan.transferBytes += WidenedBytes(section);
-    for (const AddressRange& run : plan.erased) {
+    for (const base::AddressRange& run : plan.erased) {
         plan.erasedBytes += run.Size();
         plan.sectorCount += SectorCount(run, flash);
     }
@@ -117,7 +119,7 @@ ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
 
 std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& flash) {
     std::vector<std::string> lines;
-    for (const AddressRange& run : plan.erased)
+    for (const base::AddressRange& run : plan.erased)
         lines.push_back(fmt::format("erase    {:<23} {}{}", RangeText(run),
                                     CountText(SectorCount(run, flash), "sector"),
                                     plan.erasesWhole ? ", all at once" : ""));
@@ -126,7 +128,7 @@ std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& 
         lines.push_back(fmt::format("program  {:<23} {}",
                                     RangeText({section.address, section.Last()}),
                                     SizeText(section.bytes.size())));
-    for (const AddressRange& run : plan.unchanged.Ranges())
+    for (const base::AddressRange& run : plan.unchanged.Ranges())
         lines.push_back(fmt::format("leave    {:<23} {} with the image in place", RangeText(run),
                                     CountText(SectorCount(run, flash), "sector")));
     lines.push_back(

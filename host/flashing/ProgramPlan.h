@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "host/base/AddressSet.h"
+#include "base/AddressSet.h"
 #include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
 #include "host/settings/SettingStore.h"
@@ -20,12 +20,12 @@ struct EraseChoice {
     enum class Kind { Necessary, Nothing, Everything, Range };
 
     Kind kind = Kind::Necessary;
-    AddressRange range;  ///< of kind Range
+    base::AddressRange range;  ///< of kind Range
 };
 
 struct ProgramPlan {
-    std::vector<image::Section> sections;  ///< as handed to the plug-in, one loader start each
-    std::vector<AddressRange> erased;      ///< runs of whole sectors, in address order
+    std::vector<image::Section> sections;    ///< as handed to the plug-in, one loader start each
+    std::vector<base::AddressRange> erased;  ///< runs of whole sectors, in address order
     std::uint64_t erasedBytes = 0;
     std::uint64_t sectorCount = 0;
     std::uint64_t imageBytes = 0;
@@ -35,7 +35,7 @@ struct ProgramPlan {
     std::uint64_t clearedBytes = 0;
 
     bool erasesWhole = false;          ///< by one command for all of the flash
-    AddressSet unchanged = {};         ///< sectors of the image that are left alone
+    base::AddressSet unchanged = {};   ///< sectors of the image that are left alone
     std::uint64_t unchangedBytes = 0;  ///< of the image, in these sectors
 
     bool operator==(const ProgramPlan&) const = default;
@@ -47,7 +47,7 @@ EraseChoice ChosenErase(const SettingStore& settings);
 /// Image and chosen range must lie in flash. The sectors in `unchanged` hold what they should.
 /// Sections whose gap is short and erased anyway are joined. Where the necessary sectors are all of
 /// the flash, it is erased whole.
-ProgramPlan PlanProgram(const image::Image& image, const AddressSet& unchanged,
+ProgramPlan PlanProgram(const image::Image& image, const base::AddressSet& unchanged,
                         const FlashGeometry& flash, const EraseChoice& erase);
 
 /// The lines that --dry-run shows.

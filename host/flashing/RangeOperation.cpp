@@ -4,8 +4,8 @@
 
 #include <fmt/format.h>
 
-#include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/Operations.h"
 #include "host/flashing/Comparison.h"
 #include "host/flashing/DevicePlan.h"
 #include "host/output/Summary.h"
@@ -29,10 +29,11 @@ const RangeOperation kRangeOperations[] = {
 };
 
 /// What the operation will cover; nothing when the plug-in will refuse it or do nothing.
-std::optional<AddressRange> CoveredRange(FlashDevice& device, const RangeOperation& operation) {
+std::optional<base::AddressRange> CoveredRange(FlashDevice& device,
+                                               const RangeOperation& operation) {
     const DeviceInfo& info = device.Info();
     if (!info.hasFlash) return std::nullopt;
-    const AddressRange range =
+    const base::AddressRange range =
         SelectedRange(device.Settings(), operation.keys).value_or(info.Flash());
     if (range.first > range.last || range.last >= info.flashBytes) return std::nullopt;
     return operation.unitBytes == 0 ? SectorsCovering(range, GeometryOf(device))
@@ -40,8 +41,8 @@ std::optional<AddressRange> CoveredRange(FlashDevice& device, const RangeOperati
 }
 
 /// Returns what is to be read back afterwards.
-std::optional<AddressRange> Announce(FlashDevice& device, const RangeOperation& operation,
-                                     bool verifyErase) {
+std::optional<base::AddressRange> Announce(FlashDevice& device, const RangeOperation& operation,
+                                           bool verifyErase) {
     const auto covered = CoveredRange(device, operation);
     if (!covered) return std::nullopt;
     device.Meter().Expect(operation.phase, covered->Size());
@@ -56,15 +57,15 @@ std::optional<AddressRange> Announce(FlashDevice& device, const RangeOperation& 
 
 }  // namespace
 
-AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
-                         const std::optional<std::string>& text) {
-    const AddressRange range = device.RangeInFlash(text);
+base::AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
+                               const std::optional<std::string>& text) {
+    const base::AddressRange range = device.RangeInFlash(text);
     SelectRange(device.Settings(), keys, text ? std::optional(range) : std::nullopt);
     return range;
 }
 
 Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level, bool verifyErase) {
-    std::optional<AddressRange> erased;
+    std::optional<base::AddressRange> erased;
     for (const RangeOperation& operation : kRangeOperations)
         if (name == operation.name) erased = Announce(device, operation, verifyErase);
     device.Perform(name, level);

@@ -16,8 +16,8 @@ class FlashDevice;
 
 /// Makes the settings select what a command's --range said; without one, the whole flash. Returns
 /// the range. Failure (WrongUsage) when it doesn't lie in flash.
-AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
-                         const std::optional<std::string>& text);
+base::AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
+                               const std::optional<std::string>& text);
 
 /// Announces the work as the settings are, an erase as the sectors it covers; runs the operation,
 /// any of the plug-in's, its messages shown at `level`; reads back what an erase has covered unless

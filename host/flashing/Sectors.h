@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-#include "host/base/AddressSet.h"
+#include "base/AddressSet.h"
 #include "host/image/Image.h"
 
 namespace host {
@@ -17,15 +17,15 @@ struct FlashGeometry {
 };
 
 /// A range widened to whole units of so many bytes.
-AddressRange Widened(const AddressRange& range, std::uint32_t unitBytes);
+base::AddressRange Widened(const base::AddressRange& range, std::uint32_t unitBytes);
 
 /// The sectors that hold a byte of the range, which lies in the flash.
-AddressRange SectorsCovering(const AddressRange& range, const FlashGeometry& flash);
+base::AddressRange SectorsCovering(const base::AddressRange& range, const FlashGeometry& flash);
 
 /// The same for a whole image.
-AddressSet SectorsOf(const image::Image& image, const FlashGeometry& flash);
+base::AddressSet SectorsOf(const image::Image& image, const FlashGeometry& flash);
 
 /// How many sectors a run of them has.
-std::uint64_t SectorCount(const AddressRange& run, const FlashGeometry& flash);
+std::uint64_t SectorCount(const base::AddressRange& run, const FlashGeometry& flash);
 
 }  // namespace host

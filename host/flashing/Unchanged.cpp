@@ -5,8 +5,8 @@
 #include <algorithm>
 #include <span>
 
-#include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
+#include "host/facts/LoaderMemory.h"
 #include "host/flashing/DevicePlan.h"
 
 namespace host {
@@ -25,13 +25,14 @@ constexpr std::uint64_t kLoaderStartMs = 110;
 constexpr std::uint64_t kSectorMs = 20;
 constexpr std::uint64_t kChunkMs = 10;
 
-AddressRange BlockOf(std::uint32_t address) {
+base::AddressRange BlockOf(std::uint32_t address) {
     return {address - address % plugin::kBlockBytes, address | (plugin::kBlockBytes - 1)};
 }
 
 /// The sector with that number, counted over the ranges of whole sectors.
-AddressRange Sector(const AddressSet& sectors, std::uint64_t number, const FlashGeometry& flash) {
-    for (const AddressRange& run : sectors.Ranges()) {
+base::AddressRange Sector(const base::AddressSet& sectors, std::uint64_t number,
+                          const FlashGeometry& flash) {
+    for (const base::AddressRange& run : sectors.Ranges()) {
         const std::uint64_t count = SectorCount(run, flash);
         if (number >= count) {
             number -= count;
@@ -44,7 +45,7 @@ AddressRange Sector(const AddressSet& sectors, std::uint64_t number, const Flash
 }
 
 /// Adds the sectors of a piece of flash that hold what they should.
-void AddEqualSectors(AddressSet& unchanged, std::uint32_t address,
+void AddEqualSectors(base::AddressSet& unchanged, std::uint32_t address,
                      std::span<const std::uint8_t> actual, std::span<const std::uint8_t> expected,
                      std::uint32_t sectorBytes) {
     while (!actual.empty()) {
@@ -58,7 +59,7 @@ void AddEqualSectors(AddressSet& unchanged, std::uint32_t address,
 }
 
 bool HoldsASample(FlashDevice& device, const image::Image& image) {
-    const auto holds = [&](const AddressRange& block) {
+    const auto holds = [&](const base::AddressRange& block) {
         return device.ReadFlash(block) == ContentsAfterLoad(image, block);
     };
     return std::ranges::any_of(SampleBlocks(image, GeometryOf(device)), holds);
@@ -66,7 +67,8 @@ bool HoldsASample(FlashDevice& device, const image::Image& image) {
 
 }  // namespace
 
-std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const AddressRange& range) {
+std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image,
+                                            const base::AddressRange& range) {
     std::vector<std::uint8_t> contents(range.Size(), 0xFF);
     const auto& sections = image.Sections();
     auto section = std::ranges::partition_point(
@@ -80,16 +82,17 @@ std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const Add
     return contents;
 }
 
-std::vector<AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash) {
-    const AddressSet sectors = SectorsOf(image, flash);
+std::vector<base::AddressRange> SampleBlocks(const image::Image& image,
+                                             const FlashGeometry& flash) {
+    const base::AddressSet sectors = SectorsOf(image, flash);
     std::uint64_t count = 0;
-    for (const AddressRange& run : sectors.Ranges())
+    for (const base::AddressRange& run : sectors.Ranges())
         count += SectorCount(run, flash);
     const std::uint64_t samples = std::min(count, std::clamp(count / 4, kSamplesMin, kSamplesMax));
-    std::vector<AddressRange> blocks;
+    std::vector<base::AddressRange> blocks;
     for (std::uint64_t i = 0; i < samples; ++i) {
         const std::uint64_t number = samples == 1 ? 0 : i * (count - 1) / (samples - 1);
-        const AddressRange sector = Sector(sectors, number, flash);
+        const base::AddressRange sector = Sector(sectors, number, flash);
         const auto contents = ContentsAfterLoad(image, sector);
         const auto found = std::ranges::find_if(contents, [](auto byte) { return byte != 0xFF; });
         if (found != contents.end())
@@ -100,10 +103,10 @@ std::vector<AddressRange> SampleBlocks(const image::Image& image, const FlashGeo
     return blocks;
 }
 
-AddressSet WorthLeaving(const AddressSet& unchanged, const AddressSet& sectors,
-                        std::uint32_t sectorBytes) {
-    AddressSet worth;
-    for (const AddressRange& run : unchanged.Ranges()) {
+base::AddressSet WorthLeaving(const base::AddressSet& unchanged, const base::AddressSet& sectors,
+                              std::uint32_t sectorBytes) {
+    base::AddressSet worth;
+    for (const base::AddressRange& run : unchanged.Ranges()) {
         const std::uint64_t neighbours =
             (run.first == 0 ? 0 : sectors.BytesIn({run.first - 1, run.first - 1})) +
             sectors.BytesIn({run.last + 1, run.last + 1});
@@ -114,7 +117,7 @@ AddressSet WorthLeaving(const AddressSet& unchanged, const AddressSet& sectors,
     return worth;
 }
 
-image::Image Without(const image::Image& image, const AddressSet& addresses) {
+image::Image Without(const image::Image& image, const base::AddressSet& addresses) {
     image::Image rest;
     const auto add = [&](const image::Section& section, std::uint64_t first, std::uint64_t end) {
         if (first >= end) return;
@@ -127,7 +130,7 @@ image::Image Without(const image::Image& image, const AddressSet& addresses) {
     for (const image::Section& section : image.Sections()) {
         std::uint64_t next = section.address;
         auto range = std::ranges::partition_point(
-            ranges, [&](const AddressRange& other) { return other.last < section.address; });
+            ranges, [&](const base::AddressRange& other) { return other.last < section.address; });
         for (; range != ranges.end() && range->first < section.End(); ++range) {
             add(section, next, range->first);
             next = std::uint64_t{range->last} + 1;
@@ -137,22 +140,23 @@ image::Image Without(const image::Image& image, const AddressSet& addresses) {
     return rest;
 }
 
-AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
+base::AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
     const FlashGeometry flash = GeometryOf(device);
     const std::uint32_t sectorBytes = flash.sectorBytes;
-    const AddressSet sectors = SectorsOf(image, flash);
+    const base::AddressSet sectors = SectorsOf(image, flash);
     device.Halt();
     if (!HoldsASample(device, image)) return {};
-    AddressSet unchanged;
+    base::AddressSet unchanged;
     WorkMeter& meter = device.Meter();
     meter.Expect(Phase::Look, sectors.Bytes());
     meter.Begin(Phase::Look);
     const std::uint64_t step = std::max<std::uint64_t>(kReadBytes / sectorBytes, 1) * sectorBytes;
-    for (const AddressRange& run : sectors.Ranges()) {
+    for (const base::AddressRange& run : sectors.Ranges()) {
         const std::uint64_t end = std::uint64_t{run.last} + 1;
         for (std::uint64_t first = run.first; first < end; first += step) {
-            const AddressRange piece{static_cast<std::uint32_t>(first),
-                                     static_cast<std::uint32_t>(std::min(first + step, end) - 1)};
+            const base::AddressRange piece{
+                static_cast<std::uint32_t>(first),
+                static_cast<std::uint32_t>(std::min(first + step, end) - 1)};
             AddEqualSectors(unchanged, piece.first, device.ReadFlash(piece),
                             ContentsAfterLoad(image, piece), sectorBytes);
         }

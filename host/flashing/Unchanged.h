@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "host/base/AddressSet.h"
+#include "base/AddressSet.h"
 #include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
 
@@ -15,21 +15,22 @@ class FlashDevice;
 
 /// What a load of the necessary sectors leaves in a range of them: the image's bytes, and 0xFF
 /// elsewhere.
-std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image, const AddressRange& range);
+std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image,
+                                            const base::AddressRange& range);
 
 /// A few blocks spread over the image that erased flash doesn't hold, as far as there are any.
-std::vector<AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash);
+std::vector<base::AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash);
 
 /// Of the sectors that hold what they should, those that are worth leaving alone. Others lie
 /// between two that must be programmed, and take less time than one more start of the loader.
-AddressSet WorthLeaving(const AddressSet& unchanged, const AddressSet& sectors,
-                        std::uint32_t sectorBytes);
+base::AddressSet WorthLeaving(const base::AddressSet& unchanged, const base::AddressSet& sectors,
+                              std::uint32_t sectorBytes);
 
 /// The image without the bytes that lie in a set.
-image::Image Without(const image::Image& image, const AddressSet& addresses);
+image::Image Without(const image::Image& image, const base::AddressSet& addresses);
 
 /// Reads the image's sectors, and returns those worth leaving alone. Unless one of the samples
 /// holds the image's bytes, nothing else is read. The target is halted first.
-AddressSet FindUnchanged(FlashDevice& device, const image::Image& image);
+base::AddressSet FindUnchanged(FlashDevice& device, const image::Image& image);
 
 }  // namespace host

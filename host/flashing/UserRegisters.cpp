@@ -4,9 +4,9 @@
 
 #include <fmt/format.h>
 
-#include "host/base/PluginFacts.h"
 #include "host/driver/FlashDevice.h"
-#include "host/settings/SettingKeys.h"
+#include "host/facts/Operations.h"
+#include "host/facts/SettingKeys.h"
 
 namespace host {
 

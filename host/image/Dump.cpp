@@ -4,7 +4,7 @@
 
 #include <algorithm>
 
-#include "host/base/HexDigits.h"
+#include "base/Hex.h"
 #include "host/image/Image.h"
 
 namespace host::image {

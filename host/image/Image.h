@@ -6,12 +6,15 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
-#include "host/base/FileKind.h"
+#include "host/files/FileKind.h"
 
 namespace host::image {
+
+using Bytes = std::span<const std::uint8_t>;
 
 /// The largest flash of a device has this many bytes: 16 bits count it in units of 2 KiB.
 inline constexpr std::uint64_t kFlashBytesMax = std::uint64_t{128} << 20;

@@ -4,9 +4,9 @@
 
 #include <string_view>
 
+#include "base/Hex.h"
 #include "host/base/Errors.h"
-#include "host/base/HexDigits.h"
-#include "host/base/InputFile.h"
+#include "host/files/InputFile.h"
 #include "host/image/Formats.h"
 
 namespace host::image {
@@ -18,7 +18,7 @@ std::optional<Format> DetectFormat(std::string_view contents) {
     if (contents.starts_with("\177ELF")) return Format::Elf;
     contents.remove_prefix(std::min(contents.find_first_not_of(" \t\r\n"), contents.size()));
     if (contents.size() < 2) return std::nullopt;
-    if (contents[0] == ':' && HexDigitValue(contents[1]) >= 0) return Format::IntelHex;
+    if (contents[0] == ':' && base::HexDigitValue(contents[1]) >= 0) return Format::IntelHex;
     if (contents[0] == 'S' && contents[1] >= '0' && contents[1] <= '9') return Format::SRecord;
     return std::nullopt;
 }

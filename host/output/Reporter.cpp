@@ -9,7 +9,7 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "host/base/Streams.h"
+#include "host/files/Streams.h"
 
 namespace host {
 

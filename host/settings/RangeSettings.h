@@ -5,7 +5,7 @@
 #include <optional>
 
 #include "host/base/Text.h"
-#include "host/settings/SettingKeys.h"
+#include "host/facts/SettingKeys.h"
 #include "host/settings/SettingStore.h"
 
 namespace host {
@@ -24,10 +24,11 @@ inline constexpr RangeKeys kChecksumKeys{keys::kChecksumSelection, keys::kChecks
 
 /// Makes the settings of this run select a range, or the whole flash where there is none.
 void SelectRange(SettingStore& settings, const RangeKeys& keys,
-                 const std::optional<AddressRange>& range);
+                 const std::optional<base::AddressRange>& range);
 
 /// The range that the settings select, nothing for the whole flash. Addresses are as the plug-in
 /// reads them: they may lie in reverse order or beyond the flash.
-std::optional<AddressRange> SelectedRange(const SettingStore& settings, const RangeKeys& keys);
+std::optional<base::AddressRange> SelectedRange(const SettingStore& settings,
+                                                const RangeKeys& keys);
 
 }  // namespace host

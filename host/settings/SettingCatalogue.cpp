@@ -12,10 +12,11 @@
 #include <stdexcept>
 #include <system_error>
 
+#include "base/Hex.h"
 #include "host/base/MacAddress.h"
 #include "host/base/Suggestion.h"
 #include "host/base/Text.h"
-#include "host/settings/SettingKeys.h"
+#include "host/facts/SettingKeys.h"
 
 namespace host {
 
@@ -88,7 +89,7 @@ bool Accepts(const SettingInfo& info, const std::string& text) {
         case Form::Seconds:
             return IsDecimal(text, 1);
         case Form::Hex:
-            return HexNumber(text).has_value();
+            return base::ParseHex32(text).has_value();
         case Form::Mac:
             return ParseMacAddress(text).has_value();
         case Form::Choice:

@@ -12,8 +12,8 @@
 #include <stdexcept>
 
 #include "host/base/Errors.h"
-#include "host/base/InputFile.h"
-#include "host/base/OutputFile.h"
+#include "host/files/InputFile.h"
+#include "host/files/OutputFile.h"
 #include "host/settings/SettingCatalogue.h"
 
 namespace host {

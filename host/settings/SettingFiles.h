@@ -6,7 +6,7 @@
 #include <map>
 #include <string>
 
-#include "host/base/FileKind.h"
+#include "host/files/FileKind.h"
 
 namespace host {
 

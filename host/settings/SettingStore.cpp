@@ -10,7 +10,7 @@
 
 #include "host/base/Errors.h"
 #include "host/base/MacAddress.h"
-#include "host/settings/SettingKeys.h"
+#include "host/facts/SettingKeys.h"
 
 namespace host {
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "host/base/FileLock.h"
+#include "host/files/FileLock.h"
 #include "host/settings/SettingCatalogue.h"
 #include "host/settings/SettingFiles.h"
 

@@ -6,7 +6,7 @@
 
 #include "host/base/Errors.h"
 #include "host/base/Interrupt.h"
-#include "host/base/PluginFacts.h"
+#include "host/facts/LoaderMemory.h"
 
 namespace host {
 

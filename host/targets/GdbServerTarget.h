@@ -5,7 +5,7 @@
 #include <memory>
 
 #include "host/targets/OpenTarget.h"
-#include "target/gdb/GdbTarget.h"
+#include "target/gdb/client/GdbTarget.h"
 
 namespace host {
 

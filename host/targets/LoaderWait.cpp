@@ -8,7 +8,8 @@
 #include <cstring>
 #include <utility>
 
-#include "host/base/PluginFacts.h"
+#include "host/facts/FlashMemory.h"
+#include "host/facts/LoaderMemory.h"
 
 namespace host {
 
@@ -40,7 +41,7 @@ void LoaderWait::AwaitIdle() {
             return status == plugin::kStatusPending;
         };
         if (Await(*block, chunks_[*block]->start + limit_, isPending)) continue;
-        const AddressRange flash = chunks_[*block]->flash;
+        const base::AddressRange flash = chunks_[*block]->flash;
         Forget();
         if (stop_()) return;
         throw target::TargetError(fmt::format(
@@ -83,7 +84,8 @@ LoaderWait::Chunk* LoaderWait::NoteHandOver(const void* buffer, std::size_t byte
     std::memcpy(&words, buffer, sizeof words);
     for (std::size_t block = 0; block < chunks_.size(); ++block) {
         if (address != plugin::kParameterBlocks[block] + plugin::kChunkAddressOffset) continue;
-        const AddressRange flash{words.flashAddress, words.flashAddress + words.sizeBytes - 1};
+        const base::AddressRange flash{words.flashAddress,
+                                       words.flashAddress + words.sizeBytes - 1};
         observer_.HandingOver(flash);
         return &chunks_[block].emplace(Chunk{flash, Now()});
     }

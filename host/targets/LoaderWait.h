@@ -20,13 +20,13 @@ namespace host {
 class LoaderObserver {
   public:
     /// Before the write that hands a chunk over: one whose answer is lost may have arrived.
-    virtual void HandingOver(const AddressRange& chunk) = 0;
+    virtual void HandingOver(const base::AddressRange& chunk) = 0;
 
     /// That write was answered.
-    virtual void HandedOver(const AddressRange& chunk) = 0;
+    virtual void HandedOver(const base::AddressRange& chunk) = 0;
 
     /// The loader was seen to have finished the chunk.
-    virtual void Programmed(const AddressRange& chunk) = 0;
+    virtual void Programmed(const base::AddressRange& chunk) = 0;
 
   protected:
     ~LoaderObserver() = default;
@@ -71,7 +71,7 @@ class LoaderWait final : public target::Target {
 
   private:
     struct Chunk {
-        AddressRange flash;
+        base::AddressRange flash;
         Time start;            ///< when the loader could begin it
         bool arrived = false;  ///< the write that hands it over was answered
         unsigned pauses = 0;   ///< made to wait for it

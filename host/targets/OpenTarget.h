@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-#include "host/base/FileLock.h"
+#include "host/files/FileLock.h"
 #include "target/Target.h"
 
 namespace host {

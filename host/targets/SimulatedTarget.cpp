@@ -9,11 +9,11 @@
 #include <system_error>
 
 #include "host/base/Errors.h"
-#include "host/base/InputFile.h"
-#include "host/base/OutputFile.h"
 #include "host/base/Suggestion.h"
+#include "host/files/InputFile.h"
+#include "host/files/OutputFile.h"
 #include "target/simulated/Contents.h"
-#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace host {
 

@@ -6,7 +6,7 @@
 #include <optional>
 #include <string>
 
-#include "host/base/FileLock.h"
+#include "host/files/FileLock.h"
 #include "host/targets/OpenTarget.h"
 #include "target/simulated/SimulatedDevice.h"
 

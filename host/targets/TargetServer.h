@@ -7,7 +7,7 @@
 #include <string>
 
 #include "host/targets/SimulatedTarget.h"
-#include "target/gdb/Server.h"
+#include "target/gdb/server/Server.h"
 #include "target/simulated/ServedSimulation.h"
 
 namespace host {

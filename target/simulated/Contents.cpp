@@ -12,6 +12,7 @@
 #include <span>
 #include <utility>
 
+#include "base/ByteOrder.h"
 #include "target/simulated/Ram.h"
 
 namespace target {
@@ -34,7 +35,7 @@ std::uint32_t Checksum(Bytes bytes) {
 
 void AppendWord(std::string& text, std::uint32_t value) {
     std::array<std::uint8_t, 4> bytes{};
-    StoreWord(bytes.data(), value);
+    base::StoreWord(bytes.data(), value);
     text.append(bytes.begin(), bytes.end());
 }
 
@@ -78,7 +79,7 @@ class Decoder {
         if (size > rest_.size()) throw ContentsError("it ends too early");
         return std::exchange(rest_, rest_.subspan(size)).first(size);
     }
-    std::uint32_t TakeWord() { return LoadWord(Take(4).data()); }
+    std::uint32_t TakeWord() { return base::LoadWord(Take(4).data()); }
 
     void FillEraseCounts(FlashArray& flash);
 
@@ -99,7 +100,7 @@ void Decoder::CheckFrame() {
     }
     if (rest_.size() < 4) throw ContentsError("it ends too early");
     const std::size_t checkedSize = whole.size() - 4;
-    if (Checksum(whole.first(checkedSize)) != LoadWord(whole.data() + checkedSize)) {
+    if (Checksum(whole.first(checkedSize)) != base::LoadWord(whole.data() + checkedSize)) {
         throw ContentsError("its checksum is wrong, so it is damaged or cut short");
     }
     rest_ = rest_.first(rest_.size() - 4);

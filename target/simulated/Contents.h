@@ -9,8 +9,8 @@
 #include <string>
 
 #include "target/simulated/Clock.h"
-#include "target/simulated/DeviceOptions.h"
 #include "target/simulated/SimulatedDevice.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

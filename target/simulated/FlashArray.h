@@ -11,7 +11,7 @@
 #include <span>
 #include <vector>
 
-#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

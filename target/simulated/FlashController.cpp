@@ -6,7 +6,7 @@
 
 #include <algorithm>
 
-#include "target/simulated/DeviceClass.h"
+#include "target/simulated/options/DeviceClass.h"
 
 namespace target {
 

@@ -8,10 +8,10 @@
 #include <optional>
 #include <string>
 
-#include "target/simulated/DeviceOptions.h"
 #include "target/simulated/FlashArray.h"
 #include "target/simulated/RegisterFile.h"
 #include "target/simulated/Rules.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

@@ -7,11 +7,11 @@
 #include <cstdint>
 #include <optional>
 
-#include "target/simulated/DeviceOptions.h"
 #include "target/simulated/FlashArray.h"
 #include "target/simulated/FlashController.h"
 #include "target/simulated/Ram.h"
 #include "target/simulated/Rules.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

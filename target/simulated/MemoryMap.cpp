@@ -6,6 +6,7 @@
 
 #include <algorithm>
 
+#include "base/ByteOrder.h"
 #include "target/simulated/Rules.h"
 
 namespace target {
@@ -87,7 +88,7 @@ void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes) const {
         }
         case Region::Registers:
             for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
-                StoreWord(bytes + offset, ReadRegister(address + offset));
+                base::StoreWord(bytes + offset, ReadRegister(address + offset));
             }
             return;
     }
@@ -109,7 +110,7 @@ void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, bool 
             return;
         case Region::Registers:
             for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
-                WriteRegister(address + offset, LoadWord(bytes + offset), coreRunning, now);
+                WriteRegister(address + offset, base::LoadWord(bytes + offset), coreRunning, now);
             }
             return;
     }

@@ -6,12 +6,12 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "target/simulated/DeviceOptions.h"
 #include "target/simulated/FlashArray.h"
 #include "target/simulated/FlashController.h"
 #include "target/simulated/Loader.h"
 #include "target/simulated/Ram.h"
 #include "target/simulated/RegisterFile.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

@@ -9,17 +9,9 @@
 #include <span>
 #include <vector>
 
+#include "base/ByteOrder.h"
+
 namespace target {
-
-inline std::uint32_t LoadWord(const std::uint8_t* bytes) {
-    return bytes[0] | std::uint32_t{bytes[1]} << 8 | std::uint32_t{bytes[2]} << 16 |
-           std::uint32_t{bytes[3]} << 24;
-}
-
-inline void StoreWord(std::uint8_t* bytes, std::uint32_t value) {
-    for (int i = 0; i < 4; ++i)
-        bytes[i] = static_cast<std::uint8_t>(value >> (8 * i));
-}
 
 class Ram {
   public:
@@ -38,9 +30,9 @@ class Ram {
         return std::span(bytes_).subspan(address - kStart, sizeBytes);
     }
 
-    std::uint32_t Word(std::uint32_t address) { return LoadWord(Bytes(address, 4).data()); }
+    std::uint32_t Word(std::uint32_t address) { return base::LoadWord(Bytes(address, 4).data()); }
     void SetWord(std::uint32_t address, std::uint32_t value) {
-        StoreWord(Bytes(address, 4).data(), value);
+        base::StoreWord(Bytes(address, 4).data(), value);
     }
 
     void LosePower() { bytes_.assign(bytes_.size(), 0xFF); }

@@ -6,8 +6,8 @@
 
 #include <bit>
 
-#include "target/simulated/DeviceClass.h"
 #include "target/simulated/Rules.h"
+#include "target/simulated/options/DeviceClass.h"
 
 namespace target {
 

@@ -8,7 +8,7 @@
 #include <string>
 #include <unordered_map>
 
-#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

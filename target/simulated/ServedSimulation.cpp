@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "base/ByteOrder.h"
 #include "target/simulated/Loader.h"
 #include "target/simulated/Ram.h"
 
@@ -132,8 +133,8 @@ void ServedSimulation::ResetRegisters() {
     std::uint8_t vectors[8];
     device_.Flash().Read(0, vectors);
     registers_ = {};
-    registers_.values[gdb::CoreRegisters::kSp] = LoadWord(vectors);
-    registers_.values[gdb::CoreRegisters::kPc] = LoadWord(vectors + 4) & ~std::uint32_t{1};
+    registers_.values[gdb::CoreRegisters::kSp] = base::LoadWord(vectors);
+    registers_.values[gdb::CoreRegisters::kPc] = base::LoadWord(vectors + 4) & ~std::uint32_t{1};
     registers_.values[gdb::CoreRegisters::kStatus] = 0x01000000;
     inLoader_ = false;
 }

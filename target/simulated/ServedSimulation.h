@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "target/gdb/ServedDevice.h"
+#include "target/gdb/server/ServedDevice.h"
 #include "target/simulated/SimulatedDevice.h"
 
 namespace target {

@@ -16,7 +16,6 @@
 
 #include "target/Target.h"
 #include "target/simulated/Clock.h"
-#include "target/simulated/DeviceOptions.h"
 #include "target/simulated/FlashArray.h"
 #include "target/simulated/FlashController.h"
 #include "target/simulated/Loader.h"
@@ -25,6 +24,7 @@
 #include "target/simulated/RegisterFile.h"
 #include "target/simulated/Rules.h"
 #include "target/simulated/SimulatedTime.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

@@ -7,7 +7,7 @@
 #include <cstdint>
 
 #include "target/simulated/Clock.h"
-#include "target/simulated/DeviceOptions.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

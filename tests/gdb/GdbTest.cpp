@@ -15,10 +15,10 @@
 #include <thread>
 #include <vector>
 
-#include "target/gdb/Frame.h"
-#include "target/gdb/GdbTarget.h"
-#include "target/gdb/Hex.h"
-#include "target/gdb/Session.h"
+#include "base/Hex.h"
+#include "target/gdb/client/GdbTarget.h"
+#include "target/gdb/server/Session.h"
+#include "target/gdb/wire/Frame.h"
 #include "target/simulated/ServedSimulation.h"
 
 namespace {
@@ -346,9 +346,9 @@ TEST(GdbClient, KeepsToThePacketSizeAndCutsAtWords) {
                     return "+" +
                            Framed(packetSize == 0
                                       ? ""
-                                      : "PacketSize=" +
-                                            ToHex(std::string{static_cast<char>(packetSize >> 8),
-                                                              static_cast<char>(packetSize)}));
+                                      : "PacketSize=" + base::ToHex(std::string{
+                                                            static_cast<char>(packetSize >> 8),
+                                                            static_cast<char>(packetSize)}));
                 if (payload.starts_with("X") && !binary) return "+" + Framed("");
                 return std::nullopt;
             });

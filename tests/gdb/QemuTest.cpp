@@ -16,7 +16,7 @@
 #include <vector>
 
 #include "plugin/IFlashDevice2.h"
-#include "target/gdb/GdbTarget.h"
+#include "target/gdb/client/GdbTarget.h"
 #include "target/simulated/SimulatedDevice.h"
 #include "tests/support/StrictHost.h"
 

@@ -5,6 +5,7 @@ cd "$(dirname "$0")/../.."
 
 # FOLDER: the folders whose headers its files may include, besides its own.
 allowed="
+base:
 plugin: logger device
 device: plugin
 hostcheck: device plugin
@@ -13,19 +14,24 @@ verify: device plugin
 operations: device plugin
 logger:
 target:
-target/gdb: target
-target/simulated: target target/gdb
-host/base:
-host/image: host/image/records host/base
-host/image/records: host/image host/base
-host/settings: host/base
-host/output: host/base
-host/targets: host/base target target/gdb target/simulated
-host/driver: host/output host/settings host/targets host/image host/base plugin target
-host/flashing: host/driver host/image host/output host/settings host/base
-host/cli: host/settings host/targets host/base target/gdb target/simulated
-host/commands: host/cli host/flashing host/driver host/targets host/image host/output host/settings host/base
-host: host/commands host/cli host/output host/settings host/base"
+target/gdb/wire: base
+target/gdb/client: target/gdb/wire target base
+target/gdb/server: target/gdb/wire target base
+target/simulated/options: base
+target/simulated: target/simulated/options target/gdb/server target base
+host/base: base
+host/files: host/base base
+host/facts:
+host/image: host/image/records host/files host/base base
+host/image/records: host/image host/files host/base base
+host/settings: host/facts host/files host/base base
+host/output: host/files host/base base
+host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/simulated target/simulated/options base
+host/driver: host/output host/settings host/targets host/image host/facts host/files host/base plugin target base
+host/flashing: host/driver host/image host/output host/settings host/facts host/files host/base base
+host/cli: host/settings host/targets host/facts host/files host/base target/gdb/client target/simulated/options
+host/commands: host/cli host/flashing host/driver host/targets host/image host/output host/settings host/facts host/files host/base base
+host: host/commands host/cli host/output host/settings host/facts host/files host/base"
 
 failed=0
 includes=$(mktemp)

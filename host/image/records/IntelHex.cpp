@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <array>
 
+#include "base/ByteOrder.h"
+#include "base/Hex.h"
 #include "host/image/Formats.h"
 #include "host/image/records/RecordReader.h"
 #include "host/image/records/RecordRuns.h"
@@ -74,7 +76,8 @@ class IntelHexReader {
         records_.RequireSize(bytes.size(),
                              kHeaderBytes + (bytes.empty() ? 0U : bytes[0]) + kChecksumBytes);
         records_.RequireChecksum(bytes.back(), Checksum(bytes.first(bytes.size() - 1)));
-        const Record record{bytes[3], static_cast<std::uint16_t>(BigEndian(bytes.subspan(1, 2))),
+        const Record record{bytes[3],
+                            static_cast<std::uint16_t>(base::BigEndian(bytes.subspan(1, 2))),
                             bytes.subspan(kHeaderBytes, bytes[0])};
         RequireKnown(record);
         return record;
@@ -105,11 +108,11 @@ class IntelHexReader {
                 break;
             case kSegmentBase:
                 segmented_ = true;
-                base_ = BigEndian(record.data) << 4;
+                base_ = base::BigEndian(record.data) << 4;
                 break;
             case kLinearBase:
                 segmented_ = false;
-                base_ = BigEndian(record.data) << 16;
+                base_ = base::BigEndian(record.data) << 16;
                 break;
             default:  // where a processor would start doesn't matter to its flash
                 break;
@@ -144,7 +147,7 @@ void AppendRecord(std::string& text, const Record& record) {
     std::ranges::copy(record.data, bytes.begin() + kHeaderBytes);
     bytes[size] = Checksum(Bytes(bytes).first(size));
     text += ':';
-    AppendHex(text, Bytes(bytes).first(size + kChecksumBytes));
+    base::AppendHex(text, Bytes(bytes).first(size + kChecksumBytes));
     text += '\n';
 }
 

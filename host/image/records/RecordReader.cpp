@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <numeric>
 
+#include "base/Hex.h"
 #include "host/base/Errors.h"
 
 namespace host::image {
@@ -26,13 +27,6 @@ std::string Shown(char c) {
 }
 
 }  // namespace
-
-std::uint32_t BigEndian(Bytes bytes) {
-    std::uint32_t value = 0;
-    for (const std::uint8_t byte : bytes)
-        value = value << 8 | byte;
-    return value;
-}
 
 std::uint8_t ByteSum(Bytes bytes) {
     return static_cast<std::uint8_t>(std::accumulate(bytes.begin(), bytes.end(), 0U));
@@ -56,8 +50,8 @@ Bytes RecordReader::DecodeFrom(std::size_t column) {
         FailDamaged(fmt::format("{} characters found, more than any record has", line_.size()));
     }
     for (std::size_t i = 0; i < count; ++i) {
-        const int high = HexDigitValue(digits[2 * i]);
-        const int low = HexDigitValue(digits[2 * i + 1]);
+        const int high = base::HexDigitValue(digits[2 * i]);
+        const int low = base::HexDigitValue(digits[2 * i + 1]);
         if ((high | low) < 0) FailAtDigit(column + 2 * i + (high < 0 ? 0 : 1));
         bytes_[i] = static_cast<std::uint8_t>(high << 4 | low);
     }

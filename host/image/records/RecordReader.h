@@ -9,12 +9,9 @@
 #include <string>
 #include <string_view>
 
-#include "host/base/HexDigits.h"
+#include "host/image/Image.h"
 
 namespace host::image {
-
-/// The value of up to four bytes, the most significant first, as both formats have it.
-std::uint32_t BigEndian(Bytes bytes);
 
 /// The sum of the bytes modulo 256, from which both formats make their checksum.
 std::uint8_t ByteSum(Bytes bytes);

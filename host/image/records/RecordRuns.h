@@ -8,7 +8,6 @@
 #include <string>
 #include <vector>
 
-#include "host/base/HexDigits.h"
 #include "host/image/Image.h"
 
 namespace host::image {

@@ -6,7 +6,6 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "host/base/HexDigits.h"
 #include "host/image/Image.h"
 
 namespace host::image {

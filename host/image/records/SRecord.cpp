@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <array>
 
+#include "base/ByteOrder.h"
+#include "base/Hex.h"
 #include "host/image/Formats.h"
 #include "host/image/records/RecordReader.h"
 #include "host/image/records/RecordRuns.h"
@@ -87,7 +89,7 @@ class SRecordReader {
         records_.RequireChecksum(bytes.back(), Checksum(summed));
         RequireBody(type, summed.size() - kLengthBytes);
         const std::size_t addressBytes = TypeOf(type).addressBytes;
-        return {type, BigEndian(summed.subspan(kLengthBytes, addressBytes)),
+        return {type, base::BigEndian(summed.subspan(kLengthBytes, addressBytes)),
                 summed.subspan(kLengthBytes + addressBytes)};
     }
 
@@ -163,7 +165,7 @@ void AppendRecord(std::string& text, const Record& record) {
     bytes[size] = Checksum(Bytes(bytes).first(size));
     text += 'S';
     text += record.type;
-    AppendHex(text, Bytes(bytes).first(size + kChecksumBytes));
+    base::AppendHex(text, Bytes(bytes).first(size + kChecksumBytes));
     text += '\n';
 }
 

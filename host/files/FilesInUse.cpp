@@ -1,0 +1,56 @@
+// Files are the same by device and inode; where there is none yet, by the name behind all links.
+
+#include "host/files/FilesInUse.h"
+
+#include <fmt/format.h>
+#include <sys/stat.h>
+
+#include <filesystem>
+
+#include "host/base/Errors.h"
+#include "host/files/FileLock.h"
+#include "host/files/OutputFile.h"
+
+namespace host {
+
+namespace {
+
+/// A terminal or /dev/null can be read and written at once: nothing gets lost.
+bool IsSameFile(const std::string& one, const std::string& other) {
+    struct stat first {};
+    struct stat second {};
+    const bool firstIsThere = stat(one.c_str(), &first) == 0;
+    const bool secondIsThere = stat(other.c_str(), &second) == 0;
+    if (firstIsThere && secondIsThere)
+        return first.st_dev == second.st_dev && first.st_ino == second.st_ino &&
+               !S_ISCHR(first.st_mode);
+    std::error_code ignored;
+    const auto name = [&](const std::string& path) {
+        return std::filesystem::weakly_canonical(std::filesystem::absolute(FollowLinks(path)),
+                                                 ignored);
+    };
+    return firstIsThere == secondIsThere && name(one) == name(other);
+}
+
+}  // namespace
+
+void FilesInUse::Add(const std::string& path, const std::string& what) {
+    if (!path.empty() && path != "-") files_.push_back({path, what});
+}
+
+void FilesInUse::AddLocked(const std::string& path, const std::string& what) {
+    Add(path, what);
+    if (!path.empty()) Add(LockPath(path), "the lock of " + what);
+}
+
+void FilesInUse::RequireOther(const std::string& path, const std::string& output) const {
+    if (path.empty() || path == "-") return;
+    for (const File& file : files_)
+        if (IsSameFile(path, file.path))
+            throw Failure(ExitStatus::WrongUsage,
+                          fmt::format("{} can't be written to {}: that is {} of this run, {}; name "
+                                      "another file",
+                                      output, path, file.what, file.path));
+}
+
+}  // namespace host

@@ -1,0 +1,93 @@
+// Listening, and moving bytes between a socket and a session.
+
+#include "target/gdb/server/Server.h"
+
+#include <chrono>
+#include <utility>
+
+#include "target/gdb/wire/Frame.h"
+
+namespace target::gdb {
+
+namespace {
+
+using std::chrono::milliseconds;
+
+// A client's silence is no fault; it is only looked up now and then whether to go on.
+constexpr milliseconds kBetweenLooks(200);
+constexpr milliseconds kToTakeAReply(10000);
+
+/// One client's bytes, from frames to replies.
+class Client {
+  public:
+    Client(Socket& socket, Session& session) : socket_(socket), session_(session) {}
+
+    void Take(const Frame& frame) {
+        const bool acknowledges = session_.AcknowledgesPackets();
+        switch (frame.kind) {
+            case Frame::Kind::Packet:
+                if (acknowledges) Send("+");
+                return SendAll(session_.Answer(frame.payload));
+            case Frame::Kind::Damaged:
+                if (acknowledges) Send("-");
+                return;
+            case Frame::Kind::Nak:
+                return Send(last_);
+            case Frame::Kind::Interrupt:
+                return SendAll(session_.Interrupt());
+            case Frame::Kind::Ack:
+            case Frame::Kind::Notification:
+                return;
+        }
+    }
+
+  private:
+    void SendAll(const std::vector<std::string>& payloads) {
+        last_.clear();
+        for (const std::string& payload : payloads)
+            last_ += Framed(payload);
+        Send(last_);
+    }
+    void Send(const std::string& bytes) { socket_.Write(bytes, After(kToTakeAReply)); }
+
+    Socket& socket_;
+    Session& session_;
+    std::string last_;
+};
+
+}  // namespace
+
+Server::Server(ServedDevice& device, const Address& address, InterruptCheck interrupted,
+               ComplaintSink complain)
+    : device_(device),
+      interrupted_(std::move(interrupted)),
+      complain_(std::move(complain)),
+      listener_(Socket::Listen(address, interrupted_)) {}
+
+void Server::Run() {
+    while (!interrupted_()) {
+        Socket client = listener_.Accept(After(kBetweenLooks));
+        if (client.IsOpen()) Serve(std::move(client));
+    }
+}
+
+void Server::Serve(Socket socket) {
+    Session session(device_, complain_);
+    Client client(socket, session);
+    FrameDecoder decoder(FrameDecoder::Sender::Client);
+    try {
+        while (!session.HasEnded() && !interrupted_()) {
+            decoder.Feed(socket.Read(After(kBetweenLooks)));
+            while (!session.HasEnded()) {
+                const auto frame = decoder.Next();
+                if (!frame) break;
+                client.Take(*frame);
+            }
+        }
+    } catch (const SocketError&) {
+        // The client is gone, in order or not.
+    }
+    device_.ClientGone();
+}
+
+}  // namespace target::gdb

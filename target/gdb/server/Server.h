@@ -1,0 +1,33 @@
+// Server: a device as a GDB server, for one client at a time.
+
+#pragma once
+
+#include <cstdint>
+
+#include "target/gdb/server/ServedDevice.h"
+#include "target/gdb/server/Session.h"
+#include "target/gdb/wire/Socket.h"
+
+namespace target::gdb {
+
+class Server {
+  public:
+    /// Listens at once; port 0 takes a free one. SocketError. `device` must outlive the server.
+    Server(ServedDevice& device, const Address& address, InterruptCheck interrupted,
+           ComplaintSink complain);
+
+    std::uint16_t Port() const { return listener_.Port(); }
+
+    /// Serves one client after the other until the interrupt check says so.
+    void Run();
+
+  private:
+    void Serve(Socket client);
+
+    ServedDevice& device_;
+    const InterruptCheck interrupted_;
+    const ComplaintSink complain_;
+    Socket listener_;
+};
+
+}  // namespace target::gdb
