@@ -3,65 +3,18 @@
 # the device inside the process; stock GDB must be able to load, compare, read and leave it.
 set -euo pipefail
 tool=$1
-for program in gdb-multiarch clang ld.lld; do
-    command -v "$program" >/dev/null || { echo "$program is missing"; exit 1; }
-done
-work=$(mktemp -d)
 server=
 trap 'kill $server 2>/dev/null || true; rm -rf "$work"' EXIT
-cd "$work"
-export XDG_CONFIG_HOME=$work XDG_STATE_HOME=$work
-elf=/usr/lib/firmware-tomu/toboot.elf
+# shellcheck source=tests/gdb/as-inside.sh
+. "$(dirname "$0")/as-inside.sh"
+require gdb-multiarch
+build_loader
 sim=quen,erase-time=1ms,chunk-time=1ms
-
-# What is started in the simulated RAM is the loader, whatever it is.
-echo '.globl _start; _start: b _start' |
-    clang --target=armv7m-none-eabi -mthumb -nostdlib -fuse-ld=lld -Wl,-N,-Ttext=0x20002000 \
-        -x assembler - -o loader.out
 
 CORVANE_SIM=$sim CORVANE_SIM_FILE=served.sim CORVANE_GDB=:1 timeout 300 "$tool" serve 0 >listening 2>refused &
 server=$!
-for _ in $(seq 100); do
-    port=$(sed -n 's/.*:\([0-9]*\);.*/\1/p' listening 2>/dev/null || true)
-    [ -z "$port" ] || break
-    sleep 0.1
-done
-
-# Times are nobody's business here.
-run() {
-    local status=0
-    "$tool" "$@" 2>&1 </dev/null | sed -E 's/ +in (under )?[0-9.:]+( ?m?s)?.*$//' || status=$?
-    echo "status $status"
-}
-head -c 70000 /dev/urandom >large.bin
-while read -r line; do
-    echo "\$ $line" | tee -a inside >>outside
-    # shellcheck disable=SC2086
-    run --sim "$sim" --sim-file inside.sim $line >>inside
-    run --gdb ":$port" --loader loader.out $line >>outside
-    cp out.bin outside.bin 2>/dev/null || true
-done <<END
-info
-program $elf --crc --blank-check
-verify $elf
-program large.bin --base 10003 --run
-verify large.bin --base 10003
-read - --range 10000-1007f --format srec
-checksum --range 0-fff
-checksum --of $elf
-mac program 02-1B-C3-04-05-06 --commit
-mac read
-register program 0 12ab --commit
-register read 0
-erase --range 0-fff
-verify $elf
-blank-check --range 0-fff
-blank-check
-reset --run
-erase
-program nowhere.elf
-END
-diff inside outside || { cat refused; exit 1; }
+port=$(await listening 's/.*:\([0-9]*\);.*/\1/p')
+as_inside "$sim" "$port" 70000 || { cat refused; exit 1; }
 [ ! -s refused ] || { cat refused; exit 1; }
 
 gdb-multiarch -nx -batch -ex 'set confirm off' -ex "target remote :$port" -ex load \
@@ -73,12 +26,6 @@ done
 ! grep -i 'mis-matched\|error' gdb
 
 # Wrong options, nobody there, a server that hangs, and Ctrl-C while it does.
-expect() {
-    local wanted=$1 words=$2 status=0
-    shift 2
-    timeout 30 "$tool" "$@" >said 2>&1 </dev/null || status=$?
-    [ "$status" = "$wanted" ] && grep -q -- "$words" said || { echo "$* -> $status"; cat said; exit 1; }
-}
 expect 2 'no HOST:PORT' --gdb nonsense info
 expect 2 'give one of them' --gdb ":$port" --sim quen info
 expect 2 'pc takes a number' --gdb ":$port" --gdb-option pc=x info
