@@ -23,7 +23,7 @@ gdb-multiarch -nx -batch -ex 'set confirm off' -ex "target remote :$port" -ex lo
 for expected in 'Transfer rate' 'matched' '0x400fe000:.*0x10050000' '^pc ' 'detached'; do
     grep -q "$expected" gdb || { echo "no '$expected'"; cat gdb refused; exit 1; }
 done
-! grep -i 'mis-matched\|error' gdb
+if grep -i 'mis-matched\|error' gdb; then exit 1; fi
 
 # Wrong options, nobody there, a server that hangs, and Ctrl-C while it does.
 expect 2 'no HOST:PORT' --gdb nonsense info

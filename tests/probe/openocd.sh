@@ -32,7 +32,7 @@ leave() {
     kill "$server"
     wait "$server" || true
     wait "$board" || { echo "the model failed"; cat refused; exit 1; }
-    server= board=
+    server='' board=''
     [ "$(tail -1 pins)" = "$1" ] || { echo "left $(tail -1 pins), not $1"; cat log; exit 1; }
 }
 
