@@ -33,12 +33,13 @@ await() {
     echo "$found"
 }
 
-# expect STATUS WORDS COMMAND...: what the tool ends with, and says.
+# expect STATUS WORDS COMMAND...: what the tool ends with (a pattern), and says.
 expect() {
     local wanted=$1 words=$2 status=0
     shift 2
     timeout 60 "$tool" "$@" >said 2>&1 </dev/null || status=$?
-    [ "$status" = "$wanted" ] && grep -q -- "$words" said || { echo "$* -> $status"; cat said; exit 1; }
+    # shellcheck disable=SC2053
+    [[ $status == $wanted ]] && grep -q -- "$words" said || { echo "$* -> $status"; cat said; exit 1; }
 }
 
 # Times are nobody's business here.
