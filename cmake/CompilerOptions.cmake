@@ -9,6 +9,12 @@ function(corvane_options target)
     -Wall -Wextra -Wpedantic -Wconversion -Wsign-conversion -Wshadow -Wold-style-cast
     -Wcast-qual -Wformat=2 -Wundef -Woverloaded-virtual -Wdouble-promotion
     $<$<CXX_COMPILER_ID:GNU>:-Wduplicated-cond -Wlogical-op -Wno-restrict>)
+  if(NOT WIN32 AND NOT CORVANE_SANITIZE)
+    # What Debian builds its packages with.
+    target_compile_options(${target} PRIVATE
+      $<$<CONFIG:Release>:-fstack-protector-strong -U_FORTIFY_SOURCE -D_FORTIFY_SOURCE=2>)
+    target_link_options(${target} PRIVATE $<$<CONFIG:Release>:LINKER:-z,relro,-z,now>)
+  endif()
   if(CORVANE_SANITIZE)
     target_compile_options(${target} PRIVATE
       -fsanitize=${CORVANE_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)

@@ -1,16 +1,24 @@
-# What `cmake --install` puts where. The libraries, headers and CMake package are the kit for makers
-# of debuggers; the man page and the completions come out of the tool itself, so that they can't
-# drift from its help.
-
-include(cmake/Package.cmake)
+# What `cmake --install` puts where. There are two components: the tool with the libraries that it
+# loads, and what makers of debuggers need besides. The man page and the completions come out of the
+# tool itself, so that they can't drift from its help.
 
 # The libraries are loaded, not linked, and the maker's logger has the file name of the stand-in:
 # they stay out of the directory that everybody's libraries lie in.
 set(plugin_directory ${CMAKE_INSTALL_LIBDIR}/flash_corvane)
+set(doc_directory ${CMAKE_INSTALL_DATADIR}/doc/corvane-flash)
 include(cmake/Kit.cmake)
-install(TARGETS flash_corvane flash_host_check ostrel_logger EXPORT FlashCorvane
-        LIBRARY DESTINATION ${plugin_directory})
-install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+install(TARGETS flash_corvane ostrel_logger EXPORT FlashCorvane
+        LIBRARY DESTINATION ${plugin_directory} COMPONENT tool)
+install(TARGETS flash_host_check EXPORT FlashCorvane
+        LIBRARY DESTINATION ${plugin_directory} COMPONENT development)
+install(TARGETS corvane-flash RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tool)
+
+# For whoever builds with pkg-config. The prefix is found from where the file lies.
+set(pkgconfig_directory ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+file(RELATIVE_PATH prefix_from_pkgconfig /prefix/${pkgconfig_directory} /prefix)
+configure_file(cmake/flash-corvane.pc.in flash-corvane.pc @ONLY)
+install(FILES ${PROJECT_BINARY_DIR}/flash-corvane.pc
+        DESTINATION ${pkgconfig_directory} COMPONENT development)
 
 # corvane_generate(FILE ARGUMENT...): writes what the tool prints to generated/FILE.
 set(generated ${PROJECT_BINARY_DIR}/generated)
@@ -32,13 +40,17 @@ add_custom_command(
 
 set(data ${CMAKE_INSTALL_DATADIR})
 install(FILES ${generated}/corvane-flash.bash RENAME corvane-flash
-        DESTINATION ${data}/bash-completion/completions)
+        DESTINATION ${data}/bash-completion/completions COMPONENT tool)
 install(FILES ${generated}/corvane-flash.zsh RENAME _corvane-flash
-        DESTINATION ${data}/zsh/vendor-completions)
-install(FILES ${generated}/corvane-flash.fish DESTINATION ${data}/fish/vendor_completions.d)
-install(FILES ${generated}/corvane-flash.1.gz DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
-install(FILES ${documents} DESTINATION ${data}/doc/corvane-flash)
-install(DIRECTORY docs examples DESTINATION ${data}/doc/corvane-flash)
+        DESTINATION ${data}/zsh/vendor-completions COMPONENT tool)
+install(FILES ${generated}/corvane-flash.fish
+        DESTINATION ${data}/fish/vendor_completions.d COMPONENT tool)
+install(FILES ${generated}/corvane-flash.1.gz
+        DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tool)
+install(FILES docs/boards.md docs/command-line-json.md
+        DESTINATION ${doc_directory}/docs COMPONENT tool)
+
+include(cmake/Package.cmake)
 
 # All that `cmake --install` needs, without the tests.
 add_custom_target(kit ALL DEPENDS flash_corvane flash_host_check ostrel_logger corvane-flash

@@ -1,12 +1,12 @@
-# What makers of hosts find in the kit of every system: headers, CMake package, documents. Whoever
-# includes this installs the libraries with EXPORT FlashCorvane, and the documents.
+# What makers of hosts find in the kit of every system: headers, CMake package, documents, examples.
+# Whoever includes this installs the libraries with EXPORT FlashCorvane, and sets doc_directory.
 
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
 install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h
               logger/ostrel_logger.h
-        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane)
+        DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane COMPONENT development)
 
 # The headers tell the kit's version; they are no templates, so that they compile where they lie.
 foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
@@ -26,14 +26,19 @@ install(TARGETS corvane_headers EXPORT FlashCorvane)
 
 set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
 install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake
-        DESTINATION ${package_directory})
+        DESTINATION ${package_directory} COMPONENT development)
 configure_package_config_file(cmake/FlashCorvaneConfig.cmake.in
         ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake INSTALL_DESTINATION ${package_directory})
 write_basic_package_version_file(
         ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake COMPATIBILITY SameMajorVersion)
 install(FILES ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake
               ${PROJECT_BINARY_DIR}/FlashCorvaneConfigVersion.cmake
-        DESTINATION ${package_directory})
+        DESTINATION ${package_directory} COMPONENT development)
 
-# They link to each other and into docs/, which lies beside them.
-set(documents README.md CHANGELOG.md CONTRIBUTING.md)
+# The documents lie as in the source tree, so that the links between them lead somewhere. Those that
+# tell of the source tree stay there; the kit has a README of its own.
+install(FILES cmake/KitReadme.md RENAME README.md DESTINATION ${doc_directory} COMPONENT tool)
+install(FILES CHANGELOG.md DESTINATION ${doc_directory} COMPONENT tool)
+install(FILES docs/host-guide.md docs/host-transcript.md
+        DESTINATION ${doc_directory}/docs COMPONENT development)
+install(DIRECTORY examples DESTINATION ${doc_directory} COMPONENT development)

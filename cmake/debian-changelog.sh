@@ -1,6 +1,6 @@
 #!/bin/sh
 # debian-changelog.sh CHANGELOG.md MAINTAINER: the releases in it as Debian writes them. What isn't
-# released has no date and is left out.
+# released has no date and is left out. Of two releases on one day the newer one has the later time.
 exec awk -v maintainer="$2" '
     function flush(  count, words, i, line) {
         count = split(entry, words)
@@ -18,7 +18,7 @@ exec awk -v maintainer="$2" '
     function finish(  command, stamp) {
         flush()
         if (date == "") return
-        command = "date -R -u -d " date
+        command = "date -R -u -d \"" date " 12:00 UTC - " releases++ " minutes\""
         command | getline stamp
         close(command)
         printf "\n -- %s  %s\n\n", maintainer, stamp

@@ -36,8 +36,21 @@ for example in "${examples[@]}"; do
     diff "$here/operations.txt" \
         <("$trial/$example/$example" "$plugin" "${words[@]}" | sed '0,/^operations\|^Dorna/d')
 done
-clang=(clang --target=arm-none-eabi -fuse-ld=lld -Wpedantic -Werror)
-ARM_CC="${clang[*]}" sh "$kit/share/doc/corvane-flash/examples/loader/build.sh" "$trial/loader.out"
+# The same by pkg-config, which finds the kit wherever it lies. A program for the debugger plays the
+# plug-in to the example of a loader.
+pkgconfig() { PKG_CONFIG_PATH=$(echo "$kit"/lib*/pkgconfig) pkg-config "$@" flash-corvane; }
+[ "$(pkgconfig --variable=plugin)" -ef "$plugin" ] || { echo "pkg-config tells another plug-in"; exit 1; }
+loader=$kit/share/doc/corvane-flash/examples/loader
+if [ -z "${2:-}" ]; then
+    # shellcheck disable=SC2046
+    ${CC:-cc} -std=c99 $(pkgconfig --cflags) "-DFLASH_CORVANE_LIBRARY=\"$plugin\"" \
+        "$kit/share/doc/corvane-flash/examples/c-host/main.c" -o "$trial/by-pkg-config"
+    diff "$here/c-host.txt" <("$trial/by-pkg-config")
+    ARM_CC="clang --target=arm-none-eabi -fuse-ld=lld -Wpedantic -Werror" sh "$loader/build.sh" "$trial/loader.out"
+    timeout 60 gdb-multiarch -nx -batch -x "$loader/try.gdb" "$trial/loader.out" >"$trial/played" 2>&1 ||
+        { cat "$trial/played"; exit 1; }
+    grep -q '^status 0x0, flash at 0x1000 holds 0x12345678$' "$trial/played" || { cat "$trial/played"; exit 1; }
+fi
 
 found=$("$kit/bin/corvane-flash" info | sed -n 's/^Plug-in *//p')
 [ "$found" -ef "$kit"/lib*/flash_corvane/libflash_corvane.so ] || { echo "the tool loaded '$found'"; exit 1; }
@@ -57,10 +70,7 @@ grep 'expected' "$trial/told" && exit 1
 [ "$(grep -c 'Host check, WriteDataToFlash: 10 of 10 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
 
 share=$kit/share
-cd "$share/doc/corvane-flash"
-grep -oE '\]\([^):#]+[)#]' -r --include='*.md' . | tr -d ']()#' | while IFS=: read -r document link; do
-    [ -f "$(dirname "$document")/$link" ] || { echo "$document links to $link"; exit 1; }
-done
+"$here/documents.sh" "$share/doc/corvane-flash"
 bash -n "$share/bash-completion/completions/corvane-flash"
 zsh -n "$share/zsh/vendor-completions/_corvane-flash"
 fish -n "$share/fish/vendor_completions.d/corvane-flash.fish"
