@@ -49,7 +49,7 @@ Outcome Answer(Context& context, const base::AddressRange& range, const std::str
 
 Outcome OfImage(Context& context, const LoadedImages& images) {
     return WithDevice(context, [&](FlashDevice& device) {
-        RequireFit(device, images);
+        RequireFit(device, device.Info(), images);
         const base::AddressRange range = device.RangeInFlash(context.options.range);
         return Answer(context, range, base::HexText(ImageChecksum(images.image, range)));
     });

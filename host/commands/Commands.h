@@ -5,7 +5,6 @@
 
 #include "host/cli/CommandTable.h"
 #include "host/commands/Context.h"
-#include "host/flashing/ProgramPlan.h"
 
 namespace host {
 
@@ -33,10 +32,6 @@ CommandRow Serve();
 CommandRow Settings();
 CommandRow Completion();
 CommandRow Help();
-
-/// Reads all of the flash and draws it, with what a plan would do to it. Returns the runs.
-Json ShowMap(Context& context, FlashDevice& device, const image::Image& image,
-             const ProgramPlan& plan);
 
 // Options that several commands share.
 OptionRow RangeOption(const char* help);

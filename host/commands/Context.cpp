@@ -32,13 +32,13 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
     } catch (...) {
         device.LeaveHalted();
         try {
-            device.Close(options.dryRun ? Contents::LeftAlone : Contents::Kept);
+            device.Close(options.dryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
         } catch (const Failure& second) {
             context.reporter.Error(second.what());
         }
         throw;
     }
-    device.Close(options.dryRun ? Contents::LeftAlone : Contents::Kept);
+    device.Close(options.dryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
     return outcome;
 }
 

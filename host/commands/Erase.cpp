@@ -4,7 +4,7 @@
 
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/DevicePlan.h"
+#include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/RangeOperation.h"
 
 namespace host::commands {
@@ -13,8 +13,8 @@ namespace {
 
 Outcome EraseOn(Context& context, FlashDevice& device) {
     const base::AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
-    if (context.options.all) RequireWholeErase(device, "--range");
-    const FlashGeometry flash = GeometryOf(device);
+    if (context.options.all) RequireWholeErase(device.Info(), "--range");
+    const FlashGeometry flash = GeometryOf(device.Info());
     const base::AddressRange covered = SectorsCovering(range, flash);
     const std::uint64_t sectors = SectorCount(covered, flash);
     Json members{{"address", covered.first}, {"bytes", covered.Size()}, {"sectors", sectors}};
@@ -25,7 +25,7 @@ Outcome EraseOn(Context& context, FlashDevice& device) {
                         SizeText(flash.flashBytes - covered.Size())));
         return NothingTouched(context, members);
     }
-    device.Know(members);
+    device.AddToFailures(members);
     const bool verify = !context.options.noVerify;
     Outcome outcome = RunOperation(device, plugin::kErase, Talk::Verbose, verify);
     outcome.result.update(members);

@@ -27,7 +27,7 @@ Outcome ShowMac(Context& context, FlashDevice& device) {
 Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
     const std::string old = ReadMac(device);
     context.settings.Set(Origin::CommandLine, keys::kMacInput, mac.Text());
-    ChooseCommit(device, keys::kMacCommit, context.options.commit);
+    ChooseCommit(context.settings, context.reporter, keys::kMacCommit, context.options.commit);
     device.Perform(plugin::kProgramMac);
     Outcome outcome;
     const RegisterValues values =
@@ -35,7 +35,7 @@ Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
     const std::string now = MacAddress::FromRegisters(*values[0], *values[1]).Text();
     context.reporter.Result(fmt::format("MAC address: was {}, is {}", old, now));
     outcome.result.update({{"old", old}, {"mac", now}});
-    SayWhetherCommitted(device, outcome);
+    SayWhetherCommitted(context.reporter, device.UserRegisters(), outcome);
     return outcome;
 }
 

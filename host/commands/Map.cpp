@@ -2,9 +2,11 @@
 
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/DevicePlan.h"
+#include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/FlashMap.h"
 #include "host/flashing/ImageSet.h"
+#include "host/flashing/Load.h"
+#include "host/flashing/ProgramSettings.h"
 
 namespace host::commands {
 
@@ -12,12 +14,13 @@ namespace {
 
 Outcome MapOn(Context& context, FlashDevice& device, const LoadedImages& images) {
     device.RequireFlash();
-    RequireFit(device, images);
+    RequireFit(device, device.Info(), images);
     const DeviceInfo& info = device.Info();
-    ProgramPlan plan;
+    LoadPlan plan;
     if (!images.image.Empty())
-        plan = PlanOnDevice(device, images.image, ChosenErase(context.settings), false);
-    Json runs = ShowMap(context, device, images.image, plan);
+        plan = PlanOnDevice(device, RequestedLoad(context.settings), images.image);
+    Json runs =
+        ShowMap(context.reporter, device, device.Meter(), GeometryOf(info), images.image, plan);
     return {.result = {{"flashBytes", info.flashBytes},
                        {"sectorBytes", info.sectorBytes},
                        {"runs", std::move(runs)}}};
@@ -29,21 +32,6 @@ Outcome RunMap(Context& context) {
 }
 
 }  // namespace
-
-Json ShowMap(Context& context, FlashDevice& device, const image::Image& image,
-             const ProgramPlan& plan) {
-    const DeviceInfo& info = device.Info();
-    const FlashGeometry flash = GeometryOf(device);
-    device.Halt();
-    device.Meter().Expect(Phase::Read, info.flashBytes);
-    device.Meter().Begin(Phase::Read);
-    const auto contents = device.ReadFlash(info.Flash());
-    device.Meter().End();
-    const std::vector<MapRun> runs = MapFlash(contents, flash, image, plan);
-    for (const std::string& line : DrawMap(runs, flash, context.reporter.Columns()))
-        context.reporter.Result(line);
-    return ToJson(runs);
-}
 
 CommandRow Map() {
     OptionRow images = ImagesArgument();

@@ -60,11 +60,11 @@ Json Found(const FlashDevice& device, const std::string& name) {
 Outcome OperationOn(FlashDevice& device, const std::string& name) {
     Outcome outcome = RunOperation(device, name, Talk::Normal);
     outcome.result.update(Found(device, name));
-    const RegisterValues written{device.Registers().Of(0).written,
-                                 device.Registers().Of(1).written};
+    const auto& registers = device.UserRegisters().registers;
+    const RegisterValues written{registers[0].written, registers[1].written};
     if (written[0] || written[1]) {
         const RegisterValues values = CheckRegisters(device, written, outcome);
-        device.Output().Result(Describe(device.Registers(), values));
+        device.Output().Result(Describe(device.UserRegisters(), values));
     }
     if (outcome.status == ExitStatus::Done)
         device.Output().Done(fmt::format("Done: operation {}", name));

@@ -51,13 +51,13 @@ Outcome ReadOn(Context& context, FlashDevice& device, const std::string& path,
         context.reporter.Data(contents);
     } else {
         WriteWholeFile(image::kImageFile, path, contents, ExistingFiles(context.options));
-        ShowSummary(context.reporter, device.Meter());
+        ShowSummary(context.reporter, device.Meter().Phases());
     }
     return {.result = {{"file", path},
                        {"format", image::FormatName(format)},
                        {"address", range.first},
                        {"bytes", range.Size()},
-                       {"phases", PhasesJson(device.Meter())}}};
+                       {"phases", PhasesJson(device.Meter().Phases())}}};
 }
 
 Outcome RunRead(Context& context) {

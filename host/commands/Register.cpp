@@ -31,7 +31,8 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     const unsigned index = Index(context);
     const std::uint32_t old = ReadRegister(device, index);
     context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], base::HexText(value));
-    ChooseCommit(device, keys::kRegisterCommits[index], context.options.commit);
+    ChooseCommit(context.settings, context.reporter, keys::kRegisterCommits[index],
+                 context.options.commit);
     device.Perform(plugin::ProgramRegisterOperation(index));
     Outcome outcome;
     RegisterValues expected;
@@ -40,7 +41,7 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     context.reporter.Result(
         fmt::format("User register {}: was {:#010x}, is {:#010x}", index, old, now));
     outcome.result.update({{"register", index}, {"old", old}, {"value", now}});
-    SayWhetherCommitted(device, outcome);
+    SayWhetherCommitted(context.reporter, device.UserRegisters(), outcome);
     return outcome;
 }
 

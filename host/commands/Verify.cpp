@@ -13,12 +13,12 @@ namespace {
 Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all) {
     const auto& range = context.options.range;
     const LoadedImages images = range ? Within(all, device.RangeInFlash(range)) : all;
-    RequireFit(device, images);
+    RequireFit(device, device.Info(), images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
-    const Differences differences = CompareWithFlash(device, images.image);
+    const Differences differences = CompareWithFlash(device, device.Meter(), images.image);
     const bool equal = differences.Empty();
-    Outcome outcome{.result = {{"equal", equal}, {"phases", PhasesJson(device.Meter())}}};
-    ShowSummary(context.reporter, device.Meter());
+    Outcome outcome{.result = {{"equal", equal}, {"phases", PhasesJson(device.Meter().Phases())}}};
+    ShowSummary(context.reporter, device.Meter().Phases());
     if (equal)
         context.reporter.Result("The flash holds the image");
     else

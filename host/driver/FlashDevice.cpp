@@ -13,7 +13,6 @@
 #include "host/facts/FlashMemory.h"
 #include "host/facts/LoaderMemory.h"
 #include "host/facts/SettingKeys.h"
-#include "host/output/Summary.h"
 
 namespace host {
 
@@ -33,9 +32,6 @@ std::uint64_t PublishedSize(const SettingStore& settings, const char* key) {
 bool IsNoIdentification(std::uint32_t word) {
     return word == 0 || word == 0xFFFFFFFF;
 }
-
-constexpr char kCheckConnection[] =
-    "check the connection (of a simulated device: the options of --sim)";
 
 TraceLine LinesTo(Trace* trace) {
     if (trace == nullptr) return {};
@@ -63,7 +59,7 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
     }
     Create();
     Initialize();
-    reached_ = true;
+    identified_ = true;
     reporter_.Say(Talk::Verbose, fmt::format("Plug-in {}", library_.Path()));
 }
 
@@ -77,7 +73,7 @@ void FlashDevice::Create() {
                       fmt::format("{} claims success, but has made no device object; name another "
                                   "plug-in with --plugin",
                                   library_.Path()));
-    info_.identification = Registers().Identification().value_or(0);
+    info_.identification = host_.Registers().Identification().value_or(0);
     if (IsNoIdentification(info_.identification))
         throw Failure(ExitStatus::Unreachable,
                       fmt::format("nothing answers: the identification register reads {:#010x}; {}",
@@ -206,8 +202,8 @@ void FlashDevice::StartProgram() {
     runsAtEnd_ = true;
 }
 
-void FlashDevice::Close(Contents contents) {
-    if (contents == Contents::Kept) target_->Keep(watch_.ContentsTouched());
+void FlashDevice::Close(DeviceFile file) {
+    if (file == DeviceFile::Save) target_->Keep(watch_.ContentsTouched());
     try {
         target_->Release(runsAtEnd_);
     } catch (const target::TargetError& error) {
@@ -224,7 +220,7 @@ void FlashDevice::Call(const std::string& doing, const std::string& traced, Acti
     host_.CallReturned();
     if (trace_ && error != nullptr) trace_->Line("call", fmt::format("failed: {}", error));
     if (Interrupted() || !host_.Errors().empty() || error != nullptr)
-        Fail(error == nullptr ? "" : error, doing);
+        Fail(doing, error == nullptr ? "" : error);
 }
 
 void FlashDevice::LeaveHalted() {
@@ -244,91 +240,26 @@ RegisterValues FlashDevice::TryUserRegisters() {
     return values;
 }
 
-void FlashDevice::Fail(const std::string& error, const std::string& doing) {
-    const std::string cause = host_.FirstFailure();
-    const bool shown = !host_.Errors().empty();
+void FlashDevice::Fail(const std::string& doing, const std::string& error) {
+    FailedCall call{doing, error};
+    if (!host_.Errors().empty()) call.shown = host_.Errors().front();
+    call.cause = host_.FirstFailure();
     LeaveHalted();
-    RegisterValues registers;
-    Json known = known_;
-    known.update({{"flashChanged", watch_.FlashTouched()}, {"phases", PhasesJson(meter_)}});
-    if (Registers().UserRegistersAccessed()) {
-        registers = TryUserRegisters();
-        known["registers"] = ToJson(Registers(), registers);
-    }
-    const std::string state = State(registers);
-    if (Interrupted())
-        throw DeviceFailure(ExitStatus::Interrupted, "interrupted; " + state,
-                            "interrupted; " + state, known);
-    std::string text = doing + ": " + (shown ? host_.Errors().front() : error);
-    while (text.ends_with('.'))
-        text.pop_back();
-    if (shown && !error.empty()) text += "; then " + error;
-    if (text.find(cause) == std::string::npos) text += "; it began with: " + cause;
-    if (!reached_) {
-        text = fmt::format("can't reach the target: {}; {}", text, kCheckConnection);
-        throw DeviceFailure(ExitStatus::Unreachable, text, text, known);
-    }
-    // A blank check that follows on a failed access finds what that has left.
-    if (const auto& found = watch_.FirstNotBlank(); found && cause.empty())
-        FailAsNotBlank(*found, text, state, known);
-    const std::string rest = fmt::format("; {}; {}", state, Advice());
-    std::string remark = text;
-    if (shown && cause.empty())
-        remark = doing + (error.empty() ? " ended with the errors above" : ": " + error);
-    else if (shown)
-        remark = doing + " failed: " + cause;
-    throw DeviceFailure(ExitStatus::DeviceFailed, text + rest, remark + rest, known);
+    throw MakeDeviceFailure(call, StateAfterFailure(), failureMembers_);
 }
 
-void FlashDevice::FailAsNotBlank(const NotBlank& found, const std::string& error,
-                                 const std::string& state, Json known) {
-    const bool erased = watch_.Work().erased.BytesIn({found.address, found.address}) != 0;
-    const std::string rest =
-        std::string(erased ? "; it was erased just now, so the cell is worn out or protected"
-                           : "") +
-        (watch_.FlashTouched() ? "; " + state : "");
-    known.update({{"blank", false}, {"address", found.address}, {"actual", found.actual}});
-    throw DeviceFailure(ExitStatus::ContentsDiffer, error + rest,
-                        fmt::format("the flash isn't blank: {:#x} holds {:#04x}, not 0xff{}",
-                                    found.address, found.actual, rest),
-                        known);
-}
-
-std::string FlashDevice::State(const RegisterValues& registers) const {
-    std::string text;
-    if (Registers().UserRegistersAccessed()) text = Describe(Registers(), registers);
-    if (text.empty() || watch_.FlashTouched()) text += (text.empty() ? "" : "; ") + StateOfFlash();
-    return haltFailed_ ? text + "; the target couldn't be halted" : text;
-}
-
-std::string FlashDevice::StateOfFlash() const {
-    const FlashWork& work = watch_.Work();
-    if (work.attempted.Empty()) return "the flash is as it was";
-    const PhaseProgress& erase = meter_.Of(Phase::Erase);
-    const PhaseProgress& program = meter_.Of(Phase::Program);
-    base::AddressSet seen = work.erased;
-    for (const base::AddressRange& range : work.programmed.Ranges())
-        seen.Add(range);
-    // All that was to be done was done, and nothing else was begun: an erase that failed isn't made
-    // good by what was programmed over it.
-    if (seen == work.attempted && erase.doneBytes >= erase.totalBytes &&
-        program.doneBytes >= program.totalBytes)
-        return program.totalBytes != 0
-                   ? "the image is programmed, but not compared"
-                   : SizeText(work.erased.Bytes()) + " are erased, but not compared";
-    std::string text = "the flash is incomplete: " + SizeText(work.erased.Bytes()) + " erased";
-    if (program.totalBytes != 0)
-        text += fmt::format(", {} of {} written", SizeText(program.doneBytes),
-                            SizeText(program.totalBytes));
-    const std::uint64_t written = work.programmed.Bytes();
-    if (const std::uint64_t handedOver = work.handedOver.Bytes(); handedOver > written)
-        text += fmt::format(", {} handed to the loader and not seen to be finished",
-                            SizeText(handedOver - written));
-    return text + "; run the command again before the device is used";
-}
-
-std::string FlashDevice::Advice() const {
-    return trace_ ? "the trace has every access" : "run it with --trace FILE to see every access";
+KnownState FlashDevice::StateAfterFailure() {
+    RegisterValues values;
+    if (UserRegisters().accessed) values = TryUserRegisters();
+    return {.flash = watch_.Work(),
+            .phases = meter_.Phases(),
+            .notBlank = watch_.FirstNotBlank(),
+            .registers = UserRegisters(),
+            .registerValues = values,
+            .identified = identified_,
+            .interrupted = Interrupted(),
+            .haltFailed = haltFailed_,
+            .traced = trace_ != nullptr};
 }
 
 }  // namespace host

@@ -4,14 +4,17 @@
 
 #pragma once
 
+#include <chrono>
 #include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
-#include "host/base/Errors.h"
 #include "host/base/Text.h"
+#include "host/driver/DeviceFailure.h"
+#include "host/driver/DeviceInfo.h"
 #include "host/driver/FlashHost.h"
+#include "host/driver/FlashReader.h"
 #include "host/driver/FlashWatch.h"
 #include "host/driver/PluginLibrary.h"
 #include "host/driver/Trace.h"
@@ -24,34 +27,6 @@
 
 namespace host {
 
-/// What the plug-in has found out about the device.
-struct DeviceInfo {
-    std::string family;
-    std::uint64_t flashBytes = 0;
-    std::uint64_t ramBytes = 0;
-    std::uint32_t sectorBytes = 0;
-    std::uint32_t identification = 0;
-    bool hasFlash = false;
-    std::string operations;  ///< joined by " | "
-
-    base::AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
-};
-
-/// A failure of the device or the plug-in. Part of it may have been shown already: `Remark` is what
-/// is left to say, `Result` what is known for the JSON lines.
-class DeviceFailure : public Failure {
-  public:
-    DeviceFailure(ExitStatus status, const std::string& text, std::string remark, Json result)
-        : Failure(status, text), remark_(std::move(remark)), result_(std::move(result)) {}
-
-    const std::string& Remark() const { return remark_; }
-    const Json& Result() const { return result_; }
-
-  private:
-    std::string remark_;
-    Json result_;
-};
-
 /// Which target, through which plug-in, and what traces it: null, or a trace that outlives the
 /// device.
 struct DeviceOptions {
@@ -60,10 +35,10 @@ struct DeviceOptions {
     Trace* trace = nullptr;
 };
 
-/// What becomes of a simulated device's contents at the end.
-enum class Contents { Kept, LeftAlone };
+/// What becomes of the file of a simulated device, where one was named.
+enum class DeviceFile { Save, LeaveAlone };
 
-class FlashDevice {
+class FlashDevice final : public FlashReader {
   public:
     /// Failure (Unreachable) when plug-in or target can't be had.
     FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter);
@@ -74,10 +49,10 @@ class FlashDevice {
     Reporter& Output() { return reporter_; }
     WorkMeter& Meter() { return meter_; }
     const FlashWork& Work() const { return watch_.Work(); }
-    const RegisterWatch& Registers() const { return host_.Registers(); }
+    const UserRegisterWork& UserRegisters() const { return host_.Registers().UserRegisters(); }
 
-    /// Whether the byte at an address lies in flash, by the plug-in's own answer.
-    bool Contains(std::uint32_t address);
+    /// By the plug-in's own answer.
+    bool Contains(std::uint32_t address) override;
 
     /// The range of a command, the whole flash when none was given. Failure (WrongUsage) when it
     /// doesn't lie in flash, Failure (DeviceFailed) when there is no flash.
@@ -101,13 +76,13 @@ class FlashDevice {
     /// What the last call has published. Failure (DeviceFailed) when it is nothing.
     std::string Published(const std::string& key) const;
 
-    /// Adds to what the JSON lines of a failure say: the command's plan, for one.
-    void Know(const Json& members) { known_.update(members); }
+    /// Adds to what the JSON lines of a failure have: the command's plan, for one.
+    void AddToFailures(const Json& members) { failureMembers_.update(members); }
 
     /// Reads flash of the halted target, counting the bytes for the running phase.
-    std::vector<std::uint8_t> ReadFlash(const base::AddressRange& range);
+    std::vector<std::uint8_t> ReadFlash(const base::AddressRange& range) override;
     std::uint32_t ReadUserRegister(unsigned index);
-    void Halt();
+    void Halt() override;
 
     /// Ends the work after a failure of any kind, Ctrl-C included.
     void LeaveHalted();
@@ -120,7 +95,7 @@ class FlashDevice {
 
     /// The last thing done with a device: a simulated one's contents are kept, where a file was
     /// named for them, and the target is left halted or starts its program. Failure.
-    void Close(Contents contents);
+    void Close(DeviceFile file);
 
   private:
     struct Destroyer {
@@ -132,14 +107,10 @@ class FlashDevice {
     void Initialize();
     template <typename Action>
     void Call(const std::string& doing, const std::string& traced, Action&& action);
-    [[noreturn]] void Fail(const std::string& error, const std::string& doing);
-    [[noreturn]] void FailAsNotBlank(const NotBlank& found, const std::string& error,
-                                     const std::string& state, Json known);
+    [[noreturn]] void Fail(const std::string& doing, const std::string& error);
+    KnownState StateAfterFailure();
     RegisterValues TryUserRegisters();
-    std::string State(const RegisterValues& registers) const;
     std::string AwaitLoader();
-    std::string StateOfFlash() const;
-    std::string Advice() const;
 
     SettingStore& settings_;
     Reporter& reporter_;
@@ -154,9 +125,9 @@ class FlashDevice {
     std::optional<PluginTrace> pluginTrace_;
     std::unique_ptr<IFlashDevice2, Destroyer> device_;
     DeviceInfo info_;
-    Json known_ = Json::object();
-    bool reached_ = false;  ///< the device was identified, and its properties are known
-    bool closing_ = false;  ///< after a failure
+    Json failureMembers_ = Json::object();
+    bool identified_ = false;  ///< the device was reached, and its properties are known
+    bool closing_ = false;     ///< after a failure
     bool haltFailed_ = false;
     bool runsAtEnd_ = false;
 };

@@ -22,32 +22,34 @@ std::optional<unsigned> IndexOf(std::uint32_t address) {
 }  // namespace
 
 void RegisterWatch::Accessing(std::uint32_t address) {
-    if (IndexOf(address)) accessed_ = true;
+    if (IndexOf(address)) work_.accessed = true;
 }
 
 void RegisterWatch::Writing(std::uint32_t address, std::uint32_t word) {
-    if (const auto index = IndexOf(address)) registers_[*index] = {word, Commit::None};
+    if (const auto index = IndexOf(address)) work_.registers[*index] = {word, Commit::None};
     if (address == plugin::kFlashAddressRegister) operand_ = word;
     if (address != plugin::kFlashCommandRegister || (word & plugin::kCommitBit) == 0) return;
     const std::uint32_t index = operand_ - plugin::kCommitOperand;
-    if (index >= registers_.size()) return;
+    if (index >= work_.registers.size()) return;
     committing_ = index;
-    registers_[index].commit = Commit::Begun;
+    work_.registers[index].commit = Commit::Begun;
 }
 
 void RegisterWatch::Read(std::uint32_t address, std::uint32_t word) {
     if (address == plugin::kIdentificationRegister && !identification_) identification_ = word;
     if (address != plugin::kFlashCommandRegister || !committing_) return;
     if ((word & plugin::kCommitBit) != 0) return;
-    registers_[*committing_].commit = Commit::Done;
+    work_.registers[*committing_].commit = Commit::Done;
     committing_.reset();
 }
 
-std::string Describe(const RegisterWatch& watch, const RegisterValues& values) {
-    if (!watch.Of(0).written && !watch.Of(1).written) return "the user registers are as they were";
+std::string Describe(const UserRegisterWork& work, const RegisterValues& values) {
+    const auto untouched = [](const UserRegister& one) { return !one.written; };
+    if (std::ranges::all_of(work.registers, untouched))
+        return "the user registers are as they were";
     std::string text;
     for (unsigned index = 0; index < values.size(); ++index) {
-        const auto [written, commit] = watch.Of(index);
+        const auto [written, commit] = work.registers.at(index);
         text += fmt::format("{}user register {} ", index == 0 ? "" : ", ", index);
         if (values[index])
             text += fmt::format("holds {:#010x}", *values[index]);
@@ -61,10 +63,10 @@ std::string Describe(const RegisterWatch& watch, const RegisterValues& values) {
     return text;
 }
 
-Json ToJson(const RegisterWatch& watch, const RegisterValues& values) {
+Json ToJson(const UserRegisterWork& work, const RegisterValues& values) {
     Json registers = Json::array();
     for (unsigned index = 0; index < values.size(); ++index) {
-        const Commit commit = watch.Of(index).commit;
+        const Commit commit = work.registers.at(index).commit;
         registers.push_back(
             {{"register", index},
              {"value", values[index] ? Json(*values[index]) : Json(nullptr)},

@@ -21,6 +21,12 @@ struct UserRegister {
     Commit commit = Commit::None;
 };
 
+/// What a run has done to the user registers, so far as it can know.
+struct UserRegisterWork {
+    bool accessed = false;  ///< the run had to do with them at all
+    std::array<UserRegister, 2> registers;
+};
+
 class RegisterWatch {
   public:
     /// To be called before an access goes out.
@@ -31,24 +37,20 @@ class RegisterWatch {
     void Read(std::uint32_t address, std::uint32_t word);
 
     const std::optional<std::uint32_t>& Identification() const { return identification_; }
-    const UserRegister& Of(unsigned index) const { return registers_[index]; }
-
-    /// Whether this run had to do with the user registers at all.
-    bool UserRegistersAccessed() const { return accessed_; }
+    const UserRegisterWork& UserRegisters() const { return work_; }
 
   private:
     std::optional<std::uint32_t> identification_;
-    std::array<UserRegister, 2> registers_;
+    UserRegisterWork work_;
     std::uint32_t operand_ = 0;  ///< what the flash address register was given last
     std::optional<unsigned> committing_;
-    bool accessed_ = false;
 };
 
 /// What each register was found to hold; nothing for one that can't be read.
 using RegisterValues = std::array<std::optional<std::uint32_t>, 2>;
 
 /// What became of the registers, in a sentence and for the JSON lines.
-std::string Describe(const RegisterWatch& watch, const RegisterValues& values);
-Json ToJson(const RegisterWatch& watch, const RegisterValues& values);
+std::string Describe(const UserRegisterWork& work, const RegisterValues& values);
+Json ToJson(const UserRegisterWork& work, const RegisterValues& values);
 
 }  // namespace host

@@ -6,7 +6,7 @@
 
 #include <algorithm>
 
-#include "host/driver/FlashDevice.h"
+#include "host/base/Text.h"
 #include "host/flashing/ImageSet.h"
 
 namespace host {
@@ -34,23 +34,23 @@ void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
 
 /// Calls `compare` for each piece of a range that was read.
 template <typename Action>
-void ReadPieces(FlashDevice& device, const base::AddressRange& range, const Action& compare) {
+void ReadPieces(FlashReader& reader, const base::AddressRange& range, const Action& compare) {
     std::uint64_t rest = range.Size();
     for (std::uint32_t address = range.first; rest > 0;) {
         const auto size = static_cast<std::uint32_t>(std::min<std::uint64_t>(kPieceBytes, rest));
-        compare(address, device.ReadFlash({address, address + (size - 1)}));
+        compare(address, reader.ReadFlash({address, address + (size - 1)}));
         rest -= size;
         address += size;
     }
 }
 
 template <typename Action>
-Differences Read(FlashDevice& device, const Action& work) {
+Differences Verify(FlashReader& reader, WorkMeter& meter, const Action& compare) {
     Differences differences;
-    device.Halt();
-    device.Meter().Begin(Phase::Verify);
-    work(differences);
-    device.Meter().End();
+    reader.Halt();
+    meter.Begin(Phase::Verify);
+    compare(differences);
+    meter.End();
     return differences;
 }
 
@@ -102,10 +102,10 @@ void Compare(Differences& differences, std::uint32_t address,
             Add(differences, address + static_cast<std::uint32_t>(i), expected[i], actual[i]);
 }
 
-Differences CompareWithFlash(FlashDevice& device, const image::Image& image) {
-    return Read(device, [&](Differences& differences) {
+Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image) {
+    return Verify(reader, meter, [&](Differences& differences) {
         for (const image::Section& section : image.Sections())
-            ReadPieces(device, {section.address, section.Last()},
+            ReadPieces(reader, {section.address, section.Last()},
                        [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
                            const std::span<const std::uint8_t> all = section.bytes;
                            Compare(differences, address,
@@ -114,11 +114,12 @@ Differences CompareWithFlash(FlashDevice& device, const image::Image& image) {
     });
 }
 
-Differences CompareWithErased(FlashDevice& device, const base::AddressRange& range) {
+Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,
+                              const base::AddressRange& range) {
     const std::vector<std::uint8_t> erased(std::min<std::uint64_t>(kPieceBytes, range.Size()),
                                            0xFF);
-    return Read(device, [&](Differences& differences) {
-        ReadPieces(device, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
+    return Verify(reader, meter, [&](Differences& differences) {
+        ReadPieces(reader, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
             Compare(differences, address, std::span(erased).first(actual.size()), actual);
         });
     });

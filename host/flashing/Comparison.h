@@ -10,12 +10,13 @@
 
 #include "host/base/Json.h"
 #include "host/base/Text.h"
+#include "host/driver/FlashReader.h"
 #include "host/image/Image.h"
 #include "host/output/Reporter.h"
+#include "host/output/WorkMeter.h"
 
 namespace host {
 
-class FlashDevice;
 struct LoadedImages;
 
 /// Bytes that differ, near enough to each other to be told as one range.
@@ -47,10 +48,11 @@ void Compare(Differences& differences, std::uint32_t address,
              std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual);
 
 /// Reads all that the image covers and compares. The target is halted first.
-Differences CompareWithFlash(FlashDevice& device, const image::Image& image);
+Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image);
 
 /// The same with what an erase leaves.
-Differences CompareWithErased(FlashDevice& device, const base::AddressRange& range);
+Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,
+                              const base::AddressRange& range);
 
 /// Makes the outcome the failure (ContentsDiffer) of a flash that should hold the images, with a
 /// line for each of the first ranges that names the file; `advice` ends the closing line.

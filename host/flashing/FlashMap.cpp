@@ -29,14 +29,14 @@ constexpr struct {
 
 constexpr std::uint64_t kLinesMax = 16;
 
-const auto& Of(MapState state) {
+const auto& RowOf(MapState state) {
     return kStates[static_cast<std::size_t>(state)];
 }
 
 class Mapper {
   public:
     Mapper(const std::vector<std::uint8_t>& contents, const image::Image& image,
-           const ProgramPlan& plan)
+           const LoadPlan& plan)
         : contents_(contents), image_(image) {
         for (const base::AddressRange& run : plan.erased)
             erased_.Add(run);
@@ -111,7 +111,7 @@ std::string Cells(const std::vector<MapRun>& runs, std::uint64_t flashBytes,
             states[cell] = std::max(states[cell], run.state);
     std::string cells;
     for (const MapState state : states)
-        cells += Of(state).mark;
+        cells += RowOf(state).mark;
     return cells;
 }
 
@@ -130,7 +130,7 @@ std::vector<std::string> Legend(const std::vector<MapRun>& runs) {
 }  // namespace
 
 std::vector<MapRun> MapFlash(const std::vector<std::uint8_t>& contents, const FlashGeometry& flash,
-                             const image::Image& image, const ProgramPlan& plan) {
+                             const image::Image& image, const LoadPlan& plan) {
     Mapper mapper(contents, image, plan);
     for (std::uint64_t first = 0; first < contents.size(); first += flash.sectorBytes)
         mapper.AddSector(
@@ -167,8 +167,21 @@ Json ToJson(const std::vector<MapRun>& runs) {
     for (const MapRun& run : runs)
         all.push_back({{"address", run.range.first},
                        {"bytes", run.range.Size()},
-                       {"state", Of(run.state).name}});
+                       {"state", RowOf(run.state).name}});
     return all;
+}
+
+Json ShowMap(Reporter& reporter, FlashReader& reader, WorkMeter& meter, const FlashGeometry& flash,
+             const image::Image& image, const LoadPlan& plan) {
+    reader.Halt();
+    meter.Expect(Phase::Read, flash.flashBytes);
+    meter.Begin(Phase::Read);
+    const auto contents = reader.ReadFlash({0, static_cast<std::uint32_t>(flash.flashBytes - 1)});
+    meter.End();
+    const std::vector<MapRun> runs = MapFlash(contents, flash, image, plan);
+    for (const std::string& line : DrawMap(runs, flash, reporter.Columns()))
+        reporter.Result(line);
+    return ToJson(runs);
 }
 
 }  // namespace host

@@ -10,8 +10,11 @@
 
 #include "host/base/Json.h"
 #include "host/base/Text.h"
-#include "host/flashing/ProgramPlan.h"
+#include "host/driver/FlashReader.h"
+#include "host/flashing/LoadPlan.h"
 #include "host/image/Image.h"
+#include "host/output/Reporter.h"
+#include "host/output/WorkMeter.h"
 
 namespace host {
 
@@ -34,12 +37,17 @@ struct MapRun {
 /// Runs in address order that cover the whole flash. `contents` is all of it; without an image,
 /// `plan` is the empty one. Outside of the image, a run begins and ends with a sector.
 std::vector<MapRun> MapFlash(const std::vector<std::uint8_t>& contents, const FlashGeometry& flash,
-                             const image::Image& image, const ProgramPlan& plan);
+                             const image::Image& image, const LoadPlan& plan);
 
 /// The picture, at most `columns` wide and about a screen high, and what its characters mean.
 std::vector<std::string> DrawMap(const std::vector<MapRun>& runs, const FlashGeometry& flash,
                                  std::size_t columns);
 
 Json ToJson(const std::vector<MapRun>& runs);
+
+/// Halts the target, reads all of the flash, shows its map, and returns the runs for the JSON
+/// lines.
+Json ShowMap(Reporter& reporter, FlashReader& reader, WorkMeter& meter, const FlashGeometry& flash,
+             const image::Image& image, const LoadPlan& plan);
 
 }  // namespace host

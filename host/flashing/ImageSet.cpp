@@ -10,7 +10,7 @@
 
 #include "base/Hex.h"
 #include "host/base/Errors.h"
-#include "host/driver/FlashDevice.h"
+#include "host/base/Text.h"
 
 namespace host {
 
@@ -119,10 +119,9 @@ LoadedImages ReadImages(const std::vector<std::string>& paths, const image::Read
     return images;
 }
 
-void RequireFit(FlashDevice& device, const LoadedImages& images) {
+void RequireFit(FlashReader& reader, const DeviceInfo& info, const LoadedImages& images) {
     for (const auto& [file, range] : images.origins) {
-        if (device.Contains(range.first) && device.Contains(range.last)) continue;
-        const DeviceInfo& info = device.Info();
+        if (reader.Contains(range.first) && reader.Contains(range.last)) continue;
         const std::string flash = info.hasFlash ? "the flash, " + RangeText(info.Flash())
                                                 : "flash: the device has none to program";
         throw Failure(ExitStatus::BadFile,

@@ -8,11 +8,11 @@
 #include <vector>
 
 #include "host/base/Text.h"
+#include "host/driver/DeviceInfo.h"
+#include "host/driver/FlashReader.h"
 #include "host/image/Image.h"
 
 namespace host {
-
-class FlashDevice;
 
 struct LoadedImages {
     image::Image image;
@@ -49,8 +49,8 @@ LoadedImages Within(const LoadedImages& images, const base::AddressRange& range)
 /// binary.
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options);
 
-/// Asks the plug-in about the first and the last byte of every section. Failure (BadFile) names
-/// the file and the section that doesn't lie in flash.
-void RequireFit(FlashDevice& device, const LoadedImages& images);
+/// Asks about the first and the last byte of every section. Failure (BadFile) names the file and
+/// the section that doesn't lie in flash.
+void RequireFit(FlashReader& reader, const DeviceInfo& info, const LoadedImages& images);
 
 }  // namespace host

@@ -4,8 +4,7 @@
 
 #include <algorithm>
 
-#include "host/driver/FlashDevice.h"
-#include "host/flashing/DevicePlan.h"
+#include "host/flashing/ReadRanges.h"
 
 namespace host {
 
@@ -46,16 +45,10 @@ image::Image KeptBytes(const image::Image& image, const image::Image& contents) 
     return kept;
 }
 
-image::Image ReadSectors(FlashDevice& device, const image::Image& image) {
-    const base::AddressSet sectors = SectorsOf(image, GeometryOf(device));
-    device.Halt();
-    device.Meter().Expect(Phase::Read, sectors.Bytes());
-    device.Meter().Begin(Phase::Read);
-    image::Image contents;
-    for (const base::AddressRange& run : sectors.Ranges())
-        contents.Add(run.first, device.ReadFlash(run), "the flash");
-    device.Meter().End();
-    return contents;
+image::Image ReadKeptBytes(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                           const FlashGeometry& flash) {
+    reader.Halt();
+    return KeptBytes(image, ReadRanges(reader, meter, Phase::Read, SectorsOf(image, flash)));
 }
 
 }  // namespace host

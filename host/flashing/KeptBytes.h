@@ -2,17 +2,19 @@
 
 #pragma once
 
+#include "host/driver/FlashReader.h"
+#include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
+#include "host/output/WorkMeter.h"
 
 namespace host {
-
-class FlashDevice;
 
 /// Of the contents of the image's sectors, the bytes that the image says nothing about, without
 /// those that are erased: an image that fits between the sections of the other one.
 image::Image KeptBytes(const image::Image& image, const image::Image& contents);
 
-/// Reads all sectors that hold a byte of the image. The target is halted first.
-image::Image ReadSectors(FlashDevice& device, const image::Image& image);
+/// Halts the target, reads all sectors that hold a byte of the image, and returns their KeptBytes.
+image::Image ReadKeptBytes(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                           const FlashGeometry& flash);
 
 }  // namespace host

@@ -7,7 +7,7 @@
 #include "host/driver/FlashDevice.h"
 #include "host/facts/Operations.h"
 #include "host/flashing/Comparison.h"
-#include "host/flashing/DevicePlan.h"
+#include "host/flashing/DeviceGeometry.h"
 #include "host/output/Summary.h"
 
 namespace host {
@@ -36,7 +36,7 @@ std::optional<base::AddressRange> CoveredRange(FlashDevice& device,
     const base::AddressRange range =
         SelectedRange(device.Settings(), operation.keys).value_or(info.Flash());
     if (range.first > range.last || range.last >= info.flashBytes) return std::nullopt;
-    return operation.unitBytes == 0 ? SectorsCovering(range, GeometryOf(device))
+    return operation.unitBytes == 0 ? SectorsCovering(range, GeometryOf(device.Info()))
                                     : Widened(range, operation.unitBytes);
 }
 
@@ -48,8 +48,9 @@ std::optional<base::AddressRange> Announce(FlashDevice& device, const RangeOpera
     device.Meter().Expect(operation.phase, covered->Size());
     if (operation.phase != Phase::Erase) return std::nullopt;
     device.Output().Say(
-        Talk::Normal, fmt::format("Erase covers {}: {}", RangeText(*covered),
-                                  CountText(SectorCount(*covered, GeometryOf(device)), "sector")));
+        Talk::Normal,
+        fmt::format("Erase covers {}: {}", RangeText(*covered),
+                    CountText(SectorCount(*covered, GeometryOf(device.Info())), "sector")));
     if (!verifyErase) return std::nullopt;
     device.Meter().Expect(Phase::Verify, covered->Size());
     return covered;
@@ -72,12 +73,12 @@ Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level, b
     Outcome outcome{.result = {{"operation", name}}};
     if (erased) {
         outcome.result["blank"] = true;
-        if (const Differences differences = CompareWithErased(device, *erased);
+        if (const Differences differences = CompareWithErased(device, device.Meter(), *erased);
             !differences.Empty())
             FailAsNotErased(outcome, differences);
     }
-    outcome.result["phases"] = PhasesJson(device.Meter());
-    ShowSummary(device.Output(), device.Meter());
+    outcome.result["phases"] = PhasesJson(device.Meter().Phases());
+    ShowSummary(device.Output(), device.Meter().Phases());
     return outcome;
 }
 

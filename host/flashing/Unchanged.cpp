@@ -5,16 +5,12 @@
 #include <algorithm>
 #include <span>
 
-#include "host/driver/FlashDevice.h"
 #include "host/facts/LoaderMemory.h"
-#include "host/flashing/DevicePlan.h"
+#include "host/flashing/ReadRanges.h"
 
 namespace host {
 
 namespace {
-
-/// So much is read before it is compared; an image can be as large as the flash.
-constexpr std::uint64_t kReadBytes = std::uint64_t{1} << 20;
 
 constexpr std::uint64_t kSamplesMin = 2;
 constexpr std::uint64_t kSamplesMax = 8;
@@ -44,25 +40,20 @@ base::AddressRange Sector(const base::AddressSet& sectors, std::uint64_t number,
     return {};
 }
 
-/// Adds the sectors of a piece of flash that hold what they should.
-void AddEqualSectors(base::AddressSet& unchanged, std::uint32_t address,
-                     std::span<const std::uint8_t> actual, std::span<const std::uint8_t> expected,
-                     std::uint32_t sectorBytes) {
-    while (!actual.empty()) {
-        const std::size_t size = std::min<std::size_t>(sectorBytes, actual.size());
-        if (std::ranges::equal(actual.first(size), expected.first(size)))
-            unchanged.Add({address, address + static_cast<std::uint32_t>(size - 1)});
-        actual = actual.subspan(size);
-        expected = expected.subspan(size);
-        address += sectorBytes;
-    }
+/// The bytes of a range; none unless the image has all of them.
+std::span<const std::uint8_t> BytesOf(const image::Image& image, const base::AddressRange& range) {
+    const auto& sections = image.Sections();
+    const auto section = std::ranges::partition_point(
+        sections, [&](const image::Section& other) { return other.Last() < range.last; });
+    if (section == sections.end() || section->address > range.first) return {};
+    return std::span(section->bytes).subspan(range.first - section->address, range.Size());
 }
 
-bool HoldsASample(FlashDevice& device, const image::Image& image) {
+bool HoldsASample(FlashReader& reader, const image::Image& image, const FlashGeometry& flash) {
     const auto holds = [&](const base::AddressRange& block) {
-        return device.ReadFlash(block) == ContentsAfterLoad(image, block);
+        return reader.ReadFlash(block) == ContentsAfterLoad(image, block);
     };
-    return std::ranges::any_of(SampleBlocks(image, GeometryOf(device)), holds);
+    return std::ranges::any_of(SampleBlocks(image, flash), holds);
 }
 
 }  // namespace
@@ -140,29 +131,25 @@ image::Image Without(const image::Image& image, const base::AddressSet& addresse
     return rest;
 }
 
-base::AddressSet FindUnchanged(FlashDevice& device, const image::Image& image) {
-    const FlashGeometry flash = GeometryOf(device);
-    const std::uint32_t sectorBytes = flash.sectorBytes;
+base::AddressSet Unchanged(const image::Image& image, const image::Image& flashNow,
+                           const FlashGeometry& flash) {
     const base::AddressSet sectors = SectorsOf(image, flash);
-    device.Halt();
-    if (!HoldsASample(device, image)) return {};
     base::AddressSet unchanged;
-    WorkMeter& meter = device.Meter();
-    meter.Expect(Phase::Look, sectors.Bytes());
-    meter.Begin(Phase::Look);
-    const std::uint64_t step = std::max<std::uint64_t>(kReadBytes / sectorBytes, 1) * sectorBytes;
-    for (const base::AddressRange& run : sectors.Ranges()) {
-        const std::uint64_t end = std::uint64_t{run.last} + 1;
-        for (std::uint64_t first = run.first; first < end; first += step) {
-            const base::AddressRange piece{
-                static_cast<std::uint32_t>(first),
-                static_cast<std::uint32_t>(std::min(first + step, end) - 1)};
-            AddEqualSectors(unchanged, piece.first, device.ReadFlash(piece),
-                            ContentsAfterLoad(image, piece), sectorBytes);
+    for (const base::AddressRange& run : sectors.Ranges())
+        for (std::uint64_t first = run.first; first <= run.last; first += flash.sectorBytes) {
+            const auto address = static_cast<std::uint32_t>(first);
+            const base::AddressRange sector = SectorsCovering({address, address}, flash);
+            if (std::ranges::equal(BytesOf(flashNow, sector), ContentsAfterLoad(image, sector)))
+                unchanged.Add(sector);
         }
-    }
-    meter.End();
-    return WorthLeaving(unchanged, sectors, sectorBytes);
+    return WorthLeaving(unchanged, sectors, flash.sectorBytes);
+}
+
+image::Image ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                         const FlashGeometry& flash) {
+    reader.Halt();
+    if (!HoldsASample(reader, image, flash)) return {};
+    return ReadRanges(reader, meter, Phase::Look, SectorsOf(image, flash));
 }
 
 }  // namespace host

@@ -6,12 +6,12 @@
 #include <vector>
 
 #include "base/AddressSet.h"
+#include "host/driver/FlashReader.h"
 #include "host/flashing/Sectors.h"
 #include "host/image/Image.h"
+#include "host/output/WorkMeter.h"
 
 namespace host {
-
-class FlashDevice;
 
 /// What a load of the necessary sectors leaves in a range of them: the image's bytes, and 0xFF
 /// elsewhere.
@@ -29,8 +29,14 @@ base::AddressSet WorthLeaving(const base::AddressSet& unchanged, const base::Add
 /// The image without the bytes that lie in a set.
 image::Image Without(const image::Image& image, const base::AddressSet& addresses);
 
-/// Reads the image's sectors, and returns those worth leaving alone. Unless one of the samples
-/// holds the image's bytes, nothing else is read. The target is halted first.
-base::AddressSet FindUnchanged(FlashDevice& device, const image::Image& image);
+/// The sectors of the image that hold what they should by what was read of the flash, and are worth
+/// leaving alone.
+base::AddressSet Unchanged(const image::Image& image, const image::Image& flashNow,
+                           const FlashGeometry& flash);
+
+/// Reads the image's sectors, to see which of them can be left alone. Unless one of the samples
+/// holds the image's bytes, nothing else is read and nothing returned. The target is halted first.
+image::Image ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                         const FlashGeometry& flash);
 
 }  // namespace host

@@ -4,6 +4,8 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+
 #include "host/driver/FlashDevice.h"
 #include "host/facts/Operations.h"
 #include "host/facts/SettingKeys.h"
@@ -20,13 +22,12 @@ std::uint32_t PublishedRegister(const FlashDevice& device, unsigned index) {
                             "what the plug-in has read");
 }
 
-void ChooseCommit(FlashDevice& device, const char* key, bool asked) {
-    SettingStore& settings = device.Settings();
+void ChooseCommit(SettingStore& settings, Reporter& reporter, const char* key, bool asked) {
     if (asked) return settings.Set(Origin::CommandLine, key, "1");
     const auto [text, origin] = settings.Get(key);
     if (origin == Origin::Default) return;
-    device.Output().Say(Talk::Normal, fmt::format("{} is {} ({})", key, text,
-                                                  OriginText(origin, settings.Paths())));
+    reporter.Say(Talk::Normal,
+                 fmt::format("{} is {} ({})", key, text, OriginText(origin, settings.Paths())));
 }
 
 RegisterValues CheckRegisters(FlashDevice& device, const RegisterValues& expected,
@@ -41,23 +42,21 @@ RegisterValues CheckRegisters(FlashDevice& device, const RegisterValues& expecte
             "may not take another value",
             index, *values[index], *expected[index]);
     }
-    outcome.result["registers"] = ToJson(device.Registers(), values);
+    outcome.result["registers"] = ToJson(device.UserRegisters(), values);
     return values;
 }
 
-void SayWhetherCommitted(FlashDevice& device, Outcome& outcome) {
-    bool committed = true;
-    for (const unsigned index : {0U, 1U}) {
-        const UserRegister& state = device.Registers().Of(index);
-        committed = committed && (!state.written || state.commit == Commit::Done);
-    }
+void SayWhetherCommitted(Reporter& reporter, const UserRegisterWork& work, Outcome& outcome) {
+    const bool committed = std::ranges::all_of(work.registers, [](const UserRegister& one) {
+        return !one.written || one.commit == Commit::Done;
+    });
     outcome.result["committed"] = committed;
     if (outcome.status != ExitStatus::Done) return;
-    device.Output().Say(
-        Talk::Normal, committed ? "Committed: the value stays after a reset."
-                                : "Not committed: the next reset of the device (a simulated one is "
-                                  "reset after each run) brings back what was committed last; "
-                                  "--commit keeps the value.");
+    reporter.Say(Talk::Normal,
+                 committed ? "Committed: the value stays after a reset."
+                           : "Not committed: the next reset of the device (a simulated one is "
+                             "reset after each run) brings back what was committed last; "
+                             "--commit keeps the value.");
 }
 
 }  // namespace host

@@ -7,6 +7,7 @@
 
 #include "host/driver/RegisterWatch.h"
 #include "host/output/Reporter.h"
+#include "host/settings/SettingStore.h"
 
 namespace host {
 
@@ -20,7 +21,7 @@ std::uint32_t PublishedRegister(const FlashDevice& device, unsigned index);
 
 /// Whether the programming to come commits its value: when that was `asked` for, or else when the
 /// setting `key` says so, which is then shown with where it comes from.
-void ChooseCommit(FlashDevice& device, const char* key, bool asked);
+void ChooseCommit(SettingStore& settings, Reporter& reporter, const char* key, bool asked);
 
 /// Reads both registers after a programming operation that reported success, and puts what they
 /// hold into the outcome. It is a failure (ContentsDiffer) when one isn't as expected; where
@@ -29,6 +30,6 @@ RegisterValues CheckRegisters(FlashDevice& device, const RegisterValues& expecte
                               Outcome& outcome);
 
 /// Says so, and puts it into the outcome: whether all that was programmed was seen to be committed.
-void SayWhetherCommitted(FlashDevice& device, Outcome& outcome);
+void SayWhetherCommitted(Reporter& reporter, const UserRegisterWork& work, Outcome& outcome);
 
 }  // namespace host

@@ -5,6 +5,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 
 namespace host {
 
@@ -34,13 +35,25 @@ struct PhaseProgress {
     std::uint64_t doneBytes = 0;
     std::uint64_t totalBytes = 0;  ///< 0 until the phase is expected
     double seconds = 0;
-    double simulatedSeconds = 0;  ///< of a target that simulates its time
+    std::optional<double> simulatedSeconds = {};  ///< of a target that simulates its time
 
     unsigned Percent() const {
         return totalBytes == 0 ? 0 : static_cast<unsigned>(doneBytes * 100 / totalBytes);
     }
 
     bool operator==(const PhaseProgress&) const = default;
+};
+
+/// How far each phase of a run has come.
+class PhaseRecord {
+  public:
+    const PhaseProgress& operator[](Phase phase) const {
+        return all_[static_cast<std::size_t>(phase)];
+    }
+    PhaseProgress& operator[](Phase phase) { return all_[static_cast<std::size_t>(phase)]; }
+
+  private:
+    std::array<PhaseProgress, kPhaseNames.size()> all_{};
 };
 
 }  // namespace host

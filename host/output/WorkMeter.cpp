@@ -7,7 +7,7 @@
 namespace host {
 
 void WorkMeter::Expect(Phase phase, std::uint64_t bytes) {
-    At(phase).totalBytes += bytes;
+    phases_[phase].totalBytes += bytes;
 }
 
 void WorkMeter::Begin(Phase phase) {
@@ -15,13 +15,13 @@ void WorkMeter::Begin(Phase phase) {
     current_ = phase;
     since_ = Clock::now();
     if (simulatedNow_) simulatedSince_ = simulatedNow_();
-    reporter_.Progress(phase, At(phase));
+    reporter_.Progress(phase, phases_[phase]);
 }
 
 void WorkMeter::Advance(std::uint64_t bytes) {
     if (!current_) return;
     TakeTime();
-    PhaseProgress& progress = At(*current_);
+    PhaseProgress& progress = phases_[*current_];
     progress.doneBytes += bytes;
     // More work than was announced: the total grows with it rather than be wrong.
     if (progress.totalBytes != 0)
@@ -37,12 +37,13 @@ void WorkMeter::End() {
 void WorkMeter::TakeTime() {
     if (!current_) return;
     const auto now = Clock::now();
-    At(*current_).seconds += std::chrono::duration<double>(now - since_).count();
+    phases_[*current_].seconds += std::chrono::duration<double>(now - since_).count();
     since_ = now;
     if (!simulatedNow_) return;
     const auto simulated = simulatedNow_();
-    At(*current_).simulatedSeconds +=
-        std::chrono::duration<double>(simulated - simulatedSince_).count();
+    std::optional<double>& seconds = phases_[*current_].simulatedSeconds;
+    seconds =
+        seconds.value_or(0) + std::chrono::duration<double>(simulated - simulatedSince_).count();
     simulatedSince_ = simulated;
 }
 

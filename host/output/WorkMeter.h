@@ -2,7 +2,6 @@
 
 #pragma once
 
-#include <array>
 #include <chrono>
 #include <cstdint>
 #include <functional>
@@ -21,7 +20,6 @@ class WorkMeter {
     void SetSimulatedClock(std::function<std::chrono::nanoseconds()> now) {
         simulatedNow_ = std::move(now);
     }
-    bool SimulatesTime() const { return simulatedNow_ != nullptr; }
 
     /// Announces work to come, so that its total is known before it starts.
     void Expect(Phase phase, std::uint64_t bytes);
@@ -33,16 +31,15 @@ class WorkMeter {
     void End();
 
     std::optional<Phase> Running() const { return current_; }
-    const PhaseProgress& Of(Phase phase) const { return phases_[static_cast<std::size_t>(phase)]; }
+    const PhaseRecord& Phases() const { return phases_; }
 
   private:
     using Clock = std::chrono::steady_clock;
 
-    PhaseProgress& At(Phase phase) { return phases_[static_cast<std::size_t>(phase)]; }
     void TakeTime();
 
     Reporter& reporter_;
-    std::array<PhaseProgress, kPhaseNames.size()> phases_{};
+    PhaseRecord phases_;
     std::optional<Phase> current_;
     Clock::time_point since_;
     std::function<std::chrono::nanoseconds()> simulatedNow_;

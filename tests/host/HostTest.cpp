@@ -27,7 +27,7 @@
 #include "host/flashing/Comparison.h"
 #include "host/flashing/FlashMap.h"
 #include "host/flashing/KeptBytes.h"
-#include "host/flashing/ProgramPlan.h"
+#include "host/flashing/LoadPlan.h"
 #include "target/simulated/SimulatedDevice.h"
 
 namespace host {
@@ -265,7 +265,7 @@ image::Section Joined(image::Section section, const std::vector<image::Section>&
     return section;
 }
 
-TEST(ProgramPlan, ErasesJoinsAndCounts) {
+TEST(LoadPlan, ErasesJoinsAndCounts) {
     using Kind = EraseChoice::Kind;
     const FlashGeometry flash{0x10000, 0x400};
     const image::Section a = Bytes(0x10, 0x20, 1);   // sector 0
@@ -274,24 +274,52 @@ TEST(ProgramPlan, ErasesJoinsAndCounts) {
         Bytes(0x1000, 0x801, 3);  // sectors 4 to 6, behind a gap of more than one chunk
     const struct {
         EraseChoice erase;
-        ProgramPlan expected;
+        LoadPlan expected;
     } cases[] = {
         {{Kind::Necessary, {}},
-         {{Joined(a, {b}), c}, {{0, 0x7FF}, {0x1000, 0x1BFF}}, 0x1400, 5, 0x831, 0xF00, 0xBCF}},
-        {{Kind::Nothing, {}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0}},
+         {{Joined(a, {b}), c},
+          {{0, 0x7FF}, {0x1000, 0x1BFF}},
+          0x1400,
+          5,
+          0x831,
+          0xF00,
+          0xBCF,
+          {Kind::Necessary}}},
+        {{Kind::Nothing, {}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Nothing}}},
         {{Kind::Everything, {}},
-         {{Joined(a, {b}), c}, {{0, 0xFFFF}}, 0x10000, 64, 0x831, 0xF00, 0xF7CF, true}},
+         {{Joined(a, {b}), c},
+          {{0, 0xFFFF}},
+          0x10000,
+          64,
+          0x831,
+          0xF00,
+          0xF7CF,
+          {Kind::Everything}}},
         {{Kind::Range, {0x3FF, 0x400}},
-         {{Joined(a, {b}), c}, {{0, 0x7FF}}, 0x800, 2, 0x831, 0xF00, 0x7D0}},
+         {{Joined(a, {b}), c},
+          {{0, 0x7FF}},
+          0x800,
+          2,
+          0x831,
+          0xF00,
+          0x7D0,
+          {Kind::Range, {0x3FF, 0x400}}}},
         {{Kind::Range, {0x5FF, 0x600}},
-         {{a, b, c}, {{0x400, 0x7FF}}, 0x400, 1, 0x831, 0x980, 0x3F0}},
-        {{Kind::Range, {2, 1}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0}},
+         {{a, b, c},
+          {{0x400, 0x7FF}},
+          0x400,
+          1,
+          0x831,
+          0x980,
+          0x3F0,
+          {Kind::Range, {0x5FF, 0x600}}}},
+        {{Kind::Range, {2, 1}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Range, {2, 1}}}},
     };
     image::Image image;
     for (const image::Section& section : {a, b, c})
         image.Add(section.address, section.bytes, "test");
     for (const auto& [erase, expected] : cases) {
-        EXPECT_EQ(PlanProgram(image, {}, flash, erase), expected)
+        EXPECT_EQ(PlanLoad({.erase = erase, .time = {0s, true}}, image, {}, flash), expected)
             << static_cast<int>(erase.kind) << " " << RangeText(erase.range);
     }
 }
@@ -308,7 +336,7 @@ std::vector<std::uint8_t> FlashAfter(const std::vector<base::AddressRange>& eras
     return flash;
 }
 
-TEST(ProgramPlan, JoiningChangesNoByteOfFlash) {
+TEST(LoadPlan, JoiningChangesNoByteOfFlash) {
     std::mt19937 engine(4711);
     const auto random = [&](std::uint32_t below) {
         return static_cast<std::uint32_t>(engine() % below);
@@ -324,7 +352,7 @@ TEST(ProgramPlan, JoiningChangesNoByteOfFlash) {
         }
         const EraseChoice erase{static_cast<EraseChoice::Kind>(random(4)),
                                 {random(0x4000), 0x4000 + random(0x4000)}};
-        const ProgramPlan plan = PlanProgram(image, {}, {0x8000, 0x400}, erase);
+        const LoadPlan plan = PlanLoad({.erase = erase}, image, {}, {0x8000, 0x400});
         EXPECT_LE(plan.sections.size(), image.Sections().size());
         EXPECT_EQ(FlashAfter(plan.erased, plan.sections), FlashAfter(plan.erased, image.Sections()))
             << "round " << round;
@@ -349,7 +377,7 @@ TEST(FlashMap, TellsWhatALoadDoesToEachPart) {
     image::Image image;
     image.Add(16, std::vector<std::uint8_t>(4, 0), "image");   // programmed, and 20 cleared
     image.Add(34, std::vector<std::uint8_t>(14, 0), "image");  // there already
-    ProgramPlan plan;
+    LoadPlan plan;
     plan.sections = {image.Sections()[0]};
     plan.erased = {{16, 31}};
     const FlashGeometry flash{64, 16};
@@ -500,13 +528,13 @@ TEST(FlashWatch, CountsAnEraseWhenTheDeviceSaysItIsDone) {
               (std::vector<base::AddressRange>{{0x800, 0xBFF}}));
     EXPECT_TRUE(test.watch.Work().erased.Empty());
     test.watch.Read(0x400FD008, 4, busy);
-    EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0U);
+    EXPECT_EQ(test.meter.Phases()[Phase::Erase].doneBytes, 0U);
     test.watch.Read(0x400FD008, 4, idle);
     test.watch.Read(0x400FD008, 4, idle);
-    EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x400U);
+    EXPECT_EQ(test.meter.Phases()[Phase::Erase].doneBytes, 0x400U);
     test.watch.Writing(0x400FD008, 0xA4420004);
     test.watch.Read(0x400FD008, 4, idle);
-    EXPECT_EQ(test.meter.Of(Phase::Erase).doneBytes, 0x40400U);
+    EXPECT_EQ(test.meter.Phases()[Phase::Erase].doneBytes, 0x40400U);
 }
 
 TEST(WorkMeter, GivesEachPhaseTheTimeInWhichItIsTheCurrentOne) {
@@ -521,8 +549,8 @@ TEST(WorkMeter, GivesEachPhaseTheTimeInWhichItIsTheCurrentOne) {
     const Seconds elapsed = std::chrono::steady_clock::now() - start;
     std::this_thread::sleep_for(2ms);
     test.meter.End();
-    const double read = test.meter.Of(Phase::Read).seconds;
-    const double verified = test.meter.Of(Phase::Verify).seconds;
+    const double read = test.meter.Phases()[Phase::Read].seconds;
+    const double verified = test.meter.Phases()[Phase::Verify].seconds;
     EXPECT_GE(read, 0.004);
     EXPECT_GE(verified, 0.002);
     EXPECT_LE(read + verified, elapsed.count());

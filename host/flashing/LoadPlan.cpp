@@ -1,25 +1,25 @@
-// From an image, a flash geometry and an erase choice to a plan; no device is needed.
+// From a request, an image and what flash holds to a plan; no device is needed.
 
-#include "host/flashing/ProgramPlan.h"
+#include "host/flashing/LoadPlan.h"
 
 #include <fmt/format.h>
 
 #include <algorithm>
 #include <iterator>
 
-#include "host/facts/FlashMemory.h"
+#include "host/base/Text.h"
 #include "host/facts/LoaderMemory.h"
 #include "host/flashing/Unchanged.h"
-#include "host/settings/RangeSettings.h"
 
 namespace host {
 
 namespace {
 
 using plugin::kBlockBytes;
+using plugin::kChunkBytes;
 
 /// The longest gap that is cheaper to fill than to start the loader once more for: one chunk.
-constexpr std::uint64_t kGapBytesMax = plugin::kChunkBytes;
+constexpr std::uint64_t kGapBytesMax = kChunkBytes;
 
 std::vector<base::AddressRange> ErasedRuns(const image::Image& image, const FlashGeometry& flash,
                                            const EraseChoice& erase) {
@@ -84,25 +84,27 @@ std::uint64_t WidenedBytes(const image::Section& section) {
     return (last - first + 1) * kBlockBytes;
 }
 
-}  // namespace
-
-EraseChoice ChosenErase(const SettingStore& settings) {
-    using Kind = EraseChoice::Kind;
-    const std::string option = settings.Text(keys::kProgramOption);
-    if (option == keys::kNecessaryPages) return {Kind::Necessary, {}};
-    if (option == keys::kNoErase) return {Kind::Nothing, {}};
-    const auto range = SelectedRange(settings, kEraseKeys);
-    return range ? EraseChoice{Kind::Range, *range} : EraseChoice{Kind::Everything, {}};
+/// The plug-in's limit is for its polls of a section together, so a fixed one would fail large
+/// images on slow flash: each chunk may cost two polls more, unless the user has set a limit.
+std::chrono::seconds SectionTime(const LoadTime& time, std::uint64_t transferBytes) {
+    constexpr std::uint64_t kChunksPerSecond = 5;
+    if (time.chosen) return time.limit;
+    return time.limit + std::chrono::seconds(transferBytes / (kChunkBytes * kChunksPerSecond));
 }
 
-ProgramPlan PlanProgram(const image::Image& image, const base::AddressSet& unchanged,
-                        const FlashGeometry& flash, const EraseChoice& erase) {
-    const image::Image changed = Without(image, unchanged);
-    ProgramPlan plan;
-    plan.erased = ErasedRuns(changed, flash, erase);
-    plan.erasesWhole = ErasesWhole(plan.erased, flash, erase);
+}  // namespace
+
+LoadPlan PlanLoad(const LoadRequest& request, const image::Image& image,
+                  const image::Image& flashNow, const FlashGeometry& flash) {
+    LoadPlan plan;
+    plan.unchanged = Unchanged(image, flashNow, flash);
+    const image::Image changed = Without(image, plan.unchanged);
+    plan.erased = ErasedRuns(changed, flash, request.erase);
+    plan.erase = ErasesWhole(plan.erased, flash, request.erase)
+                     ? EraseChoice{EraseChoice::Kind::Everything}
+                     : request.erase;
+    plan.checks = request.checks;
     plan.sections = Join(changed, plan.erased);
-    plan.unchanged = unchanged;
     plan.imageBytes = image.ByteCount();
     plan.unchangedBytes = plan.imageBytes - changed.ByteCount();
     for (const image::Section& section : plan.sections)
@@ -114,15 +116,27 @@ ProgramPlan PlanProgram(const image::Image& image, const base::AddressSet& uncha
     plan.clearedBytes = plan.erasedBytes;
     for (const image::Section& section : changed.Sections())
         plan.clearedBytes -= ErasedBytes({section.address, section.Last()}, plan.erased);
+    plan.chunkTime = request.time.limit;
+    plan.sectionTime = SectionTime(request.time, plan.transferBytes);
     return plan;
 }
 
-std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& flash) {
+void ExpectLoad(WorkMeter& meter, const LoadPlan& plan, const FlashGeometry& flash) {
+    meter.Expect(Phase::Erase, plan.erasedBytes);
+    meter.Expect(Phase::Program, plan.transferBytes);
+    if (plan.checks.blankCheck)
+        for (const image::Section& section : plan.sections)
+            meter.Expect(Phase::BlankCheck, Widened({section.address, section.Last()}, 4).Size());
+    if (plan.checks.checksum) meter.Expect(Phase::Checksum, flash.flashBytes);
+    if (plan.checks.compare) meter.Expect(Phase::Verify, plan.imageBytes);
+}
+
+std::vector<std::string> Describe(const LoadPlan& plan, const FlashGeometry& flash) {
     std::vector<std::string> lines;
     for (const base::AddressRange& run : plan.erased)
         lines.push_back(fmt::format("erase    {:<23} {}{}", RangeText(run),
                                     CountText(SectorCount(run, flash), "sector"),
-                                    plan.erasesWhole ? ", all at once" : ""));
+                                    plan.ErasesWhole() ? ", all at once" : ""));
     if (plan.erased.empty()) lines.emplace_back("erase    nothing");
     for (const image::Section& section : plan.sections)
         lines.push_back(fmt::format("program  {:<23} {}",
@@ -137,6 +151,21 @@ std::vector<std::string> Describe(const ProgramPlan& plan, const FlashGeometry& 
                     SizeText(plan.imageBytes), SizeText(plan.clearedBytes),
                     SizeText(flash.flashBytes - plan.erasedBytes)));
     return lines;
+}
+
+Json ToJson(const LoadPlan& plan) {
+    Json sections = Json::array();
+    for (const image::Section& section : plan.sections)
+        sections.push_back({{"address", section.address}, {"bytes", section.bytes.size()}});
+    Json erased = Json::array();
+    for (const base::AddressRange& run : plan.erased)
+        erased.push_back({{"address", run.first}, {"bytes", run.Size()}});
+    return {{"sections", sections},
+            {"erased", erased},
+            {"sectors", plan.sectorCount},
+            {"imageBytes", plan.imageBytes},
+            {"unchangedBytes", plan.unchangedBytes},
+            {"clearedBytes", plan.clearedBytes}};
 }
 
 }  // namespace host
