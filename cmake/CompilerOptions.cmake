@@ -1,5 +1,5 @@
-# corvane_options(TARGET): what every target of the project is compiled with. The presets make
-# warnings errors; whoever packages it with another compiler is only warned.
+# corvane_options(TARGET): what every target of the project is compiled with. Only the presets
+# of CI make warnings errors: whoever builds it with another compiler is warned and goes on.
 #
 # GCC 12 finds overlapping copies in std::string that cannot happen, hence -Wno-restrict.
 

@@ -57,7 +57,7 @@ std::string Suggestion(const std::string& word, const std::vector<std::string>& 
     return nearest == nullptr ? "" : fmt::format("; did you mean '{}'?", *nearest);
 }
 
-bool EqualButForCase(const std::string& one, const std::string& other) {
+bool EqualButForCase(std::string_view one, std::string_view other) {
     return std::equal(one.begin(), one.end(), other.begin(), other.end(), Equal);
 }
 

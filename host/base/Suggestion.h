@@ -3,6 +3,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace host {
@@ -12,6 +13,6 @@ namespace host {
 std::string Suggestion(const std::string& word, const std::vector<std::string>& known);
 
 /// Whether two words differ in the case of their letters at most.
-bool EqualButForCase(const std::string& one, const std::string& other);
+bool EqualButForCase(std::string_view one, std::string_view other);
 
 }  // namespace host

@@ -49,16 +49,22 @@ std::vector<std::string> WordsForParser(const std::vector<std::string>& words) {
     return prepared;
 }
 
+/// CLI11 lets arguments have few characters in their names: of "[HOST:]PORT" it sees PORT.
+std::string NamesForParser(const OptionRow& row) {
+    const std::string names = row.names;
+    return names.substr(names.find(']') + 1);
+}
+
 /// Texts are taken as they come, an empty one too, and the last of several counts.
 template <typename Text>
 CLI::Option* DefineText(CLI::App& app, const OptionRow& row, Text& target) {
     CLI::Option* option = app.add_option_function<std::string>(
-        row.names, [&target](const std::string& text) { target = text; });
+        NamesForParser(row), [&target](const std::string& text) { target = text; });
     return option->multi_option_policy(CLI::MultiOptionPolicy::TakeLast);
 }
 
 CLI::Option* DefineTexts(CLI::App& app, const OptionRow& row, std::vector<std::string>& target) {
-    return app.add_option(row.names, target)->allow_extra_args(row.IsArgument());
+    return app.add_option(NamesForParser(row), target)->allow_extra_args(row.IsArgument());
 }
 
 CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options) {

@@ -106,7 +106,7 @@ std::span<const SettingInfo> SettingCatalogue() {
     return kCatalogue;
 }
 
-const SettingInfo* FindSetting(const std::string& key) {
+const SettingInfo* FindSetting(std::string_view key) {
     const auto found =
         std::find_if(std::begin(kCatalogue), std::end(kCatalogue),
                      [&](const SettingInfo& info) { return EqualButForCase(key, info.key); });
@@ -119,12 +119,12 @@ bool IsOfOneBoard(const std::string& key) {
            std::find(std::begin(inputs), std::end(inputs), key) != std::end(inputs);
 }
 
-std::string UnknownSetting(const std::string& key) {
+std::string UnknownSetting(std::string_view key) {
     std::vector<std::string> keys;
     for (const SettingInfo& info : kCatalogue)
         keys.emplace_back(info.key);
     return fmt::format("unknown setting '{}'{}; 'corvane-flash settings' lists all keys", key,
-                       Suggestion(key, keys));
+                       Suggestion(std::string(key), keys));
 }
 
 std::string AcceptedTexts(const SettingInfo& info) {

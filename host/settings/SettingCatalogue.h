@@ -5,6 +5,7 @@
 
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace host {
@@ -22,14 +23,14 @@ struct SettingInfo {
 std::span<const SettingInfo> SettingCatalogue();
 
 /// The row of a key in any case of its letters, or null.
-const SettingInfo* FindSetting(const std::string& key);
+const SettingInfo* FindSetting(std::string_view key);
 
 /// Whether a setting is the MAC address or a register value of one board. Such a text is never
 /// kept, or it would become the input for the next board.
 bool IsOfOneBoard(const std::string& key);
 
 /// What to say of a key that has no row.
-std::string UnknownSetting(const std::string& key);
+std::string UnknownSetting(std::string_view key);
 
 /// The accepted texts, for people: "0 or 1", "hexadecimal, up to ffffffff".
 std::string AcceptedTexts(const SettingInfo& info);

@@ -97,7 +97,7 @@ std::string EnvironmentName(const std::string& key) {
     return std::string(kEnvironmentPrefix) + key;
 }
 
-const SettingInfo& RequireSetting(const std::string& key, const std::string& where) {
+const SettingInfo& RequireSetting(std::string_view key, std::string_view where) {
     if (const SettingInfo* info = FindSetting(key)) return *info;
     throw Failure(ExitStatus::WrongUsage, fmt::format("{}: {}", where, UnknownSetting(key)));
 }

@@ -5,6 +5,7 @@
 #include <array>
 #include <map>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "host/files/FileLock.h"
@@ -85,7 +86,7 @@ SettingStore LoadSettings(const std::string& settingsFile,
                           const std::vector<std::string>& assignments);
 
 /// The row of the catalogue; Failure (WrongUsage) for an unknown key, beginning with `where`.
-const SettingInfo& RequireSetting(const std::string& key, const std::string& where);
+const SettingInfo& RequireSetting(std::string_view key, std::string_view where);
 
 /// CheckedText with a Failure (WrongUsage) that begins with `where`.
 std::string RequireText(const SettingInfo& info, const std::string& text, const std::string& where);

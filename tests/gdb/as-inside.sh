@@ -2,10 +2,12 @@
 # Sourced with $tool set: a place to work in, and the commands that must find a device behind a GDB
 # server as they find it inside the process.
 
+firmware=$(cd "$(dirname "${BASH_SOURCE[0]}")/../../examples/firmware" && pwd)
 work=$(mktemp -d)
 cd "$work"
 export XDG_CONFIG_HOME=$work XDG_STATE_HOME=$work
-elf=/usr/lib/firmware-tomu/toboot.elf
+"$firmware/build.sh" "$work"
+elf=firmware.elf
 
 require() {
     local program

@@ -5,9 +5,16 @@
 
 int test::failingAllocation = 0;
 
-[[gnu::noinline]] void* operator new(std::size_t size) {
+// All forms of new whose memory the delete below may get: those of the sanitizers give memory that
+// free() doesn't take back.
+
+[[gnu::noinline]] void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
     const bool fails = test::failingAllocation > 0 && --test::failingAllocation == 0;
-    void* memory = fails ? nullptr : std::malloc(size);
+    return fails ? nullptr : std::malloc(size);
+}
+
+[[gnu::noinline]] void* operator new(std::size_t size) {
+    void* memory = operator new(size, std::nothrow);
     if (memory == nullptr) throw std::bad_alloc();
     return memory;
 }

@@ -65,8 +65,10 @@ class Workplace {
             "' && exec >.out 2>.err </dev/null\n"
             "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
             "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_PLUGIN\n"
-            "ELF=/usr/lib/firmware-tomu/toboot.elf HEX=/usr/lib/firmware-tomu/toboot.ihex\n"
-            "BIN=/usr/lib/firmware-tomu/toboot.bin\n"
+            "ELF='" FIRMWARE_DIRECTORY "/firmware.elf' HEX='" FIRMWARE_DIRECTORY
+            "/firmware.ihex'\n"
+            "BIN='" FIRMWARE_DIRECTORY
+            "/firmware.bin'\n"
             "tool() { \"" CORVANE_FLASH_TOOL "\" \"$@\"; }\n" +
             commands + "\n";
         const int status = std::system(script.c_str());
@@ -102,12 +104,12 @@ const Row kDone[] = {
      ""},
     {"tool info --sim velk", 0, "Flash       none", ""},
     {"CORVANE_SIM=quen tool info", 0, "Family      Quen", ""},
-    {"tool program $ELF", 0, "Erased        6 KiB", "5.5 KiB in 1 section for Tolva Rev.B"},
+    {"tool program $ELF", 0, "Erased        5 KiB", "4.5 KiB in 1 section for Tolva Rev.B"},
     {"tool -q program $ELF", 0, "", ""},
-    {"tool -v program $ELF", 0, nullptr, "erase    0x0-0x17ff"},
-    {"tool -vv program $ELF", 0, nullptr, "Erasing Flash Page @ address 0x1400 of size 0x400"},
-    {"tool program $ELF --crc", 0, "Checksummed   256 KiB", "CRC-32 value: 0xfe9214a8"},
-    {"tool program $ELF --blank-check", 0, "Blank-checked 5.5 KiB", "in 1 section"},
+    {"tool -v program $ELF", 0, nullptr, "erase    0x0-0x13ff"},
+    {"tool -vv program $ELF", 0, nullptr, "Erasing Flash Page @ address 0x1000 of size 0x400"},
+    {"tool program $ELF --crc", 0, "Checksummed   256 KiB", "CRC-32 value: 0xfe08dea"},
+    {"tool program $ELF --blank-check", 0, "Blank-checked 4.5 KiB", "in 1 section"},
     {"tool program $ELF --no-verify", 0, "Done: the image is programmed, but not compared\n",
      nullptr},
     {"tool program data.bin --base 800 --erase all", 0, "Erased        256 KiB", nullptr},
@@ -123,12 +125,12 @@ const Row kDone[] = {
     {"tool program data.bin --base 1083 --sim dorna,chunk-time=100ms", 0, "Written       384 bytes",
      nullptr},
     {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d", 0,
-     "Left alone    5.5 KiB\nDone: the flash held the image already\n", nullptr},
+     "Left alone    4.5 KiB\nDone: the flash held the image already\n", nullptr},
     {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d --dry-run", 0,
-     "erase    nothing\nleave    0x0-0x17ff              6 sectors with the image in place\n",
+     "erase    nothing\nleave    0x0-0x13ff              5 sectors with the image in place\n",
      nullptr},
     {"tool -q program $ELF --sim-file d && tool program $ELF --sim-file d --rewrite", 0,
-     "Erased        6 KiB", nullptr},
+     "Erased        5 KiB", nullptr},
     {"tool program small.hex data.bin --base 400 --dry-run --sim-file d && test ! -e d", 0,
      "erase    0x0-0x7ff               2 sectors\nprogram  0x10-0x52b              1.3 KiB\n"
      "304 bytes of the image; 1.7 KiB more are cleared with its sectors; 254 KiB of flash are not "
@@ -151,7 +153,7 @@ const Row kDone[] = {
     {"tool -q blank-check --range 5-5", 0, "0x5-0x5 is blank\n", nullptr},
     {"tool -q checksum", 0, "0xb7094978\n", ""},
     {"tool checksum --range 0-3", 0, "0xffffffff\n", ""},
-    {"tool checksum --of $ELF", 0, "0xfe9214a8\n", ""},
+    {"tool checksum --of $ELF", 0, "0xfe08dea\n", ""},
     {"tool checksum --of small.hex --range 10-13", 0, "0xb63cfbcd\n", ""},
     {"tool register read 1", 0, "0xffffffff\n", ""},
     {"tool register program 1 12ab", 0, "User register 1: was 0xffffffff, is 0x000012ab\n",
@@ -331,8 +333,8 @@ const Row kFailing[] = {
     {"tool blank-check --sim tolva,stuck-cell=0x1234", 5, "", "0x1234 holds 0x00"},
     // Ctrl-C; timeout interrupts the command, and then its whole group.
     {"timeout --preserve-status -s INT 1 " CORVANE_FLASH_TOOL
-     " program /usr/lib/firmware-tomu/toboot.elf --sim tolva,loader=hangs",
-     130, "", "interrupted; the flash is incomplete: 6 KiB erased"},
+     " program $ELF --sim tolva,loader=hangs",
+     130, "", "interrupted; the flash is incomplete: 5 KiB erased"},
     {"mkfifo f; timeout --foreground --preserve-status -s HUP 1 " CORVANE_FLASH_TOOL " program f",
      130, "", "interrupted"},
 };
@@ -399,7 +401,7 @@ INSTANTIATE_TEST_SUITE_P(Failing, CommandLine, testing::ValuesIn(kFailing));
 const Row kStories[] = {
     {"for f in $ELF $HEX '--base 0 '$BIN; do rm -f d; tool -q --sim-file d program $f;\n"
      "tool -q --sim-file d checksum; done",
-     0, "0xfe9214a8\n0xfe9214a8\n0xfe9214a8\n", ""},
+     0, "0xfe08dea\n0xfe08dea\n0xfe08dea\n", ""},
     {"export CORVANE_SIM_FILE=d; tool -q program $ELF\n"
      "for f in a.bin a.hex a.srec; do tool -q read $f; done\n"
      "for f in a.bin@0 a.hex a.srec; do tool -q verify $f; done\n"
@@ -504,7 +506,7 @@ const Row kStories[] = {
     {"tool program small.hex --keep --erase all", 2, "", "--keep goes with --erase necessary"},
     {"timeout --foreground -s INT 1 " CORVANE_FLASH_TOOL
      " --json -q program $ELF --sim tolva,loader=hangs | sed -n '$p'",
-     0, R"("clearedBytes":480,"keptBytes":0,"flashChanged":true,"phases":{"erase")", nullptr},
+     0, R"("clearedBytes":552,"keptBytes":0,"flashChanged":true,"phases":{"erase")", nullptr},
     // What the shells make of it: bash has taken the word apart, zsh would show what is added.
     {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
      ":$PATH bash -c '. "
