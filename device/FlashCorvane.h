@@ -2,14 +2,14 @@
 //
 // The record below is fixed when the object is built, the per-load state excepted. The operations
 // are member functions so that each can reach the record; where they live is said above each
-// group. Operations that face the user return true when they are done and false when they have
-// shown a failure. Whatever else goes wrong is an exception derived from std::exception.
+// group. What needs nothing but the host is a function of the file that uses it. Operations that
+// face the user return true when they are done and false when they have shown a failure. Whatever
+// else goes wrong is an exception derived from std::exception.
 
 #pragma once
 
 #include <array>
 #include <cstdint>
-#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -47,11 +47,8 @@ class FlashCorvane {
 
   private:
     using RangeOperation = bool (FlashCorvane::*)(std::uint32_t start, std::uint32_t end);
-    using ChunkConsumer = std::function<bool(const std::vector<std::uint8_t>& buffer,
-                                             std::uint32_t count, std::uint32_t address)>;
     using RegisterValues = std::array<std::uint32_t, 2>;
     using CommitRequests = std::array<bool, 2>;
-    struct WidenedImage;
     struct NamedOperation;
     struct Operations;
 
@@ -62,15 +59,9 @@ class FlashCorvane {
     // device/DeviceInformation.cpp
     std::int32_t VerboseMode() const;
 
-    // device/SettingsReset.cpp
-    bool ResetWatchdogs();
-
     // flash/InitializeDevice.cpp
     bool InitializeDevice();
     void SetUpClockAndTiming();
-    void SetFlashTiming();
-    void FixUpOrrinClock();
-    void FixUpQuenController();
     bool SystemResetAndHalt();
     bool ROMAliasClear();
 
@@ -81,22 +72,13 @@ class FlashCorvane {
     bool Erase();
     bool EraseAsSelected();
     bool MassErase();
-    bool PrepareFlashBlocks();
     bool PageErase(std::uint32_t start, std::uint32_t end);
     bool EraseSectors(std::uint32_t first, std::uint32_t last, std::uint32_t keyedCommand);
     bool EraseSector(std::uint32_t sector, std::uint32_t keyedCommand);
-    bool EraseFinished(std::uint32_t command, int polls, std::uint32_t pollIntervalMs);
 
     // flash/Program.cpp
     bool Program(const std::uint8_t* data, std::uint32_t address, std::uint32_t length,
                  std::int16_t page);
-    WidenedImage Widen(const std::uint8_t* data, std::uint32_t address, std::uint32_t length,
-                       std::int16_t page);
-    void StartLoader();
-    void StreamToLoader(const WidenedImage& image, std::int32_t budgetMs, std::int16_t page);
-    void ProgramChunk(const std::uint8_t* chunk, std::uint32_t count, std::uint32_t flashAddress,
-                      std::uint32_t index, std::int16_t page);
-    void WaitForLoader(std::uint32_t index, std::int32_t& budgetMs);
 
     // flash/ProgramLoad.cpp
     void EraseForSection(std::uint32_t address, std::uint32_t last);
@@ -106,8 +88,6 @@ class FlashCorvane {
     bool RunOnSelectedRange(const std::string& operationName, const std::string& selectionKey,
                             const std::string& startKey, const std::string& endKey,
                             RangeOperation operation);
-    bool ReadRangeInChunks(const ProgressHandle& progress, const std::string& text,
-                           std::uint32_t start, std::uint32_t end, const ChunkConsumer& consumer);
 
     // verify/BlankCheck.cpp
     bool BlankCheck();
@@ -125,9 +105,8 @@ class FlashCorvane {
     void RunOperation(std::string_view operationName);
     template <typename Step>
     void RunOperationStep(const std::string& statusText, const std::string& errorText, Step step);
-    void RunErase(const NamedOperation&);
-    void RunBlankCheck(const NamedOperation&);
-    void RunCalculateChecksum(const NamedOperation&);
+    void RunOneStep(const NamedOperation& operation);
+    void RunErase(const NamedOperation& operation);
     void RunUserRegisterOperation(const NamedOperation& operation);
     void RunTest(const NamedOperation&);
 
@@ -135,8 +114,6 @@ class FlashCorvane {
     bool UserRegisterOperation(const NamedOperation& operation);
     void ReadUserRegisters(RegisterChoice choice);
     bool ProgramUserRegisters(RegisterChoice choice);
-    void ReadUserRegister(std::uint32_t index, const RegisterValues& values);
-    void ProgramUserRegister(std::uint32_t index, CommitRequests& requests);
     void CommitUserRegister(std::uint32_t index);
 
     // operations/MacAddress.cpp

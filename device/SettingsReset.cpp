@@ -15,6 +15,15 @@ constexpr std::int32_t Checksum = 2;
 constexpr std::int32_t KeepErased = 4;
 }  // namespace ResetMode
 
+void ResetWatchdogs(const HostAccess& host, DeviceClass deviceClass) {
+    const bool newer = deviceClass > DeviceClass::Quen;
+    const std::uint32_t address = newer ? Register::WatchdogReset : Register::SoftwareReset0;
+    const std::uint32_t watchdogs = newer ? 0x3 : 0x10000008;
+
+    host.WriteWord(address, host.ReadWord(address) | watchdogs);
+    host.WriteWord(address, host.ReadWord(address) & ~watchdogs);
+}
+
 }  // namespace
 
 // The state is reset before any setting is read, so that a bad setting cannot leave half a load
@@ -33,18 +42,8 @@ void FlashCorvane::ResetSettings(std::int32_t mode) {
             CalculateChecksumByAddress(0, p_mFlashSize - 1);
         }
     } else if (mode == ResetMode::ResetWatchdogs) {
-        ResetWatchdogs();
+        ResetWatchdogs(p_mHost, p_mClassRev);
         p_mHost.SetSetting(Setting::FlashChecksumValue, "--");
     }
     TRACE(Result, "FlashCorvane::ResetSettings()");
-}
-
-bool FlashCorvane::ResetWatchdogs() {
-    const bool newer = p_mClassRev > DeviceClass::Quen;
-    const std::uint32_t address = newer ? Register::WatchdogReset : Register::SoftwareReset0;
-    const std::uint32_t watchdogs = newer ? 0x3 : 0x10000008;
-
-    p_mHost.WriteWord(address, p_mHost.ReadWord(address) | watchdogs);
-    p_mHost.WriteWord(address, p_mHost.ReadWord(address) & ~watchdogs);
-    return true;
 }

@@ -34,6 +34,33 @@ constexpr FlashBlockRow kFlashBlockRows[] = {
     {0x20000, Register::FlashBlock2, 0},
 };
 
+bool PrepareFlashBlocks(const HostAccess& host, std::uint32_t flashSize) {
+    const auto row = std::ranges::find(kFlashBlockRows, flashSize, &FlashBlockRow::flashSize);
+    if (row == std::end(kFlashBlockRows)) return false;
+
+    const auto writeAndPause = [&](std::uint32_t address, std::uint32_t value) {
+        host.WriteWord(address, value);
+        host.Sleep(kMassErasePauseMs);
+    };
+    for (std::uint32_t address = Register::FlashBlock3; address >= row->lowestCleared;
+         address -= 4) {
+        writeAndPause(address, 0);
+    }
+    if (row->halved != 0) {
+        writeAndPause(row->halved, host.ReadWord(Register::FlashBlock0) & 0xFFFF);
+    }
+    return true;
+}
+
+bool EraseFinished(const HostAccess& host, std::uint32_t command, int polls,
+                   std::uint32_t pollIntervalMs) {
+    for (int poll = 0; poll < polls; ++poll) {
+        if ((host.ReadWord(Register::FlashCommand) & command) == 0) return true;
+        host.Sleep(pollIntervalMs);
+    }
+    return false;
+}
+
 }  // namespace
 
 bool FlashCorvane::Erase() {
@@ -78,7 +105,7 @@ bool FlashCorvane::MassErase() {
     TRACE(Entry, "FlashCorvane::MassErase()");
     p_mHost.HaltTarget();
     const bool mesk = p_mClassRev == DeviceClass::MeskRevA || p_mClassRev == DeviceClass::MeskRevB;
-    if (mesk && !PrepareFlashBlocks()) {
+    if (mesk && !PrepareFlashBlocks(p_mHost, p_mFlashSize)) {
         TRACE(Result, "FlashCorvane::MassErase() = false, p_mFlashSize %u unsupported.",
               p_mFlashSize);
         return false;
@@ -86,7 +113,7 @@ bool FlashCorvane::MassErase() {
 
     p_mHost.WriteWord(Register::FlashCommand, KeyedCommand(FlashCommandBit::EraseAll));
     p_mHost.Sleep(kMassErasePauseMs);
-    if (!EraseFinished(FlashCommandBit::EraseAll, kMassErasePolls, kMassErasePauseMs)) {
+    if (!EraseFinished(p_mHost, FlashCommandBit::EraseAll, kMassErasePolls, kMassErasePauseMs)) {
         p_mHost.ShowErrorText("Flash Programmer: Erasing all of the flash contents failed!");
         TRACE(Result, "FlashCorvane::MassErase() = false");
         return false;
@@ -94,24 +121,6 @@ bool FlashCorvane::MassErase() {
     p_mHost.ResetTarget(false);
     ROMAliasClear();
     TRACE(Result, "FlashCorvane::MassErase() = true");
-    return true;
-}
-
-bool FlashCorvane::PrepareFlashBlocks() {
-    const auto row = std::ranges::find(kFlashBlockRows, p_mFlashSize, &FlashBlockRow::flashSize);
-    if (row == std::end(kFlashBlockRows)) return false;
-
-    const auto writeAndPause = [this](std::uint32_t address, std::uint32_t value) {
-        p_mHost.WriteWord(address, value);
-        p_mHost.Sleep(kMassErasePauseMs);
-    };
-    for (std::uint32_t address = Register::FlashBlock3; address >= row->lowestCleared;
-         address -= 4) {
-        writeAndPause(address, 0);
-    }
-    if (row->halved != 0) {
-        writeAndPause(row->halved, p_mHost.ReadWord(Register::FlashBlock0) & 0xFFFF);
-    }
     return true;
 }
 
@@ -164,13 +173,6 @@ bool FlashCorvane::EraseSector(std::uint32_t sector, std::uint32_t keyedCommand)
     p_mHost.Sleep(kSectorErasePauseMs);
     p_mHost.WriteWord(Register::FlashCommand, keyedCommand);
     p_mHost.Sleep(kSectorErasePauseMs);
-    return EraseFinished(FlashCommandBit::EraseSector, kSectorErasePolls, kSectorErasePauseMs);
-}
-
-bool FlashCorvane::EraseFinished(std::uint32_t command, int polls, std::uint32_t pollIntervalMs) {
-    for (int poll = 0; poll < polls; ++poll) {
-        if ((p_mHost.ReadWord(Register::FlashCommand) & command) == 0) return true;
-        p_mHost.Sleep(pollIntervalMs);
-    }
-    return false;
+    return EraseFinished(p_mHost, FlashCommandBit::EraseSector, kSectorErasePolls,
+                         kSectorErasePauseMs);
 }

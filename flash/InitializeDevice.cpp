@@ -8,6 +8,35 @@
 #include "plugin/Conversions.h"
 #include "plugin/Trace.h"
 
+namespace {
+
+// A host without a crystal setting, or a device that refuses it, still gets a timing that is safe.
+void SetFlashTiming(const HostAccess& host) {
+    try {
+        const std::uint32_t crystal = ParseHex(host.GetSetting(Setting::FlashCrystalFreq));
+        host.WriteWord(Register::FlashTiming, crystal - 1);
+    } catch (const std::exception&) {
+        host.WriteWord(Register::FlashTiming, 7);
+    }
+}
+
+// Only the first silicon of the class needs it.
+void FixUpOrrinClock(const HostAccess& host) {
+    if (host.ReadWord(Register::DeviceIdentification0) != 0x10040101) return;
+    const std::uint32_t clock2 = host.ReadWord(Register::ClockConfiguration2);
+    host.WriteWord(Register::ClockConfiguration2, clock2 & 0x7FFFFFFF);
+    host.WriteWord(Register::ClockConfiguration, 0x078E3AD1);
+    host.Sleep(20);
+}
+
+void FixUpQuenController(const HostAccess& host) {
+    host.WriteWord(Register::QuenUnlock, 3);
+    host.WriteWord(Register::QuenFixUp, 0);
+    host.WriteWord(Register::QuenUnlock, 0);
+}
+
+}  // namespace
+
 bool FlashCorvane::InitializeDevice() {
     TRACE(Entry, "FlashCorvane::InitializeDevice()");
     switch (p_mClassRev) {
@@ -19,10 +48,10 @@ bool FlashCorvane::InitializeDevice() {
             SetUpClockAndTiming();
             break;
         case DeviceClass::Orrin:
-            FixUpOrrinClock();
+            FixUpOrrinClock(p_mHost);
             break;
         case DeviceClass::Quen:
-            FixUpQuenController();
+            FixUpQuenController(p_mHost);
             break;
         case DeviceClass::Dorna:
             break;
@@ -39,7 +68,7 @@ void FlashCorvane::SetUpClockAndTiming() {
     const bool resetTarget = ParseBoolean(p_mHost.GetSetting(Setting::FlashResetSetting));
     if (resetTarget && p_mResetPending) SystemResetAndHalt();
 
-    SetFlashTiming();
+    SetFlashTiming(p_mHost);
     p_mHost.HaltTarget();
 
     // Every write starts from this one reading: the register must not be read again while the
@@ -55,31 +84,6 @@ void FlashCorvane::SetUpClockAndTiming() {
         p_mHost.WriteWord(Register::ClockConfiguration, (clock & ~0x005E0073u) | 0x07803B82);
     }
     p_mHost.Sleep(20);
-}
-
-// A host without a crystal setting, or a device that refuses it, still gets a timing that is safe.
-void FlashCorvane::SetFlashTiming() {
-    try {
-        const std::uint32_t crystal = ParseHex(p_mHost.GetSetting(Setting::FlashCrystalFreq));
-        p_mHost.WriteWord(Register::FlashTiming, crystal - 1);
-    } catch (const std::exception&) {
-        p_mHost.WriteWord(Register::FlashTiming, 7);
-    }
-}
-
-// Only the first silicon of the class needs it.
-void FlashCorvane::FixUpOrrinClock() {
-    if (p_mHost.ReadWord(Register::DeviceIdentification0) != 0x10040101) return;
-    const std::uint32_t clock2 = p_mHost.ReadWord(Register::ClockConfiguration2);
-    p_mHost.WriteWord(Register::ClockConfiguration2, clock2 & 0x7FFFFFFF);
-    p_mHost.WriteWord(Register::ClockConfiguration, 0x078E3AD1);
-    p_mHost.Sleep(20);
-}
-
-void FlashCorvane::FixUpQuenController() {
-    p_mHost.WriteWord(Register::QuenUnlock, 3);
-    p_mHost.WriteWord(Register::QuenFixUp, 0);
-    p_mHost.WriteWord(Register::QuenUnlock, 0);
 }
 
 bool FlashCorvane::SystemResetAndHalt() {

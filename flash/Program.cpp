@@ -44,11 +44,9 @@ void SleepForPollInterval() {
         std::this_thread::sleep_until(deadline);
 }
 
-}  // namespace
-
 /// A section completed to whole blocks with what the target holds around it. It refers to the
 /// caller's bytes and copies none of them; its size can exceed 32 bits.
-struct FlashCorvane::WidenedImage {
+struct WidenedImage {
     using Block = std::array<std::uint8_t, kBlockSize>;
     using Chunk = std::array<std::uint8_t, LoaderMemory::BufferSize>;
 
@@ -77,17 +75,77 @@ struct FlashCorvane::WidenedImage {
     }
 };
 
+// The blocks that the section begins and ends in are read before the target is touched.
+WidenedImage Widen(const HostAccess& host, const std::uint8_t* data, std::uint32_t address,
+                   std::uint32_t length, std::int16_t page) {
+    const std::uint32_t headSize = address % kBlockSize;
+    const std::uint32_t lastSize = (headSize + length) % kBlockSize;
+    const std::uint32_t padSize = lastSize == 0 ? 0 : kBlockSize - lastSize;
+    WidenedImage image{data, length, address - headSize, headSize, padSize};
+    if (headSize > 0) host.ReadBytes(image.head.data(), headSize, image.start, page);
+    if (padSize > 0) host.ReadBytes(image.pad.data(), padSize, address + length, page);
+    return image;
+}
+
+void StartLoader(const HostAccess& host) {
+    host.HaltTarget();
+    const std::string directory = host.Directory() + kLoaderSubdirectory;
+    host.LoadProgram(kLoaderFile, directory);
+    host.RunTarget();
+}
+
+// The bytes go first: the loader takes the chunk as soon as its status is pending.
+void ProgramChunk(const HostAccess& host, const std::uint8_t* chunk, std::uint32_t count,
+                  std::uint32_t flashAddress, std::uint32_t index, std::int16_t page) {
+    const std::uint32_t buffer = LoaderMemory::Buffers + index * LoaderMemory::BufferSize;
+    host.WriteBytes(chunk, count, buffer, page);
+    const std::array<std::uint32_t, 3> parameters = {flashAddress, count,
+                                                     LoaderMemory::ChunkPending};
+    host.WriteBytes(parameters.data(), sizeof parameters,
+                    ParameterBlock(index) + LoaderMemory::ChunkOffset, page);
+}
+
+void WaitForLoader(const HostAccess& host, std::uint32_t index, std::int32_t& budgetMs) {
+    const std::uint32_t status = ParameterBlock(index) + LoaderMemory::StatusOffset;
+    while (budgetMs > 0) {
+        if (host.ReadWord(status) != LoaderMemory::ChunkPending) return;
+        budgetMs -= kPollIntervalMs;
+        SleepForPollInterval();
+    }
+    throw std::runtime_error("Flash programming timed out.");
+}
+
+// While the loader works on one chunk, the next one goes into the other buffer. Each wait is for
+// the chunk handed over before the last one, so the first finds the idle second block, and nobody
+// waits for the last chunk here.
+void StreamToLoader(const HostAccess& host, const WidenedImage& image, std::int32_t budgetMs,
+                    std::int16_t page) {
+    WidenedImage::Chunk composed;
+    std::uint32_t index = 0;
+    for (std::uint64_t offset = 0; offset < image.Size();) {
+        const auto count = static_cast<std::uint32_t>(
+            std::min<std::uint64_t>(LoaderMemory::BufferSize, image.Size() - offset));
+        const auto flashAddress = static_cast<std::uint32_t>(image.start + offset);
+        ProgramChunk(host, image.Bytes(offset, count, composed), count, flashAddress, index, page);
+        index ^= 1;
+        offset += count;
+        WaitForLoader(host, index, budgetMs);
+    }
+}
+
+}  // namespace
+
 // Only failures of the stream are shown here; whatever fails before it is the caller's to report.
 bool FlashCorvane::Program(const std::uint8_t* data, std::uint32_t address, std::uint32_t length,
                            std::int16_t page) {
     TRACE(Entry, "FlashCorvane::Program(%p,0x%08X,0x%08X,%d)", static_cast<const void*>(data),
           address, length, page);
-    const WidenedImage image = Widen(data, address, length, page);
-    StartLoader();
+    const WidenedImage image = Widen(p_mHost, data, address, length, page);
+    StartLoader(p_mHost);
     const std::int32_t budgetMs =
         BudgetMs(ParseDecimal(p_mHost.GetSetting(Setting::FlashTimeoutValue)));
     try {
-        StreamToLoader(image, budgetMs, page);
+        StreamToLoader(p_mHost, image, budgetMs, page);
     } catch (const std::exception& error) {
         p_mHost.ShowErrorText(std::string("Flash Programmer: ") + error.what());
         TRACE(Result, "FlashCorvane::Program() = false %s", error.what());
@@ -95,63 +153,4 @@ bool FlashCorvane::Program(const std::uint8_t* data, std::uint32_t address, std:
     }
     TRACE(Result, "FlashCorvane::Program() = true");
     return true;
-}
-
-// The blocks that the section begins and ends in are read before the target is touched.
-FlashCorvane::WidenedImage FlashCorvane::Widen(const std::uint8_t* data, std::uint32_t address,
-                                               std::uint32_t length, std::int16_t page) {
-    const std::uint32_t headSize = address % kBlockSize;
-    const std::uint32_t lastSize = (headSize + length) % kBlockSize;
-    const std::uint32_t padSize = lastSize == 0 ? 0 : kBlockSize - lastSize;
-    WidenedImage image{data, length, address - headSize, headSize, padSize};
-    if (headSize > 0) p_mHost.ReadBytes(image.head.data(), headSize, image.start, page);
-    if (padSize > 0) p_mHost.ReadBytes(image.pad.data(), padSize, address + length, page);
-    return image;
-}
-
-void FlashCorvane::StartLoader() {
-    p_mHost.HaltTarget();
-    const std::string directory = p_mHost.Directory() + kLoaderSubdirectory;
-    p_mHost.LoadProgram(kLoaderFile, directory);
-    p_mHost.RunTarget();
-}
-
-// While the loader works on one chunk, the next one goes into the other buffer. Each wait is for
-// the chunk handed over before the last one, so the first finds the idle second block, and nobody
-// waits for the last chunk here.
-void FlashCorvane::StreamToLoader(const WidenedImage& image, std::int32_t budgetMs,
-                                  std::int16_t page) {
-    WidenedImage::Chunk composed;
-    std::uint32_t index = 0;
-    for (std::uint64_t offset = 0; offset < image.Size();) {
-        const auto count = static_cast<std::uint32_t>(
-            std::min<std::uint64_t>(LoaderMemory::BufferSize, image.Size() - offset));
-        const auto flashAddress = static_cast<std::uint32_t>(image.start + offset);
-        ProgramChunk(image.Bytes(offset, count, composed), count, flashAddress, index, page);
-        index ^= 1;
-        offset += count;
-        WaitForLoader(index, budgetMs);
-    }
-}
-
-// The bytes go first: the loader takes the chunk as soon as its status is pending.
-void FlashCorvane::ProgramChunk(const std::uint8_t* chunk, std::uint32_t count,
-                                std::uint32_t flashAddress, std::uint32_t index,
-                                std::int16_t page) {
-    const std::uint32_t buffer = LoaderMemory::Buffers + index * LoaderMemory::BufferSize;
-    p_mHost.WriteBytes(chunk, count, buffer, page);
-    const std::array<std::uint32_t, 3> parameters = {flashAddress, count,
-                                                     LoaderMemory::ChunkPending};
-    p_mHost.WriteBytes(parameters.data(), sizeof parameters,
-                       ParameterBlock(index) + LoaderMemory::ChunkOffset, page);
-}
-
-void FlashCorvane::WaitForLoader(std::uint32_t index, std::int32_t& budgetMs) {
-    const std::uint32_t status = ParameterBlock(index) + LoaderMemory::StatusOffset;
-    while (budgetMs > 0) {
-        if (p_mHost.ReadWord(status) != LoaderMemory::ChunkPending) return;
-        budgetMs -= kPollIntervalMs;
-        SleepForPollInterval();
-    }
-    throw std::runtime_error("Flash programming timed out.");
 }

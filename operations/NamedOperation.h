@@ -12,8 +12,15 @@ enum class RegisterChoice : std::uint8_t { Register0 = 0, Register1 = 1, MACAddr
 
 struct FlashCorvane::NamedOperation {
     const char* name;
+    bool listed;  ///< in the text that hosts show to their users
     void (FlashCorvane::*run)(const NamedOperation& operation);
-    bool listed;            ///< in the text that hosts show to their users
-    RegisterAccess access;  ///< of an operation on the user registers
-    RegisterChoice choice;
+
+    // The step that an operation on flash ends with, or consists of.
+    const char* statusText = nullptr;  ///< shown before it
+    const char* errorText = nullptr;   ///< shown when it has failed
+    bool (FlashCorvane::*step)() = nullptr;
+
+    // Of an operation on the user registers.
+    RegisterAccess access = {};
+    RegisterChoice choice = {};
 };

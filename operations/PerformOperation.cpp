@@ -35,18 +35,22 @@ struct FlashCorvane::Operations {
     using enum RegisterAccess;
     using enum RegisterChoice;
 
-    static constexpr auto runOnUserRegisters = &FlashCorvane::RunUserRegisterOperation;
+    static constexpr auto oneStep = &FlashCorvane::RunOneStep;
+    static constexpr auto onUserRegisters = &FlashCorvane::RunUserRegisterOperation;
     static constexpr NamedOperation table[] = {
-        {"Erase", &FlashCorvane::RunErase, kListed, {}, {}},
-        {"BlankCheck", &FlashCorvane::RunBlankCheck, kListed, {}, {}},
-        {"CalculateChecksum", &FlashCorvane::RunCalculateChecksum, kListed, {}, {}},
-        {"ProgramUserRegister0", runOnUserRegisters, kListed, Program, Register0},
-        {"ReadUserRegister0", runOnUserRegisters, kListed, Read, Register0},
-        {"ProgramUserRegister1", runOnUserRegisters, kListed, Program, Register1},
-        {"ReadUserRegister1", runOnUserRegisters, kListed, Read, Register1},
-        {"ProgramMACAddress", runOnUserRegisters, kListed, Program, MACAddress},
-        {"ReadMACAddress", runOnUserRegisters, kListed, Read, MACAddress},
-        {"Test", &FlashCorvane::RunTest, kUnlisted, {}, {}},
+        {"Erase", kListed, &FlashCorvane::RunErase, "Erasing device...", "Error erasing flash.",
+         &FlashCorvane::Erase},
+        {"BlankCheck", kListed, oneStep, "Performing Blank Check...",
+         "Error performing Blank Check.", &FlashCorvane::BlankCheck},
+        {"CalculateChecksum", kListed, oneStep, "Calculating CRC-32...", "Error calculating CRC.",
+         &FlashCorvane::CalculateChecksum},
+        {"ProgramUserRegister0", kListed, onUserRegisters, {}, {}, {}, Program, Register0},
+        {"ReadUserRegister0", kListed, onUserRegisters, {}, {}, {}, Read, Register0},
+        {"ProgramUserRegister1", kListed, onUserRegisters, {}, {}, {}, Program, Register1},
+        {"ReadUserRegister1", kListed, onUserRegisters, {}, {}, {}, Read, Register1},
+        {"ProgramMACAddress", kListed, onUserRegisters, {}, {}, {}, Program, MACAddress},
+        {"ReadMACAddress", kListed, onUserRegisters, {}, {}, {}, Read, MACAddress},
+        {"Test", kUnlisted, &FlashCorvane::RunTest},
     };
 };
 
@@ -90,21 +94,16 @@ void FlashCorvane::RunOperationStep(const std::string& statusText, const std::st
     p_mHost.ShowMessageText("Operation completed successfully.");
 }
 
-void FlashCorvane::RunErase(const NamedOperation&) {
+void FlashCorvane::RunOneStep(const NamedOperation& operation) {
+    RunOperationStep(operation.statusText, operation.errorText,
+                     [&] { return (this->*operation.step)(); });
+}
+
+void FlashCorvane::RunErase(const NamedOperation& operation) {
     RunOperationStep("Initializing device...", "Error initializing device.",
                      [this] { return InitializeDevice(); });
     ResetSettings(0);
-    RunOperationStep("Erasing device...", "Error erasing flash.", [this] { return Erase(); });
-}
-
-void FlashCorvane::RunBlankCheck(const NamedOperation&) {
-    RunOperationStep("Performing Blank Check...", "Error performing Blank Check.",
-                     [this] { return BlankCheck(); });
-}
-
-void FlashCorvane::RunCalculateChecksum(const NamedOperation&) {
-    RunOperationStep("Calculating CRC-32...", "Error calculating CRC.",
-                     [this] { return CalculateChecksum(); });
+    RunOneStep(operation);
 }
 
 void FlashCorvane::RunUserRegisterOperation(const NamedOperation& operation) {

@@ -23,6 +23,21 @@ std::uint32_t IndexOf(RegisterChoice choice) {
     return static_cast<std::uint32_t>(choice);
 }
 
+void PublishUserRegister(const HostAccess& host, std::uint32_t index, std::uint32_t value) {
+    const std::string text = ToHexText(value);
+    host.SetSetting(Setting::FlashUserRegisterInput[index], text);
+    host.ShowMessageText("User Register " + ToDecimalText(index) + " value: 0x" + text);
+}
+
+/// Returns whether it is to be committed.
+bool ProgramUserRegister(const HostAccess& host, std::uint32_t index) {
+    const std::uint32_t value = ParseHex(host.GetSetting(Setting::FlashUserRegisterInput[index]));
+    host.WriteWord(kRegisterAddresses[index], value);
+    host.ShowMessageText("Writing 0x" + ToHexText(value) + " to User Register " +
+                         ToDecimalText(index));
+    return ParseHex(host.GetSetting(Setting::FlashUserRegisterCommit[index])) == 1;
+}
+
 }  // namespace
 
 bool FlashCorvane::UserRegisterOperation(const NamedOperation& operation) {
@@ -56,7 +71,7 @@ void FlashCorvane::ReadUserRegisters(RegisterChoice choice) {
     if (choice == RegisterChoice::MACAddress) {
         ReadMACAddress(values);
     } else {
-        ReadUserRegister(IndexOf(choice), values);
+        PublishUserRegister(p_mHost, IndexOf(choice), values[IndexOf(choice)]);
     }
 }
 
@@ -65,7 +80,7 @@ void FlashCorvane::ReadUserRegisters(RegisterChoice choice) {
 bool FlashCorvane::ProgramUserRegisters(RegisterChoice choice) {
     CommitRequests requests{};
     if (choice != RegisterChoice::MACAddress) {
-        ProgramUserRegister(IndexOf(choice), requests);
+        requests[IndexOf(choice)] = ProgramUserRegister(p_mHost, IndexOf(choice));
     } else if (!ProgramMACAddress(requests)) {
         return false;
     }
@@ -76,21 +91,6 @@ bool FlashCorvane::ProgramUserRegisters(RegisterChoice choice) {
         CommitUserRegister(index);
     }
     return true;
-}
-
-void FlashCorvane::ReadUserRegister(std::uint32_t index, const RegisterValues& values) {
-    const std::string value = ToHexText(values[index]);
-    p_mHost.SetSetting(Setting::FlashUserRegisterInput[index], value);
-    p_mHost.ShowMessageText("User Register " + ToDecimalText(index) + " value: 0x" + value);
-}
-
-void FlashCorvane::ProgramUserRegister(std::uint32_t index, CommitRequests& requests) {
-    const std::uint32_t value =
-        ParseHex(p_mHost.GetSetting(Setting::FlashUserRegisterInput[index]));
-    p_mHost.WriteWord(kRegisterAddresses[index], value);
-    p_mHost.ShowMessageText("Writing 0x" + ToHexText(value) + " to User Register " +
-                            ToDecimalText(index));
-    requests[index] = ParseHex(p_mHost.GetSetting(Setting::FlashUserRegisterCommit[index])) == 1;
 }
 
 void FlashCorvane::CommitUserRegister(std::uint32_t index) {

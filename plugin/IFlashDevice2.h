@@ -20,8 +20,8 @@
 // CreateFlashDevice2 come one at a time in the whole process. Every call runs to its end on the
 // caller's thread, calling the host's slots as it goes.
 //
-// Pointers. None may be null but where it is said, and none is tested: outputs are written without
-// a look. Texts are NUL-terminated bytes and are not used after the call.
+// Pointers. None may be null but where it is said: outputs are written without a test. Texts are
+// NUL-terminated bytes and are not used after the call; null counts as an empty text.
 //
 // Each slot ends with a tag: who implements it, and when the host may call it.
 
@@ -108,8 +108,8 @@ class IFlashDevice2 {
 
     // Slot 5. Runs the operation of that exact, case-sensitive name (see Initialize). What it
     // does, it takes from the host's settings; what it finds, it shows through ShowMessage and
-    // ShowError. An operation that failed and has said so to the user returns null. operation is
-    // NUL-terminated and not null.
+    // ShowError. An operation that failed and has said so to the user returns null. An
+    // operation that is null or not known fails, as any other operation does.
     // [device implements; any time after creation]
     virtual const char* PerformOperation(const char* operation) = 0;
 
@@ -152,8 +152,8 @@ class IFlashDevice2 {
 // Creates a device object for the connected microcontroller: reads its identification registers
 // through host and halts it.
 //     variant       the name that the host has for the device; it goes into the trace and
-//                   decides nothing; not null
-//     text2, text3  two further texts, not used; not null
+//                   decides nothing
+//     text2, text3  two further texts, not used
 //     host          the services of the caller, which keeps it alive and owns it until after
 //                   Destroy; not null and not checked
 //     device        receives the interface on success and is left alone on failure; not null

@@ -8,6 +8,7 @@
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
 #include "plugin/Trace.h"
+#include "verify/Ranges.h"
 
 namespace {
 
@@ -60,7 +61,7 @@ bool FlashCorvane::BlankCheckByAddress(std::uint32_t start, std::uint32_t end) {
     bool blank = false;
     try {
         blank = ReadRangeInChunks(
-            progress, "Checking...", alignedStart, alignedEnd,
+            p_mHost, progress, "Checking...", alignedStart, alignedEnd,
             [this](const std::vector<std::uint8_t>& buffer, std::uint32_t count,
                    std::uint32_t address) { return ChunkIsBlank(buffer, count, address); });
     } catch (const std::exception& error) {

@@ -7,6 +7,7 @@
 #include "device/SettingKeys.h"
 #include "plugin/Conversions.h"
 #include "plugin/Trace.h"
+#include "verify/Ranges.h"
 
 namespace {
 
@@ -53,7 +54,7 @@ bool FlashCorvane::CalculateChecksumByAddress(std::uint32_t start, std::uint32_t
     std::uint32_t crc = 0xFFFFFFFF;
     ProgressHandle progress = p_mHost.OpenProgress("CRC Calculation");
     try {
-        ReadRangeInChunks(progress, "Calculating...", start, end,
+        ReadRangeInChunks(p_mHost, progress, "Calculating...", start, end,
                           [this, &crc](const std::vector<std::uint8_t>& buffer, std::uint32_t count,
                                        std::uint32_t /*address*/) {
                               UpdateCRC32(crc, buffer.data(), count);

@@ -1,6 +1,8 @@
 // What the verifying operations share: the range that the user's settings select, and reading a
 // range in chunks under a progress display.
 
+#include "verify/Ranges.h"
+
 #include <algorithm>
 #include <stdexcept>
 
@@ -35,9 +37,9 @@ bool FlashCorvane::RunOnSelectedRange(const std::string& operationName,
     throw std::runtime_error(operationName + " range selection not set.");
 }
 
-bool FlashCorvane::ReadRangeInChunks(const ProgressHandle& progress, const std::string& text,
-                                     std::uint32_t start, std::uint32_t end,
-                                     const ChunkConsumer& consumer) {
+bool ReadRangeInChunks(const HostAccess& host, const ProgressHandle& progress,
+                       const std::string& text, std::uint32_t start, std::uint32_t end,
+                       const ChunkConsumer& consumer) {
     std::vector<std::uint8_t> buffer(kReadBufferSize);
     const std::uint32_t total = end - start + 1;
     std::uint32_t address = start;
@@ -46,7 +48,7 @@ bool FlashCorvane::ReadRangeInChunks(const ProgressHandle& progress, const std::
         const std::uint32_t percent = (total - remaining) * 100 / total;
         progress.UpdateProgress(percent, text);
         const std::uint32_t count = std::min(remaining, kChunkSize);
-        p_mHost.ReadBytes(buffer.data(), count, address, kFlashPage);
+        host.ReadBytes(buffer.data(), count, address, kFlashPage);
         if (!consumer(buffer, count, address)) return false;
         address += count;
         remaining -= count;

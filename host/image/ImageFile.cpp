@@ -4,6 +4,7 @@
 
 #include <string_view>
 
+#include "base/Elf.h"
 #include "base/Hex.h"
 #include "host/base/Errors.h"
 #include "host/files/InputFile.h"
@@ -15,7 +16,7 @@ namespace {
 const std::string kStandardInput = "standard input";
 
 std::optional<Format> DetectFormat(std::string_view contents) {
-    if (contents.starts_with("\177ELF")) return Format::Elf;
+    if (base::LooksLikeElf(contents)) return Format::Elf;
     contents.remove_prefix(std::min(contents.find_first_not_of(" \t\r\n"), contents.size()));
     if (contents.size() < 2) return std::nullopt;
     if (contents[0] == ':' && base::HexDigitValue(contents[1]) >= 0) return Format::IntelHex;

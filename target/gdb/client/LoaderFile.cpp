@@ -1,94 +1,77 @@
-// The loadable segments of an ELF file, and its entry point.
+// Reading the file, and filling up what a segment's memory has beyond its bytes in the file.
 
 #include "target/gdb/client/LoaderFile.h"
 
 #include <fcntl.h>
 #include <fmt/format.h>
-#include <libelf.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <memory>
 #include <system_error>
 
+#include "base/Descriptor.h"
+#include "base/Elf.h"
 #include "target/Target.h"
 
 namespace target::gdb {
 
 namespace {
 
-constexpr std::uint64_t kLoadedSizeMax = std::uint64_t{16} * 1024 * 1024;
+/// Far more than the RAM of any device, debugging information included.
+constexpr std::uint64_t kFileBytesMax = std::uint64_t{64} << 20;
+constexpr std::uint64_t kMemoryBytesMax = std::uint64_t{16} << 20;
 
 [[noreturn]] void Refuse(const std::string& path, const std::string& why) {
     throw TargetError(fmt::format("the loader {} {}; --loader FILE names another one", path, why));
 }
 
-class File {
-  public:
-    /// Doesn't wait for the writer of a pipe, which is no loader anyway.
-    explicit File(const std::string& path)
-        : descriptor_(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC)) {
-        if (descriptor_ < 0)
-            Refuse(path, "can't be opened: " + std::generic_category().message(errno));
-    }
-    ~File() { close(descriptor_); }
-    File(const File&) = delete;
-    File& operator=(const File&) = delete;
-
-    int Descriptor() const { return descriptor_; }
-
-  private:
-    int descriptor_;
-};
-
-LoaderFile::Segment ReadSegment(const File& file, const Elf32_Phdr& header,
-                                const std::string& path) {
-    LoaderFile::Segment segment{header.p_paddr, std::string(header.p_memsz, '\0')};
-    for (std::size_t done = 0; done < header.p_filesz;) {
-        const auto offset = static_cast<off_t>(header.p_offset + done);
-        const ssize_t got =
-            pread(file.Descriptor(), segment.bytes.data() + done, header.p_filesz - done, offset);
-        if (got == 0) Refuse(path, "ends too early: it is cut off");
-        if (got < 0 && errno != EINTR)
-            Refuse(path, "can't be read: " + std::generic_category().message(errno));
-        if (got > 0) done += static_cast<std::size_t>(got);
-    }
-    return segment;
+[[noreturn]] void RefuseForError(const std::string& path, const char* what) {
+    Refuse(path, fmt::format("can't be {}: {}", what, std::generic_category().message(errno)));
 }
 
-void RequireRegularFile(const File& file, const std::string& path) {
+/// Doesn't wait for the writer of a pipe, which is no loader anyway.
+base::Descriptor OpenFile(const std::string& path) {
+    base::Descriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    if (!file.IsOpen()) RefuseForError(path, "opened");
+    return file;
+}
+
+std::string ReadContents(const std::string& path) {
+    const base::Descriptor file = OpenFile(path);
     struct stat status {};
-    if (fstat(file.Descriptor(), &status) != 0 || !S_ISREG(status.st_mode))
+    if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode))
         Refuse(path, "is no regular file");
+    const auto size = static_cast<std::uint64_t>(status.st_size);
+    if (size > kFileBytesMax) Refuse(path, "is too large for a program in a microcontroller's RAM");
+    std::string contents(size, '\0');
+    for (std::size_t done = 0; done < contents.size();) {
+        const ssize_t got = read(file.Get(), contents.data() + done, contents.size() - done);
+        if (got < 0 && errno != EINTR) RefuseForError(path, "read");
+        if (got == 0) contents.resize(done);  // it became shorter just now
+        if (got > 0) done += static_cast<std::size_t>(got);
+    }
+    return contents;
 }
 
 }  // namespace
 
-LoaderFile ReadLoaderFile(const std::string& path) {
-    const File file(path);
-    RequireRegularFile(file, path);
-    elf_version(EV_CURRENT);
-    const std::unique_ptr<Elf, int (*)(Elf*)> elf(elf_begin(file.Descriptor(), ELF_C_READ, nullptr),
-                                                  elf_end);
-    const Elf32_Ehdr* header = elf ? elf32_getehdr(elf.get()) : nullptr;
-    if (header == nullptr || header->e_ident[EI_DATA] != ELFDATA2LSB || header->e_type != ET_EXEC)
-        Refuse(path, "is no 32-bit, little-endian ELF executable");
-    std::size_t count = 0;
-    const Elf32_Phdr* headers = elf32_getphdr(elf.get());
-    if (headers == nullptr || elf_getphdrnum(elf.get(), &count) != 0) count = 0;
-
-    LoaderFile loader{{}, header->e_entry};
-    std::uint64_t size = 0;
-    for (std::size_t i = 0; i < count; ++i) {
-        if (headers[i].p_type != PT_LOAD || headers[i].p_memsz == 0) continue;
-        size += headers[i].p_memsz;
-        if (size > kLoadedSizeMax || headers[i].p_filesz > headers[i].p_memsz)
-            Refuse(path, "is damaged, or no program for a microcontroller's RAM");
-        loader.segments.push_back(ReadSegment(file, headers[i], path));
+LoaderFile ReadLoaderFile(const std::string& path) try {
+    const std::string contents = ReadContents(path);
+    const base::ElfProgram program = base::ReadElf(contents);
+    LoaderFile loader{{}, program.entry};
+    std::uint64_t memoryBytes = 0;
+    for (const base::ElfSegment& segment : program.segments) {
+        memoryBytes += segment.memoryBytes;
+        if (memoryBytes > kMemoryBytesMax)
+            Refuse(path, "is too large for a program in a microcontroller's RAM");
+        loader.segments.push_back({segment.address, std::string(segment.bytes)});
+        loader.segments.back().bytes.resize(segment.memoryBytes, '\0');
     }
     if (loader.segments.empty()) Refuse(path, "holds nothing to load");
     return loader;
+} catch (const base::ElfError& error) {
+    Refuse(path, fmt::format("can't be loaded: {}", error.what()));
 }
 
 }  // namespace target::gdb

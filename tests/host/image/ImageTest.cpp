@@ -197,9 +197,12 @@ TEST(ImageFile, RefusesElfFilesThatAreCutOffOrUnfit) {
     noSections[32] = 61, noSections[46] = 40, noSections[48] = 1;  // offset, entry size and count
     bigEndian[5] = 2, bigEndian[16] = 0, bigEndian[17] = 2, bigEndian[23] = 1;
     bigEndian.replace(28, 20, 20, 0);
+    std::string otherMachine = whole, moreInFile = whole;
+    otherMachine[18] = 62, moreInFile[72] = 3;
     const std::string expected = " found, a 32-bit little-endian executable expected";
     const std::pair<std::string, std::string> cases[] = {
-        {whole.substr(0, 30), "f: ELF header can't be read (invalid ELF file data)"},
+        {whole.substr(0, 30),
+         "f: ELF header: 52 bytes expected at offset 0, but the file ends at 30"},
         {whole.substr(0, 70),
          "f: program header table: 32 bytes expected at offset 52, but the file ends at 70"},
         {whole.substr(0, 87),
@@ -216,6 +219,8 @@ TEST(ImageFile, RefusesElfFilesThatAreCutOffOrUnfit) {
         {MakeElf(segments, "abcd", 4), "f: a core" + expected},
         {MakeElf(segments, "abcd", 9), "f: a file of type 9" + expected},
         {bigEndian, "f: an executable, big-endian" + expected},
+        {otherMachine, "f: an executable, for another machine than Arm (62)" + expected},
+        {moreInFile, "f: segment 0: 4 bytes in the file, but 3 in memory"},
     };
     for (const auto& [contents, text] : cases)
         EXPECT_EQ(text, Complaint(contents));
