@@ -5,26 +5,23 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <atomic>
 #include <chrono>
-#include <fstream>
 #include <functional>
-#include <initializer_list>
 #include <random>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "base/Hex.h"
 #include "target/gdb/client/GdbTarget.h"
-#include "target/gdb/server/Session.h"
 #include "target/gdb/wire/Frame.h"
-#include "target/simulated/ServedSimulation.h"
+#include "tests/gdb/Peer.h"
 
 namespace {
 
 using namespace target;
 using namespace target::gdb;
+using test::LoaderFile;
+using test::Peer;
 using namespace std::chrono_literals;
 
 constexpr Mailbox kMailbox{0x20001000, 32, 0xFFFFFFFF};
@@ -85,102 +82,10 @@ TEST(GdbFrames, AreReadAsTheyStandOnTheWire) {
     EXPECT_EQ(FramesIn(flooded), "damage(a packet longer than any that was asked for)ack()");
 }
 
-/// A server on a free port for one client, bounded in time. The hook sees each payload (an
-/// interrupt as "\x03") and may give the bytes to send in place of the answer; kClose closes the
-/// connection.
-class Peer {
-  public:
-    using Hook = std::function<std::optional<std::string>(const std::string& payload)>;
-    static constexpr char kClose[] = "(close)";
-
-    explicit Peer(Hook hook, const char* device = "quen,latency=1ns,bandwidth=0")
-        : device_(ParseDeviceOptions(device)),
-          served_(
-              device_, [](const std::string&) {}, [] {}),
-          hook_(std::move(hook)),
-          listener_(Socket::Listen(Address::Parse(":0"), [this] { return done_.load(); })),
-          address_(Address::Parse(std::to_string(listener_.Port()))),
-          thread_([this] { Serve(); }) {}
-    ~Peer() {
-        done_ = true;
-        thread_.join();
-    }
-
-    Address Where() const { return address_; }
-    SimulatedDevice& Device() { return device_; }
-    std::vector<std::string> Log() {
-        done_ = true;
-        if (thread_.joinable()) thread_.join();
-        thread_ = std::thread([] {});
-        return log_;
-    }
-
-  private:
-    void Serve() try {
-        Socket client = listener_.Accept(std::chrono::steady_clock::now() + 5s);
-        Session session(served_, [](const std::string&) {});
-        FrameDecoder decoder(FrameDecoder::Sender::Client);
-        while (!done_ && client.IsOpen()) {
-            decoder.Feed(client.Read(std::chrono::steady_clock::now() + 20ms));
-            while (const auto frame = decoder.Next())
-                Answer(client, session, *frame);
-        }
-    } catch (const SocketError&) {
-    }
-
-    void Answer(Socket& client, Session& session, const Frame& frame) {
-        const bool interrupt = frame.kind == Frame::Kind::Interrupt;
-        if (frame.kind != Frame::Kind::Packet && !interrupt) return;
-        const std::string payload = interrupt ? "\x03" : frame.payload;
-        log_.push_back(payload);
-        std::string wire = session.AcknowledgesPackets() && !interrupt ? "+" : "";
-        const auto replies = interrupt ? session.Interrupt() : std::vector<std::string>();
-        if (const auto instead = hook_(payload)) {
-            wire = *instead;
-        } else {
-            for (const std::string& reply : interrupt ? replies : session.Answer(payload))
-                wire += Framed(reply);
-        }
-        if (wire == kClose) throw SocketError("as the script says");
-        client.Write(wire, std::chrono::steady_clock::now() + 1s);
-    }
-
-    SimulatedDevice device_;
-    ServedSimulation served_;
-    const Hook hook_;
-    std::atomic<bool> done_ = false;
-    std::vector<std::string> log_;
-    Socket listener_;
-    const Address address_;
-    std::thread thread_;
-};
-
 GdbOptions Quick(std::chrono::milliseconds timeout = 500ms) {
     GdbOptions options;
     options.timeout = timeout;
     return options;
-}
-
-std::string Little(std::initializer_list<std::uint32_t> words) {
-    std::string bytes;
-    for (const std::uint32_t word : words)
-        for (int i = 0; i < 4; ++i)
-            bytes += static_cast<char>(word >> (8 * i));
-    return bytes;
-}
-
-/// The smallest program: one segment of four bytes, and as many behind it that aren't in the file.
-const std::string& LoaderFile() {
-    static const std::string path = [] {
-        std::string file = testing::TempDir() + "gdb-test-loader-" + std::to_string(getpid());
-        std::ofstream(file) << "\x7f"
-                               "ELF\1\1\1"
-                            << std::string(9, '\0')
-                            << Little({0x00280002, 1, 0x20002001, 52, 0, 0, 0x00200034, 1, 0})
-                            << Little({1, 84, 0, 0x20002000, 4, 8, 7, 4}) << "\xfe\xe7\xfe\xe7";
-        return file;
-    }();
-    return path;
 }
 
 /// A few accesses of each kind, on a target that is halted, runs and is halted again; throws or

@@ -1,9 +1,11 @@
 #include "tests/support/VirtualTime.h"
 
+#include <poll.h>
 #include <sys/syscall.h>
 #include <time.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 
 namespace {
@@ -12,6 +14,9 @@ std::atomic<long long> nowNs{1'000'000'000};
 
 // Looking at the clock takes time too, or a loop that only waits for it would never end.
 constexpr long long LookNs = 1'000'000;
+
+// Another thread of the process answers within this time, or not at all.
+constexpr int kPatienceMs = 5;
 
 }  // namespace
 
@@ -46,5 +51,12 @@ __attribute__((visibility("default"))) int clock_nanosleep(clockid_t, int flags,
     const long long until = time->tv_sec * 1'000'000'000LL + time->tv_nsec;
     if (until > nowNs) nowNs = until;
     return 0;
+}
+
+__attribute__((visibility("default"))) int poll(struct pollfd* files, nfds_t count, int timeoutMs) {
+    const auto wait = std::min(timeoutMs, kPatienceMs);
+    const auto ready = static_cast<int>(syscall(SYS_poll, files, count, wait));
+    if (ready == 0) nowNs += timeoutMs * 1'000'000LL;
+    return ready;
 }
 }

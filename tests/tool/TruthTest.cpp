@@ -1,6 +1,6 @@
 // What the tool says about a device is compared with what the device holds: for every command that
-// changes it, with each access failing in turn, once and from then on, and with the simulated
-// device's other faults.
+// changes it, with each access failing in turn, once and from then on, with the simulated device's
+// other faults, and behind a GDB server that misbehaves at any packet.
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
@@ -15,6 +15,8 @@
 
 #include "host/Tool.h"
 #include "host/targets/SimulatedTarget.h"
+#include "target/simulated/Contents.h"
+#include "tests/gdb/Peer.h"
 #include "tests/support/VirtualTime.h"
 
 namespace host {
@@ -103,12 +105,16 @@ class Bench {
 
     void PutBack() const { std::ofstream("device", std::ios::binary) << device_; }
 
-    Said Run(Words words, const std::string& fault) const {
+    static Said Run(const Words& words, const std::string& fault) {
+        return Run(words, Words{"--sim", kDevice + fault, "--sim-file", "device"});
+    }
+
+    static Said Run(Words words, const Words& target) {
         fs::remove("trace");
-        for (const std::string& word :
-             Words{"--json", "--sim", kDevice + fault, "--sim-file", "device", "--plugin",
-                   FLASH_CORVANE_LIBRARY, "--trace", "trace", "--set", "FlashTimeoutValue=2"})
-            words.push_back(word);
+        words.insert(words.end(), target.begin(), target.end());
+        for (const char* word : {"--json", "--plugin", FLASH_CORVANE_LIBRARY, "--trace", "trace",
+                                 "--set", "FlashTimeoutValue=2"})
+            words.emplace_back(word);
         testing::internal::CaptureStdout();
         testing::internal::CaptureStderr();
         Said said{RunTool(words), {}, "", {0xABC, 0xDEF}};
@@ -138,6 +144,11 @@ class Bench {
         for (const std::uint32_t index : {0U, 1U})
             device.Read(&contents.committed.at(index), 1, 0x400FE1E0 + 4 * index, 1, 4);
         return contents;
+    }
+
+    /// The device, to be put behind a server.
+    std::unique_ptr<target::SimulatedDevice> Device() const {
+        return target::DecodeContents(device_, target::ParseDeviceOptions(kDevice));
     }
 
     /// Whether flash holds the first bytes of the image.
@@ -260,6 +271,82 @@ TEST(Truth, HoldsOfFaultyDevices) {
             Said said;
             Check(bench, work, fault, said);
         }
+}
+
+/// What one reply becomes; `late` is sent in front of the next one.
+struct ReplyFault {
+    const char* name;
+    void (*bend)(std::string& wire, std::string& late);
+};
+
+const ReplyFault kReplyFaults[] = {
+    {"dropped", [](std::string& wire, std::string&) { wire.clear(); }},
+    {"damaged",
+     [](std::string& wire, std::string&) {
+         if (!wire.empty()) wire.back() ^= 1;
+     }},
+    {"late", [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
+    {"cut", [](std::string& wire,
+               std::string&) { wire = wire.substr(0, wire.size() / 2) + test::Peer::kClose; }},
+};
+
+/// One run with the device behind this server. Gives the number of packets that the server saw.
+std::size_t CheckBehind(const Bench& bench, const Work& work, const std::string& lie,
+                        test::Peer& peer, Said& said, const char* timeout = "1s") {
+    const auto start = std::chrono::system_clock::now();
+    said = Bench::Run(
+        work.words, Words{"--gdb", "127.0.0.1:" + peer.Where().port, "--loader", test::LoaderFile(),
+                          "--gdb-option", std::string("timeout=") + timeout});
+    const std::size_t packets = peer.Log().size();
+    EXPECT_LT(std::chrono::system_clock::now() - start, std::chrono::seconds(20)) << lie;
+    const target::SimulatedDevice& device = peer.Device();
+    for (const std::uint32_t index : {0U, 1U})
+        said.written.at(index) = device.PeekRegister(0x400FE1E0 + 4 * index);
+    const Contents now{device.FlashContents(), device.CommittedUserRegisters()};
+    for (const std::string& text : bench.Lies(work, said, now))
+        ADD_FAILURE() << "not true: " << text << "\nbehind a server with " << lie << ": "
+                      << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
+                      << said.text << said.end;
+    return packets;
+}
+
+TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
+    const Bench bench;
+    for (const Work& work : {kWorks[0], kWorks[3], kWorks[7]}) {
+        Said said;
+        test::Peer sound([](const std::string&) { return std::nullopt; }, {}, bench.Device());
+        const std::size_t packets = CheckBehind(bench, work, "no fault", sound, said, "60s");
+        EXPECT_EQ(said.status, 0) << said.text;
+        for (const ReplyFault& fault : kReplyFaults)
+            for (std::size_t failing = 0; failing < packets; ++failing) {
+                std::size_t index = 0;
+                std::string late;
+                std::string bent;
+                test::Peer peer([](const std::string&) { return std::nullopt; },
+                                [&](const std::string& payload, std::string& wire) {
+                                    wire.insert(0, std::exchange(late, ""));
+                                    if (index++ != failing) return;
+                                    bent = payload;
+                                    fault.bend(wire, late);
+                                },
+                                bench.Device());
+                CheckBehind(bench, work, fmt::format("reply {} {}", failing, fault.name), peer,
+                            said);
+                if (HasFailure()) FAIL() << bent;
+            }
+        for (const char* refusal : {"+$E01#a6", ""})
+            for (std::size_t failing = 0; failing < packets; ++failing) {
+                std::size_t index = 0;
+                test::Peer peer(
+                    [&](const std::string&) -> std::optional<std::string> {
+                        if (index++ != failing) return std::nullopt;
+                        return refusal;
+                    },
+                    {}, bench.Device());
+                CheckBehind(bench, work, fmt::format("request {} not done: '{}'", failing, refusal),
+                            peer, said);
+            }
+    }
 }
 
 }  // namespace
