@@ -2,6 +2,17 @@
 # out from the binaries; the libraries of our own, which nobody else's package provides, are told by
 # their directory.
 
+# A package depends on the libraries of the release that it was made on, so its version names that:
+# 1.2.3~deb13. It gives way to a 1.2.3 of the distribution's own.
+cmake_host_system_information(RESULT distribution QUERY DISTRIB_ID)
+cmake_host_system_information(RESULT release QUERY DISTRIB_VERSION_ID)
+set(package_version ${PROJECT_VERSION})
+if(distribution AND release)
+  string(REPLACE debian deb distribution "${distribution}")
+  string(APPEND package_version "~${distribution}${release}")
+endif()
+set(CPACK_DEBIAN_PACKAGE_VERSION ${package_version})
+
 set(maintainer "Flash Corvane maintainers <maintainers@flash-corvane.invalid>")
 set(CPACK_GENERATOR DEB)
 set(CPACK_PACKAGE_CONTACT "${maintainer}")
@@ -26,7 +37,7 @@ programs a simulated device, or a board behind a GDB server.")
 
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libflash-corvane-dev)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_SECTION libdevel)
-set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_DEPENDS "corvane-flash (= ${PROJECT_VERSION})")
+set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_DEPENDS "corvane-flash (= ${package_version})")
 set(CPACK_DEBIAN_DEVELOPMENT_DESCRIPTION
 "Flash programming for the Corvane microcontrollers, for debuggers
 What makers of debuggers need to load the flash plug-in of corvane-flash.
@@ -39,9 +50,9 @@ set(changelog ${generated}/changelog.gz)
 add_custom_command(
   OUTPUT ${changelog} VERBATIM
   DEPENDS ${PROJECT_SOURCE_DIR}/CHANGELOG.md ${PROJECT_SOURCE_DIR}/cmake/debian-changelog.sh
-  COMMAND sh -ec "sh \"$1\" \"$2\" \"$3\" | gzip -9n > \"$0\"" ${changelog}
+  COMMAND sh -ec "sh \"$1\" \"$2\" \"$3\" \"$4\" | gzip -9n > \"$0\"" ${changelog}
           ${PROJECT_SOURCE_DIR}/cmake/debian-changelog.sh ${PROJECT_SOURCE_DIR}/CHANGELOG.md
-          ${maintainer})
+          ${maintainer} ${package_version})
 install(FILES ${changelog} cmake/copyright DESTINATION ${doc_directory} COMPONENT tool)
 set(overrides_directory ${CMAKE_INSTALL_DATADIR}/lintian/overrides)
 install(FILES cmake/lintian/corvane-flash DESTINATION ${overrides_directory} COMPONENT tool)

@@ -1,7 +1,8 @@
 #!/bin/sh
-# debian-changelog.sh CHANGELOG.md MAINTAINER: the releases in it as Debian writes them. What isn't
+# debian-changelog.sh CHANGELOG.md MAINTAINER VERSION: the releases in it as Debian writes them. What isn't
 # released has no date and is left out. Of two releases on one day the newer one has the later time.
-exec awk -v maintainer="$2" '
+# VERSION is that of the package, and stands for the newest.
+exec awk -v maintainer="$2" -v version="$3" '
     function flush(  count, words, i, line) {
         count = split(entry, words)
         line = "  *"
@@ -26,7 +27,9 @@ exec awk -v maintainer="$2" '
     /^## / {
         finish()
         date = match($0, /[0-9]+-[0-9]+-[0-9]+/) ? substr($0, RSTART, RLENGTH) : ""
-        if (date != "") printf "corvane-flash (%s) unstable; urgency=medium\n\n", $2
+        if (date == "") next
+        printf "corvane-flash (%s) unstable; urgency=medium\n\n", version ? version : $2
+        version = ""
         next
     }
     date == "" { next }

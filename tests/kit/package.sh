@@ -10,7 +10,7 @@ for run in first second; do
         -D CPACK_PACKAGING_INSTALL_PREFIX=/usr >"$trial/log" 2>&1 || { cat "$trial/log"; exit 1; }
     sleep 1.1 # so that a time that gets in differs
 done
-version=$(sed -n 's/^set(CPACK_PACKAGE_VERSION "\(.*\)")$/\1/p' "$1/CPackConfig.cmake")
+version=$(sed -n 's/^set(CPACK_DEBIAN_PACKAGE_VERSION "\(.*\)")$/\1/p' "$1/CPackConfig.cmake")
 cd "$trial/first"
 doc=share/doc/corvane-flash
 expected=(
