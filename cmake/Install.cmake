@@ -47,8 +47,6 @@ install(FILES ${generated}/corvane-flash.fish
         DESTINATION ${data}/fish/vendor_completions.d COMPONENT tool)
 install(FILES ${generated}/corvane-flash.1.gz
         DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tool)
-install(FILES docs/boards.md docs/command-line-json.md
-        DESTINATION ${doc_directory}/docs COMPONENT tool)
 
 include(cmake/Package.cmake)
 
