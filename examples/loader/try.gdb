@@ -10,3 +10,11 @@ set {unsigned[4]}0x20001000 = {0, 0x1000, 128, 0xffffffff}
 watch *(unsigned*)0x2000100c
 continue
 printf "status 0x%x, flash at 0x1000 holds 0x%x\n", *(unsigned*)0x2000100c, *(unsigned*)0x1000
+
+# QEMU would go on when GDB has left, and GDB would wait for it. It ends before it answers.
+python
+try:
+    gdb.execute("kill")
+except gdb.error:
+    pass
+end
