@@ -4,8 +4,8 @@
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
-install(FILES plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h
-              logger/ostrel_logger.h
+set(headers plugin/IFlashHost.h plugin/IFlashDevice2.h plugin/flash_corvane.h logger/ostrel_logger.h)
+install(FILES ${headers}
         DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/flash_corvane COMPONENT development)
 
 # The headers tell the kit's version; they are no templates, so that they compile where they lie.
@@ -18,11 +18,22 @@ foreach(header plugin/IFlashDevice2.h plugin/flash_corvane.h)
   set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${header})
 endforeach()
 
-# The headers as a target of their own: a host sees the plug-in through them alone, and loads it.
+# The headers as a target of their own: a host sees the plug-in through them alone, and loads it. A
+# project that has this tree in it includes them under the names that they have when installed.
+foreach(header ${headers})
+  get_filename_component(name ${header} NAME)
+  configure_file(${header} ${PROJECT_BINARY_DIR}/include/flash_corvane/${name} COPYONLY)
+endforeach()
 add_library(corvane_headers INTERFACE)
 set_target_properties(corvane_headers PROPERTIES EXPORT_NAME headers)
-target_include_directories(corvane_headers INTERFACE $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+target_include_directories(corvane_headers INTERFACE
+  $<BUILD_INTERFACE:${PROJECT_BINARY_DIR}/include>
+  $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 install(TARGETS corvane_headers EXPORT FlashCorvane)
+add_library(FlashCorvane::headers ALIAS corvane_headers)
+foreach(library flash_corvane flash_host_check ostrel_logger)
+  add_library(FlashCorvane::${library} ALIAS ${library})
+endforeach()
 
 set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/FlashCorvane)
 install(EXPORT FlashCorvane NAMESPACE FlashCorvane:: FILE FlashCorvaneTargets.cmake

@@ -15,7 +15,6 @@
 
 namespace host::image {
 
-namespace intelhex {
 namespace {
 
 enum Type : std::uint8_t {
@@ -152,14 +151,12 @@ void AppendRecord(std::string& text, const Record& record) {
 }
 
 }  // namespace
-}  // namespace intelhex
 
 Image ParseIntelHex(const std::string& contents, const std::string& name) {
-    return intelhex::IntelHexReader(contents, name).Read();
+    return IntelHexReader(contents, name).Read();
 }
 
 std::string FormatIntelHex(const Image& image) {
-    using namespace intelhex;
     std::string text;
     std::uint32_t upperHalf = 0;
     ForEachRecord(image, [&](std::uint32_t address, Bytes data) {

@@ -15,7 +15,6 @@
 
 namespace host::image {
 
-namespace srecord {
 namespace {
 
 enum class Kind { Header, Data, Reserved, Count, Termination };
@@ -170,15 +169,13 @@ void AppendRecord(std::string& text, const Record& record) {
 }
 
 }  // namespace
-}  // namespace srecord
 
 Image ParseSRecord(const std::string& contents, const std::string& name) {
-    return srecord::SRecordReader(contents, name).Read();
+    return SRecordReader(contents, name).Read();
 }
 
 /// S3 records throughout, between a header and a count as far as a count record can hold it.
 std::string FormatSRecord(const Image& image) {
-    using namespace srecord;
     static constexpr std::array<std::uint8_t, 3> kHeaderText{'H', 'D', 'R'};
     std::string text;
     std::uint32_t count = 0;
