@@ -240,8 +240,12 @@ TEST(GdbClient, KeepsToThePacketSizeAndCutsAtWords) {
             std::uint64_t end = 0;
             std::string breach;
             Peer peer([&](const std::string& payload) -> std::optional<std::string> {
-                const Request request = ParseRequest(payload);
-                const bool reads = request.kind == Request::Kind::ReadMemory;
+                Arguments request;
+                const std::string_view rest = std::string_view(payload).substr(1);
+                const bool reads = payload.starts_with("m");
+                if (reads) Range(rest, request);
+                if (payload.starts_with("M")) HexBytes(rest, request);
+                if (payload.starts_with("X")) BinaryBytes(rest, request);
                 const std::size_t size = reads ? 2 * request.length : Escaped(payload).size();
                 const std::uint32_t behind = request.address + request.length;
                 const bool cut = reads || !request.data.empty();

@@ -1,4 +1,4 @@
-// One function for each kind of request.
+// The table of requests, and one function for each kind of them.
 
 #include "target/gdb/server/Session.h"
 
@@ -15,17 +15,17 @@ namespace target::gdb {
 
 namespace {
 
-using Kind = Request::Kind;
-
 constexpr char kOk[] = "OK";
 constexpr char kRefused[] = "E01";
 constexpr char kUnknown[] = "";
+constexpr char kVersion[] = "corvane-flash: a simulated device\n";
 constexpr char kStopped[] = "T05thread:1;";
 constexpr char kInterrupted[] = "T02thread:1;";
 
 constexpr char kMonitorHelp[] =
     "reset        reset the device and let it run\n"
     "reset halt   reset the device and leave it halted\n"
+    "version      who this server is\n"
     "help         this list\n";
 
 // What fits the reply's packet.
@@ -45,97 +45,140 @@ std::uint32_t AddToChecksum(std::uint32_t crc, std::string_view bytes) {
     return crc;
 }
 
+constexpr char kResumeKinds[] = "vCont;c;C;s;S";
+constexpr char kFirstThreads[] = "m1";
+constexpr char kNoMoreThreads[] = "l";
+constexpr char kCurrentThread[] = "QC1";
+constexpr char kAttached[] = "1";
+
 }  // namespace
 
+/// What a client can ask: adding a request is adding a row.
+struct Session::RequestRow {
+    std::string_view name;
+    ReadArguments read;
+    Replies (Session::*answer)(const Arguments& arguments);
+};
+
+template <const char* Reply>
+Session::Replies Session::Always(const Arguments&) {
+    return {Reply};
+}
+
+const Session::RequestRow* Session::FindRow(std::string_view payload) {
+    // A name that another one begins with stands behind that.
+    static constexpr RequestRow kRows[] = {
+        {"qSupported", Anything, &Session::Supported},
+        {"QStartNoAckMode", Nothing, &Session::StartNoAckMode},
+        {"qXfer:", Document, &Session::ReadDocument},
+        {"qCRC:", Range, &Session::Checksum},
+        {"qRcmd,", HexData, &Session::Monitor},
+        {"qfThreadInfo", Nothing, &Session::Always<kFirstThreads>},
+        {"qsThreadInfo", Nothing, &Session::Always<kNoMoreThreads>},
+        {"qC", Nothing, &Session::Always<kCurrentThread>},
+        {"qAttached", Anything, &Session::Always<kAttached>},
+        {"qSymbol:", Anything, &Session::Always<kOk>},
+        {"vFlashErase:", Range, &Session::EraseFlash},
+        {"vFlashWrite:", FlashBytes, &Session::WriteFlash},
+        {"vFlashDone", Nothing, &Session::Always<kOk>},
+        {"vCont?", Nothing, &Session::Always<kResumeKinds>},
+        {"vCont;", FirstAction, &Session::Resume},
+        {"?", Nothing, &Session::WhyStopped},
+        {"g", Nothing, &Session::ReadRegisters},
+        {"G", HexData, &Session::WriteRegisters},
+        {"p", RegisterNumber, &Session::ReadRegister},
+        {"P", RegisterValue, &Session::WriteRegister},
+        {"m", Range, &Session::ReadMemory},
+        {"M", HexBytes, &Session::WriteMemory},
+        {"X", BinaryBytes, &Session::WriteMemory},
+        {"c", OptionalAddress, &Session::Continue},
+        {"s", OptionalAddress, &Session::Step},
+        {"H", Anything, &Session::Always<kOk>},
+        {"T", Anything, &Session::Always<kOk>},
+        {"D", Anything, &Session::Detach},
+        {"k", Nothing, &Session::Kill},
+    };
+    for (const RequestRow& row : kRows)
+        if (payload.starts_with(row.name)) return &row;
+    return nullptr;
+}
+
 std::vector<std::string> Session::Answer(std::string_view payload) {
-    const Request request = ParseRequest(payload);
-    if (request.malformed)
-        return {Refuse(fmt::format("the request {} is malformed", request.name))};
-    if (awaitsStop_ && request.kind != Kind::Kill)
+    const RequestRow* row = FindRow(payload);
+    Arguments arguments;
+    if (row != nullptr && !row->read(payload.substr(row->name.size()), arguments))
+        return {Refuse(fmt::format("the request {} is malformed", row->name))};
+    const bool ends = row != nullptr && row->answer == &Session::Kill;
+    if (awaitsStop_ && !ends)
         return {Refuse("the target is running; it takes nothing but an interrupt")};
+    if (row == nullptr) return {kUnknown};
     try {
-        return Carry(request);
+        return (this->*row->answer)(arguments);
     } catch (const TargetError& error) {
         return {Refuse(error.what())};
     }
 }
 
-std::vector<std::string> Session::Carry(const Request& request) {
-    switch (request.kind) {
-        case Kind::Supported:
-            return {
-                fmt::format("PacketSize={:x};QStartNoAckMode+;qXfer:features:read+;"
-                            "qXfer:memory-map:read+;vContSupported+",
-                            kPacketSize)};
-        case Kind::StartNoAckMode:
-            acknowledges_ = false;
-            return {kOk};
-        case Kind::WhyStopped:
-            device_.Stop();
-            return {kStopped};
-        case Kind::ReadRegisters: {
-            std::string bytes;
-            for (const std::uint32_t value : device_.Registers().values)
-                bytes += base::WordBytes(value);
-            return {base::ToHex(bytes)};
-        }
-        case Kind::WriteRegisters:
-            return {WriteRegisters(request)};
-        case Kind::ReadRegister:
-            return {ReadRegister(request)};
-        case Kind::WriteRegister:
-            return {WriteRegister(request)};
-        case Kind::ReadMemory:
-            return {ReadMemory(request)};
-        case Kind::WriteMemory:
-            return {WriteMemory(request)};
-        case Kind::Continue:
-            GoTo(request);
-            device_.Start();
-            awaitsStop_ = true;
-            return {};
-        case Kind::Step:
-            GoTo(request);
-            return {kStopped};
-        case Kind::ResumeKinds:
-            return {"vCont;c;C;s;S"};
-        case Kind::Checksum:
-            return {Checksum(request)};
-        case Kind::ReadDocument:
-            return {ReadDocument(request)};
-        case Kind::EraseFlash:
-            device_.EraseFlash(request.address, request.length);
-            return {kOk};
-        case Kind::WriteFlash:
-            device_.ProgramFlash(request.address, request.data);
-            return {kOk};
-        case Kind::Monitor:
-            return Monitor(request.data);
-        case Kind::FirstThreads:
-            return {"m1"};
-        case Kind::MoreThreads:
-            return {"l"};
-        case Kind::CurrentThread:
-            return {"QC1"};
-        case Kind::Attached:
-            return {"1"};
-        case Kind::FinishFlash:
-        case Kind::ChooseThread:
-        case Kind::ThreadAlive:
-        case Kind::Symbols:
-            return {kOk};
-        case Kind::Detach:
-            device_.Start();
-            ended_ = true;
-            return {kOk};
-        case Kind::Kill:
-            device_.Reset();
-            ended_ = true;
-            return {};
-        case Kind::Unknown:
-            break;
-    }
-    return {kUnknown};
+Session::Replies Session::Supported(const Arguments&) {
+    return {
+        fmt::format("PacketSize={:x};QStartNoAckMode+;qXfer:features:read+;"
+                    "qXfer:memory-map:read+;vContSupported+",
+                    kPacketSize)};
+}
+
+Session::Replies Session::StartNoAckMode(const Arguments&) {
+    acknowledges_ = false;
+    return {kOk};
+}
+
+Session::Replies Session::WhyStopped(const Arguments&) {
+    device_.Stop();
+    return {kStopped};
+}
+
+Session::Replies Session::ReadRegisters(const Arguments&) {
+    std::string bytes;
+    for (const std::uint32_t value : device_.Registers().values)
+        bytes += base::WordBytes(value);
+    return {base::ToHex(bytes)};
+}
+
+Session::Replies Session::Continue(const Arguments& arguments) {
+    GoTo(arguments);
+    device_.Start();
+    awaitsStop_ = true;
+    return {};
+}
+
+Session::Replies Session::Step(const Arguments& arguments) {
+    GoTo(arguments);
+    return {kStopped};
+}
+
+Session::Replies Session::Resume(const Arguments& arguments) {
+    return arguments.step ? Step(arguments) : Continue(arguments);
+}
+
+Session::Replies Session::EraseFlash(const Arguments& arguments) {
+    device_.EraseFlash(arguments.address, arguments.length);
+    return {kOk};
+}
+
+Session::Replies Session::WriteFlash(const Arguments& arguments) {
+    device_.ProgramFlash(arguments.address, arguments.data);
+    return {kOk};
+}
+
+Session::Replies Session::Detach(const Arguments&) {
+    device_.Start();
+    ended_ = true;
+    return {kOk};
+}
+
+Session::Replies Session::Kill(const Arguments&) {
+    device_.Reset();
+    ended_ = true;
+    return {};
 }
 
 std::vector<std::string> Session::Interrupt() {
@@ -149,74 +192,78 @@ std::vector<std::string> Session::Interrupt() {
     return {kInterrupted};
 }
 
-void Session::GoTo(const Request& request) {
-    if (request.hasAddress) device_.Registers().values[CoreRegisters::kPc] = request.address;
+void Session::GoTo(const Arguments& arguments) {
+    if (arguments.hasAddress) device_.Registers().values[CoreRegisters::kPc] = arguments.address;
 }
 
-std::string Session::ReadMemory(const Request& request) {
-    if (request.length > kReadMax) return Refuse("more memory was asked for than fits a packet");
-    return base::ToHex(
-        device_.Read(request.address, request.length, WidthOf(request.address, request.length)));
+Session::Replies Session::ReadMemory(const Arguments& arguments) {
+    if (arguments.length > kReadMax)
+        return {Refuse("more memory was asked for than fits a packet")};
+    return {base::ToHex(device_.Read(arguments.address, arguments.length,
+                                     WidthOf(arguments.address, arguments.length)))};
 }
 
-std::string Session::WriteMemory(const Request& request) {
-    if (!request.data.empty())
-        device_.Write(request.address, request.data, WidthOf(request.address, request.length));
-    return kOk;
+Session::Replies Session::WriteMemory(const Arguments& arguments) {
+    if (!arguments.data.empty())
+        device_.Write(arguments.address, arguments.data,
+                      WidthOf(arguments.address, arguments.length));
+    return {kOk};
 }
 
-std::string Session::Checksum(const Request& request) {
+Session::Replies Session::Checksum(const Arguments& arguments) {
     constexpr std::uint32_t kPieceSize = 4096;
     std::uint32_t crc = 0xFFFFFFFF;
-    for (std::uint32_t done = 0; done < request.length;) {
-        const std::uint32_t size = std::min(kPieceSize, request.length - done);
-        crc = AddToChecksum(
-            crc, device_.Read(request.address + done, size, WidthOf(request.address + done, size)));
+    for (std::uint32_t done = 0; done < arguments.length;) {
+        const std::uint32_t size = std::min(kPieceSize, arguments.length - done);
+        crc = AddToChecksum(crc, device_.Read(arguments.address + done, size,
+                                              WidthOf(arguments.address + done, size)));
         done += size;
     }
-    return fmt::format("C{:x}", crc);
+    return {fmt::format("C{:x}", crc)};
 }
 
-std::string Session::ReadDocument(const Request& request) const {
+Session::Replies Session::ReadDocument(const Arguments& arguments) {
     std::string document;
-    if (request.name == "features:target.xml")
+    if (arguments.name == "features:target.xml")
         document = RegistersDocument();
-    else if (request.name == "memory-map:")
+    else if (arguments.name == "memory-map:")
         document = MemoryDocument(device_.Regions());
     else
-        return "E00";
-    const std::size_t offset = std::min<std::size_t>(request.address, document.size());
+        return {"E00"};
+    const std::size_t offset = std::min<std::size_t>(arguments.address, document.size());
     const std::size_t room = (kPacketSize - kFrameSize - 1) / 2;
-    const std::size_t size = std::min<std::size_t>(request.length, room);
+    const std::size_t size = std::min<std::size_t>(arguments.length, room);
     const bool last = document.size() - offset <= size;
-    return (last ? "l" : "m") + Escaped(std::string_view(document).substr(offset, size));
+    return {(last ? "l" : "m") + Escaped(std::string_view(document).substr(offset, size))};
 }
 
-std::string Session::ReadRegister(const Request& request) {
-    if (request.address >= CoreRegisters::kCount) return kRefused;
-    return base::ToHex(base::WordBytes(device_.Registers().values[request.address]));
+Session::Replies Session::ReadRegister(const Arguments& arguments) {
+    if (arguments.address >= CoreRegisters::kCount) return {kRefused};
+    return {base::ToHex(base::WordBytes(device_.Registers().values[arguments.address]))};
 }
 
-std::string Session::WriteRegister(const Request& request) {
-    if (request.address >= CoreRegisters::kCount || request.data.size() != 4) return kRefused;
-    device_.Registers().values[request.address] = base::WordOf(request.data);
-    return kOk;
+Session::Replies Session::WriteRegister(const Arguments& arguments) {
+    if (arguments.address >= CoreRegisters::kCount || arguments.data.size() != 4) return {kRefused};
+    device_.Registers().values[arguments.address] = base::WordOf(arguments.data);
+    return {kOk};
 }
 
-std::string Session::WriteRegisters(const Request& request) {
+Session::Replies Session::WriteRegisters(const Arguments& arguments) {
     CoreRegisters& registers = device_.Registers();
-    if (request.data.size() != sizeof registers.values) return kRefused;
+    if (arguments.data.size() != sizeof registers.values) return {kRefused};
     for (std::size_t i = 0; i < CoreRegisters::kCount; ++i)
-        registers.values[i] = base::WordOf(std::string_view(request.data).substr(4 * i, 4));
-    return kOk;
+        registers.values[i] = base::WordOf(std::string_view(arguments.data).substr(4 * i, 4));
+    return {kOk};
 }
 
-std::vector<std::string> Session::Monitor(const std::string& command) {
+Session::Replies Session::Monitor(const Arguments& arguments) {
+    const std::string& command = arguments.data;
     if (command == "reset halt" || command == "reset") {
         device_.Reset();
         if (command == "reset") device_.Start();
         return {kOk};
     }
+    if (command == "version") return {"O" + base::ToHex(kVersion), kOk};
     const bool help = command == "help";
     const std::string text =
         help ? kMonitorHelp

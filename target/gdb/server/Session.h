@@ -1,5 +1,10 @@
 // Session: a client's requests to a device, answered. It sees payloads only, so that it can be
 // driven without a connection.
+//
+// The protocol is all-stop: between a request to go on and the stop that answers it, a client may
+// send nothing but an interrupt or the end of the session. Everything else is refused then, and
+// changes nothing. A request that fails leaves the session as it was; the device says why to
+// whoever runs the server, because an error reply has no room for a text.
 
 #pragma once
 
@@ -10,8 +15,8 @@
 #include <string_view>
 #include <vector>
 
+#include "target/gdb/server/Arguments.h"
 #include "target/gdb/server/ServedDevice.h"
-#include "target/gdb/wire/Requests.h"
 
 namespace target::gdb {
 
@@ -36,22 +41,41 @@ class Session {
     bool HasEnded() const { return ended_; }
 
   private:
-    std::vector<std::string> Carry(const Request& request);
-    void GoTo(const Request& request);
-    std::string ReadMemory(const Request& request);
-    std::string WriteMemory(const Request& request);
-    std::string Checksum(const Request& request);
-    std::string ReadDocument(const Request& request) const;
-    std::string ReadRegister(const Request& request);
-    std::string WriteRegister(const Request& request);
-    std::string WriteRegisters(const Request& request);
-    std::vector<std::string> Monitor(const std::string& command);
+    using Replies = std::vector<std::string>;
+    struct RequestRow;
+
+    static const RequestRow* FindRow(std::string_view payload);
+
+    // One function for each kind of request. All may throw TargetError.
+    Replies Supported(const Arguments& arguments);
+    Replies StartNoAckMode(const Arguments& arguments);
+    Replies WhyStopped(const Arguments& arguments);
+    Replies ReadRegisters(const Arguments& arguments);
+    Replies WriteRegisters(const Arguments& arguments);
+    Replies ReadRegister(const Arguments& arguments);
+    Replies WriteRegister(const Arguments& arguments);
+    Replies ReadMemory(const Arguments& arguments);
+    Replies WriteMemory(const Arguments& arguments);
+    Replies Checksum(const Arguments& arguments);
+    Replies Continue(const Arguments& arguments);
+    Replies Step(const Arguments& arguments);
+    Replies Resume(const Arguments& arguments);
+    Replies ReadDocument(const Arguments& arguments);
+    Replies EraseFlash(const Arguments& arguments);
+    Replies WriteFlash(const Arguments& arguments);
+    Replies Monitor(const Arguments& arguments);
+    Replies Detach(const Arguments& arguments);
+    Replies Kill(const Arguments& arguments);
+    template <const char* Reply>
+    Replies Always(const Arguments& arguments);
+
+    void GoTo(const Arguments& arguments);
     std::string Refuse(const std::string& why);
 
     ServedDevice& device_;
     const ComplaintSink complain_;
     bool acknowledges_ = true;
-    bool awaitsStop_ = false;  ///< the client: it has let the target run
+    bool awaitsStop_ = false;  ///< the client has let the target run, and waits for its stop
     bool ended_ = false;
 };
 
