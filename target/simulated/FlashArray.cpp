@@ -68,12 +68,14 @@ std::optional<std::uint32_t> FlashArray::Program(std::uint32_t address,
     return notErased;
 }
 
-void FlashArray::Erase(std::uint32_t address, std::uint32_t sizeBytes) {
+FlashArray::HeldPages FlashArray::Erase(std::uint32_t address, std::uint32_t sizeBytes) {
+    HeldPages held;
     const std::size_t first = address / kPageSizeBytes;
     for (std::size_t page = first; page < first + sizeBytes / kPageSizeBytes; ++page) {
-        pages_[page].reset();
+        if (pages_[page] != nullptr) held.emplace_back(page, std::move(pages_[page]));
         ++eraseCounts_[page];
     }
+    return held;
 }
 
 void FlashArray::Preset(std::uint32_t address, std::span<const std::uint8_t> bytes) {

@@ -9,6 +9,7 @@
 #include <memory>
 #include <optional>
 #include <span>
+#include <utility>
 #include <vector>
 
 #include "target/simulated/options/DeviceOptions.h"
@@ -19,6 +20,7 @@ class FlashArray {
   public:
     static constexpr std::uint32_t kPageSizeBytes = 1024;
     using Page = std::array<std::uint8_t, kPageSizeBytes>;
+    using HeldPages = std::vector<std::pair<std::size_t, std::unique_ptr<Page>>>;
 
     /// sizeBytes is a multiple of the page size.
     FlashArray(std::uint32_t sizeBytes, std::optional<StuckCell> stuckCell);
@@ -37,7 +39,8 @@ class FlashArray {
                                          std::span<const std::uint8_t> bytes);
 
     /// Sets all bits of the pages from `address` on; both numbers are multiples of the page size.
-    void Erase(std::uint32_t address, std::uint32_t sizeBytes);
+    /// Returns those that held something, with their index.
+    HeldPages Erase(std::uint32_t address, std::uint32_t sizeBytes);
 
     /// How often a page was erased.
     std::uint32_t EraseCount(std::size_t index) const { return eraseCounts_[index]; }

@@ -1,4 +1,5 @@
-// The commands of the flash controller, in the order: key, command, operand, work, end.
+// The commands of the flash controller, in the order: registers, key, what may lose a command,
+// operand, work, end.
 
 #include "target/simulated/FlashController.h"
 
@@ -12,6 +13,9 @@ namespace target {
 
 namespace {
 
+using namespace std::chrono_literals;
+using Time = FlashController::Time;
+
 constexpr std::uint32_t kEraseSector = 0x2;
 constexpr std::uint32_t kEraseAll = 0x4;
 constexpr std::uint32_t kCommit = 0x8;
@@ -22,17 +26,74 @@ constexpr std::uint32_t kPrimaryKeyBit = 0x10;  // of the key configuration
 
 constexpr std::uint32_t kCommitBase = 0x80000000;
 
+// A mass erase works on all that lies below the end of the bank that it is given. There are two.
+constexpr std::uint32_t kLowerBank = 0;
+constexpr std::uint32_t kUpperBank = 0x20000;
+
 // One bit of a flash block register stands for this much flash.
 constexpr std::uint32_t kFlashBlockSizeBytes = 2048;
 constexpr std::uint32_t kFlashBlockRegisters = 4;
 
+// What the charge pump and the address latches need. The rest of the silicon is faster.
+constexpr Time kAddressSetUp = 4ms;   // of a sector, before its erase
+constexpr Time kEraseRecovery = 4ms;  // after a sector, before the next address
+constexpr Time kBlockWrite = 8ms;     // of a flash block register
+constexpr Time kSectorStatus = 4ms;   // until the status shows a sector's erase
+constexpr Time kMassStatus = 8ms;     // and one of the whole flash
+
+Time StatusDelay(std::uint32_t bit) {
+    return bit == kEraseSector ? kSectorStatus : bit == kEraseAll ? kMassStatus : Time(0);
+}
+
 }  // namespace
 
 FlashController::FlashController(const DeviceOptions& options, RegisterFile& registers,
-                                 FlashArray& flash, RuleLog& rules)
-    : options_(options), registers_(registers), flash_(flash), rules_(rules) {}
+                                 SystemControl& system, FlashArray& flash, RuleLog& rules)
+    : options_(options),
+      registers_(registers),
+      system_(system),
+      flash_(flash),
+      rules_(rules),
+      unsettled_(flash) {}
 
-void FlashController::Command(std::uint32_t value, bool coreRunning, Time now) {
+bool FlashController::Owns(std::uint32_t address) {
+    return address == reg::kFlashAddress || address == reg::kFlashCommand ||
+           (address >= reg::kFlashBlocks0 &&
+            address < reg::kFlashBlocks0 + 4 * kFlashBlockRegisters);
+}
+
+void FlashController::Write(std::uint32_t address, std::uint32_t value, CoreState core, Time now) {
+    if (address == reg::kFlashAddress) return WriteAddress(value, now);
+    if (address == reg::kFlashCommand) return Command(value, core, now);
+    WriteBlocks(address, value, now);
+}
+
+// A lost address leaves the old one, which the next command then works on.
+void FlashController::WriteAddress(std::uint32_t value, Time now) {
+    const auto lost = [&](const char* ruleName, const char* why) {
+        rules_.Record(ruleName, fmt::format("Flash address 0x{:08X} lost: {}", value, why));
+    };
+    if (IsBusy()) return lost(rule::kOneCommand, "a command is at work");
+    if (!system_.IsClockStable(now))
+        return lost(rule::kClockSettling, "the clock was switched too short a time before");
+    if (sectorErased_ && now < *sectorErased_ + kEraseRecovery)
+        return lost(rule::kEraseRecovery, "a sector's erase ended too short a time before");
+    registers_.Write(reg::kFlashAddress, value);
+    addressWritten_ = now;
+}
+
+void FlashController::WriteBlocks(std::uint32_t address, std::uint32_t value, Time now) {
+    if (now < blocksReady_) {
+        return rules_.Record(rule::kBlockWrite,
+                             fmt::format("Flash blocks 0x{:08X} lost: the last word of these "
+                                         "registers is still being written",
+                                         value));
+    }
+    registers_.Write(address, value);
+    blocksReady_ = now + kBlockWrite;
+}
+
+void FlashController::Command(std::uint32_t value, CoreState core, Time now) {
     if (!TakesKey(value >> 16)) {
         rules_.Record(rule::kWriteKey,
                       fmt::format("Flash command 0x{:08X} ignored: wrong write key", value));
@@ -47,13 +108,12 @@ void FlashController::Command(std::uint32_t value, bool coreRunning, Time now) {
         Refuse(rule::kOneCommand,
                fmt::format("the flash controller still works on command 0x{:X}", running_->bit));
     }
-    if (coreRunning && bit != kCommit) {
+    if (core != CoreState::Halted && bit != kCommit) {
         Refuse(rule::kHaltedForErase, "the flash is erased under a running program");
     }
-    if (bit == kEraseAll && BlocksBeyondFlashAreEnabled()) {
-        rules_.Record(rule::kFlashBlocks,
-                      "Mass erase ignored: the flash block registers enable blocks that the flash "
-                      "doesn't have");
+    if (const auto obstacle = WhyCommandIsLost(bit, now)) {
+        rules_.Record(obstacle->rule,
+                      fmt::format("Flash command 0x{:08X} lost: {}", value, obstacle->why));
         return;
     }
     running_ = bit == kEraseSector ? SectorErase(now)
@@ -68,6 +128,29 @@ bool FlashController::TakesKey(std::uint32_t key) const {
     return key == (alternate ? kAlternateKey : kPrimaryKey);
 }
 
+// A commit works on cells of its own, which need none of this.
+std::optional<Obstacle> FlashController::WhyCommandIsLost(std::uint32_t bit, Time now) const {
+    if (bit == kCommit) return std::nullopt;
+    if (const auto obstacle = system_.WhyFlashIsNotReady()) return obstacle;
+    if (bit == kEraseSector) {
+        if (addressWritten_ && now < *addressWritten_ + kAddressSetUp) {
+            return Obstacle{rule::kAddressSetUp, "it came too soon after the address"};
+        }
+        return std::nullopt;
+    }
+    if (!IsBank(registers_.Read(reg::kFlashAddress))) {
+        return Obstacle{rule::kBank, "the flash address register holds the start of no bank"};
+    }
+    if (BlocksBeyondFlashAreEnabled()) {
+        return Obstacle{rule::kFlashBlocks,
+                        "the flash block registers enable blocks that the flash doesn't have"};
+    }
+    if (now < blocksReady_) {
+        return Obstacle{rule::kBlockWrite, "the flash block registers are still being written"};
+    }
+    return std::nullopt;
+}
+
 FlashController::Running FlashController::SectorErase(Time now) const {
     const std::uint32_t address = registers_.Read(reg::kFlashAddress);
     if (!flash_.Contains(address, 1) || address % options_.sectorSizeBytes != 0) {
@@ -77,11 +160,15 @@ FlashController::Running FlashController::SectorErase(Time now) const {
                            address, options_.sectorSizeBytes, flash_.SizeBytes()));
     }
     const std::uint32_t size = std::min(options_.sectorSizeBytes, flash_.SizeBytes() - address);
-    return {kEraseSector, address, size, now + options_.timings.sectorErase};
+    return {kEraseSector, address, size, now, now + options_.timings.sectorErase};
 }
 
+// Up to the end of the bank; the upper one ends where the flash does.
 FlashController::Running FlashController::MassErase(Time now) const {
-    return {kEraseAll, 0, flash_.SizeBytes(), now + options_.timings.massErase};
+    const bool lower = registers_.Read(reg::kFlashAddress) == kLowerBank;
+    const std::uint32_t size =
+        lower ? std::min(kUpperBank, flash_.SizeBytes()) : flash_.SizeBytes();
+    return {kEraseAll, 0, size, now, now + options_.timings.massErase};
 }
 
 FlashController::Running FlashController::Commit(Time now) const {
@@ -93,7 +180,11 @@ FlashController::Running FlashController::Commit(Time now) const {
                            "register of class {}",
                            operand, options_.className));
     }
-    return {kCommit, address, 0, now + options_.timings.commit};
+    return {kCommit, address, 0, now, now + options_.timings.commit};
+}
+
+bool FlashController::IsBank(std::uint32_t address) const {
+    return address == kLowerBank || (address == kUpperBank && flash_.Contains(address, 1));
 }
 
 // The block registers cover more flash than a small device has. While a bit beyond its end is
@@ -110,6 +201,35 @@ bool FlashController::BlocksBeyondFlashAreEnabled() const {
     return false;
 }
 
+// What lies beyond the registers' reach is always enabled.
+bool FlashController::IsBlockEnabled(std::uint32_t address) const {
+    const std::uint32_t block = address / kFlashBlockSizeBytes;
+    if (!registers_.Has(reg::kFlashBlocks0) || block >= 32 * kFlashBlockRegisters) return true;
+    return (registers_.Read(reg::kFlashBlocks0 + block / 32 * 4) >> block % 32 & 1) != 0;
+}
+
+void FlashController::EraseEnabledBlocks(const Running& erase, Time now) {
+    if (!registers_.Has(reg::kFlashBlocks0)) {
+        return unsettled_.Erase(erase.address, erase.sizeBytes, now);
+    }
+    const std::uint32_t end = erase.address + erase.sizeBytes;
+    for (std::uint32_t start = erase.address, next = start; start < end; start = next) {
+        next = std::min(end, (start / kFlashBlockSizeBytes + 1) * kFlashBlockSizeBytes);
+        if (IsBlockEnabled(start)) unsettled_.Erase(start, next - start, now);
+    }
+}
+
+bool FlashController::IsHidden(Time now) const {
+    return running_ && now - running_->start < StatusDelay(running_->bit);
+}
+
+std::uint32_t FlashController::ReadStatus(Time now) const {
+    if (IsHidden(now)) {
+        rules_.Record(rule::kStatusDelay, "Flash status reads idle: it doesn't show the erase yet");
+    }
+    return Status(now);
+}
+
 void FlashController::AdvanceTo(Time now) {
     if (!running_) return;
     const bool commit = running_->bit == kCommit;
@@ -119,17 +239,41 @@ void FlashController::AdvanceTo(Time now) {
     if (commit) {
         registers_.SetResetValue(running_->address, registers_.Read(running_->address));
     } else {
-        flash_.Erase(running_->address, running_->sizeBytes);
+        EraseEnabledBlocks(*running_, running_->end);
+        inEraseMode_ = true;
+        if (running_->bit == kEraseSector) sectorErased_ = running_->end;
     }
     running_.reset();
 }
 
-void FlashController::Abort() {
+void FlashController::Reset() {
     if (running_ && running_->bit != kCommit) {
         const std::uint32_t half = running_->sizeBytes / 2;
         flash_.Erase(running_->address, half - half % FlashArray::kPageSizeBytes);
     }
     running_.reset();
+    inEraseMode_ = false;
+    sectorErased_.reset();
+    addressWritten_.reset();
+    blocksReady_ = Time(0);
+}
+
+std::optional<Obstacle> FlashController::PrepareToProgram(std::uint32_t address,
+                                                          std::uint32_t sizeBytes, Time now) {
+    if (const auto obstacle = system_.WhyFlashIsNotReady()) return obstacle;
+    if (system_.IsRomAt(address, now)) {
+        return Obstacle{rule::kRomAlias, "the ROM lies over it"};
+    }
+    if (inEraseMode_) {
+        return Obstacle{rule::kResetAfterErase, "no reset has followed the last erase"};
+    }
+    if (unsettled_.Undo(address, sizeBytes, now)) {
+        rules_.Record(rule::kEraseSettling,
+                      fmt::format("Erase of the flash at 0x{:08X} undone: it was used before the "
+                                  "erase had settled",
+                                  address));
+    }
+    return std::nullopt;
 }
 
 }  // namespace target

@@ -41,7 +41,7 @@ bool Overlap(std::uint64_t startA, std::uint64_t sizeA, std::uint64_t startB, st
 }  // namespace
 
 Loader::Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash,
-               const FlashController& controller, RuleLog& rules)
+               FlashController& controller, RuleLog& rules)
     : options_(options), ram_(ram), flash_(flash), controller_(controller), rules_(rules) {}
 
 void Loader::Start() {
@@ -108,7 +108,16 @@ bool Loader::StartChunk(Time start) {
         block_ ^= 1;
         return true;
     }
-    chunk_ = Chunk{address, size, start + options_.timings.chunk};
+    chunk_ = Chunk{address, size, start + options_.timings.chunk, IsLost(address, size, start)};
+    return true;
+}
+
+// The loader can't tell: it reports such a chunk like any other.
+bool Loader::IsLost(std::uint32_t address, std::uint32_t sizeBytes, Time start) {
+    const auto obstacle = controller_.PrepareToProgram(address, sizeBytes, start);
+    if (!obstacle) return false;
+    rules_.Record(obstacle->rule, fmt::format("The loader programmed nothing at 0x{:08X}: {}",
+                                              address, obstacle->why));
     return true;
 }
 
@@ -121,6 +130,7 @@ void Loader::FinishChunk() {
 }
 
 void Loader::ProgramFromBuffer(std::uint32_t sizeBytes) {
+    if (chunk_->lost) return;
     const auto notErased =
         flash_.Program(chunk_->flashAddress, ram_.Bytes(Buffer(block_), sizeBytes));
     if (notErased) {

@@ -21,8 +21,8 @@ class Loader {
 
     static constexpr char kFileName[] = "FlashLoaderMerrow.out";
 
-    Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash,
-           const FlashController& controller, RuleLog& rules);
+    Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash, FlashController& controller,
+           RuleLog& rules);
 
     /// Enters the program at its start: both status words become 0 (idle) at once, and block 0
     /// is served first, then the two in turn.
@@ -54,16 +54,18 @@ class Loader {
         std::uint32_t flashAddress;
         std::uint32_t sizeBytes;
         Time end;
+        bool lost;  ///< flash wasn't ready for it
     };
 
     bool StartChunk(Time start);
     void FinishChunk();
+    bool IsLost(std::uint32_t address, std::uint32_t sizeBytes, Time start);
     void ProgramFromBuffer(std::uint32_t sizeBytes);
 
     const DeviceOptions& options_;
     Ram& ram_;
     FlashArray& flash_;
-    const FlashController& controller_;
+    FlashController& controller_;
     RuleLog& rules_;
     bool running_ = false;
     bool halted_ = false;         ///< in the middle of its work

@@ -42,11 +42,13 @@ std::uint64_t Transfer::SizeBytes() const {
 }
 
 MemoryMap::MemoryMap(const DeviceOptions& options, FlashArray& flash, Ram& ram,
-                     RegisterFile& registers, FlashController& controller, Loader& loader)
+                     RegisterFile& registers, SystemControl& system, FlashController& controller,
+                     Loader& loader)
     : registerFault_(options.faults.registers),
       flash_(flash),
       ram_(ram),
       registers_(registers),
+      system_(system),
       controller_(controller),
       loader_(loader) {}
 
@@ -71,7 +73,7 @@ MemoryMap::Region MemoryMap::CheckedRegion(const Transfer& transfer) const {
     return Region::Registers;
 }
 
-void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes) const {
+void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes, Time now) const {
     const std::uint32_t address = transfer.address;
     const std::size_t size = transfer.SizeBytes();
     switch (CheckedRegion(transfer)) {
@@ -79,8 +81,7 @@ void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes) const {
             if (controller_.IsBusy() || loader_.IsProgramming()) {
                 Refuse(rule::kFlashBusy, "the flash is being erased or programmed");
             }
-            flash_.Read(address, {bytes, size});
-            return;
+            return ReadFlash(address, {bytes, size}, now);
         case Region::Ram: {
             const auto held = ram_.Bytes(address, size);
             std::copy(held.begin(), held.end(), bytes);
@@ -88,14 +89,22 @@ void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes) const {
         }
         case Region::Registers:
             for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
-                base::StoreWord(bytes + offset, ReadRegister(address + offset));
+                base::StoreWord(bytes + offset, ReadRegister(address + offset, now));
             }
             return;
     }
 }
 
-void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, bool coreRunning,
-                      std::chrono::nanoseconds now) {
+// The ROM, where it lies over the flash, is no error: whoever reads there gets what is there.
+void MemoryMap::ReadFlash(std::uint32_t address, std::span<std::uint8_t> bytes, Time now) const {
+    flash_.Read(address, bytes);
+    if (!system_.IsRomAt(address, now)) return;
+    const std::size_t covered = SystemControl::kRomSizeBytes - address;
+    std::fill_n(bytes.begin(), std::min(covered, bytes.size()), SystemControl::kRomByte);
+}
+
+void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, CoreState core,
+                      Time now) {
     const std::uint32_t address = transfer.address;
     const std::size_t size = transfer.SizeBytes();
     switch (CheckedRegion(transfer)) {
@@ -110,13 +119,13 @@ void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, bool 
             return;
         case Region::Registers:
             for (std::uint32_t offset = 0; offset < size; offset += kRegisterSizeBytes) {
-                WriteRegister(address + offset, base::LoadWord(bytes + offset), coreRunning, now);
+                WriteRegister(address + offset, base::LoadWord(bytes + offset), core, now);
             }
             return;
     }
 }
 
-std::uint32_t MemoryMap::ReadRegister(std::uint32_t address) const {
+std::uint32_t MemoryMap::PeekRegister(std::uint32_t address, Time now) const {
     switch (registerFault_) {
         case RegisterFault::Ones:
             return 0xFFFFFFFF;
@@ -125,22 +134,25 @@ std::uint32_t MemoryMap::ReadRegister(std::uint32_t address) const {
         case RegisterFault::None:
             break;
     }
-    return address == reg::kFlashCommand ? controller_.Status() : registers_.Read(address);
+    return address == reg::kFlashCommand ? controller_.Status(now) : registers_.Read(address);
 }
 
-void MemoryMap::WriteRegister(std::uint32_t address, std::uint32_t value, bool coreRunning,
-                              std::chrono::nanoseconds now) {
+std::uint32_t MemoryMap::ReadRegister(std::uint32_t address, Time now) const {
+    if (address == reg::kFlashCommand && registerFault_ == RegisterFault::None) {
+        return controller_.ReadStatus(now);
+    }
+    return PeekRegister(address, now);
+}
+
+void MemoryMap::WriteRegister(std::uint32_t address, std::uint32_t value, CoreState core,
+                              Time now) {
     // A register bus that reads constants doesn't bring a write through either.
     if (registerFault_ != RegisterFault::None) return;
-    const bool flashRegister = address == reg::kFlashAddress || address == reg::kFlashCommand;
-    if (flashRegister && loader_.IsProgramming()) {
+    if (!FlashController::Owns(address)) return system_.Write(address, value, core, now);
+    if (loader_.IsProgramming()) {
         Refuse(rule::kFlashBusy, "the loader is using the flash controller");
     }
-    if (address == reg::kFlashCommand) {
-        controller_.Command(value, coreRunning, now);
-    } else {
-        registers_.Write(address, value);
-    }
+    controller_.Write(address, value, core, now);
 }
 
 }  // namespace target

@@ -5,12 +5,14 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 
 #include "target/simulated/FlashArray.h"
 #include "target/simulated/FlashController.h"
 #include "target/simulated/Loader.h"
 #include "target/simulated/Ram.h"
 #include "target/simulated/RegisterFile.h"
+#include "target/simulated/SystemControl.h"
 #include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
@@ -31,28 +33,32 @@ struct Transfer {
 
 class MemoryMap {
   public:
+    using Time = std::chrono::nanoseconds;
+
     MemoryMap(const DeviceOptions& options, FlashArray& flash, Ram& ram, RegisterFile& registers,
-              FlashController& controller, Loader& loader);
+              SystemControl& system, FlashController& controller, Loader& loader);
 
     /// Both throw RuleBroken; of a transfer to several registers, those before the refused one
     /// have been written then.
-    void Read(const Transfer& transfer, std::uint8_t* bytes) const;
-    void Write(const Transfer& transfer, const std::uint8_t* bytes, bool coreRunning,
-               std::chrono::nanoseconds now);
+    void Read(const Transfer& transfer, std::uint8_t* bytes, Time now) const;
+    void Write(const Transfer& transfer, const std::uint8_t* bytes, CoreState core, Time now);
 
-    std::uint32_t ReadRegister(std::uint32_t address) const;
+    /// What a register reads, without being read.
+    std::uint32_t PeekRegister(std::uint32_t address, Time now) const;
 
   private:
     enum class Region { Flash, Ram, Registers };
 
     Region CheckedRegion(const Transfer& transfer) const;
-    void WriteRegister(std::uint32_t address, std::uint32_t value, bool coreRunning,
-                       std::chrono::nanoseconds now);
+    void ReadFlash(std::uint32_t address, std::span<std::uint8_t> bytes, Time now) const;
+    std::uint32_t ReadRegister(std::uint32_t address, Time now) const;
+    void WriteRegister(std::uint32_t address, std::uint32_t value, CoreState core, Time now);
 
     const RegisterFault registerFault_;
     FlashArray& flash_;
     Ram& ram_;
     RegisterFile& registers_;
+    SystemControl& system_;
     FlashController& controller_;
     Loader& loader_;
 };

@@ -42,26 +42,28 @@ struct RegisterFile::Row {
     const char* name;
     Traits devices;
     std::uint32_t resetValue;
+    bool staysAtReset = false;  ///< only power-up brings it back
 };
 
 // Reset values of 0 in read-only rows and in the key configuration come from the options. The
-// clock registers wake up with the bits set that a driver has to clear.
+// clock registers wake up with the bits set that a driver has to clear. Clock, flash timing and the
+// test registers belong to the part of the device that a reset by the debug port doesn't reach.
 const RegisterFile::Row RegisterFile::kRows[] = {
-    {0x400AE2C0, Kind::ReadWrite, "system control 0x400AE2C0", kQuen, 0x00000001},
+    {reg::kTestControl, Kind::ReadWrite, "system control 0x400AE2C0", kQuen, 0x00000001, true},
     {reg::kFlashAddress, Kind::ReadWrite, "flash address", kAll, 0},
-    {0x400FD0FC, Kind::ReadWrite, "flash control 0x400FD0FC", kQuen, 0},
+    {reg::kTestLock, Kind::ReadWrite, "flash control 0x400FD0FC", kQuen, 0, true},
     {reg::kFlashSize, Kind::ReadOnly, "flash size", kTwoSizeRegisters, 0},
     {reg::kRamSize, Kind::ReadOnly, "SRAM size", kTwoSizeRegisters, 0},
     {reg::kIdentification, Kind::ReadOnly, "device identification 0", kAll, 0},
     {reg::kCapabilities, Kind::ReadOnly, "device capabilities 0", kOneSizeRegister, 0},
-    {0x400FE040, Kind::ReadWrite, "software reset control 0", kAll, 0},
-    {0x400FE044, Kind::ReadWrite, "software reset control 1", kAll, 0},
-    {0x400FE048, Kind::ReadWrite, "software reset control 2", kAll, 0},
-    {0x400FE058, Kind::ReadWrite, "system control 0x400FE058", kOldest, 0},
-    {0x400FE060, Kind::ReadWrite, "clock configuration", kAll, 0x01C03FF3},
-    {0x400FE070, Kind::ReadWrite, "clock configuration 2", kOrrin, 0x80007810},
-    {0x400FE0F0, Kind::WriteOneToClear, "ROM control", kRom, 0x00000001},
-    {0x400FE140, Kind::ReadWrite, "flash timing", kOldest, 0x00000031},
+    {reg::kSoftwareReset0, Kind::ReadWrite, "software reset control 0", kAll, 0},
+    {reg::kSoftwareReset0 + 4, Kind::ReadWrite, "software reset control 1", kAll, 0},
+    {reg::kSoftwareReset0 + 8, Kind::ReadWrite, "software reset control 2", kAll, 0},
+    {reg::kClockStatus, Kind::ReadWrite, "system control 0x400FE058", kOldest, 0, true},
+    {reg::kClock, Kind::ReadWrite, "clock configuration", kAll, 0x01C03FF3, true},
+    {reg::kClock2, Kind::ReadWrite, "clock configuration 2", kOrrin, 0x80007810, true},
+    {reg::kRomControl, Kind::WriteOneToClear, "ROM control", kRom, 0x00000001},
+    {reg::kFlashTiming, Kind::ReadWrite, "flash timing", kOldest, 0x00000031, true},
     {0x400FE1A0, Kind::ReadOnly, "flash-buffer capability", kAll & ~kOldest, 0x00000001},
     {0x400FE1A0, Kind::ReadOnly, "flash-buffer capability", kOldest, 0},
     {reg::kKeyConfiguration, Kind::ReadOnly, "key configuration", kAll, 0},
@@ -78,10 +80,11 @@ RegisterFile::RegisterFile(const DeviceOptions& options) : className_(options.cl
     const Traits traits = TraitsOf(options);
     for (const Row& row : kRows) {
         if ((row.devices & traits) == 0) continue;
-        registers_[row.address] = {row.name, row.kind, row.resetValue, row.resetValue};
+        registers_[row.address] = {row.name, row.kind, row.resetValue, row.resetValue,
+                                   row.staysAtReset};
     }
     SetOptionValues(options);
-    Reset();
+    PowerUp();
 }
 
 void RegisterFile::SetOptionValues(const DeviceOptions& options) {
@@ -122,9 +125,14 @@ void RegisterFile::Write(std::uint32_t address, std::uint32_t value) {
     written.value = found.kind == Kind::WriteOneToClear ? written.value & ~value : value;
 }
 
-void RegisterFile::Reset() {
+void RegisterFile::PowerUp() {
     for (auto& [address, entry] : registers_)
         entry.value = entry.resetValue;
+}
+
+void RegisterFile::Reset() {
+    for (auto& [address, entry] : registers_)
+        if (!entry.staysAtReset) entry.value = entry.resetValue;
 }
 
 std::uint32_t RegisterFile::ResetValue(std::uint32_t address) const {

@@ -32,9 +32,28 @@ inline constexpr char kLoadedForRun[] = "loaded-for-run";
 inline constexpr char kHaltedForRun[] = "halted-for-run";
 inline constexpr char kBufferInUse[] = "buffer-in-use";
 
-// Broken without anybody being told: the device has no way to, or ignores the request.
+// Broken without anybody being told: the device has no way to, or ignores the request. Writes that
+// come too soon or out of order are lost, as they are on silicon.
 inline constexpr char kWriteKey[] = "write-key";
 inline constexpr char kFlashBlocks[] = "flash-blocks";
+inline constexpr char kBlockWrite[] = "block-write";
+inline constexpr char kFlashTiming[] = "flash-timing";
+inline constexpr char kHaltedForTiming[] = "halted-for-timing";
+inline constexpr char kTimingSetUp[] = "timing-set-up";
+inline constexpr char kClockSetUp[] = "clock-set-up";
+inline constexpr char kHaltedForClock[] = "halted-for-clock";
+inline constexpr char kClockSettling[] = "clock-settling";
+inline constexpr char kFixUp[] = "fix-up";
+inline constexpr char kResetRecovery[] = "reset-recovery";
+inline constexpr char kPeripheralReset[] = "peripheral-reset";
+inline constexpr char kHaltedForReset[] = "halted-for-reset";
+inline constexpr char kRomAlias[] = "rom-alias";
+inline constexpr char kBank[] = "bank";
+inline constexpr char kAddressSetUp[] = "address-set-up";
+inline constexpr char kEraseRecovery[] = "erase-recovery";
+inline constexpr char kStatusDelay[] = "status-delay";
+inline constexpr char kEraseSettling[] = "erase-settling";
+inline constexpr char kResetAfterErase[] = "reset-after-erase";
 inline constexpr char kLoaderParameters[] = "loader-parameters";
 inline constexpr char kErasedCells[] = "erased-cells";
 

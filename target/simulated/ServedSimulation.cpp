@@ -97,8 +97,14 @@ void ServedSimulation::Stop() {
     if (ran && inLoader_) registers_.values[gdb::CoreRegisters::kPc] = haltedAt_;
 }
 
+// The core is left at the program in flash, as the registers say: the boot ROM has run.
 void ServedSimulation::Reset() {
-    Do([&] { device_.Reset(true); });
+    Do([&] {
+        device_.Halt();
+        device_.Reset(true);
+        device_.Continue();
+        device_.Halt();
+    });
     ResetRegisters();
 }
 

@@ -24,9 +24,10 @@ SimulatedDevice::SimulatedDevice(const DeviceOptions& options, Clock* clock)
       flash_(options_.flashSizeBytes, options_.faults.stuckCell),
       ram_(options_.ramSizeBytes),
       registers_(options_),
-      controller_(options_, registers_, flash_, rules_),
+      system_(options_, registers_, rules_),
+      controller_(options_, registers_, system_, flash_, rules_),
       loader_(options_, ram_, flash_, controller_, rules_),
-      memory_(options_, flash_, ram_, registers_, controller_, loader_) {
+      memory_(options_, flash_, ram_, registers_, system_, controller_, loader_) {
     PowerCycle();
 }
 
@@ -38,7 +39,7 @@ void SimulatedDevice::Read(void* buffer, std::size_t count, std::uint32_t addres
                            page);
     };
     Perform(transfer.SizeBytes(), describe,
-            [&] { memory_.Read(transfer, static_cast<std::uint8_t*>(buffer)); });
+            [&] { memory_.Read(transfer, static_cast<std::uint8_t*>(buffer), time_.Now()); });
 }
 
 void SimulatedDevice::Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
@@ -49,7 +50,7 @@ void SimulatedDevice::Write(const void* buffer, std::size_t count, std::uint32_t
                            page);
     };
     Perform(transfer.SizeBytes(), describe, [&] {
-        memory_.Write(transfer, static_cast<const std::uint8_t*>(buffer), running_, time_.Now());
+        memory_.Write(transfer, static_cast<const std::uint8_t*>(buffer), Core(), time_.Now());
     });
 }
 
@@ -85,17 +86,19 @@ void SimulatedDevice::Halt() {
 void SimulatedDevice::Continue() {
     Perform(0, "Letting the target go on", [&] {
         running_ = true;
+        if (!programLoaded_) system_.RunBootRom();
         loader_.Continue(time_.Now());
     });
 }
 
-// The two kinds of reset differ in how the probe goes about them, not in what becomes of the
-// device.
-void SimulatedDevice::Reset(bool /*flag*/) {
+// With the flag it is a system reset, which reaches the peripherals, and without it one of the core
+// alone. Either leaves the core halted before the first instruction of the boot ROM.
+void SimulatedDevice::Reset(bool flag) {
     Perform(0, "Resetting the target", [&] {
+        system_.Reset(flag, Core(), time_.Now());
         StopCore();
         loader_.Forget();
-        controller_.Abort();
+        controller_.Reset();
         registers_.Reset();
         programLoaded_ = false;
     });
@@ -146,6 +149,12 @@ const char* SimulatedDevice::RequestedFault() const {
     return nullptr;
 }
 
+CoreState SimulatedDevice::Core() const {
+    return !running_        ? CoreState::Halted
+           : programLoaded_ ? CoreState::RunsLoader
+                            : CoreState::RunsFlash;
+}
+
 void SimulatedDevice::StopCore() {
     loader_.Stop();
     running_ = false;
@@ -154,8 +163,9 @@ void SimulatedDevice::StopCore() {
 void SimulatedDevice::PowerCycle() {
     StopCore();
     loader_.Forget();
-    controller_.Abort();
-    registers_.Reset();
+    controller_.Reset();
+    registers_.PowerUp();
+    system_.PowerUp();
     ram_.LosePower();
     programLoaded_ = false;
     running_ = true;
@@ -184,7 +194,7 @@ void SimulatedDevice::PresetCommittedUserRegisters(const std::array<std::uint32_
 
 std::uint32_t SimulatedDevice::PeekRegister(std::uint32_t address) const {
     try {
-        return memory_.ReadRegister(address);
+        return memory_.PeekRegister(address, time_.Now());
     } catch (const RuleBroken& error) {
         throw TargetError(error.what());
     }

@@ -1,10 +1,12 @@
 // SimulatedDevice: a Corvane microcontroller as it looks through a debug probe: flash at 0, RAM at
 // 0x20000000, registers above, and a core that runs the flash loader.
 //
-// It is stricter than silicon. What real hardware would ignore, garble or lose is a TargetError
-// that names the broken rule. Time is simulated: it goes on with every pause, with what each
-// access costs, and with the injected clock. There is no thread; each access first brings the
-// device up to now.
+// It is as strict as silicon, and where a debug port could tell, it tells: such an access is a
+// TargetError that names the broken rule. What silicon loses without a word (a command that comes
+// too soon, a chunk for flash that isn't ready) is lost here as well, and the log of the rules
+// alone has it. docs/simulated-device.md lists what the device wants. Time is simulated: it goes on
+// with every pause, with what each access costs, and with the injected clock. There is no thread;
+// each access first brings the device up to now.
 
 #pragma once
 
@@ -24,6 +26,7 @@
 #include "target/simulated/RegisterFile.h"
 #include "target/simulated/Rules.h"
 #include "target/simulated/SimulatedTime.h"
+#include "target/simulated/SystemControl.h"
 #include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
@@ -95,6 +98,7 @@ class SimulatedDevice final : public Target {
     void Perform(std::uint64_t sizeBytes, const Describe& describe, const Action& action);
     void AdvanceToNow();
     const char* RequestedFault() const;
+    CoreState Core() const;
     void StopCore();
 
     const DeviceOptions options_;
@@ -103,6 +107,7 @@ class SimulatedDevice final : public Target {
     FlashArray flash_;
     Ram ram_;
     RegisterFile registers_;
+    SystemControl system_;
     FlashController controller_;
     Loader loader_;
     MemoryMap memory_;

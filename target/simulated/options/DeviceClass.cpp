@@ -56,4 +56,13 @@ bool HasRom(const DeviceOptions& options) {
     return field >= 3 || (field == 1 && MajorRevision(options) >= 1);
 }
 
+bool NeedsFlashSetUp(const DeviceOptions& options) {
+    const DeviceKind kind = KindOf(options);
+    return kind == DeviceKind::Ravik || (kind <= DeviceKind::Mesk && MajorRevision(options) <= 1);
+}
+
+bool NeedsClockFixUp(const DeviceOptions& options) {
+    return KindOf(options) == DeviceKind::Orrin && options.identification == 0x10040101;
+}
+
 }  // namespace target

@@ -38,4 +38,11 @@ bool HasSizeRegisters(const DeviceOptions& options);
 /// Ravik and the first Tolva have no ROM, and so nothing that could lie over the flash.
 bool HasRom(const DeviceOptions& options);
 
+/// The three oldest classes don't know how to time their flash until somebody sets their clock up
+/// and tells them. From the third revision on they do.
+bool NeedsFlashSetUp(const DeviceOptions& options);
+
+/// The first silicon of Orrin wakes up with a clock that is too fast for its flash.
+bool NeedsClockFixUp(const DeviceOptions& options);
+
 }  // namespace target
