@@ -9,6 +9,7 @@
 #include <numeric>
 
 #include "target/simulated/Contents.h"
+#include "target/simulated/DeviceClass.h"
 
 namespace {
 
@@ -17,6 +18,7 @@ using Bytes = std::vector<std::uint8_t>;
 
 constexpr std::uint32_t kFlashAddress = 0x400FD000;
 constexpr std::uint32_t kFlashCommand = 0x400FD008;
+constexpr std::uint32_t kClock = 0x400FE060;
 constexpr std::uint32_t kUser0 = 0x400FE1E0;
 constexpr std::uint32_t kStatus[] = {0x2000100C, 0x2000101C};
 constexpr std::uint32_t kBusy = 0xFFFFFFFF;
@@ -24,9 +26,27 @@ constexpr char kLoader[] = "FlashLoaderMerrow.out";
 
 // A device under a clock that stands still, and the few things that a debugger does with it.
 struct Rig {
-    explicit Rig(const std::string& options = "tolva")
+    explicit Rig(const std::string& options = "tolva", bool setUp = true)
         : device(target::ParseDeviceOptions(options), &clock) {
         device.Halt();
+        if (setUp) SetUp();
+    }
+
+    // What the class wants before its flash is worked on.
+    void SetUp() {
+        if (target::NeedsFlashSetUp(device.Options())) {
+            SetWord(0x400FE140, 7);
+            device.Pause(16);
+            SetWord(kClock, 0x01803FF3);
+            SetWord(0x400FE058, 0x40);
+            for (const std::uint32_t word : {0x01803F80U, 0x01803F80U, 0x07803F82U, 0x07803F82U})
+                SetWord(kClock, word);
+            device.Pause(16);
+        } else if (device.Options().className == "quen") {
+            SetWord(0x400FD0FC, 3);
+            SetWord(0x400AE2C0, 0);
+            SetWord(0x400FD0FC, 0);
+        }
     }
 
     std::uint32_t Word(std::uint32_t address) {
@@ -39,6 +59,7 @@ struct Rig {
     }
     void Command(std::uint32_t address, std::uint32_t command) {
         SetWord(kFlashAddress, address);
+        device.Pause(4);
         SetWord(kFlashCommand, command);
     }
     void StartLoader() {
@@ -55,6 +76,13 @@ struct Rig {
     Bytes Flash(std::uint32_t address, std::size_t size) {
         Bytes bytes(size);
         device.Read(bytes.data(), size, address, 0, 1);
+        return bytes;
+    }
+
+    // What is there, whatever reads there.
+    Bytes Cells(std::uint32_t address, std::size_t size) const {
+        Bytes bytes(size);
+        device.Flash().Read(address, bytes);
         return bytes;
     }
 
@@ -99,7 +127,7 @@ TEST(Rules, RefusedAccessNamesTheRule) {
         {"[one-command]",
          [](Rig& r) {
              r.Command(0, 0xA4420002);
-             r.Command(0, 0xA4420002);
+             r.SetWord(kFlashCommand, 0xA4420002);
          }},
         {"[flash-busy]",
          [](Rig& r) {
@@ -179,7 +207,11 @@ TEST(WriteKey, WrongOneDoesNothing) {
         for (const std::uint32_t key : {wrong, right}) {
             for (const std::uint32_t command : {2U, 4U, 8U}) {
                 rig.SetWord(kUser0, command);
-                rig.Command(command == 8 ? 0x80000000 : 0x4000, key << 16 | command);
+                rig.Command(command == 8   ? 0x80000000
+                            : command == 4 ? 0
+                                           : 0x4000,
+                            key << 16 | command);
+                if (command != 8) rig.device.Pause(2 * command);  // shows by then
                 EXPECT_EQ(rig.Word(kFlashCommand), key == right ? command : 0) << options;
                 rig.device.Pause(100);
                 EXPECT_EQ(rig.Word(kFlashCommand), 0U) << options;
@@ -206,7 +238,7 @@ TEST(Erase, TakesPollsAndKeepsToItsSector) {
     Bytes expected(0x3000, 0);
     std::fill_n(expected.begin() + 0x800, 0x800, std::uint8_t{0xFF});
     EXPECT_EQ(rig.Flash(0, 0x3000), expected);
-    EXPECT_EQ(polls(0, 0x71D50004, 10), 5);
+    EXPECT_EQ(polls(0x20000, 0x71D50004, 10), 5);
     EXPECT_EQ(rig.device.FlashContents(), Bytes(0x80000, 0xFF));
 }
 
@@ -226,9 +258,12 @@ TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
                  {"256K", {kBusy, kBusy, kBusy, kBusy}, true}};
     for (const auto& c : cases) {
         Rig rig(std::string("mesk,flash=") + c.flash);
-        for (std::uint32_t i = 0; i < 4; ++i)
+        for (std::uint32_t i = 0; i < 4; ++i) {
             rig.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
+            rig.device.Pause(8);
+        }
         rig.Command(0, 0xA4420004);
+        rig.device.Pause(8);
         EXPECT_EQ(rig.Word(kFlashCommand) == 4, c.erases) << c.flash;
         EXPECT_EQ(rig.device.Violations().empty(), c.erases);
     }
@@ -279,7 +314,7 @@ TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
         rig.device.Pause(1000);
         Bytes expected(256, 0xFF);
         std::fill_n(expected.begin(), 128, std::uint8_t{0});
-        EXPECT_EQ(rig.Flash(0, 256), expected);
+        EXPECT_EQ(rig.Cells(0, 256), expected);
         EXPECT_EQ(rig.Word(kStatus[0]), kBusy);
     }
 }
@@ -324,14 +359,14 @@ TEST(UserRegisters, AreVolatileUntilCommitted) {
 }
 
 TEST(Faults, ComeAsAsked) {
-    Rig once("tolva,fail-access=3");  // the rig's halt is the first
+    Rig once("tolva,fail-access=3", false);  // the rig's halt is the first
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
     EXPECT_EQ(ErrorOf([&] { once.Word(0x400FE000); }),
               "Reading 1 x 4 bytes at 0x400FE000 on page 1: the connection to the target failed at "
               "access 3 [fail-access]");
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
 
-    Rig fromThen("tolva,fail-from=2");
+    Rig fromThen("tolva,fail-from=2", false);
     for (int i = 0; i < 3; ++i)
         EXPECT_THROW(fromThen.device.Run(), target::TargetError);
 
@@ -434,8 +469,9 @@ TEST(Contents, KeepTheDevice) {
     for (std::uint32_t address = 0; address < 0x8000000; address += 0x400) {
         const std::uint32_t command = 0x71D50002;
         device->Write(&address, 1, kFlashAddress, 1, 4);
+        device->Pause(4);
         device->Write(&command, 1, kFlashCommand, 1, 4);
-        device->Pause(8);
+        device->Pause(12);
     }
     EXPECT_TRUE(device->FlashContents() == Bytes(0x8000000, 0xFF));
 }
