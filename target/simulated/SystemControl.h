@@ -13,10 +13,10 @@
 #include <optional>
 
 #include "target/simulated/ClockSetUp.h"
-#include "target/simulated/options/DeviceOptions.h"
 #include "target/simulated/PeripheralReset.h"
 #include "target/simulated/RegisterFile.h"
 #include "target/simulated/Rules.h"
+#include "target/simulated/options/DeviceOptions.h"
 
 namespace target {
 

@@ -65,7 +65,8 @@ const Settings& OrdinarySettings() {
 RecordingHost::RecordingHost(const std::string& deviceOptions, Settings changes)
     : settings(std::move(changes)),
       device_(std::make_unique<target::SimulatedDevice>(target::ParseDeviceOptions(deviceOptions),
-                                                        &clock_)) {
+                                                        &clock_)),
+      target_(device_.get()) {
     settings.insert(kOrdinarySettings.begin(), kOrdinarySettings.end());
     OstrelLoggerSetSink(
         [](void* self, int level, const char* text) {
@@ -153,25 +154,25 @@ const char* RecordingHost::SetProperty(const char* name, const char* value) {
 const char* RecordingHost::LoadProgram(const char* fileName, const char* second,
                                        const char* directory) {
     return Answer(fmt::format(R"(load "{}" "{}" "{}")", fileName, second, directory),
-                  [&] { device_->LoadProgram(fileName, directory); });
+                  [&] { target_->LoadProgram(fileName, directory); });
 }
 
 const char* RecordingHost::RunTarget() {
-    return Answer("run", [&] { device_->Run(); });
+    return Answer("run", [&] { target_->Run(); });
 }
 
 const char* RecordingHost::HaltTarget() {
-    return Answer("halt", [&] { device_->Halt(); });
+    return Answer("halt", [&] { target_->Halt(); });
 }
 
 const char* RecordingHost::ResetTarget(bool flag) {
-    return Answer(fmt::format("reset {}", flag), [&] { device_->Reset(flag); });
+    return Answer(fmt::format("reset {}", flag), [&] { target_->Reset(flag); });
 }
 
 const char* RecordingHost::ReadMemory(void* buffer, size_t count, uint64_t address, int16_t page,
                                       size_t width) {
     return Answer(TransferText("read", count, address, page, width), [&] {
-        device_->Read(buffer, count, static_cast<std::uint32_t>(address), page, width);
+        target_->Read(buffer, count, static_cast<std::uint32_t>(address), page, width);
         bytesRead_ = BytesText(buffer, count, width);
     });
 }
@@ -180,7 +181,7 @@ const char* RecordingHost::WriteMemory(const void* buffer, size_t count, uint64_
                                        int16_t page, size_t width) {
     const std::string line = TransferText("write", count, address, page, width);
     return Answer(line + BytesText(buffer, count, width), [&] {
-        device_->Write(buffer, count, static_cast<std::uint32_t>(address), page, width);
+        target_->Write(buffer, count, static_cast<std::uint32_t>(address), page, width);
     });
 }
 
@@ -217,7 +218,7 @@ const char* RecordingHost::GetDirectory() {
 }
 
 const char* RecordingHost::Sleep(uint32_t milliseconds) {
-    return Answer(fmt::format("sleep {}", milliseconds), [&] { device_->Pause(milliseconds); });
+    return Answer(fmt::format("sleep {}", milliseconds), [&] { target_->Pause(milliseconds); });
 }
 
 CreateFlashDevice2Function Factory() {

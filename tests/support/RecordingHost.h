@@ -41,6 +41,9 @@ class RecordingHost final : public StrictHost {
 
     target::SimulatedDevice& Device() { return *device_; }
 
+    /// From now on the calls go to that target, which passes on what it likes to the device.
+    void PutInFront(target::Target& target) { target_ = &target; }
+
     Settings settings;
     Fault fault;
     std::string failNext;  ///< the next call whose line begins so fails as well
@@ -86,8 +89,9 @@ class RecordingHost final : public StrictHost {
 
     VirtualClock clock_;
     std::unique_ptr<target::SimulatedDevice> device_;
-    std::string bytesRead_;  ///< by the call, as its line shows them
-    std::string answer_;     ///< what the last call returned; gone with the next one
+    target::Target* target_;  ///< what is driven
+    std::string bytesRead_;   ///< by the call, as its line shows them
+    std::string answer_;      ///< what the last call returned; gone with the next one
 };
 
 /// Loads the built plug-in once and creates a device object; throws std::runtime_error with the

@@ -9,7 +9,7 @@
 #include <numeric>
 
 #include "target/simulated/Contents.h"
-#include "target/simulated/DeviceClass.h"
+#include "target/simulated/options/DeviceClass.h"
 
 namespace {
 
