@@ -25,9 +25,9 @@ void PeripheralReset::Reset(bool full, Time now) {
 }
 
 bool PeripheralReset::Write(std::size_t index, std::uint32_t value, Time now) {
-    if (now < recovered_) return false;
     Register& entry = registers_.at(index);
     const std::uint32_t held = value & kPeripherals.at(index);
+    if (now < recovered_ && held != 0) return false;
     if (held == kPeripherals.at(index)) {
         if (!entry.held) entry.since = now;
     } else if (held == 0 && entry.held && now - entry.since >= kPulseWidth) {

@@ -73,6 +73,15 @@ struct Rig {
                                             kBusy};
         device.Write(parameters, 12, 0x20001004 + index * 0x10, 1, 1);
     }
+    void Program(std::uint32_t address) {
+        if (!device.IsRunning()) StartLoader();
+        HandOver(0, address, Bytes(128, 0));
+        device.Pause(1);
+    }
+    void HoldPeripherals(std::uint32_t value) {
+        for (const std::uint32_t address : {0x400FE040U, 0x400FE044U, 0x400FE048U})
+            SetWord(address, value);
+    }
     Bytes Flash(std::uint32_t address, std::size_t size) {
         Bytes bytes(size);
         device.Read(bytes.data(), size, address, 0, 1);
@@ -220,6 +229,70 @@ TEST(WriteKey, WrongOneDoesNothing) {
             EXPECT_EQ(rig.device.CommittedUserRegisters()[0], key == right ? 8 : kBusy) << options;
         }
         EXPECT_EQ(rig.device.Violations().size(), 3U);
+    }
+}
+
+// Each wait as long as it has to be is kept, and a millisecond less breaks its rule and no other.
+TEST(Rules, WaitsAreExact) {
+    const struct {
+        const char* rule;
+        const char* device;
+        std::uint32_t waitMs;
+        std::function<void(Rig&)> before, after;
+    } cases[] = {
+        {"timing-set-up", "tolva", 16, [](Rig& r) { r.SetWord(0x400FE140, 7); },
+         [](Rig& r) { r.SetWord(kClock, 0x07803F82); }},
+        {"clock-settling", "pell", 16, [](Rig& r) { r.SetWord(kClock, 0); },
+         [](Rig& r) { r.SetWord(kFlashAddress, 0); }},
+        {"address-set-up", "pell", 4, [](Rig& r) { r.SetWord(kFlashAddress, 0); },
+         [](Rig& r) { r.SetWord(kFlashCommand, 0xA4420002); }},
+        {"status-delay", "pell", 4, [](Rig& r) { r.Command(0, 0xA4420002); },
+         [](Rig& r) { r.Word(kFlashCommand); }},
+        {"status-delay", "pell", 8, [](Rig& r) { r.Command(0, 0xA4420004); },
+         [](Rig& r) { r.Word(kFlashCommand); }},
+        {"erase-recovery", "pell,erase-time=7ms", 7 + 4, [](Rig& r) { r.Command(0, 0xA4420002); },
+         [](Rig& r) { r.SetWord(kFlashAddress, 0); }},
+        {"block-write", "mesk", 8, [](Rig& r) { r.SetWord(0x400FE40C, 0); },
+         [](Rig& r) { r.SetWord(0x400FE408, 0); }},
+        {"reset-recovery", "pell", 4, [](Rig& r) { r.device.Reset(true); },
+         [](Rig& r) { r.SetWord(0x400FE048, kBusy); }},
+        {"peripheral-reset", "pell", 4,
+         [](Rig& r) {
+             r.device.Reset(true);
+             r.device.Pause(4);
+             r.HoldPeripherals(kBusy);
+         },
+         [](Rig& r) {
+             r.HoldPeripherals(0);
+             r.Command(0, 0xA4420002);
+         }},
+        {"rom-alias", "pell", 8,
+         [](Rig& r) {
+             r.device.Reset(false);
+             r.SetWord(0x400FE0F0, 1);
+         },
+         [](Rig& r) { r.Program(0x7F80); }},
+        {"erase-settling", "ravik,erase-time=7ms", 40,
+         [](Rig& r) {
+             r.device.Flash().Preset(0x400, Bytes(0x400, 0xAA));
+             r.Command(0x400, 0xA4420002);
+             r.device.Pause(7);
+             r.device.Reset(false);
+         },
+         [](Rig& r) { r.Program(0x780); }},
+    };
+    for (const auto& [rule, device, waitMs, before, after] : cases) {
+        for (const bool enough : {false, true}) {
+            SCOPED_TRACE(testing::Message() << rule << " " << waitMs << " " << enough);
+            Rig rig(device + std::string(",latency=0,bandwidth=0"));
+            before(rig);
+            rig.device.Pause(enough ? waitMs : waitMs - 1);
+            after(rig);
+            const auto broken = rig.device.TakeViolations();
+            EXPECT_EQ(broken.empty(), enough);
+            for (const std::string& text : broken)
+                EXPECT_TRUE(text.ends_with(std::string("[") + rule + "]")) << text;
+        }
     }
 }
 
