@@ -55,6 +55,7 @@ const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
         try {
             errorText_ = error.what();
             if (firstFailure_.empty()) firstFailure_ = errorText_;
+            watch_.SlotFailed();
             return errorText_.c_str();
         } catch (...) {
             return "the host ran out of memory";

@@ -38,6 +38,7 @@ void FlashWatch::Writing(std::uint32_t address, std::uint32_t word) {
 }
 
 void FlashWatch::Programmed(const base::AddressRange& chunk) {
+    if (eraseFailed_ || pendingErase_ != 0) return;
     work_.programmed.Add(chunk);
     if (meter_.Running() == Phase::Program) meter_.Advance(chunk.Size());
 }
@@ -55,8 +56,13 @@ void FlashWatch::Read(std::uint32_t address, std::size_t bytes, const std::uint8
     meter_.Advance(bytes);
 }
 
+void FlashWatch::SlotFailed() {
+    if (meter_.Running() == Phase::Erase) eraseFailed_ = true;
+}
+
 void FlashWatch::NoteCommand(std::uint32_t command) {
     commanded_ = true;
+    eraseFailed_ = false;
     pendingErase_ = command & (plugin::kEraseSectorBit | plugin::kEraseAllBit);
     if (pendingErase_ == 0) return;
     const auto last = static_cast<std::uint32_t>(flashBytes_ - 1);

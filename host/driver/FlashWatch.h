@@ -28,7 +28,7 @@ struct FlashWork {
         attempted;  ///< the access that erases or programs it went out, and perhaps arrived
     base::AddressSet erased;      ///< the flash controller was seen to be done
     base::AddressSet handedOver;  ///< arrived at the loader
-    base::AddressSet programmed;  ///< the loader was seen to be done
+    base::AddressSet programmed;  ///< the loader was seen to be done, and no erase had failed
 };
 
 class FlashWatch final : public LoaderObserver {
@@ -46,6 +46,10 @@ class FlashWatch final : public LoaderObserver {
     void HandingOver(const base::AddressRange& chunk) override { work_.attempted.Add(chunk); }
     void HandedOver(const base::AddressRange& chunk) override { work_.handedOver.Add(chunk); }
     void Programmed(const base::AddressRange& chunk) override;
+    /// The plug-in goes on with a load after an erase that failed, and then nobody knows what the
+    /// flash controller makes of it.
+    void SlotFailed();
+
     void DisplayBegan(const std::string& title);
     void DisplayEnded();
 
@@ -70,6 +74,7 @@ class FlashWatch final : public LoaderObserver {
     std::uint32_t addressRegister_ = 0;
     std::uint32_t pendingErase_ = 0;  ///< command bits of an erase that is under way
     base::AddressRange erasing_;      ///< what it erases
+    bool eraseFailed_ = false;        ///< the last one
     bool commanded_ = false;
     bool displayOpen_ = false;
     std::optional<NotBlank> notBlank_;
