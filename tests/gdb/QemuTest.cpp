@@ -4,6 +4,7 @@
 
 #include <arpa/inet.h>
 #include <dlfcn.h>
+#include <fmt/format.h>
 #include <gtest/gtest.h>
 #include <signal.h>
 #include <sys/socket.h>
@@ -184,9 +185,8 @@ TEST(Qemu, RunsTheExampleOfALoaderThroughWhichThePluginProgramsMemory) {
          {"clang --target=arm-none-eabi -fuse-ld=lld", "arm-none-eabi-gcc"}) {
         SCOPED_TRACE(compiler);
         if (compiler == "arm-none-eabi-gcc" && !Have(compiler)) continue;
-        const std::string build = "ARM_CC='" + compiler +
-                                  " -Wpedantic -Werror' sh " EXAMPLE_LOADER "/build.sh '" + loader +
-                                  "'";
+        const std::string build = fmt::format("ARM_CC='{} -Wpedantic -Werror' sh {}/build.sh '{}'",
+                                              compiler, EXAMPLE_LOADER, loader);
         ASSERT_EQ(std::system(build.c_str()), 0);
         ProgramThrough(loader);
     }
