@@ -2,9 +2,10 @@
 
 #include <fmt/format.h>
 
-#include <CLI/CLI.hpp>
+#include <algorithm>
 #include <fstream>
-#include <set>
+#include <string>
+#include <vector>
 
 #include "bench/Measurements.h"
 #include "bench/support/Workloads.h"
@@ -44,19 +45,30 @@ constexpr NamedTable kTables[] = {
     {"packets", bench::PacketsTable}, {"own", bench::OwnWorkTable},
     {"growth", bench::GrowthTable},   {"throughput", bench::ThroughputTable}};
 
+/// Names the tables, for those who have asked for none of them.
+int ShowUsage() {
+    fmt::print(stderr, "usage: corvane_bench [--json FILE] [TABLE]...\ntables:");
+    for (const NamedTable& table : kTables)
+        fmt::print(stderr, " {}", table.name);
+    fmt::print(stderr, "\n");
+    return 2;
+}
+
+bool IsTable(const std::string& name) {
+    return std::ranges::find(kTables, name, &NamedTable::name) != std::end(kTables);
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
-    CLI::App app("Measures the flash plug-in: counts, modelled time and processor time.");
+    std::vector<std::string> names(argv + 1, argv + argc);
     std::string jsonFile;
-    std::vector<std::string> names;
-    app.add_option("--json", jsonFile, "Write the tables to this file as well");
-    std::set<std::string> known;
-    for (const NamedTable& table : kTables)
-        known.insert(table.name);
-    app.add_option("tables", names, "The tables to make; all of them if none is named")
-        ->check(CLI::IsMember(known));
-    CLI11_PARSE(app, argc, argv);
+    if (const auto option = std::ranges::find(names, "--json"); option != names.end()) {
+        if (option + 1 == names.end()) return ShowUsage();
+        jsonFile = option[1];
+        names.erase(option, option + 2);
+    }
+    if (!std::ranges::all_of(names, IsTable)) return ShowUsage();
 
     nlohmann::json results;
     for (const auto& [name, make] : kTables) {

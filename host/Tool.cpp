@@ -99,12 +99,11 @@ Outcome CheckOutput(Outcome outcome, int error, Reporter& reporter) {
 
 int RunTool(const std::vector<std::string>& words) {
     // Whoever asked for JSON gets the end line of a command line that can't be read, too.
-    const auto optionsEnd = std::find(words.begin(), words.end(), "--");
-    const bool json = std::find(words.begin(), optionsEnd, "--json") != optionsEnd;
+    const FollowedLine followed = FollowLine(AllCommands(), words);
     ParsedLine line;
-    Reporter early({Talk::Normal, json, "none"});
+    Reporter early({Talk::Normal, followed.Has("--json"), "none"});
     Outcome outcome = Guarded(early, [&] {
-        line = ParseCommandLine(AllCommands(), words);
+        line = ParseCommandLine(AllCommands(), followed);
         return Outcome{};
     });
     if (line.command == nullptr) {

@@ -1,14 +1,12 @@
-// The parsing itself is CLI11's, fed from the tables of commands and options.
+// What stands in the line comes first, then what the environment adds to it.
 
 #include "host/cli/CommandLine.h"
 
 #include <fmt/format.h>
 #include <fmt/ranges.h>
 
-#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <cstdlib>
-#include <memory>
 #include <type_traits>
 
 #include "host/base/Errors.h"
@@ -21,220 +19,137 @@ namespace host {
 
 namespace {
 
-// What stands behind "--" is an argument, whatever it begins with. CLI11 would make an option of it
-// again where the command has no place for it, so that it gets a mark that no typed word can hold.
-constexpr char kMark = '\0';
-
-bool IsMarked(const std::string& word) {
-    return word.starts_with(kMark);
+/// What could stand in the place of a stray word: options, or commands.
+std::vector<std::string> KnownWords(const CommandRows& commands, const FollowedLine& line,
+                                    const std::string& stray) {
+    if (!IsOption(stray))
+        return line.command == nullptr ? FirstWords(commands) : std::vector<std::string>();
+    std::vector<std::string> known;
+    const auto add = [&](const std::vector<OptionRow>& rows) {
+        for (const OptionRow& row : rows)
+            if (!row.IsArgument()) known.push_back(LongName(row));
+    };
+    add(AnsweredOptions());
+    add(GlobalOptions());
+    if (line.command != nullptr) add(line.command->options);
+    return known;
 }
 
-std::string Unmarked(const std::string& word) {
-    return IsMarked(word) ? word.substr(1) : word;
+/// What to do about a stray word, as far as it is known.
+std::string StrayAdvice(const CommandRows& commands, const FollowedLine& line) {
+    const StrayWord& first = line.strays.front();
+    if (first.isLiteral) return "";
+    const std::string name = first.text.substr(0, first.text.find('='));
+    if (line.command != nullptr && line.FindOption(name) != nullptr)
+        return fmt::format("; write it behind '{}'", line.name);
+    return Suggestion(name, KnownWords(commands, line, name));
 }
 
-/// CLI11 would also look for the value of "--option=" in the next word.
-std::vector<std::string> WordsForParser(const std::vector<std::string>& words) {
-    std::vector<std::string> prepared;
-    bool behind = false;
-    for (const std::string& word : words) {
-        if (behind)
-            prepared.push_back(kMark + word);
-        else if (word.size() > 3 && word.starts_with("--") && word.find('=') == word.size() - 1)
-            prepared.insert(prepared.end(), {word.substr(0, word.size() - 1), ""});
-        else if (word != "--")
-            prepared.push_back(word);
-        behind = behind || word == "--";
+std::string StrayText(const CommandRows& commands, const FollowedLine& line) {
+    std::vector<std::string> words;
+    for (const StrayWord& stray : line.strays)
+        words.push_back(stray.text);
+    return fmt::format("{}: {}{}",
+                       line.command == nullptr ? "unknown command or option" : "not expected here",
+                       fmt::join(words, " "), StrayAdvice(commands, line));
+}
+
+std::string MissingArgument(const FollowedLine& line) {
+    for (const OptionRow& row : line.command->options)
+        if (row.required && !line.Has(LongName(row)))
+            return fmt::format("{} is required", LongName(row));
+    return "";
+}
+
+/// What is wrong with the line; empty when nothing is, but that it may have no command.
+std::string Complaint(const CommandRows& commands, const FollowedLine& line) {
+    const auto below = SecondWords(commands, line.name);
+    if (line.command == nullptr && !below.empty())
+        return fmt::format("{} what? {}", line.name, fmt::join(below, " or "));
+    if (!line.complaint.empty()) return line.complaint;
+    if (line.awaited != nullptr) return ValueMissing(*line.awaited);
+    if (!line.strays.empty()) return StrayText(commands, line);
+    return line.command == nullptr ? "" : MissingArgument(line);
+}
+
+void RefuseNonsense(const CommandRows& commands, const FollowedLine& line) {
+    const std::string complaint = Complaint(commands, line);
+    if (!complaint.empty())
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{}; 'corvane-flash {}{}--help' shows what there is", complaint,
+                                  line.name, line.name.empty() ? "" : " "));
+    if (line.command == nullptr)
+        throw Failure(ExitStatus::WrongUsage,
+                      "which command? 'corvane-flash --help' lists them, for example "
+                      "'corvane-flash program firmware.elf'");
+}
+
+/// What the first of the answered options asks for; empty when there is none.
+std::string Answer(const CommandRows& commands, const FollowedLine& line) {
+    for (const GivenOption& given : line.given) {
+        const std::string name = LongName(*given.row);
+        if (name == "--help") return HelpText(commands, line.name);
+        if (name == "--version") return "corvane-flash " CORVANE_FLASH_VERSION "\n";
+        if (name == "--man") return ManPage(commands);
     }
-    return prepared;
+    return "";
 }
 
-/// CLI11 lets arguments have few characters in their names: of "[HOST:]PORT" it sees PORT.
-std::string NamesForParser(const OptionRow& row) {
-    const std::string names = row.names;
-    return names.substr(names.find(']') + 1);
-}
-
-/// Texts are taken as they come, an empty one too, and the last of several counts.
-template <typename Text>
-CLI::Option* DefineText(CLI::App& app, const OptionRow& row, Text& target) {
-    CLI::Option* option = app.add_option_function<std::string>(
-        NamesForParser(row), [&target](const std::string& text) { target = text; });
-    return option->multi_option_policy(CLI::MultiOptionPolicy::TakeLast);
-}
-
-CLI::Option* DefineTexts(CLI::App& app, const OptionRow& row, std::vector<std::string>& target) {
-    return app.add_option(NamesForParser(row), target)->allow_extra_args(row.IsArgument());
-}
-
-CLI::Option* DefineMember(CLI::App& app, const OptionRow& row, Options& options) {
-    return std::visit(
-        [&](auto member) -> CLI::Option* {
+/// The last text of several counts, unless the option collects them.
+void Set(Options& options, const OptionRow& row, const std::string& text) {
+    std::visit(
+        [&](auto member) {
             auto& target = options.*member;
             using Target = std::remove_reference_t<decltype(target)>;
-            if constexpr (std::is_same_v<Target, bool> || std::is_same_v<Target, int>)
-                return app.add_flag(row.names, target);
+            if constexpr (std::is_same_v<Target, bool>)
+                target = true;
+            else if constexpr (std::is_same_v<Target, int>)
+                ++target;
             else if constexpr (std::is_same_v<Target, std::vector<std::string>>)
-                return DefineTexts(app, row, target);
+                target.push_back(text);
             else
-                return DefineText(app, row, target);
+                target = text;
         },
         row.member);
 }
 
-bool IsTyped(const std::string& option, const std::vector<std::string>& words) {
-    return std::any_of(words.begin(), words.end(), [&](const std::string& word) {
-        return word == option || word.starts_with(option + "=");
-    });
+/// What is typed goes before a variable, and so does what is typed in contradiction to it.
+bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
+    if (*row.environment == '\0' || line.Has(LongName(row))) return false;
+    if (line.command->isForSimulated && LongName(row) == "--gdb") return false;
+    return std::none_of(row.overrides.begin(), row.overrides.end(),
+                        [&](const std::string& name) { return line.Has(name); });
 }
 
-bool HasTypedRival(const OptionRow& row, const std::vector<std::string>& words) {
-    return std::any_of(row.rivals.begin(), row.rivals.end(),
-                       [&](const std::string& rival) { return IsTyped(rival, words); });
-}
-
-std::string NoValue(const std::string& text) {
-    return IsMarked(text) ? "its value is missing" : "";
-}
-
-std::string NoFileName(const std::string& text) {
-    return text.empty() ? "the name of the file is empty" : "";
-}
-
-void Define(CLI::App& app, const OptionRow& row, Options& options) {
-    CLI::Option* option = DefineMember(app, row, options);
-    option->required(row.required);
-    if (!row.choices.empty() && row.offers != Offers::SomeChoices)
-        option->check(CLI::IsMember(row.choices));
-    if (row.offers == Offers::Files) option->check(NoFileName);
-    if (row.IsArgument())
-        option->transform(Unmarked);
-    else if (!row.IsSwitch())
-        option->check(NoValue);
-}
-
-void TakeEnvironment(CLI::App& app, const OptionRow& row, const std::vector<std::string>& words,
-                     Options& options) {
-    const std::string name = SplitNames(row).back();
-    if (*row.environment == '\0' || HasTypedRival(row, words)) return;
-    app.get_option(name)->envname(row.environment);
-    const char* text = std::getenv(row.environment);
-    if (!row.rivals.empty() && !IsTyped(name, words) && text != nullptr && *text != '\0')
-        options.targetVariables.emplace_back(row.environment);
-}
-
-/// The app of a command; for one of two words, below the app of the first word.
-CLI::App* AddCommand(CLI::App& app, const CommandRow& row) {
-    const std::string name = row.name;
-    const auto blank = name.find(' ');
-    CLI::App* parent = &app;
-    if (blank != std::string::npos) {
-        const std::string word = name.substr(0, blank);
-        const auto known =
-            app.get_subcommands([&](CLI::App* group) { return group->get_name() == word; });
-        parent = known.empty() ? app.add_subcommand(word) : known.front();
-        parent->fallthrough()->require_subcommand(1);
-    }
-    return parent->add_subcommand(name.substr(blank + 1))->fallthrough();
-}
-
-/// The words of the command that the parser has come to.
-std::string CommandWords(const CLI::App& app) {
-    const auto chosen = app.get_subcommands();
-    if (chosen.empty()) return "";
-    const std::string rest = CommandWords(*chosen.front());
-    return chosen.front()->get_name() + (rest.empty() ? "" : " ") + rest;
-}
-
-struct Parser {
-    CLI::App app;
-    Options options;
-    const CommandRow* chosen = nullptr;
-    bool man = false;
-
-    Parser(const CommandRows& commands, const std::vector<std::string>& words) {
-        app.set_version_flag("--version", std::string("corvane-flash " CORVANE_FLASH_VERSION));
-        app.add_flag("--man", man);
-        app.require_subcommand(0, 1);
-        for (const OptionRow& row : GlobalOptions()) {
-            Define(app, row, options);
-            TakeEnvironment(app, row, words, options);
-        }
-        for (const CommandRow& row : commands) {
-            CLI::App* command = AddCommand(app, row);
-            for (const OptionRow& option : row.options)
-                Define(*command, option, options);
-            command->callback([this, &row] { chosen = &row; });
-        }
-    }
-};
-
-/// What could stand in the place of a word: options, or commands.
-std::vector<std::string> KnownWords(const CommandRows& commands, const std::string& command,
-                                    const std::string& word) {
-    if (!word.starts_with('-'))
-        return command.empty() ? FirstWords(commands) : std::vector<std::string>();
-    std::vector<std::string> known{"--help", "--version", "--man"};
-    const auto add = [&](const std::vector<OptionRow>& rows) {
-        for (const OptionRow& row : rows)
-            if (!row.IsArgument()) known.push_back(SplitNames(row).back());
-    };
-    add(GlobalOptions());
-    for (const CommandRow& row : commands)
-        if (command == row.name) add(row.options);
-    return known;
-}
-
-/// CLI11 speaks in several lines and of subcommands; people want one line and commands.
-std::string OneLine(const CommandRows& commands, const CLI::ParseError& error,
-                    const std::string& command, const std::vector<std::string>& surplus) {
-    const auto below = SecondWords(commands, command);
-    if (!below.empty()) return fmt::format("{} what? {}", command, fmt::join(below, " or "));
-    std::string text = error.what();
-    std::replace(text.begin(), text.end(), '\n', ' ');
-    if (dynamic_cast<const CLI::ExtrasError*>(&error) == nullptr || surplus.empty()) return text;
-    const std::string& first = surplus.front();
-    std::vector<std::string> words(surplus.size());
-    std::transform(surplus.begin(), surplus.end(), words.begin(), Unmarked);
-    return fmt::format(
-        "{}: {}{}", command.empty() ? "unknown command or option" : "not expected here",
-        fmt::join(words, " "),
-        IsMarked(first) ? "" : Suggestion(first, KnownWords(commands, command, first)));
-}
-
-[[noreturn]] void Refuse(const CommandRows& commands, const CLI::ParseError& error,
-                         const CLI::App& app) {
-    const std::string command = CommandWords(app);
-    throw Failure(ExitStatus::WrongUsage,
-                  fmt::format("{}; 'corvane-flash {}{}--help' shows what there is",
-                              OneLine(commands, error, command, app.remaining(true)), command,
-                              command.empty() ? "" : " "));
+std::vector<GivenOption> WithEnvironment(const FollowedLine& line, const Environment& environment) {
+    std::vector<GivenOption> given = line.given;
+    for (const OptionRow& row : GlobalOptions())
+        if (HeedsEnvironment(row, line))
+            if (const std::string text = environment(row.environment); !text.empty())
+                given.push_back({&row, text, true});
+    return given;
 }
 
 }  // namespace
 
-ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words) {
-    words = WordsForParser(words);
-    Parser parser(commands, words);
-    const bool gdbTyped = IsTyped("--gdb", words);
-    std::reverse(words.begin(), words.end());  // CLI11 takes them from the back
-    try {
-        parser.app.parse(words);
-    } catch (const CLI::CallForHelp&) {
-        return {{}, nullptr, HelpText(commands, CommandWords(parser.app))};
-    } catch (const CLI::CallForVersion& version) {
-        return {{}, nullptr, std::string(version.what()) + "\n"};
-    } catch (const CLI::ParseError& error) {
-        Refuse(commands, error, parser.app);
+std::string ProcessEnvironment(const char* name) {
+    const char* text = std::getenv(name);
+    return text == nullptr ? "" : text;
+}
+
+ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
+                            const Environment& environment) {
+    if (const std::string text = Answer(commands, line); !text.empty())
+        return {{}, {}, nullptr, text};
+    RefuseNonsense(commands, line);
+    ParsedLine parsed{{}, WithEnvironment(line, environment), line.command, ""};
+    parsed.options.command = line.command->name;
+    for (const GivenOption& given : parsed.given) {
+        Set(parsed.options, *given.row, given.value);
+        if (given.isFromEnvironment && !given.row->overrides.empty())
+            parsed.options.targetVariables.emplace_back(given.row->environment);
     }
-    if (parser.man) return {{}, nullptr, ManPage(commands)};
-    if (parser.chosen == nullptr)
-        throw Failure(ExitStatus::WrongUsage,
-                      "which command? 'corvane-flash --help' lists them, for example "
-                      "'corvane-flash program firmware.elf'");
-    parser.options.command = parser.chosen->name;
-    if (parser.chosen->isForSimulated && !gdbTyped) parser.options.gdb.reset();
-    return {parser.options, parser.chosen, ""};
+    return parsed;
 }
 
 }  // namespace host

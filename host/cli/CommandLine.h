@@ -1,21 +1,27 @@
-// From the words of a command line to a plain Options value.
+// From a followed command line to plain values, or to a complaint.
 
 #pragma once
 
+#include <functional>
 #include <string>
-#include <vector>
 
-#include "host/cli/CommandTable.h"
+#include "host/cli/FollowedLine.h"
 
 namespace host {
 
 struct ParsedLine {
     Options options;
+    std::vector<GivenOption> given;       ///< the line's, then what the environment adds
     const CommandRow* command = nullptr;  ///< null: `text` is all that was asked for
     std::string text;                     ///< help, version or man page
 };
 
-/// `words` without the program's name. Failure (WrongUsage) for a line that makes no sense.
-ParsedLine ParseCommandLine(const CommandRows& commands, std::vector<std::string> words);
+/// A variable's text; empty when it isn't set.
+using Environment = std::function<std::string(const char* name)>;
+std::string ProcessEnvironment(const char* name);
+
+/// Failure (WrongUsage) for a line that makes no sense.
+ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
+                            const Environment& environment = ProcessEnvironment);
 
 }  // namespace host

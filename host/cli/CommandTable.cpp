@@ -75,6 +75,16 @@ const std::vector<OptionRow>& GlobalOptions() {
     return options;
 }
 
+const std::vector<OptionRow>& AnsweredOptions() {
+    static constexpr bool Options::*kNoMember = nullptr;
+    static const std::vector<OptionRow> options{
+        {"-h,--help", "", "Show the help, or that of the command", kNoMember},
+        {"--version", "", "Show the version", kNoMember},
+        {"--man", "", "Print the man page, for 'man -l -'", kNoMember},
+    };
+    return options;
+}
+
 const char* GroupHelp(const std::string& word) {
     return std::string_view(word) == "mac" ? "Read or program the MAC address"
                                            : "Read or program a user register";

@@ -40,7 +40,7 @@ struct OptionRow {
     std::vector<std::string> choices = {};
     bool required = false;
     const char* environment = "";
-    std::vector<std::string> rivals = {};  ///< any of them, when typed, beats the environment
+    std::vector<std::string> overrides = {};  ///< options that, when typed, beat the environment
 
     bool IsArgument() const { return names[0] != '-'; }
     bool IsRepeated() const {
@@ -68,6 +68,9 @@ using CommandRows = std::vector<CommandRow>;
 
 /// The options that every command takes.
 const std::vector<OptionRow>& GlobalOptions();
+
+/// The options that are answered in the place of a command: --help and the like. They set nothing.
+const std::vector<OptionRow>& AnsweredOptions();
 
 /// What a first word stands for that has commands below it: "mac".
 const char* GroupHelp(const std::string& word);

@@ -1,13 +1,10 @@
-// The words before the cursor are followed as the parser would, then the cursor's is looked at.
+// The words before the cursor are followed as the parser does it; they say what its word can be.
 
 #include "host/cli/Completion.h"
 
 #include <fmt/format.h>
 
-#include <algorithm>
-#include <cstddef>
-#include <string_view>
-
+#include "host/cli/FollowedLine.h"
 #include "host/cli/OfferedValues.h"
 #include "host/cli/Topics.h"
 #include "host/cli/Words.h"
@@ -16,73 +13,36 @@ namespace host {
 
 namespace {
 
-bool IsOption(const std::string& word) {
-    return word.size() > 1 && word.front() == '-';
-}
-
 class Completer {
   public:
-    explicit Completer(const CommandRows& commands) : commands_(commands) {}
-
-    /// Takes a word that stands before the cursor.
-    void Follow(const std::string& word) {
-        if (awaiting_ != nullptr) {
-            awaiting_ = nullptr;
-        } else if (word == "--" && !onlyArguments_) {
-            onlyArguments_ = true;
-        } else if (IsOption(word) && !onlyArguments_) {
-            FollowOption(word);
-        } else if (onlyArguments_ || command_ != nullptr) {
-            arguments_.push_back(word);
-        } else {
-            name_ += (name_.empty() ? "" : " ") + word;
-            for (const CommandRow& row : commands_)
-                if (name_ == row.name) command_ = &row;
-        }
-    }
+    Completer(const CommandRows& commands, const FollowedLine& line)
+        : commands_(commands), line_(line) {}
 
     Completions At(const std::string& cursor) const {
-        if (awaiting_ != nullptr) return OfferedValues(*awaiting_, "", cursor);
-        if (!onlyArguments_ && !cursor.empty() && cursor.front() == '-') return AtOption(cursor);
-        if (command_ == nullptr) return CommandWords(name_);
+        if (line_.awaited != nullptr) return OfferedValues(*line_.awaited, "", cursor);
+        if (!line_.optionsEnded && cursor.starts_with('-')) return AtOption(cursor);
+        if (line_.command == nullptr)
+            return line_.MayNameCommand() ? CommandWords(line_.name) : Completions();
         const Completions arguments = AtArgument(cursor);
         const bool none = arguments.words.empty() && !arguments.filesBehind;
-        return none ? OptionWords(command_->options) : arguments;
+        return none ? OptionWords(line_.command->options) : arguments;
     }
 
   private:
-    const OptionRow* Find(const std::string& name) const {
-        const auto among = [&](const std::vector<OptionRow>& rows) -> const OptionRow* {
-            for (const OptionRow& row : rows) {
-                const auto names = SplitNames(row);
-                if (std::find(names.begin(), names.end(), name) != names.end()) return &row;
-            }
-            return nullptr;
-        };
-        const OptionRow* row = command_ == nullptr ? nullptr : among(command_->options);
-        return row != nullptr ? row : among(GlobalOptions());
-    }
-
-    void FollowOption(const std::string& word) {
-        const OptionRow* row = Find(word.substr(0, word.find('=')));
-        if (row == nullptr) return;
-        given_.push_back(row);
-        if (!row->IsSwitch() && word.find('=') == std::string::npos) awaiting_ = row;
-    }
-
     Completions AtOption(const std::string& cursor) const {
         if (const auto equals = cursor.find('='); equals != std::string::npos) {
-            const OptionRow* row = Find(cursor.substr(0, equals));
+            const OptionRow* row = line_.FindOption(cursor.substr(0, equals));
             if (row == nullptr || row->IsSwitch()) return {};
             return OfferedValues(*row, cursor.substr(0, equals + 1), cursor.substr(equals + 1));
         }
         Completions offered = OptionWords(GlobalOptions());
-        if (command_ != nullptr) {
-            const Completions own = OptionWords(command_->options);
+        if (line_.command != nullptr) {
+            const Completions own = OptionWords(line_.command->options);
             offered.words.insert(offered.words.begin(), own.words.begin(), own.words.end());
         }
-        offered.words.push_back({"--help", "Show the help"});
-        if (name_.empty()) offered.words.push_back({"--version", "Show the version"});
+        for (const OptionRow& row : AnsweredOptions())
+            if (line_.name.empty() || LongName(row) == "--help")
+                offered.words.push_back({LongName(row), row.help});
         return offered;
     }
 
@@ -90,8 +50,7 @@ class Completer {
     Completions OptionWords(const std::vector<OptionRow>& rows) const {
         Completions offered;
         for (const OptionRow& row : rows) {
-            const bool given = std::find(given_.begin(), given_.end(), &row) != given_.end();
-            if (row.IsArgument() || (given && !row.IsRepeated())) continue;
+            if (row.IsArgument() || (line_.Has(LongName(row)) && !row.IsRepeated())) continue;
             for (const std::string& name : SplitNames(row))
                 offered.words.push_back({name, row.help});
         }
@@ -110,41 +69,34 @@ class Completer {
     }
 
     Completions AtArgument(const std::string& cursor) const {
-        std::vector<const OptionRow*> rows;
-        for (const OptionRow& row : command_->options)
-            if (row.IsArgument()) rows.push_back(&row);
-        if (rows.empty()) return {};
-        const std::size_t index = arguments_.size();
-        if (index >= rows.size() && !rows.back()->IsRepeated()) return {};
-        const OptionRow& row = *rows[std::min(index, rows.size() - 1)];
-        return row.offers == Offers::HelpWords ? HelpWords() : OfferedValues(row, "", cursor);
+        const OptionRow* row = line_.NextArgument();
+        if (row == nullptr) return {};
+        return row->offers == Offers::HelpWords ? HelpWords() : OfferedValues(*row, "", cursor);
     }
 
     Completions HelpWords() const {
-        if (arguments_.size() > 1) return {};
-        Completions offered = CommandWords(arguments_.empty() ? "" : arguments_.front());
-        if (arguments_.empty())
+        std::vector<std::string> words;
+        for (const GivenOption& given : line_.given)
+            if (given.row->IsArgument()) words.push_back(given.value);
+        if (words.size() > 1) return {};
+        Completions offered = CommandWords(words.empty() ? "" : words.front());
+        if (words.empty())
             for (const Topic& topic : Topics())
                 offered.words.push_back({topic.name, topic.help});
         return offered;
     }
 
     const CommandRows& commands_;
-    std::string name_;  ///< the words so far that name the command
-    const CommandRow* command_ = nullptr;
-    const OptionRow* awaiting_ = nullptr;  ///< the option whose value comes next
-    std::vector<const OptionRow*> given_;
-    std::vector<std::string> arguments_;
-    bool onlyArguments_ = false;
+    const FollowedLine& line_;
 };
 
 }  // namespace
 
 Completions Complete(const CommandRows& commands, const std::vector<std::string>& line) {
-    Completer completer(commands);
-    for (std::size_t i = 0; i + 1 < line.size(); ++i)
-        completer.Follow(line[i]);
-    return completer.At(line.empty() ? "" : line.back());
+    std::vector<std::string> before = line;
+    const std::string cursor = line.empty() ? "" : line.back();
+    if (!line.empty()) before.pop_back();
+    return Completer(commands, FollowLine(commands, before)).At(cursor);
 }
 
 }  // namespace host

@@ -57,9 +57,8 @@ std::string OptionsHelp() {
     std::string text = "Every command takes these options, before or behind its own:\n";
     for (const OptionRow& row : GlobalOptions())
         text += OptionEntry(row);
-    text += Entry("-h, --help", "Show the help, or that of the command");
-    text += Entry("    --version", "Show the version");
-    text += Entry("    --man", "Print the man page, for 'man -l -'");
+    for (const OptionRow& row : AnsweredOptions())
+        text += OptionEntry(row);
     return text + "\n" +
            Wrap(
                "Addresses are hexadecimal, with or without 0x; ranges include both ends. What "

@@ -13,6 +13,10 @@ std::vector<std::string> SplitNames(const OptionRow& row) {
     return {names.substr(0, comma), names.substr(comma + 1)};
 }
 
+std::string LongName(const OptionRow& row) {
+    return SplitNames(row).back();
+}
+
 std::vector<std::string> FirstWords(const CommandRows& commands) {
     std::vector<std::string> words;
     for (const CommandRow& command : commands) {

@@ -16,12 +16,6 @@
 #include "base/Hex.h"
 #include "host/base/Errors.h"
 #include "host/base/MacAddress.h"
-#include "host/cli/CommandLine.h"
-#include "host/cli/Completion.h"
-#include "host/cli/Help.h"
-#include "host/cli/ManPage.h"
-#include "host/cli/Words.h"
-#include "host/commands/Commands.h"
 #include "host/driver/FlashHost.h"
 #include "host/facts/SettingKeys.h"
 #include "host/flashing/Comparison.h"
@@ -554,52 +548,6 @@ TEST(WorkMeter, GivesEachPhaseTheTimeInWhichItIsTheCurrentOne) {
     EXPECT_GE(read, 0.004);
     EXPECT_GE(verified, 0.002);
     EXPECT_LE(read + verified, elapsed.count());
-}
-
-TEST(CommandTable, EveryCommandAndOptionIsInHelpAndManPage) {
-    std::vector<std::string> words = FirstWords(AllCommands());
-    std::vector<std::vector<std::string>> options;
-    const auto add = [&](const std::vector<OptionRow>& rows) {
-        for (const OptionRow& row : rows)
-            if (!row.IsArgument()) options.push_back(SplitNames(row));
-    };
-    add(GlobalOptions());
-    std::string help = HelpText(AllCommands(), "");
-    std::string man = ManPage(AllCommands());
-    man.erase(std::remove(man.begin(), man.end(), '\\'), man.end());
-    for (const CommandRow& command : AllCommands()) {
-        add(command.options);
-        help += HelpText(AllCommands(), command.name);
-        EXPECT_NE(man.find(std::string("corvane-flash ") + command.name), std::string::npos);
-        EXPECT_NE(std::string(command.example).find(command.name), std::string::npos);
-        for (std::istringstream lines(HelpText(AllCommands(), command.name)); !lines.eof();) {
-            std::string line;
-            std::getline(lines, line);
-            EXPECT_TRUE(line.size() < 80 || line.starts_with("  corvane-flash")) << line;
-        }
-    }
-    for (const std::vector<std::string>& names : options) {
-        // The tool's own help has only the short name of an option that has one.
-        EXPECT_NE(help.find(names.front()), std::string::npos) << names.front();
-        EXPECT_NE(man.find(names.back()), std::string::npos) << names.back();
-    }
-}
-
-TEST(CommandTable, OptionsMayStandAnywhere) {
-    const std::vector<std::vector<std::string>> lines = {
-        {"--sim", "quen", "-vv", "--set", "A=1", "--set", "B=2", "program", "x", "y", "--crc"},
-        {"program", "--crc", "x", "--sim", "tolva", "y", "--set", "A=1", "-v", "--set", "B=2", "-v",
-         "--sim", "quen"},
-    };
-    for (const auto& line : lines) {
-        const Options options = ParseCommandLine(AllCommands(), line).options;
-        EXPECT_EQ(options.command, "program");
-        EXPECT_EQ(options.sim, "quen");
-        EXPECT_EQ(options.verbose, 2);
-        EXPECT_EQ(options.set, (std::vector<std::string>{"A=1", "B=2"}));
-        EXPECT_EQ(options.files, (std::vector<std::string>{"x", "y"}));
-        EXPECT_TRUE(options.crc);
-    }
 }
 
 }  // namespace

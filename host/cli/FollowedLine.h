@@ -1,0 +1,65 @@
+// A command line followed word by word through the tables of commands and options. The parser reads
+// from it what was asked for, the completion what may come next.
+//
+// What a word is, the first that fits:
+//   the value of `awaited`   when the option before it takes one: whatever the word is, but "--"
+//   "--"                     the end of the options
+//   an option                one that begins with "-" (not "-" itself), until the options have
+//   ended a word of the command    until `name` is that of a command an argument              of
+//   the command, as many as it takes a stray                  anything else; behind one that is no
+//   option, none names the command
+
+#pragma once
+
+#include <span>
+#include <string>
+#include <vector>
+
+#include "host/cli/CommandTable.h"
+
+namespace host {
+
+/// An option or argument that stands in the line.
+struct GivenOption {
+    const OptionRow* row;
+    std::string value;  ///< of an argument, the word itself; of a switch, empty
+    bool isFromEnvironment = false;
+};
+
+struct StrayWord {
+    std::string text;
+    bool isLiteral;  ///< it stands behind "--"
+};
+
+struct FollowedLine {
+    std::string name;  ///< of the command, as far as it goes: "", "mac", "mac read"
+    const CommandRow* command = nullptr;  ///< null while `name` isn't that of one
+    std::vector<GivenOption> given;       ///< in the order of the line
+    std::vector<StrayWord> strays;
+    std::string complaint;               ///< of the first value that can't be: which, and why
+    const OptionRow* awaited = nullptr;  ///< the option whose value is the next word
+    bool optionsEnded = false;
+
+    /// Whether an option is given, by its long name.
+    bool Has(const std::string& name) const;
+
+    /// Whether the next word may be one of the command's name.
+    bool MayNameCommand() const;
+
+    /// Where the next argument goes; null when the command takes no more.
+    const OptionRow* NextArgument() const;
+
+    /// The option of a name, long or short; the command's own go first. Null for none.
+    const OptionRow* FindOption(const std::string& name) const;
+};
+
+/// `words` without the tool's name. The line keeps pointers into `commands`.
+FollowedLine FollowLine(const CommandRows& commands, std::span<const std::string> words);
+
+/// What is wrong with an option that stands without its value.
+std::string ValueMissing(const OptionRow& row);
+
+/// Whether a word would be an option where options may stand.
+bool IsOption(const std::string& word);
+
+}  // namespace host
