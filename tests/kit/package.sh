@@ -36,4 +36,5 @@ done
 zcat "$trial/installed/usr/$doc/changelog.gz" | head -n 1 | grep -qF "($version)" ||
     { echo "the changelog doesn't begin with $version"; exit 1; }
 found=$(lintian --fail-on error --allow-root --info --display-info ./*.deb) || { echo "$found"; exit 1; }
-! grep -E 'hardening|spelling' <<<"$found"
+# Which overrides match depends on the compiler.
+if grep -v mismatched-override <<<"$found" | grep -E 'hardening|spelling'; then exit 1; fi

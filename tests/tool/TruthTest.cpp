@@ -294,9 +294,9 @@ const ReplyFault kReplyFaults[] = {
 std::size_t CheckBehind(const Bench& bench, const Work& work, const std::string& lie,
                         test::Peer& peer, Said& said, const char* timeout = "1s") {
     const auto start = std::chrono::system_clock::now();
-    said = Bench::Run(
-        work.words, Words{"--gdb", "127.0.0.1:" + peer.Where().port, "--loader", test::LoaderFile(),
-                          "--gdb-option", std::string("timeout=") + timeout});
+    said =
+        Bench::Run(work.words, Words{"--gdb", peer.Where().Text(), "--loader", test::LoaderFile(),
+                                     "--gdb-option", std::string("timeout=") + timeout});
     const std::size_t packets = peer.Log().size();
     EXPECT_LT(std::chrono::system_clock::now() - start, std::chrono::seconds(20)) << lie;
     const target::SimulatedDevice& device = peer.Device();
