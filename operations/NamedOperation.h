@@ -12,7 +12,6 @@ enum class RegisterChoice : std::uint8_t { Register0 = 0, Register1 = 1, MACAddr
 
 struct FlashCorvane::NamedOperation {
     const char* name;
-    bool listed;  ///< in the text that hosts show to their users
     void (FlashCorvane::*run)(const NamedOperation& operation);
 
     // The step that an operation on flash ends with, or consists of.
@@ -23,4 +22,6 @@ struct FlashCorvane::NamedOperation {
     // Of an operation on the user registers.
     RegisterAccess access = {};
     RegisterChoice choice = {};
+
+    bool listed = true;  ///< in the text that hosts show to their users
 };

@@ -11,7 +11,6 @@
 
 namespace {
 
-constexpr bool kListed = true;
 constexpr bool kUnlisted = false;  // for those who bring up a new host
 
 // Joined by the compiler: hosts keep the pointer for as long as the library is loaded.
@@ -38,19 +37,19 @@ struct FlashCorvane::Operations {
     static constexpr auto oneStep = &FlashCorvane::RunOneStep;
     static constexpr auto onUserRegisters = &FlashCorvane::RunUserRegisterOperation;
     static constexpr NamedOperation table[] = {
-        {"Erase", kListed, &FlashCorvane::RunErase, "Erasing device...", "Error erasing flash.",
+        {"Erase", &FlashCorvane::RunErase, "Erasing device...", "Error erasing flash.",
          &FlashCorvane::Erase},
-        {"BlankCheck", kListed, oneStep, "Performing Blank Check...",
-         "Error performing Blank Check.", &FlashCorvane::BlankCheck},
-        {"CalculateChecksum", kListed, oneStep, "Calculating CRC-32...", "Error calculating CRC.",
+        {"BlankCheck", oneStep, "Performing Blank Check...", "Error performing Blank Check.",
+         &FlashCorvane::BlankCheck},
+        {"CalculateChecksum", oneStep, "Calculating CRC-32...", "Error calculating CRC.",
          &FlashCorvane::CalculateChecksum},
-        {"ProgramUserRegister0", kListed, onUserRegisters, {}, {}, {}, Program, Register0},
-        {"ReadUserRegister0", kListed, onUserRegisters, {}, {}, {}, Read, Register0},
-        {"ProgramUserRegister1", kListed, onUserRegisters, {}, {}, {}, Program, Register1},
-        {"ReadUserRegister1", kListed, onUserRegisters, {}, {}, {}, Read, Register1},
-        {"ProgramMACAddress", kListed, onUserRegisters, {}, {}, {}, Program, MACAddress},
-        {"ReadMACAddress", kListed, onUserRegisters, {}, {}, {}, Read, MACAddress},
-        {"Test", kUnlisted, &FlashCorvane::RunTest},
+        {"ProgramUserRegister0", onUserRegisters, {}, {}, {}, Program, Register0},
+        {"ReadUserRegister0", onUserRegisters, {}, {}, {}, Read, Register0},
+        {"ProgramUserRegister1", onUserRegisters, {}, {}, {}, Program, Register1},
+        {"ReadUserRegister1", onUserRegisters, {}, {}, {}, Read, Register1},
+        {"ProgramMACAddress", onUserRegisters, {}, {}, {}, Program, MACAddress},
+        {"ReadMACAddress", onUserRegisters, {}, {}, {}, Read, MACAddress},
+        {"Test", &FlashCorvane::RunTest, {}, {}, {}, {}, {}, kUnlisted},
     };
 };
 

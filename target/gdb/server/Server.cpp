@@ -17,12 +17,15 @@ using std::chrono::milliseconds;
 constexpr milliseconds kBetweenLooks(200);
 constexpr milliseconds kToTakeAReply(10000);
 
-/// One client's bytes, from frames to replies.
+/// One client's bytes, from frames to replies. The last replies are kept, because a client may say
+/// that they arrived damaged; they are sent again then, and the request is not carried out twice.
 class Client {
   public:
     Client(Socket& socket, Session& session) : socket_(socket), session_(session) {}
 
     void Take(const Frame& frame) {
+        // Asked before the request is answered: the one that ends acknowledgements is the last to
+        // get one.
         const bool acknowledges = session_.AcknowledgesPackets();
         switch (frame.kind) {
             case Frame::Kind::Packet:

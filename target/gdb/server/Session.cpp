@@ -31,6 +31,7 @@ constexpr char kMonitorHelp[] =
 // What fits the reply's packet.
 constexpr std::uint32_t kReadMax = (Session::kPacketSize - kFrameSize) / 2;
 
+// Registers take nothing but whole words; a debugger asks for them as it does for any memory.
 std::size_t WidthOf(std::uint32_t address, std::size_t sizeBytes) {
     return address % 4 == 0 && sizeBytes % 4 == 0 ? 4 : 1;
 }
@@ -131,6 +132,7 @@ Session::Replies Session::StartNoAckMode(const Arguments&) {
     return {kOk};
 }
 
+// A debugger asks this first, and takes the target for stopped from then on.
 Session::Replies Session::WhyStopped(const Arguments&) {
     device_.Stop();
     return {kStopped};
@@ -143,6 +145,7 @@ Session::Replies Session::ReadRegisters(const Arguments&) {
     return {base::ToHex(bytes)};
 }
 
+// Answered by the stop, which only an interrupt brings about: the core executes nothing.
 Session::Replies Session::Continue(const Arguments& arguments) {
     GoTo(arguments);
     device_.Start();
@@ -169,6 +172,7 @@ Session::Replies Session::WriteFlash(const Arguments& arguments) {
     return {kOk};
 }
 
+// Debuggers expect a target that they have left to run.
 Session::Replies Session::Detach(const Arguments&) {
     device_.Start();
     ended_ = true;

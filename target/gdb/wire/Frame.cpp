@@ -74,6 +74,7 @@ std::string Escaped(std::string_view bytes) {
     return escaped;
 }
 
+// Bytes that were taken are given up here, once for each arrival, and not one by one.
 void FrameDecoder::Feed(std::string_view bytes) {
     arrived_.erase(0, taken_);
     taken_ = 0;
@@ -100,7 +101,8 @@ std::optional<Frame> FrameDecoder::Take(char byte) {
             if (byte == '$') return TakeBetween(byte);
             if (byte == '#') {
                 state_ = State::FirstDigit;
-            } else if (raw_.size() < kPayloadMax) {
+            } else if (raw_.size() <
+                       kPayloadMax) {  // or whoever sends without end takes all memory
                 raw_ += byte;
             } else {
                 tooLong_ = true;
@@ -143,6 +145,8 @@ Frame FrameDecoder::Finish(char lastDigit) {
     const int low = base::HexDigitValue(lastDigit);
     if (high < 0 || low < 0 || (high << 4 | low) != Sum(raw_))
         return {Frame::Kind::Damaged, "a packet with a wrong checksum"};
+    // The checksum is that of the bytes on the wire. Runs are expanded before escapes are undone: a
+    // '*' that is data stands escaped.
     if (sender_ == Sender::Client) return {kind_, Unescaped(raw_)};
     const auto expanded = WithRunsExpanded(raw_);
     if (!expanded) return {Frame::Kind::Damaged, "a packet with a malformed run"};

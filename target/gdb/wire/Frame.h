@@ -48,6 +48,9 @@ class FrameDecoder {
     std::optional<Frame> Next();
 
   private:
+    /// Between frames, inside of one, or at its checksum. A '$' inside of a payload begins a new
+    /// frame: what came before was cut off. After damage the decoder is between frames again, and
+    /// whoever feeds it asks for the packet once more.
     enum class State { Between, Payload, FirstDigit, SecondDigit };
 
     std::optional<Frame> Take(char byte);

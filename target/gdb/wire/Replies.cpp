@@ -18,6 +18,7 @@ constexpr std::uint64_t kPacketSizeMax = 0x4000;
 
 }  // namespace
 
+// Three characters, for a longer reply that begins with E can be memory.
 bool IsError(std::string_view reply) {
     if (reply.starts_with("E.")) return true;
     return reply.size() == 3 && reply[0] == 'E' &&
@@ -28,6 +29,8 @@ bool IsRefusal(std::string_view reply) {
     return reply.empty() || IsError(reply);
 }
 
+// Whatever follows the number (registers, the thread, the reason) is of no use here, and servers
+// differ in it.
 std::optional<StopReply> ParseStopReply(std::string_view reply) {
     if (reply.empty()) return std::nullopt;
     const auto number = base::ParseHexDigits(reply.substr(1, 2));

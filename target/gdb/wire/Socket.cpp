@@ -120,6 +120,7 @@ std::string Address::Text() const {
                        host, port);
 }
 
+// Never blocking: every wait is a poll, which has a limit and can be interrupted.
 Socket::Socket(int descriptor, InterruptCheck interrupted)
     : descriptor_(descriptor), interrupted_(std::move(interrupted)) {
     fcntl(descriptor_, F_SETFL, fcntl(descriptor_, F_GETFL) | O_NONBLOCK);
@@ -159,6 +160,7 @@ Socket Socket::Connect(const Address& address, Deadline deadline,
         SetUpConnection(descriptor);
         error = 0;
         if (connect(descriptor, each->ai_addr, each->ai_addrlen) != 0) error = errno;
+        // An interrupted connect goes on by itself, like one that can't be had at once.
         if (error == EINPROGRESS || error == EINTR)
             error = connection.Await(POLLOUT, deadline) ? ConnectionError(descriptor) : ETIMEDOUT;
         if (error == 0) return connection;
@@ -193,6 +195,7 @@ std::uint16_t Socket::Port() const {
 Socket Socket::Accept(Deadline deadline) {
     while (Await(POLLIN, deadline)) {
         const int descriptor = accept4(descriptor_, nullptr, nullptr, SOCK_CLOEXEC);
+        // Other errors are those of a client that has gone again; the next one may come.
         if (descriptor < 0 && errno == EMFILE) throw SocketError(SystemText(errno));
         if (descriptor < 0) continue;
         SetUpConnection(descriptor);
@@ -215,6 +218,7 @@ std::string Socket::Read(Deadline deadline) {
 
 void Socket::Write(std::string_view bytes, Deadline deadline) {
     while (!bytes.empty()) {
+        // A peer that has gone is an error of this call, not a signal to the whole process.
         const ssize_t put = send(descriptor_, bytes.data(), bytes.size(), MSG_NOSIGNAL);
         if (put > 0) {
             bytes.remove_prefix(static_cast<std::size_t>(put));
