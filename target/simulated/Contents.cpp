@@ -21,6 +21,11 @@ namespace {
 
 using Bytes = std::span<const std::uint8_t>;
 
+// Order of checks: magic, version, checksum over everything before it; then definition, and the
+// rest against the device that it makes. Nothing is believed that a checked part doesn't bear out:
+// whoever wrote the file may have meant harm. Timings and faults are never kept; they belong to a
+// run.
+
 constexpr std::array<std::uint8_t, 8> kMagic = {'C', 'O', 'R', 'V', 'S', 'I', 'M', '\n'};
 constexpr std::uint32_t kVersion = 2;
 constexpr std::uint32_t kVersionWithoutCounts = 1;
@@ -33,6 +38,7 @@ std::uint32_t Checksum(Bytes bytes) {
     return static_cast<std::uint32_t>(crc32_z(0, bytes.data(), bytes.size()));
 }
 
+// Always little-endian, so that a file can go from one machine to another.
 void AppendWord(std::string& text, std::uint32_t value) {
     std::array<std::uint8_t, 4> bytes{};
     base::StoreWord(bytes.data(), value);
@@ -75,6 +81,7 @@ class Decoder {
     void Fill(SimulatedDevice& device);
 
   private:
+    // Never beyond the end, however large a number in the file is.
     Bytes Take(std::size_t size) {
         if (size > rest_.size()) throw ContentsError("it ends too early");
         return std::exchange(rest_, rest_.subspan(size)).first(size);
@@ -106,6 +113,7 @@ void Decoder::CheckFrame() {
     rest_ = rest_.first(rest_.size() - 4);
 }
 
+// What was given when the device was made is no demand of today's.
 DeviceOptions Decoder::Definition() {
     const auto text = Take(TakeWord());
     try {
@@ -123,6 +131,7 @@ void Decoder::Fill(SimulatedDevice& device) {
     const std::uint32_t register1 = TakeWord();
     device.PresetCommittedUserRegisters({register0, register1});
     if (version_ != kVersionWithoutCounts) FillEraseCounts(device.Flash());
+    // Erased pages aren't there. A page that comes twice takes its last contents.
     while (!rest_.empty()) {
         const std::uint32_t index = TakeWord();
         const auto page = Take(FlashArray::kPageSizeBytes);

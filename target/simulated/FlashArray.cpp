@@ -8,6 +8,8 @@ namespace target {
 
 namespace {
 
+// A page is either programmed and held, or erased and not there; a held page may be all ones as
+// well.
 constexpr std::uint8_t kErased = 0xFF;
 
 std::uint32_t OffsetInPage(std::uint32_t address) {
@@ -47,12 +49,14 @@ void FlashArray::Read(std::uint32_t address, std::span<std::uint8_t> bytes) cons
             std::copy_n(page->begin() + OffsetInPage(at), part.size(), part.begin());
         }
     });
+    // The cell below keeps what it was told, so that contents survive a change of this fault.
     if (stuckCell_ && stuckCell_->address >= address &&
         stuckCell_->address - address < bytes.size()) {
         bytes[stuckCell_->address - address] = stuckCell_->value;
     }
 }
 
+// Everything is programmed, also behind the first cell that wasn't erased: silicon doesn't look.
 std::optional<std::uint32_t> FlashArray::Program(std::uint32_t address,
                                                  std::span<const std::uint8_t> bytes) {
     std::optional<std::uint32_t> notErased;
@@ -68,6 +72,7 @@ std::optional<std::uint32_t> FlashArray::Program(std::uint32_t address,
     return notErased;
 }
 
+// Erased pages are given away instead of being filled, which costs the same for any size.
 FlashArray::HeldPages FlashArray::Erase(std::uint32_t address, std::uint32_t sizeBytes) {
     HeldPages held;
     const std::size_t first = address / kPageSizeBytes;

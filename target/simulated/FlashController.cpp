@@ -16,6 +16,10 @@ namespace {
 using namespace std::chrono_literals;
 using Time = FlashController::Time;
 
+// States: idle, or at work on one command (running_). Besides, and only ended by a reset, erase
+// mode (inEraseMode_). A command begins in Command and nowhere else; it ends in AdvanceTo when its
+// time is up, or in Reset. Erased cells change at the end, never in between.
+
 constexpr std::uint32_t kEraseSector = 0x2;
 constexpr std::uint32_t kEraseAll = 0x4;
 constexpr std::uint32_t kCommit = 0x8;
@@ -99,6 +103,7 @@ void FlashController::Command(std::uint32_t value, CoreState core, Time now) {
                       fmt::format("Flash command 0x{:08X} ignored: wrong write key", value));
         return;
     }
+    // From here on the key was right, so that somebody meant it: what makes no sense is refused.
     const std::uint32_t bit = value & 0xFFFF;
     if (bit != kEraseSector && bit != kEraseAll && bit != kCommit) {
         Refuse(rule::kKnownCommand,
@@ -121,6 +126,7 @@ void FlashController::Command(std::uint32_t value, CoreState core, Time now) {
                                    : Commit(now);
 }
 
+// Two keys from Quen on. A configuration that reads 0 isn't there, and asks for nothing.
 bool FlashController::TakesKey(std::uint32_t key) const {
     const std::uint32_t configuration = registers_.Read(reg::kKeyConfiguration);
     const bool alternate = KindOf(options_) >= DeviceKind::Quen && configuration != 0 &&
@@ -141,6 +147,7 @@ std::optional<Obstacle> FlashController::WhyCommandIsLost(std::uint32_t bit, Tim
     if (!IsBank(registers_.Read(reg::kFlashAddress))) {
         return Obstacle{rule::kBank, "the flash address register holds the start of no bank"};
     }
+    // The blocks decide before the time of their writing: what was lost isn't being written.
     if (BlocksBeyondFlashAreEnabled()) {
         return Obstacle{rule::kFlashBlocks,
                         "the flash block registers enable blocks that the flash doesn't have"};
@@ -236,6 +243,7 @@ void FlashController::AdvanceTo(Time now) {
     const Faults& faults = options_.faults;
     if (commit ? faults.commitNeverEnds : faults.eraseNeverEnds) return;
     if (now < running_->end) return;
+    // A commit keeps what the register holds when it ends.
     if (commit) {
         registers_.SetResetValue(running_->address, registers_.Read(running_->address));
     } else {
@@ -247,6 +255,7 @@ void FlashController::AdvanceTo(Time now) {
 }
 
 void FlashController::Reset() {
+    // Cut off half-way. What that leaves has settled: nothing was raised to full voltage.
     if (running_ && running_->bit != kCommit) {
         const std::uint32_t half = running_->sizeBytes / 2;
         flash_.Erase(running_->address, half - half % FlashArray::kPageSizeBytes);
@@ -264,6 +273,7 @@ std::optional<Obstacle> FlashController::PrepareToProgram(std::uint32_t address,
     if (system_.IsRomAt(address, now)) {
         return Obstacle{rule::kRomAlias, "the ROM lies over it"};
     }
+    // The high voltage is still of the erase's polarity.
     if (inEraseMode_) {
         return Obstacle{rule::kResetAfterErase, "no reset has followed the last erase"};
     }

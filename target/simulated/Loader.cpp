@@ -8,6 +8,10 @@ namespace target {
 
 namespace {
 
+// The status word says whose a block is. Handed over: the loader's, until it writes another value;
+// any other value: the debugger's. Nobody but the loader takes back what was handed over, so a
+// loader that is gone leaves it so for ever.
+
 constexpr std::uint32_t kBufferSizeBytes = 2048;
 constexpr std::uint32_t kParameterSizeBytes = 16;
 constexpr std::uint32_t kBlockSizeBytes = 128;
@@ -44,6 +48,7 @@ Loader::Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash,
                FlashController& controller, RuleLog& rules)
     : options_(options), ram_(ram), flash_(flash), controller_(controller), rules_(rules) {}
 
+// Whatever the words held is gone, so a chunk that was handed over before the start is lost.
 void Loader::Start() {
     Forget();
     if (options_.faults.loader == LoaderFault::Dead) return;
@@ -55,6 +60,7 @@ void Loader::Start() {
 
 void Loader::Stop() {
     if (!running_) return;
+    // From here on the end of a chunk is what it still needs; Continue makes it a time again.
     if (chunk_) {
         ProgramFromBuffer(chunk_->sizeBytes / 2);
         chunk_->end -= now_;
@@ -94,6 +100,7 @@ void Loader::AdvanceTo(Time now) {
 
 // False when there is nothing to do, or when the loader waits for the flash controller.
 bool Loader::StartChunk(Time start) {
+    // Strictly in turn: a chunk in the other block waits until this one has been served.
     if (ram_.Word(Status(block_)) != kStatusHandedOver || controller_.IsBusy()) return false;
     const std::uint32_t address = ram_.Word(FlashAddress(block_));
     const std::uint32_t size = ram_.Word(ByteCount(block_));
@@ -121,6 +128,8 @@ bool Loader::IsLost(std::uint32_t address, std::uint32_t sizeBytes, Time start) 
     return true;
 }
 
+// Programs the whole chunk, the half of it again that a halt may have cut short: the same bits are
+// cleared twice, which changes nothing.
 void Loader::FinishChunk() {
     ProgramFromBuffer(chunk_->sizeBytes);
     busyTime_ += options_.timings.chunk;
@@ -141,6 +150,7 @@ void Loader::ProgramFromBuffer(std::uint32_t sizeBytes) {
     }
 }
 
+// A loader that was halted owns nothing: whoever halted it may do as they like.
 bool Loader::Owns(std::uint32_t address, std::uint64_t sizeBytes) {
     if (!running_) return false;
     for (std::uint32_t block = 0; block < 2; ++block) {

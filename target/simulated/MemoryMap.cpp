@@ -17,6 +17,10 @@ constexpr std::uint64_t kAddressSpaceBytes = 0x100000000;
 
 constexpr std::uint32_t kRegisterSizeBytes = 4;
 
+// A transfer is decided on as a whole before anything is moved: its form, then the region that it
+// starts in, which it must not leave. So flash and RAM are transferred completely or not at all.
+// The registers have no region of their own; each is found, or refused, by itself.
+
 // What can be told from the transfer alone.
 void CheckForm(const Transfer& transfer) {
     const std::size_t width = transfer.width;
@@ -55,6 +59,7 @@ MemoryMap::MemoryMap(const DeviceOptions& options, FlashArray& flash, Ram& ram,
 MemoryMap::Region MemoryMap::CheckedRegion(const Transfer& transfer) const {
     CheckForm(transfer);
     const std::uint32_t address = transfer.address;
+    // A transfer of nothing still has to point somewhere.
     const std::uint64_t size = std::max<std::uint64_t>(transfer.SizeBytes(), 1);
     if (flash_.Contains(address, size)) return Region::Flash;
     const bool inRam = ram_.Contains(address, 1);
@@ -78,6 +83,7 @@ void MemoryMap::Read(const Transfer& transfer, std::uint8_t* bytes, Time now) co
     const std::size_t size = transfer.SizeBytes();
     switch (CheckedRegion(transfer)) {
         case Region::Flash:
+            // One array: while some cell is under high voltage none can be read.
             if (controller_.IsBusy() || loader_.IsProgramming()) {
                 Refuse(rule::kFlashBusy, "the flash is being erased or programmed");
             }
@@ -111,6 +117,8 @@ void MemoryMap::Write(const Transfer& transfer, const std::uint8_t* bytes, CoreS
         case Region::Flash:
             Refuse(rule::kFlashReadOnly, "flash can't be written like memory; use the loader");
         case Region::Ram:
+            // From the hand-over on, buffer and parameters are the loader's until it says
+            // otherwise.
             if (loader_.Owns(address, size)) {
                 Refuse(rule::kBufferInUse,
                        "the loader hasn't finished the chunk that was handed over in this buffer");
@@ -148,6 +156,7 @@ void MemoryMap::WriteRegister(std::uint32_t address, std::uint32_t value, CoreSt
                               Time now) {
     // A register bus that reads constants doesn't bring a write through either.
     if (registerFault_ != RegisterFault::None) return;
+    // Two masters at one controller would take each other's address.
     if (!FlashController::Owns(address)) return system_.Write(address, value, core, now);
     if (loader_.IsProgramming()) {
         Refuse(rule::kFlashBusy, "the loader is using the flash controller");

@@ -13,6 +13,10 @@ namespace target {
 
 namespace {
 
+// Presence is decided once, when the device is made: `registers_` holds the registers of this
+// device and no others, so that all later questions are a look-up. A write changes `value` alone;
+// what comes back at a reset is `resetValue`, which only options and commits change.
+
 // What a register's presence can depend on; a device has a register when they share a trait.
 using Traits = std::uint32_t;
 constexpr Traits Of(DeviceKind kind) {
@@ -87,6 +91,7 @@ RegisterFile::RegisterFile(const DeviceOptions& options) : className_(options.cl
     PowerUp();
 }
 
+// The size registers hold one less than the number of units, so that the largest size fits.
 void RegisterFile::SetOptionValues(const DeviceOptions& options) {
     const std::uint32_t flashField = options.flashSizeBytes / 2048 - 1;
     const std::uint32_t ramField = options.ramSizeBytes / 256 - 1;
@@ -102,6 +107,7 @@ void RegisterFile::SetOptionValues(const DeviceOptions& options) {
     SetResetValue(reg::kRamSize, ramField);
 }
 
+// The one place where an address without a register is noticed.
 const RegisterFile::Register& RegisterFile::Find(std::uint32_t address) const {
     const auto found = registers_.find(address);
     if (found == registers_.end()) {
@@ -116,6 +122,7 @@ std::uint32_t RegisterFile::Read(std::uint32_t address) const {
     return Find(address).value;
 }
 
+// Effects beyond the value are for system control and the flash controller, which call this.
 void RegisterFile::Write(std::uint32_t address, std::uint32_t value) {
     const Register& found = Find(address);
     if (found.kind == Kind::ReadOnly) {
@@ -139,6 +146,7 @@ std::uint32_t RegisterFile::ResetValue(std::uint32_t address) const {
     return Find(address).resetValue;
 }
 
+// What the register reads now stays until the next reset.
 void RegisterFile::SetResetValue(std::uint32_t address, std::uint32_t value) {
     Find(address);
     registers_.at(address).resetValue = value;

@@ -15,6 +15,10 @@ namespace target {
 
 namespace {
 
+// The core executes nothing. What its registers say is what a debugger wrote, but for pc: it
+// decides at each start whether the loader begins (in RAM that was written), goes on (where it was
+// halted) or the core runs what is in flash.
+
 constexpr std::uint32_t kPeripheralStart = 0x40000000;
 constexpr std::uint32_t kPeripheralSizeBytes = 0x20000000;
 
@@ -56,6 +60,8 @@ void ServedSimulation::Write(std::uint32_t address, std::string_view bytes, std:
         writtenWords_[word] = true;
 }
 
+// A server's own flash packets bypass the flash controller: a real server has an algorithm of its
+// own for them, which keeps every rule.
 void ServedSimulation::EraseFlash(std::uint32_t address, std::uint32_t sizeBytes) {
     const std::uint32_t sector = device_.Options().sectorSizeBytes;
     if (address % sector != 0 || sizeBytes % sector != 0)
@@ -91,6 +97,7 @@ void ServedSimulation::Start() {
     haltedAt_ = goesOn ? pc : pc + kInsideLoader;
 }
 
+// A debugger that looks at the halted loader finds it inside of its loop.
 void ServedSimulation::Stop() {
     const bool ran = IsRunning();
     Do([&] { device_.Halt(); });
@@ -128,6 +135,8 @@ void ServedSimulation::RequireFlash(std::uint32_t address, std::size_t sizeBytes
                                   sizeBytes, address, device_.Flash().SizeBytes()));
 }
 
+// Whether somebody loaded something there. Nothing ever makes a word unwritten again but a new
+// device: RAM keeps its contents through a reset.
 bool ServedSimulation::WasWritten(std::uint32_t address) const {
     if (address < Ram::kStart) return false;
     const std::size_t word = (address - Ram::kStart) / 4;

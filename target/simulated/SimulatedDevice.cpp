@@ -7,6 +7,15 @@
 
 #include <type_traits>
 
+// What every access may rely on, and leaves behind, also when it fails:
+// - Controller and loader have been brought up to the time of the access before it is carried out.
+// - The core is halted, runs the loader, or runs what is in flash. The loader is at work in the
+// second
+//   case only; the third needs no time and changes nothing.
+// - An access that is refused has changed nothing, but for a transfer to several registers, of
+// which
+//   those before the refused one are written. It has cost its time and counts as an access.
+
 namespace target {
 
 namespace {
@@ -31,6 +40,7 @@ SimulatedDevice::SimulatedDevice(const DeviceOptions& options, Clock* clock)
     PowerCycle();
 }
 
+// The text of an access is put together only when somebody is told of it: a load has thousands.
 void SimulatedDevice::Read(void* buffer, std::size_t count, std::uint32_t address, int page,
                            std::size_t width) {
     const Transfer transfer{count, address, page, width};
@@ -68,6 +78,8 @@ void SimulatedDevice::LoadProgram(const std::string& fileName, const std::string
     });
 }
 
+// The loader is all that can be run: a program in flash is the same as none to whoever looks from
+// outside.
 void SimulatedDevice::Run() {
     Perform(0, "Running the target", [&] {
         if (running_) Refuse(rule::kHaltedForRun, "the target is running already");
@@ -79,6 +91,7 @@ void SimulatedDevice::Run() {
     });
 }
 
+// Halting a halted core is no mistake, and neither is letting a running one go on.
 void SimulatedDevice::Halt() {
     Perform(0, "Halting the target", [&] { StopCore(); });
 }
@@ -119,6 +132,7 @@ void SimulatedDevice::Perform(std::uint64_t sizeBytes, const Describe& describe,
             return describe;
         }
     };
+    // A failed access has cost its time all the same: the link was busy.
     ++accessCount_;
     time_.AddAccess(sizeBytes);
     AdvanceToNow();
@@ -136,6 +150,7 @@ void SimulatedDevice::Perform(std::uint64_t sizeBytes, const Describe& describe,
     AdvanceToNow();  // The loader sees at once what was handed over to it.
 }
 
+// The controller first: the loader waits for the end of a command and goes on at the same moment.
 void SimulatedDevice::AdvanceToNow() {
     const auto now = time_.Now();
     controller_.AdvanceTo(now);
@@ -155,11 +170,14 @@ CoreState SimulatedDevice::Core() const {
                             : CoreState::RunsFlash;
 }
 
+// The loader first: of the chunk at work it programs what it got done by now.
 void SimulatedDevice::StopCore() {
     loader_.Stop();
     running_ = false;
 }
 
+// What is at work is cut off as by a reset; then the volatile part is new. What the flash cells and
+// the committed registers hold is all that is left.
 void SimulatedDevice::PowerCycle() {
     StopCore();
     loader_.Forget();
@@ -184,6 +202,7 @@ std::array<std::uint32_t, 2> SimulatedDevice::CommittedUserRegisters() const {
 
 void SimulatedDevice::PresetCommittedUserRegisters(const std::array<std::uint32_t, 2>& values) {
     std::uint32_t address = reg::kUserRegister0;
+    // Both the value that a reset brings and the one that reads now, as after power-up.
     for (const std::uint32_t value : values) {
         if (!registers_.Has(address)) return;
         registers_.SetResetValue(address, value);

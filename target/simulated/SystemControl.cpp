@@ -12,6 +12,7 @@ namespace {
 
 using namespace std::chrono_literals;
 
+// Each a little less than what drivers allow for: a pause that is half as long must not do.
 constexpr std::chrono::nanoseconds kTimingSetUp = 16ms;    // before the clock may be switched
 constexpr std::chrono::nanoseconds kClockSettling = 16ms;  // after it was switched
 constexpr std::chrono::nanoseconds kRomLeaving = 8ms;      // until the flash shows
@@ -30,6 +31,8 @@ SystemControl::SystemControl(const DeviceOptions& options, RegisterFile& registe
       registers_(registers),
       rules_(rules) {}
 
+// A register that a class lacks is refused by the register file in any case, before or after the
+// effect. So an effect must do no harm on a class without the register.
 void SystemControl::Write(std::uint32_t address, std::uint32_t value, CoreState core, Time now) {
     switch (address) {
         case reg::kFlashTiming:
@@ -50,6 +53,7 @@ void SystemControl::Write(std::uint32_t address, std::uint32_t value, CoreState 
                     rule::kFixUp, fmt::format("Write of 0x{:08X} ignored: it is locked", address));
             }
             return registers_.Write(address, value);
+        // Words of the watchdogs alone are never lost: they are on a clock of their own.
         case reg::kSoftwareReset0:
         case reg::kSoftwareReset0 + 4:
         case reg::kSoftwareReset0 + 8:
@@ -81,10 +85,12 @@ void SystemControl::WriteClock(std::uint32_t value, CoreState core, Time now) {
     clockFixed_ = overrideCleared_ && value == kFixedClock;
     if (!needsSetUp_) return;
     clock_.Configure(previous, value);
+    // Under a running core the source may go away between two of its instructions.
     if (core != CoreState::Halted) {
         clock_.Lose();
         rules_.Record(rule::kHaltedForClock, "Clock lost: it was switched under a running core");
     }
+    // The timing counts clocks, and has to be taken over before these change.
     if (timingWritten_ && now < *timingWritten_ + kTimingSetUp) {
         timingWritten_.reset();
         rules_.Record(rule::kTimingSetUp,
@@ -99,6 +105,7 @@ void SystemControl::WriteClock2(std::uint32_t value) {
     overrideCleared_ = value == (previous & ~kClockOverride);
 }
 
+// Writing ones clears them, so a driver writes back what it has read.
 void SystemControl::WriteRomControl(std::uint32_t value, Time now) {
     const std::uint32_t previous = registers_.Read(reg::kRomControl);
     registers_.Write(reg::kRomControl, value);
@@ -113,6 +120,7 @@ void SystemControl::PowerUp() {
     RunBootRom();
 }
 
+// A cut fetch ends with the next reset that finds the core halted. Timing, clock and fix-ups stay.
 void SystemControl::Reset(bool full, CoreState core, Time now) {
     peripherals_.Reset(full, now);
     fetchCut_ = core != CoreState::Halted;
@@ -122,6 +130,7 @@ void SystemControl::Reset(bool full, CoreState core, Time now) {
     }
 }
 
+// It leaves everything as the program in flash expects it.
 void SystemControl::RunBootRom() {
     peripherals_.Finish();
     fetchCut_ = false;
@@ -129,6 +138,7 @@ void SystemControl::RunBootRom() {
     romGone_ = Time(0);
 }
 
+// One obstacle is enough; they are asked for in the order in which a driver removes them.
 std::optional<Obstacle> SystemControl::WhyFlashIsNotReady() const {
     if (needsSetUp_ && !timingWritten_) {
         return Obstacle{rule::kFlashTiming, "its timing has not been written since power-up"};
@@ -155,6 +165,7 @@ bool SystemControl::IsRomAt(std::uint32_t address, Time now) const {
     return (registers_.Read(reg::kRomControl) & kRomMapped) != 0 || now < romGone_;
 }
 
+// Only for classes that have the lock; others have no test register to ask for.
 bool SystemControl::IsTestRegisterLocked() const {
     return registers_.Read(reg::kTestLock) != kTestUnlocked;
 }

@@ -21,6 +21,7 @@ bool UnsettledErases::Undo(std::uint32_t address, std::uint32_t sizeBytes, Time 
     ForgetSettled(now);
     const std::uint32_t first = address / FlashArray::kPageSizeBytes;
     const std::uint32_t last = (address + sizeBytes - 1) / FlashArray::kPageSizeBytes;
+    // A page that was blank before has nothing to come back, on silicon as well.
     bool undone = false;
     for (Entry& entry : entries_) {
         for (auto& [index, page] : entry.pages) {
@@ -33,6 +34,7 @@ bool UnsettledErases::Undo(std::uint32_t address, std::uint32_t sizeBytes, Time 
     return undone;
 }
 
+// Entries are in the order of their ends, and each takes as long to settle.
 void UnsettledErases::ForgetSettled(Time now) {
     while (!entries_.empty() && now >= entries_.front().settled)
         entries_.pop_front();

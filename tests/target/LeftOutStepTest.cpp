@@ -8,9 +8,11 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <fstream>
 #include <map>
 #include <numeric>
 #include <set>
+#include <sstream>
 #include <utility>
 
 #include "tests/support/RecordingHost.h"
@@ -479,6 +481,15 @@ TEST(LeftOutStep, MakesSomeWorkOnSomeDeviceWrong) {
             EXPECT_NE(outcome.violations.find(fmt::format("[{}]", row.rule)), std::string::npos)
                 << outcome.violations;
         }
+    }
+}
+
+TEST(LeftOutStep, BreaksARuleThatIsDocumented) {
+    std::ostringstream document;
+    document << std::ifstream(DEVICE_DOCUMENT).rdbuf();
+    for (const Row& row : kRows) {
+        const std::string rule = row.rule == nullptr ? "" : fmt::format("`{}`", row.rule);
+        EXPECT_NE(document.str().find(rule), std::string::npos) << rule;
     }
 }
 

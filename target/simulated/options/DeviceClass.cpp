@@ -8,6 +8,9 @@ namespace target {
 
 namespace {
 
+// What a driver sees is the identification alone. An option may change it so that it no longer fits
+// the class: then registers go by the class, and sizes and ROM by what is seen.
+
 std::uint32_t ClassField(const DeviceOptions& options) {
     return (options.identification >> 16) & 0xFFU;
 }

@@ -19,6 +19,10 @@ namespace {
 
 using std::string_view;
 
+// Options go from text to value in one pass, each checked by itself. What depends on two of them is
+// checked afterwards, for they come in any order, and once more when a kept device is opened with
+// options of today. An OptionError leaves nothing half set: the value is thrown away with it.
+
 constexpr char kClass[] = "class";
 
 [[noreturn]] void ThrowBadValue(string_view name, string_view value, string_view why) {
@@ -72,6 +76,7 @@ void ParseOption(DeviceOptions& options, string_view text) {
 
 }  // namespace
 
+// The class comes first: it brings the defaults that the other options replace.
 DeviceOptions ParseDeviceOptions(const std::string& text) {
     string_view rest = text;
     const auto nextItem = [&rest] {
@@ -88,6 +93,7 @@ DeviceOptions ParseDeviceOptions(const std::string& text) {
     return options;
 }
 
+// `given` stays empty: a default contradicts nobody.
 DeviceOptions DefaultDeviceOptions(const std::string& className) {
     const DeviceClass* row = FindDeviceClass(className);
     if (row == nullptr) {
@@ -104,11 +110,14 @@ DeviceOptions DefaultDeviceOptions(const std::string& className) {
     return options;
 }
 
+// The value may have been made by hand. Its text is parsed back, so that one set of limits serves
+// both.
 void CheckDeviceOptions(const DeviceOptions& options) {
     CheckTogether(options);
     ParseDeviceOptions(DefinitionText(options));
 }
 
+// Kept in contents files: a name in it can't be changed any more.
 std::string DefinitionText(const DeviceOptions& options) {
     std::string text = options.className;
     for (const OptionRow& row : OptionTable()) {
@@ -137,6 +146,7 @@ DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& toda
     DeviceOptions reopened = kept;
     reopened.timings = today.timings;
     reopened.faults = today.faults;
+    // The checks that follow name what the user gave, not what was kept.
     reopened.given = today.given;
     return reopened;
 }

@@ -16,6 +16,10 @@ namespace {
 
 using std::string_view;
 
+// A row's `set` changes the member that it is for, and nothing else, when it takes the text; when
+// it refuses, what it leaves there is of no account. Rows with a `definition` say what a device is
+// and are kept with it: their order is the order in contents files. The others are of a run.
+
 bool Store(std::optional<std::uint32_t> parsed, std::uint32_t& member) {
     if (parsed) member = *parsed;
     return parsed.has_value();
@@ -36,6 +40,7 @@ bool SetTime(DeviceOptions& options, string_view text) {
     return duration.has_value();
 }
 
+// 0 stands for none and can't be asked for.
 template <std::uint64_t Faults::*Member>
 bool SetAccessNumber(DeviceOptions& options, string_view text) {
     const auto number = ParseNumber(text);
@@ -50,6 +55,7 @@ bool SetNever(DeviceOptions& options, string_view text) {
     return options.faults.*Member;
 }
 
+// The revision is a part of the identification, which can also be given as a whole.
 bool SetRevision(DeviceOptions& options, string_view text) {
     const auto revision = ParseRevision(text);
     if (!revision) return false;
@@ -57,6 +63,7 @@ bool SetRevision(DeviceOptions& options, string_view text) {
     return true;
 }
 
+// A power of two, for the register holds an exponent.
 bool SetSector(DeviceOptions& options, string_view text) {
     std::uint32_t size = 0;
     if (!StoreSize(text, kKiB, kKiB, 128 * kKiB, size) || !std::has_single_bit(size)) return false;
@@ -84,6 +91,7 @@ bool SetRegisterFault(DeviceOptions& options, string_view text) {
     return options.faults.registers != RegisterFault::None;
 }
 
+// Without a byte it is stuck at 0.
 bool SetStuckCell(DeviceOptions& options, string_view text) {
     const std::size_t colon = text.find(':');
     const auto address = base::ParseHex32(text.substr(0, colon));
@@ -93,6 +101,7 @@ bool SetStuckCell(DeviceOptions& options, string_view text) {
     return true;
 }
 
+// Each is the end of the sentence "accepted is ...", and stands in the help.
 constexpr char kTimeForm[] = "a whole number with ns, us, ms or s, up to an hour";
 constexpr char kHexForm[] = "a hexadecimal number of up to 8 digits";
 

@@ -13,6 +13,7 @@ namespace target {
 
 namespace {
 
+// No sign, no blank, no separator, and nothing behind the number: std::from_chars takes none.
 std::optional<std::uint64_t> ParseDigits(std::string_view digits, int base) {
     std::uint64_t value = 0;
     const auto [end, error] =
@@ -25,6 +26,7 @@ bool HasHexPrefix(std::string_view text) {
     return text.starts_with("0x") || text.starts_with("0X");
 }
 
+// Too large is no number, rather than another one.
 std::optional<std::uint64_t> Multiply(std::optional<std::uint64_t> number, std::uint64_t factor) {
     if (!number || *number > std::numeric_limits<std::uint64_t>::max() / factor) {
         return std::nullopt;
@@ -60,6 +62,7 @@ std::optional<std::uint8_t> ParseRevision(std::string_view text) {
     return static_cast<std::uint8_t>(*number);
 }
 
+// 0 has no suffix: "0M" would be right and odd.
 std::string FormatSize(std::uint64_t bytes) {
     if (bytes != 0 && bytes % (kKiB * kKiB) == 0) return fmt::format("{}M", bytes / (kKiB * kKiB));
     if (bytes != 0 && bytes % kKiB == 0) return fmt::format("{}K", bytes / kKiB);
