@@ -121,7 +121,8 @@ bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
                         [&](const std::string& name) { return line.Has(name); });
 }
 
-std::vector<GivenOption> WithEnvironment(const FollowedLine& line, const Environment& environment) {
+std::vector<GivenOption> WithEnvironment(const FollowedLine& line,
+                                         const ReadVariable& environment) {
     std::vector<GivenOption> given = line.given;
     for (const OptionRow& row : GlobalOptions())
         if (HeedsEnvironment(row, line))
@@ -138,7 +139,7 @@ std::string ProcessEnvironment(const char* name) {
 }
 
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
-                            const Environment& environment) {
+                            const ReadVariable& environment) {
     if (const std::string text = Answer(commands, line); !text.empty())
         return {{}, {}, nullptr, text};
     RefuseNonsense(commands, line);

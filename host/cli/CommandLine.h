@@ -17,11 +17,11 @@ struct ParsedLine {
 };
 
 /// A variable's text; empty when it isn't set.
-using Environment = std::function<std::string(const char* name)>;
+using ReadVariable = std::function<std::string(const char* name)>;
 std::string ProcessEnvironment(const char* name);
 
 /// Failure (WrongUsage) for a line that makes no sense.
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
-                            const Environment& environment = ProcessEnvironment);
+                            const ReadVariable& environment = ProcessEnvironment);
 
 }  // namespace host
