@@ -143,8 +143,8 @@ std::uint32_t Crc32(const Bytes& bytes) {
 }
 
 /// One device and what its cells should hold.
-struct Bench {
-    Bench(const std::string& device, const Settings& settings, const Steps& leftOut, How how)
+struct PluginRun {
+    PluginRun(const std::string& device, const Settings& settings, const Steps& leftOut, How how)
         : host(device, settings),
           front(host, leftOut, how),
           cells(host.Device().Flash().SizeBytes()) {
@@ -188,80 +188,80 @@ struct Bench {
     int version = 0;
 };
 
-bool Describes(Bench& bench, Plugin& plugin) {
+bool Describes(PluginRun& run, Plugin& plugin) {
     bool flash = false;
     const char* operations = nullptr;
     plugin->Initialize(&flash, &operations);
-    const target::DeviceOptions& options = bench.host.Device().Options();
-    const auto published = [&](const char* name) { return bench.host.settings[name]; };
+    const target::DeviceOptions& options = run.host.Device().Options();
+    const auto published = [&](const char* name) { return run.host.settings[name]; };
     return published("DeviceInfoFlashSize") == fmt::format("{}KB", options.flashSizeBytes / 1024) &&
            published("DeviceInfoRAMSize") == fmt::format("{}KB", options.ramSizeBytes / 1024);
 }
 
-bool LoadsPages(Bench& bench, Plugin& plugin) {
+bool LoadsPages(PluginRun& run, Plugin& plugin) {
     for (int load = 0; load < 2; ++load) {
-        bench.EraseSectors();
-        bench.Load(plugin);
-        if (!bench.AsExpected() || !bench.ChecksumFits()) return false;
+        run.EraseSectors();
+        run.Load(plugin);
+        if (!run.AsExpected() || !run.ChecksumFits()) return false;
     }
-    return Describes(bench, plugin);
+    return Describes(run, plugin);
 }
 
 // The second load comes while the loader of the first is still running.
-bool LoadsWithoutStop(Bench& bench, Plugin& plugin) {
+bool LoadsWithoutStop(PluginRun& run, Plugin& plugin) {
     for (int load = 0; load < 2; ++load) {
-        bench.EraseSectors();
-        bench.Load(plugin, false);
-        if (!bench.AsExpected()) return false;
+        run.EraseSectors();
+        run.Load(plugin, false);
+        if (!run.AsExpected()) return false;
     }
     return true;
 }
 
-bool LoadsWhole(Bench& bench, Plugin& plugin) {
+bool LoadsWhole(PluginRun& run, Plugin& plugin) {
     for (int load = 0; load < 2; ++load) {
-        bench.Erase(0, static_cast<std::uint32_t>(bench.cells.size()));
-        bench.Load(plugin, false);
-        if (!bench.AsExpected()) return false;
+        run.Erase(0, static_cast<std::uint32_t>(run.cells.size()));
+        run.Load(plugin, false);
+        if (!run.AsExpected()) return false;
     }
     return true;
 }
 
-bool LoadsOnBlank(Bench& bench, Plugin& plugin) {
-    bench.Erase(0, static_cast<std::uint32_t>(bench.cells.size()));
-    bench.host.Device().Flash().Preset(0, bench.cells);
-    bench.Load(plugin);
-    return bench.AsExpected() && bench.ChecksumFits();
+bool LoadsOnBlank(PluginRun& run, Plugin& plugin) {
+    run.Erase(0, static_cast<std::uint32_t>(run.cells.size()));
+    run.host.Device().Flash().Preset(0, run.cells);
+    run.Load(plugin);
+    return run.AsExpected() && run.ChecksumFits();
 }
 
-bool ErasesAndChecks(Bench& bench, Plugin& plugin) {
-    bench.Erase(0, static_cast<std::uint32_t>(bench.cells.size()));
+bool ErasesAndChecks(PluginRun& run, Plugin& plugin) {
+    run.Erase(0, static_cast<std::uint32_t>(run.cells.size()));
     plugin->PerformOperation("Erase");
     plugin->PerformOperation("CalculateChecksum");
-    return bench.AsExpected() && bench.ChecksumFits();
+    return run.AsExpected() && run.ChecksumFits();
 }
 
-bool Commits(Bench& bench, Plugin& plugin) {
+bool Commits(PluginRun& run, Plugin& plugin) {
     plugin->PerformOperation("ProgramMACAddress");
-    bench.host.Device().Pause(100);
-    return bench.host.Device().CommittedUserRegisters() == std::array{0x00C31B02U, 0x00060504U};
+    run.host.Device().Pause(100);
+    return run.host.Device().CommittedUserRegisters() == std::array{0x00C31B02U, 0x00060504U};
 }
 
-bool CommitsAndErases(Bench& bench, Plugin& plugin) {
-    return Commits(bench, plugin) && ErasesAndChecks(bench, plugin);
+bool CommitsAndErases(PluginRun& run, Plugin& plugin) {
+    return Commits(run, plugin) && ErasesAndChecks(run, plugin);
 }
 
 // An erase that takes longer than anybody waits for leaves the first half erased.
-bool LoadsAfterATimeOut(Bench& bench, Plugin& plugin) {
+bool LoadsAfterATimeOut(PluginRun& run, Plugin& plugin) {
     plugin->PerformOperation("Erase");
-    bench.host.settings["FlashProgramOption"] = "Necessary Pages Only";
-    bench.Erase(0, static_cast<std::uint32_t>(bench.cells.size() / 2));
-    bench.EraseSectors();
-    bench.Load(plugin, false);
-    return bench.AsExpected();
+    run.host.settings["FlashProgramOption"] = "Necessary Pages Only";
+    run.Erase(0, static_cast<std::uint32_t>(run.cells.size() / 2));
+    run.EraseSectors();
+    run.Load(plugin, false);
+    return run.AsExpected();
 }
 
 struct Task {
-    bool (*work)(Bench&, Plugin&);
+    bool (*work)(PluginRun&, Plugin&);
     Settings settings;
 };
 const Task kPages = {LoadsPages, {{"FlashProgramCRCOption", "1"}}};
@@ -453,16 +453,16 @@ struct Outcome {
 };
 
 Outcome Try(const char* device, const Task& task, const Steps& leftOut, How how = How::Whole) {
-    Bench bench(device, task.settings, leftOut, how);
+    PluginRun run(device, task.settings, leftOut, how);
     bool right = false;
     try {
-        Plugin plugin(bench.host);
-        right = task.work(bench, plugin);
+        Plugin plugin(run.host);
+        right = task.work(run, plugin);
     } catch (const std::exception&) {
         // No device object: nothing was done.
     }
-    return {right, fmt::format("{}", fmt::join(bench.host.Device().Violations(), "\n")),
-            bench.front.Seen()};
+    return {right, fmt::format("{}", fmt::join(run.host.Device().Violations(), "\n")),
+            run.front.Seen()};
 }
 
 TEST(LeftOutStep, MakesSomeWorkOnSomeDeviceWrong) {

@@ -25,8 +25,8 @@ constexpr std::uint32_t kBusy = 0xFFFFFFFF;
 constexpr char kLoader[] = "FlashLoaderMerrow.out";
 
 // A device under a clock that stands still, and the few things that a debugger does with it.
-struct Rig {
-    explicit Rig(const std::string& options = "tolva", bool setUp = true)
+struct DebuggedDevice {
+    explicit DebuggedDevice(const std::string& options = "tolva", bool setUp = true)
         : device(target::ParseDeviceOptions(options), &clock) {
         device.Halt();
         if (setUp) SetUp();
@@ -117,81 +117,84 @@ std::string ErrorOf(const std::function<void()>& action) {
 TEST(Rules, RefusedAccessNamesTheRule) {
     const struct {
         const char* text;
-        std::function<void(Rig&)> access;
+        std::function<void(DebuggedDevice&)> access;
     } cases[] = {
         {"0x400FD000 on page 2: the device has the pages 0 (flash) and 1 (everything) [page]",
-         [](Rig& r) { r.device.Read(nullptr, 1, 0x400FD000, 2, 4); }},
-        {"[page]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE000, 0, 4); }},
-        {"[access-width]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE000, 1, 2); }},
-        {"[access-width]", [](Rig& r) { r.device.Read(nullptr, 1, 0x20000000, 1, 0); }},
-        {"[aligned-access]", [](Rig& r) { r.device.Read(nullptr, 1, 0x400FE002, 1, 4); }},
-        {"[aligned-access]", [](Rig& r) { r.device.Write(nullptr, 1, 0x20000001, 1, 2); }},
-        {"[mapped-address]", [](Rig& r) { r.Flash(0x3FFFF, 2); }},
-        {"[mapped-address]", [](Rig& r) { r.device.Read(nullptr, SIZE_MAX, 0x100, 0, 4); }},
+         [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FD000, 2, 4); }},
+        {"[page]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE000, 0, 4); }},
+        {"[access-width]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE000, 1, 2); }},
+        {"[access-width]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x20000000, 1, 0); }},
+        {"[aligned-access]",
+         [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE002, 1, 4); }},
+        {"[aligned-access]",
+         [](DebuggedDevice& r) { r.device.Write(nullptr, 1, 0x20000001, 1, 2); }},
+        {"[mapped-address]", [](DebuggedDevice& r) { r.Flash(0x3FFFF, 2); }},
+        {"[mapped-address]",
+         [](DebuggedDevice& r) { r.device.Read(nullptr, SIZE_MAX, 0x100, 0, 4); }},
         {"class tolva has no memory and no register at 0x400FE070 [mapped-address]",
-         [](Rig& r) { r.Word(0x400FE070); }},
-        {"[read-only-register]", [](Rig& r) { r.SetWord(0x400FE1D0, 0); }},
-        {"[flash-read-only]", [](Rig& r) { r.device.Write("x", 1, 0, 1, 1); }},
-        {"[known-command]", [](Rig& r) { r.SetWord(kFlashCommand, 0xA4420006); }},
+         [](DebuggedDevice& r) { r.Word(0x400FE070); }},
+        {"[read-only-register]", [](DebuggedDevice& r) { r.SetWord(0x400FE1D0, 0); }},
+        {"[flash-read-only]", [](DebuggedDevice& r) { r.device.Write("x", 1, 0, 1, 1); }},
+        {"[known-command]", [](DebuggedDevice& r) { r.SetWord(kFlashCommand, 0xA4420006); }},
         {"[one-command]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.Command(0, 0xA4420002);
              r.SetWord(kFlashCommand, 0xA4420002);
          }},
         {"[flash-busy]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.Command(0, 0xA4420002);
              r.Flash(0x8000, 1);
          }},
         {"[flash-busy]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.HandOver(0, 0, Pattern(128));
              r.Flash(0x8000, 1);
          }},
         {"[flash-busy]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.HandOver(0, 0, Pattern(128));
              r.SetWord(kFlashAddress, 0);
          }},
         {"[halted-for-erase]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.Command(0, 0xA4420004);
          }},
         {"the flash address register holds 0x00000200, which is not the start of a 0x400-byte "
          "sector of the 0x40000-byte flash [sector-address]",
-         [](Rig& r) { r.Command(0x200, 0xA4420002); }},
-        {"[sector-address]", [](Rig& r) { r.Command(0x40000, 0xA4420002); }},
-        {"[commit-address]", [](Rig& r) { r.Command(0x80000002, 0xA4420008); }},
-        {"[loaded-for-run]", [](Rig& r) { r.device.Run(); }},
+         [](DebuggedDevice& r) { r.Command(0x200, 0xA4420002); }},
+        {"[sector-address]", [](DebuggedDevice& r) { r.Command(0x40000, 0xA4420002); }},
+        {"[commit-address]", [](DebuggedDevice& r) { r.Command(0x80000002, 0xA4420008); }},
+        {"[loaded-for-run]", [](DebuggedDevice& r) { r.device.Run(); }},
         {"[loaded-for-run]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.device.LoadProgram(kLoader, "");
              r.device.Reset(true);
              r.device.Run();
          }},
-        {"[known-program]", [](Rig& r) { r.device.LoadProgram("other.out", "d/"); }},
+        {"[known-program]", [](DebuggedDevice& r) { r.device.LoadProgram("other.out", "d/"); }},
         {"[halted-for-load]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.StartLoader();
          }},
         {"[halted-for-run]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.device.Run();
          }},
         {"[buffer-in-use]",
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.StartLoader();
              r.HandOver(0, 0, Pattern(128));
              r.HandOver(0, 0x80, Pattern(128));
          }},
     };
     for (const auto& [text, access] : cases) {
-        Rig rig;
+        DebuggedDevice rig;
         const std::string error = ErrorOf([&, &run = access] { run(rig); });
         EXPECT_TRUE(error.ends_with(text)) << error << " instead of " << text;
         EXPECT_EQ(rig.device.Violations(), std::vector{error});
@@ -211,7 +214,7 @@ TEST(WriteKey, WrongOneDoesNothing) {
                  {"dorna,keyconfig=0x10", 0xA442, 0x71D5},
                  {"dorna", 0x71D5, 0}};
     for (const auto& [options, right, wrong] : cases) {
-        Rig rig(options);
+        DebuggedDevice rig(options);
         rig.device.Flash().Preset(0x4000, Bytes{0});
         for (const std::uint32_t key : {wrong, right}) {
             for (const std::uint32_t command : {2U, 4U, 8U}) {
@@ -238,53 +241,54 @@ TEST(Rules, WaitsAreExact) {
         const char* rule;
         const char* device;
         std::uint32_t waitMs;
-        std::function<void(Rig&)> before, after;
+        std::function<void(DebuggedDevice&)> before, after;
     } cases[] = {
-        {"timing-set-up", "tolva", 16, [](Rig& r) { r.SetWord(0x400FE140, 7); },
-         [](Rig& r) { r.SetWord(kClock, 0x07803F82); }},
-        {"clock-settling", "pell", 16, [](Rig& r) { r.SetWord(kClock, 0); },
-         [](Rig& r) { r.SetWord(kFlashAddress, 0); }},
-        {"address-set-up", "pell", 4, [](Rig& r) { r.SetWord(kFlashAddress, 0); },
-         [](Rig& r) { r.SetWord(kFlashCommand, 0xA4420002); }},
-        {"status-delay", "pell", 4, [](Rig& r) { r.Command(0, 0xA4420002); },
-         [](Rig& r) { r.Word(kFlashCommand); }},
-        {"status-delay", "pell", 8, [](Rig& r) { r.Command(0, 0xA4420004); },
-         [](Rig& r) { r.Word(kFlashCommand); }},
-        {"erase-recovery", "pell,erase-time=7ms", 7 + 4, [](Rig& r) { r.Command(0, 0xA4420002); },
-         [](Rig& r) { r.SetWord(kFlashAddress, 0); }},
-        {"block-write", "mesk", 8, [](Rig& r) { r.SetWord(0x400FE40C, 0); },
-         [](Rig& r) { r.SetWord(0x400FE408, 0); }},
-        {"reset-recovery", "pell", 4, [](Rig& r) { r.device.Reset(true); },
-         [](Rig& r) { r.SetWord(0x400FE048, kBusy); }},
+        {"timing-set-up", "tolva", 16, [](DebuggedDevice& r) { r.SetWord(0x400FE140, 7); },
+         [](DebuggedDevice& r) { r.SetWord(kClock, 0x07803F82); }},
+        {"clock-settling", "pell", 16, [](DebuggedDevice& r) { r.SetWord(kClock, 0); },
+         [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); }},
+        {"address-set-up", "pell", 4, [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); },
+         [](DebuggedDevice& r) { r.SetWord(kFlashCommand, 0xA4420002); }},
+        {"status-delay", "pell", 4, [](DebuggedDevice& r) { r.Command(0, 0xA4420002); },
+         [](DebuggedDevice& r) { r.Word(kFlashCommand); }},
+        {"status-delay", "pell", 8, [](DebuggedDevice& r) { r.Command(0, 0xA4420004); },
+         [](DebuggedDevice& r) { r.Word(kFlashCommand); }},
+        {"erase-recovery", "pell,erase-time=7ms", 7 + 4,
+         [](DebuggedDevice& r) { r.Command(0, 0xA4420002); },
+         [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); }},
+        {"block-write", "mesk", 8, [](DebuggedDevice& r) { r.SetWord(0x400FE40C, 0); },
+         [](DebuggedDevice& r) { r.SetWord(0x400FE408, 0); }},
+        {"reset-recovery", "pell", 4, [](DebuggedDevice& r) { r.device.Reset(true); },
+         [](DebuggedDevice& r) { r.SetWord(0x400FE048, kBusy); }},
         {"peripheral-reset", "pell", 4,
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.device.Reset(true);
              r.device.Pause(4);
              r.HoldPeripherals(kBusy);
          },
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.HoldPeripherals(0);
              r.Command(0, 0xA4420002);
          }},
         {"rom-alias", "pell", 8,
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.device.Reset(false);
              r.SetWord(0x400FE0F0, 1);
          },
-         [](Rig& r) { r.Program(0x7F80); }},
+         [](DebuggedDevice& r) { r.Program(0x7F80); }},
         {"erase-settling", "ravik,erase-time=7ms", 40,
-         [](Rig& r) {
+         [](DebuggedDevice& r) {
              r.device.Flash().Preset(0x400, Bytes(0x400, 0xAA));
              r.Command(0x400, 0xA4420002);
              r.device.Pause(7);
              r.device.Reset(false);
          },
-         [](Rig& r) { r.Program(0x780); }},
+         [](DebuggedDevice& r) { r.Program(0x780); }},
     };
     for (const auto& [rule, device, waitMs, before, after] : cases) {
         for (const bool enough : {false, true}) {
             SCOPED_TRACE(testing::Message() << rule << " " << waitMs << " " << enough);
-            Rig rig(device + std::string(",latency=0,bandwidth=0"));
+            DebuggedDevice rig(device + std::string(",latency=0,bandwidth=0"));
             before(rig);
             rig.device.Pause(enough ? waitMs : waitMs - 1);
             after(rig);
@@ -297,7 +301,7 @@ TEST(Rules, WaitsAreExact) {
 }
 
 TEST(Erase, TakesPollsAndKeepsToItsSector) {
-    Rig rig("velk,sector=2K");
+    DebuggedDevice rig("velk,sector=2K");
     rig.device.Flash().Preset(0, Bytes(0x3000, 0));
     const auto polls = [&rig](std::uint32_t address, std::uint32_t command, std::uint32_t pauseMs) {
         rig.Command(address, command);
@@ -330,7 +334,7 @@ TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
                  {"128K", {0, 0, 0, 0x80000000}, false},
                  {"256K", {kBusy, kBusy, kBusy, kBusy}, true}};
     for (const auto& c : cases) {
-        Rig rig(std::string("mesk,flash=") + c.flash);
+        DebuggedDevice rig(std::string("mesk,flash=") + c.flash);
         for (std::uint32_t i = 0; i < 4; ++i) {
             rig.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
             rig.device.Pause(8);
@@ -343,7 +347,7 @@ TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
 }
 
 TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
-    Rig rig;
+    DebuggedDevice rig;
     const Bytes image = Pattern(5 * 2048 + 128);
     rig.StartLoader();
     EXPECT_EQ(rig.Word(kStatus[1]), 0U);
@@ -361,7 +365,7 @@ TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
 }
 
 TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
-    Rig rig("tolva,chunk-time=10ms,latency=0,bandwidth=0");
+    DebuggedDevice rig("tolva,chunk-time=10ms,latency=0,bandwidth=0");
     rig.StartLoader();
     rig.HandOver(1, 0x800, Pattern(128));  // must wait for block 0
     rig.clock.Advance(1s);
@@ -376,7 +380,7 @@ TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
 
 TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
     for (const bool reset : {false, true}) {
-        Rig rig;
+        DebuggedDevice rig;
         rig.StartLoader();
         rig.HandOver(0, 0, Bytes(256, 0));
         if (reset) {
@@ -403,7 +407,7 @@ TEST(Loader, SaysWhatItCannotTellTheDebugger) {
                  {kBusy - 127, 128, "[loader-parameters]"},
                  {0x400, 128, "[erased-cells]"}};
     for (const auto& [address, size, rule] : cases) {
-        Rig rig;
+        DebuggedDevice rig;
         rig.device.Flash().Preset(0x410, Bytes{0xF0});
         rig.StartLoader();
         rig.HandOver(0, address, Bytes(size, 0x3C));
@@ -416,7 +420,7 @@ TEST(Loader, SaysWhatItCannotTellTheDebugger) {
 }
 
 TEST(UserRegisters, AreVolatileUntilCommitted) {
-    Rig rig;
+    DebuggedDevice rig;
     const auto values = [&rig] { return std::array{rig.Word(kUser0), rig.Word(kUser0 + 4)}; };
     rig.SetWord(kUser0, 0x11);
     rig.SetWord(kUser0 + 4, 0x22);
@@ -432,18 +436,18 @@ TEST(UserRegisters, AreVolatileUntilCommitted) {
 }
 
 TEST(Faults, ComeAsAsked) {
-    Rig once("tolva,fail-access=3", false);  // the rig's halt is the first
+    DebuggedDevice once("tolva,fail-access=3", false);  // the device's halt is the first
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
     EXPECT_EQ(ErrorOf([&] { once.Word(0x400FE000); }),
               "Reading 1 x 4 bytes at 0x400FE000 on page 1: the connection to the target failed at "
               "access 3 [fail-access]");
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
 
-    Rig fromThen("tolva,fail-from=2", false);
+    DebuggedDevice fromThen("tolva,fail-from=2", false);
     for (int i = 0; i < 3; ++i)
         EXPECT_THROW(fromThen.device.Run(), target::TargetError);
 
-    Rig never("tolva,erase=never,commit=never");
+    DebuggedDevice never("tolva,erase=never,commit=never");
     for (const auto& [address, command] : {std::pair{0U, 2U}, {0U, 4U}, {0x80000000U, 8U}}) {
         never.Command(address, 0xA4420000 | command);
         never.device.Pause(0xFFFFFFFF);
@@ -451,10 +455,10 @@ TEST(Faults, ComeAsAsked) {
         never.device.Reset(false);
     }
 
-    Rig stuck("tolva,stuck-cell=0x1003:0x5A");
+    DebuggedDevice stuck("tolva,stuck-cell=0x1003:0x5A");
     EXPECT_EQ(stuck.Flash(0x1002, 3), (Bytes{0xFF, 0x5A, 0xFF}));
 
-    Rig ones("tolva,registers=ones"), zeros("tolva,registers=zeros");
+    DebuggedDevice ones("tolva,registers=ones"), zeros("tolva,registers=zeros");
     EXPECT_EQ(ones.Word(kFlashCommand), kBusy);
     EXPECT_EQ(zeros.Word(0x400FDFC0), 0U);
     ones.device.Flash().Preset(0, Bytes{0});
@@ -464,7 +468,7 @@ TEST(Faults, ComeAsAsked) {
 
     for (const auto& [options, idle] :
          {std::pair{"tolva,loader=hangs", 0U}, {"tolva,loader=dead", kBusy}}) {
-        Rig rig(options);
+        DebuggedDevice rig(options);
         rig.StartLoader();
         EXPECT_EQ(rig.Word(kStatus[1]), idle);
         rig.HandOver(0, 0, Pattern(128));
@@ -474,7 +478,7 @@ TEST(Faults, ComeAsAsked) {
 }
 
 TEST(Time, CannotBeWaitedIntoAnOverflow) {
-    Rig rig;
+    DebuggedDevice rig;
     for (int i = 0; i < 5000; ++i)
         rig.device.Pause(0xFFFFFFFF);
     rig.Command(0, 0xA4420002);
