@@ -7,9 +7,9 @@
 #include <optional>
 #include <stdexcept>
 #include <string>
-#include <vector>
 
 #include "hostcheck/ReadableMemory.h"
+#include "hostcheck/Texts.h"
 #include "plugin/IFlashHost.h"
 
 namespace hostcheck {
@@ -26,10 +26,9 @@ class NotChecked : public std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
-using Bytes = std::vector<std::uint8_t>;
-
-/// Registers and RAM are on this page.
+/// Registers and single values are on this page, and the contents of flash on that one.
 inline constexpr std::int16_t kGeneralPage = 1;
+inline constexpr std::int16_t kFlashPage = 0;
 
 class CheckedHost {
   public:
@@ -42,6 +41,12 @@ class CheckedHost {
         return Text(Called(call));
     }
 
+    /// The same. Breach also when the text doesn't stay until the next call.
+    template <typename Call>
+    std::optional<std::string> AskForAWhile(Call call) const {
+        return LastingText(Called(call));
+    }
+
     /// Calls a slot that has to succeed. Breach with its error text.
     template <typename Call>
     void Do(Call call) const {
@@ -51,17 +56,42 @@ class CheckedHost {
     std::optional<std::string> Get(const std::string& name) const;
     void Set(const std::string& name, const std::string& value) const;
 
-    /// `bytes` has to be a multiple of `width`. Breach also when the slot writes beside its buffer.
+    /// `bytes` has to be a multiple of `width`. Breach also when the slot writes outside of the
+    /// room that the plug-in has for such a read.
     Bytes Read(std::uint32_t address, std::size_t bytes, std::size_t width,
                std::int16_t page = kGeneralPage) const;
     void Write(std::uint32_t address, const Bytes& bytes, std::size_t width,
                std::int16_t page = kGeneralPage) const;
 
+    /// A register or a single value, in one access of 32 bits.
+    std::uint32_t ReadWord(std::uint32_t address) const;
+    void WriteWord(std::uint32_t address, std::uint32_t value) const;
+
     void Halt() const;
+    void Run() const;
+    void Reset(bool flag) const;
+    void Sleep(std::uint32_t milliseconds) const;
 
-    /// What a pointer leads to, null to nothing. Breach when that is no text.
-    static std::optional<std::string> Text(const char* text);
+    /// Says what comes next, where a host may never come back. Whether that is shown is checked
+    /// elsewhere.
+    void Announce(const char* text) const;
 
+    /// The page that the running WriteDataToFlash was called with.
+    std::int16_t page = kGeneralPage;
+
+    /// How far the loader has come in the running call. It is started only when `cleared` says that
+    /// no status word can hold a chunk that nobody has handed over.
+    struct LoaderProgress {
+        bool loaded = false;
+        bool cleared = false;
+        bool runs = false;
+        bool takesChunks = false;
+        unsigned turn = 0;  ///< the block that it looks at next
+        Bytes flashBefore;
+    };
+    LoaderProgress loader;
+
+  private:
     /// The pointer that a slot returns. Breach for an exception.
     template <typename Call>
     const char* Called(Call call) const {
@@ -75,13 +105,10 @@ class CheckedHost {
         throw Breach("an exception" + what);
     }
 
-    /// The page that the running WriteDataToFlash was called with, and whether the loader has been
-    /// loaded and started in it.
-    std::int16_t page = kGeneralPage;
-    bool loaderLoaded = false;
-    bool loaderRuns = false;
+    /// What a pointer leads to, null to nothing. Breach when that is no text.
+    static std::optional<std::string> Text(const char* text);
+    static std::optional<std::string> LastingText(const char* text);
 
-  private:
     IFlashHost* host_;
 };
 

@@ -2,6 +2,8 @@
 // user can tell; that they are taken is checked here. Errors have operations of their own, since a
 // good host calls whatever shows one a failure.
 
+#include <utility>
+
 #include "hostcheck/Checks.h"
 
 namespace hostcheck {
@@ -25,47 +27,77 @@ std::string TakesLongMessages(CheckedHost& host) {
     return "";
 }
 
-void Begin(CheckedHost& host, const char* title) {
-    host.Do([&](IFlashHost& h) { return h.BeginProgress(title); });
-}
+/// A display that is ended once when it was begun, whatever comes between.
+class Display {
+  public:
+    Display(CheckedHost& host, const char* title) : host_(host) {
+        host_.Do([&](IFlashHost& h) { return h.BeginProgress(title); });
+        open_ = true;
+    }
+    Display(const Display&) = delete;
+    Display& operator=(const Display&) = delete;
+    ~Display() {
+        try {
+            End();
+        } catch (const std::exception&) {
+            // The check was over before, and has its failure.
+        }
+    }
 
-void Update(CheckedHost& host, std::uint32_t percent, const char* text) {
-    host.Do([&](IFlashHost& h) { return h.UpdateProgress(percent, text); });
-}
+    void Update(std::uint32_t percent, const char* text) {
+        host_.Do([&](IFlashHost& h) { return h.UpdateProgress(percent, text); });
+    }
 
-void End(CheckedHost& host) {
-    host.Do([](IFlashHost& h) { return h.EndProgress(); });
-}
+    void End() {
+        if (std::exchange(open_, false)) host_.Do([](IFlashHost& h) { return h.EndProgress(); });
+    }
+
+  private:
+    CheckedHost& host_;
+    bool open_ = false;
+};
+
+/// For checks that aren't about the beginning.
+struct OpenDisplay : Display {
+    explicit OpenDisplay(CheckedHost& host) try : Display(host, "Checking the host") {
+    } catch (const Breach&) {
+        throw NotChecked("no display can be begun");
+    }
+};
 
 std::string BeginsADisplay(CheckedHost& host) {
-    Begin(host, "Checking the host");
+    const Display display(host, "Checking the host");
     return "";
 }
 
 std::string TakesEveryPercentage(CheckedHost& host) {
+    OpenDisplay display(host);
     for (std::uint32_t percent = 0; percent <= 100; ++percent)
-        Update(host, percent, "checking");
+        display.Update(percent, "checking");
     return "";
 }
 
 // The plug-in's percentages wrap over ranges of more than 40 MiB.
 std::string TakesFewerPercent(CheckedHost& host) {
-    Update(host, 0, kAwkward);
-    Update(host, 0, "");
+    OpenDisplay display(host);
+    display.Update(50, "checking");
+    display.Update(0, kAwkward);
+    display.Update(0, "");
     return "";
 }
 
 std::string EndsADisplay(CheckedHost& host) {
-    End(host);
+    OpenDisplay display(host);
+    display.End();
     return "";
 }
 
 std::string DisplaysAgain(CheckedHost& host) {
-    Begin(host, kAwkward);
-    Update(host, 50, "half");
-    End(host);
-    Begin(host, "A display without updates");
-    End(host);
+    OpenDisplay(host).End();
+    Display second(host, kAwkward);
+    second.Update(50, "half");
+    second.End();
+    Display(host, "A display without updates").End();
     return "";
 }
 
@@ -73,11 +105,11 @@ constexpr Check kDisplayChecks[] = {
     {Stage::Initialize, "ShowMessage", "null for a text with percent signs and UTF-8",
      TakesAwkwardMessages},
     {Stage::Initialize, "ShowMessage", "null for a text of 300 characters", TakesLongMessages},
-    {Stage::Operation, "BeginProgress", "null", BeginsADisplay},
-    {Stage::Operation, "UpdateProgress", "null for 0 to 100 percent", TakesEveryPercentage},
-    {Stage::Operation, "UpdateProgress", "null for fewer percent than before", TakesFewerPercent},
-    {Stage::Operation, "EndProgress", "null", EndsADisplay},
-    {Stage::Operation, "BeginProgress", "further displays after the first", DisplaysAgain},
+    {Stage::Display, "BeginProgress", "null", BeginsADisplay},
+    {Stage::Display, "UpdateProgress", "null for 0 to 100 percent", TakesEveryPercentage},
+    {Stage::Display, "UpdateProgress", "null for fewer percent than before", TakesFewerPercent},
+    {Stage::Display, "EndProgress", "null", EndsADisplay},
+    {Stage::Display, "BeginProgress", "further displays after the first", DisplaysAgain},
 };
 
 }  // namespace

@@ -5,24 +5,19 @@
 #include <string_view>
 
 #include "hostcheck/HostCheckDevice.h"
+#include "hostcheck/Limits.h"
 #include "plugin/ErrorText.h"
 
 namespace hostcheck {
 
 namespace {
 
-// A small device without anything special, whose flash nobody touches.
 constexpr std::uint32_t kFlashBytes = 64 * 1024;
-constexpr std::pair<const char*, const char*> kPublished[] = {
-    {"DeviceInfoFlashSize", "64KB"},
-    {"DeviceInfoRAMSize", "16KB"},
-    {"DeviceInfoSectorSize", "1KB"},
-    {"DeviceInfoFamily", "Host check"},
-};
 
+constexpr std::string_view kLoaderOperation = "CheckLoader";
 constexpr std::string_view kShownError = "CheckShownError";
 constexpr std::string_view kReturnedError = "CheckReturnedError";
-constexpr char kOperations[] = "CheckProgress | CheckShownError | CheckReturnedError";
+constexpr char kOperations[] = "CheckProgress | CheckLoader | CheckShownError | CheckReturnedError";
 
 // The names that a host may have built in.
 constexpr std::string_view kProgressOperations[] = {"CheckProgress",        "Erase",
@@ -52,7 +47,10 @@ const char* HostCheckDevice::Guarded(const char* call, Body body) {
     const char* answer = nullptr;
     try {
         body();
-        Tell(call);
+        Require(!calledWhileBusy_.exchange(false), call,
+                "no other call before this one has returned",
+                "one, from a slot or from another thread");
+        report_.RequireShown();
     } catch (const std::exception& error) {
         answer = KeepErrorText(lastError_, error.what());
     }
@@ -64,15 +62,8 @@ const char* HostCheckDevice::Initialize(bool* flashAvailable, const char** opera
     return Guarded("Initialize", [&] {
         RequirePointer(flashAvailable, "flashAvailable");
         RequirePointer(operations, "operations");
-        for (const auto& [name, value] : kPublished) {
-            try {
-                host_.Set(name, value);
-            } catch (const Breach& breach) {
-                Require(false, "SetProperty", name, breach.what());
-            }
-        }
-        Examine(Stage::Initialize);
-        initialized_ = true;
+        report_.Open();
+        Examine("Initialize", {Stage::Initialize}, kUnseenAtStart);
         *flashAvailable = true;
         *operations = kOperations;
     });
@@ -101,38 +92,72 @@ const char* HostCheckDevice::WriteDataToFlash(const unsigned char* data, uint64_
                                               uint32_t length, int16_t page) {
     constexpr char call[] = "WriteDataToFlash";
     return Guarded(call, [&] {
-        NarrowAddress(address);
-        Require(initialized_, call, "a call of Initialize before", "none");
-        Require(loadBegun_, call, "ResetSettings before the first section", "none");
-        Bytes bytes(length);
-        Require(length == 0 || CopyReadable(bytes.data(), data, length), call,
-                "as many bytes to read as length says", "fewer");
+        const std::uint32_t first = NarrowAddress(address);
+        report_.Open();
+        RequireSection(data, first, length);
+        const bool atFirst = load_.AtFirstSection();
+        const std::string expected = load_.Section();
+        Require(expected.empty(), call, expected, "none");
         host_.page = page;
-        host_.loaderLoaded = host_.loaderRuns = false;
-        Examine(Stage::Load);
-        Note(Verdict::Holds,
-             std::string(call) + ": taken, and nothing programmed: flash is as it was");
+        if (atFirst)
+            Examine(call, {Stage::LoadBegins, Stage::LoaderStart, Stage::LoaderEnd},
+                    kUnseenInALoad);
+        report_.Say(std::string(call) + ": " + std::to_string(length) + " bytes for " +
+                    HexWord(first) + " taken, and nothing programmed: flash is as it was");
     });
+}
+
+void HostCheckDevice::RequireSection(const void* data, std::uint32_t address,
+                                     std::uint32_t length) {
+    constexpr char call[] = "WriteDataToFlash";
+    Require(length != 0, call, "no section of length 0", "one");
+    const bool inFlash = address < kFlashBytes && length <= kFlashBytes - address;
+    Require(inFlash, call, "a section in the 64 KiB of flash that AddressWithinFlash tells of",
+            std::to_string(length) + " bytes for " + HexWord(address));
+    if (!inFlash) return;
+    Bytes bytes(length);
+    Require(length == 0 || CopyReadable(bytes.data(), data, length), call,
+            "as many bytes to read as length says", "fewer");
 }
 
 const char* HostCheckDevice::PerformOperation(const char* operation) {
     return Guarded("PerformOperation", [&] {
         RequirePointer(operation, "operation");
-        const std::string name = CheckedHost::Text(operation).value_or("");
-        Require(initialized_, "PerformOperation", "a call of Initialize before", "none");
-        if (name == kReturnedError)
-            throw std::runtime_error("This error is returned, 100 % of it.");
-        if (name == kShownError)
-            Note(Verdict::Fails, "This error is shown, 100 % of it, and the operation has failed.");
-        else if (std::ranges::find(kProgressOperations, name) != std::end(kProgressOperations))
-            Examine(Stage::Operation);
-        else
-            Require(false, "PerformOperation", "a name from the list", Quoted(name));
+        const auto name = ReadableText(operation);
+        if (!name) throw std::runtime_error("expected a text for operation; came none");
+        report_.Open();
+        CheckNamedOperation(*name);
     });
 }
 
-const char* HostCheckDevice::ResetSettings(int32_t) {
-    return Guarded("ResetSettings", [&] { loadBegun_ = true; });
+void HostCheckDevice::CheckNamedOperation(const std::string& name) {
+    if (name == kReturnedError)
+        throw std::runtime_error("This error is returned, 100 % of it, %s and %d.");
+    if (name == kShownError) {
+        report_.SayAsError(
+            "This error is shown, 100 % of it, %s and %d, and the operation has failed.");
+    } else if (name == kLoaderOperation) {
+        loaderChecked_ = true;
+        host_.page = kGeneralPage;
+        Examine("CheckLoader", {Stage::LoaderStart, Stage::LoaderWork, Stage::LoaderEnd},
+                kUnseenInTheLoader);
+    } else if (std::ranges::find(kProgressOperations, name) != std::end(kProgressOperations)) {
+        displaysChecked_ = true;
+        Examine("PerformOperation", {Stage::Display}, kUnseenInDisplays);
+    } else {
+        Require(false, "PerformOperation", "a name from the list", Quoted(name));
+    }
+}
+
+const char* HostCheckDevice::ResetSettings(int32_t mode) {
+    return Guarded("ResetSettings", [&] {
+        report_.Open();
+        const bool completed = load_.Completed();
+        const std::string expected = load_.Reset(mode);
+        Require(expected.empty(), "ResetSettings", expected, std::to_string(mode));
+        if (load_.Completed() && !completed)
+            report_.Say("ResetSettings: ok: 0, sections and 2, which is a whole load");
+    });
 }
 
 const char* HostCheckDevice::AddressWithinSpecialRegion(uint64_t address, bool* result) {

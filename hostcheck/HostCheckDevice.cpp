@@ -1,85 +1,72 @@
-// Here is how checks are run and told; the calls are in HostCalls.cpp.
+// Here is how checks are run; the calls are in HostCalls.cpp.
 
 #include "hostcheck/HostCheckDevice.h"
 
-#include <algorithm>
-
 namespace hostcheck {
+
+namespace {
+
+using Table = std::span<const Check> (*)();
+
+// Memory comes before halts: a plug-in begins with a read from the target as it was found.
+constexpr Table kTables[] = {SettingChecks,     PropertyChecks,   RegisterChecks, RamChecks,
+                             FlashChecks,       RefusalChecks,    CoreChecks,     PauseChecks,
+                             LoaderStartChecks, LoaderWorkChecks, DisplayChecks};
+
+}  // namespace
 
 HostCheckDevice::HostCheckDevice(const char* variant, const char* text2, const char* text3,
                                  IFlashHost* host)
-    : host_(host) {
+    : host_(host), report_(host_) {
     Require(variant != nullptr && text2 != nullptr && text3 != nullptr, "CreateFlashDevice2",
             "three texts", "null");
-    Examine(Stage::Creation);
+    for (const Table table : kTables)
+        for (const Check& check : table())
+            if (check.stage == Stage::Creation) Run(check);
 }
 
-// Memory comes before halts: a plug-in begins with a read from the target as it was found.
-void HostCheckDevice::Examine(Stage stage) {
-    for (const auto& table : {SettingChecks(), MemoryChecks(), TargetChecks(), DisplayChecks()}) {
-        for (const Check& check : table) {
-            if (check.stage != stage) continue;
-            const std::string slot = std::string(check.slot) + ": ";
-            try {
-                const std::string remark = check.run(host_);
-                Note(Verdict::Holds,
-                     slot + "ok: " + check.expected + (remark.empty() ? "" : "; " + remark));
-            } catch (const Breach& breach) {
-                Note(Verdict::Fails,
-                     slot + "expected " + check.expected + "; came " + breach.what());
-            } catch (const NotChecked& reason) {
-                Note(Verdict::NotChecked,
-                     slot + "not checked: " + check.expected + "; " + reason.what());
-            }
-        }
-    }
+void HostCheckDevice::Examine(const char* call, std::initializer_list<Stage> stages,
+                              const char* unseen) {
+    host_.loader = {};
+    for (const Stage stage : stages)
+        for (const Table table : kTables)
+            for (const Check& check : table())
+                if (check.stage == stage) Run(check);
+    report_.Summarise(call);
+    report_.Say(unseen);
+    if (const std::string rest = NotRunYet(); !rest.empty())
+        report_.Say("Not run yet with this device object:" + rest);
 }
 
-void HostCheckDevice::Note(Verdict verdict, std::string text) {
-    findings_.push_back({verdict, std::move(text)});
-}
-
-void HostCheckDevice::Require(bool holds, const char* call, const char* expected,
-                              const std::string& came) {
-    if (!holds)
-        Note(Verdict::Fails, std::string(call) + ": expected " + expected + "; came " + came);
-}
-
-void HostCheckDevice::Tell(const char* call) {
-    Require(!calledWhileBusy_.exchange(false), call, "no other call before this one has returned",
-            "one, from a slot or from another thread");
-    const std::vector<Finding> findings = std::exchange(findings_, {});
-    if (findings.empty()) return;
-    const auto count = [&](Verdict verdict) {
-        return std::ranges::count(findings, verdict, &Finding::verdict);
-    };
-    const auto held = count(Verdict::Holds);
-    const auto unchecked = count(Verdict::NotChecked);
-    for (const Finding& finding : findings)
-        Show(finding);
-    Show({Verdict::Holds,
-          std::string("Host check, ") + call + ": " + std::to_string(held) + " of " +
-              std::to_string(held + count(Verdict::Fails)) + " hold" +
-              (unchecked == 0 ? "" : ", " + std::to_string(unchecked) + " not checked")});
-}
-
-// What ShowMessage won't take is shown as an error; what ShowError won't take is returned.
-void HostCheckDevice::Show(const Finding& finding) {
-    std::string text = finding.text;
-    if (finding.verdict != Verdict::Fails) {
-        try {
-            host_.Do([&](IFlashHost& host) { return host.ShowMessage(text.c_str()); });
-            return;
-        } catch (const Breach& breach) {
-            text = "ShowMessage: expected null for " + Quoted(text) + "; came " + breach.what();
-        }
-    }
+void HostCheckDevice::Run(const Check& check) {
+    const std::string slot = std::string(check.slot) + ": ";
     try {
-        host_.Do([&](IFlashHost& host) { return host.ShowError(text.c_str()); });
+        const std::string seen = check.run(host_);
+        report_.Note(Verdict::Holds,
+                     slot + "ok: " + check.expected + (seen.empty() ? "" : "; " + seen));
+    } catch (const NotChecked& reason) {
+        report_.Note(Verdict::NotChecked,
+                     slot + "not checked: " + check.expected + "; " + reason.what());
     } catch (const Breach& breach) {
-        throw std::runtime_error("ShowError: expected null for " + Quoted(text) + "; came " +
-                                 breach.what());
+        report_.Note(Verdict::Fails,
+                     slot + "expected " + check.expected + "; came " + breach.what());
     }
+}
+
+void HostCheckDevice::Require(bool holds, const std::string& call, const std::string& expected,
+                              const std::string& came) {
+    if (!holds) report_.Note(Verdict::Fails, call + ": expected " + expected + "; came " + came);
+}
+
+std::string HostCheckDevice::NotRunYet() const {
+    std::string rest;
+    const auto add = [&](bool done, const char* what) {
+        if (!done) rest += (rest.empty() ? " " : ", ") + std::string(what);
+    };
+    add(displaysChecked_, "CheckProgress");
+    add(loaderChecked_, "CheckLoader");
+    add(load_.Completed(), "a program load up to ResetSettings(2)");
+    return rest;
 }
 
 }  // namespace hostcheck

@@ -4,11 +4,12 @@
 #pragma once
 
 #include <atomic>
+#include <initializer_list>
 #include <string>
-#include <utility>
-#include <vector>
 
 #include "hostcheck/Checks.h"
+#include "hostcheck/LoadSequence.h"
+#include "hostcheck/Report.h"
 #include "plugin/IFlashDevice2.h"
 
 namespace hostcheck {
@@ -34,29 +35,26 @@ class HostCheckDevice final : public IFlashDevice2 {
     void Destroy() override;
 
   private:
-    enum class Verdict { Holds, Fails, NotChecked };
-    struct Finding {
-        Verdict verdict;
-        std::string text;
-    };
-
     template <typename Body>
     const char* Guarded(const char* call, Body body);
 
-    /// The checks of a stage, in order.
-    void Examine(Stage stage);
-    void Note(Verdict verdict, std::string text);
+    /// The checks of these stages, and what they can't see. `call` is what the host has called.
+    void Examine(const char* call, std::initializer_list<Stage> stages, const char* unseen);
+    void Run(const Check& check);
+
     /// A finding about the call that the host is making.
-    void Require(bool holds, const char* call, const char* expected, const std::string& came);
-    /// Shows the findings, and how many of those that were checked hold. Throws what the host can't
-    /// even be shown.
-    void Tell(const char* call);
-    void Show(const Finding& finding);
+    void Require(bool holds, const std::string& call, const std::string& expected,
+                 const std::string& came);
+    void RequireSection(const void* data, std::uint32_t address, std::uint32_t length);
+    void CheckNamedOperation(const std::string& name);
+    /// What of the whole has not been run with this device object.
+    std::string NotRunYet() const;
 
     CheckedHost host_;
-    std::vector<Finding> findings_;
-    bool initialized_ = false;
-    bool loadBegun_ = false;
+    Report report_;
+    LoadSequence load_;
+    bool displaysChecked_ = false;
+    bool loaderChecked_ = false;
     std::atomic<bool> busy_ = false;
     std::atomic<bool> calledWhileBusy_ = false;
     std::string lastError_;

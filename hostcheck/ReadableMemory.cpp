@@ -22,7 +22,6 @@ namespace {
 
 constexpr std::size_t kPageBytes = 4096;
 constexpr std::size_t kTextBytesMax = std::size_t{64} * 1024;
-constexpr std::size_t kShownBytesMax = 160;
 
 }  // namespace
 
@@ -61,19 +60,6 @@ std::optional<std::string> ReadableText(const char* text) {
         if (end != first + count) return read;
     }
     return std::nullopt;
-}
-
-std::string Quoted(const std::string& text) {
-    static constexpr char digits[] = "0123456789abcdef";
-    std::string quoted = "\"";
-    for (const char character : text.substr(0, kShownBytesMax)) {
-        const auto byte = static_cast<unsigned char>(character);
-        if (byte >= ' ' && byte <= '~')
-            quoted += character;
-        else
-            quoted.append("\\x").append({digits[byte / 16], digits[byte % 16]});
-    }
-    return quoted + (text.size() > kShownBytesMax ? "...\"" : "\"");
 }
 
 }  // namespace hostcheck

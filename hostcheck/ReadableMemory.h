@@ -15,8 +15,4 @@ bool CopyReadable(void* to, const void* from, std::size_t bytes);
 /// The text at `text`, which isn't null. Nothing when it can't be read or has no end within 64 KiB.
 std::optional<std::string> ReadableText(const char* text);
 
-/// Between quotation marks, at most 160 characters of it, with everything but printable ASCII as
-/// \xNN: fit to be shown wherever a text came from.
-std::string Quoted(const std::string& text);
-
 }  // namespace hostcheck

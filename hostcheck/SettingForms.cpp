@@ -1,44 +1,20 @@
-// The conversions are the plug-in's own.
-
-#include "hostcheck/SettingForms.h"
+// What the texts of settings look like. The conversions are the plug-in's own; where they never
+// fail, a text is good when nothing of it is lost on them.
 
 #include <algorithm>
-#include <cstddef>
 #include <exception>
+#include <string_view>
 
 #include "device/SettingKeys.h"
+#include "hostcheck/KnownSettings.h"
 #include "plugin/Conversions.h"
 
 namespace hostcheck {
 
 namespace {
 
-constexpr KnownSetting kSettings[] = {
-    {Setting::FlashProgramOption, Form::EraseOption, true},
-    {Setting::FlashProgramBlankCheckOption, Form::Switch, true},
-    {Setting::FlashProgramCRCOption, Form::Switch, true},
-    {Setting::FlashResetSetting, Form::Switch, true},
-    {Setting::FlashTimeoutValue, Form::Seconds, true},
-    {Setting::FlashVerboseMode, Form::Integer, true},
-    {Setting::FlashCrystalFreq, Form::Hex},
-    {Setting::FlashEraseType, Form::Selection},
-    {Setting::FlashEraseStartAddr, Form::Hex},
-    {Setting::FlashEraseEndAddr, Form::Hex},
-    {Setting::FlashBlankCheckSelection, Form::Selection},
-    {Setting::FlashBlankCheckStartAddr, Form::Hex},
-    {Setting::FlashBlankCheckEndAddr, Form::Hex},
-    {Setting::FlashChecksumSelection, Form::Selection},
-    {Setting::FlashChecksumStartAddr, Form::Hex},
-    {Setting::FlashChecksumEndAddr, Form::Hex},
-    {"FlashUserRegister0Input", Form::Hex},
-    {"FlashUserRegister0Commit", Form::Hex},
-    {"FlashUserRegister1Input", Form::Hex},
-    {"FlashUserRegister1Commit", Form::Hex},
-    {Setting::FlashMACAddrInput, Form::Mac},
-    {Setting::FlashMACAddrCommit, Form::Hex},
-};
-
-constexpr char kHexDigits[] = "0123456789abcdefABCDEF";
+constexpr std::string_view kHexDigits = "0123456789abcdefABCDEF";
+constexpr std::string_view kBlanks = " \t\n\v\f\r";
 
 template <typename Conversion>
 bool Converts(Conversion conversion, const std::string& text) {
@@ -50,25 +26,26 @@ bool Converts(Conversion conversion, const std::string& text) {
     }
 }
 
-bool IsHex(const std::string& text) {
-    const bool prefixed = text.starts_with("0x") || text.starts_with("0X");
-    const std::string digits = text.substr(prefixed ? 2 : 0);
-    return !digits.empty() && digits.find_first_not_of(kHexDigits) == std::string::npos &&
-           digits.size() - std::min(digits.find_first_not_of('0'), digits.size()) <= 8;
+/// A text of blanks is 0 to the plug-in, and meant so: nothing is in the field.
+bool IsHex(std::string_view text) {
+    text.remove_prefix(std::min(text.find_first_not_of(kBlanks), text.size()));
+    text = text.substr(0, text.find_last_not_of(kBlanks) + 1);
+    if (text.empty()) return true;
+    if (text.starts_with('+') || text.starts_with('-')) text.remove_prefix(1);
+    if (text.starts_with("0x") || text.starts_with("0X")) text.remove_prefix(2);
+    if (text.empty() || text.find_first_not_of(kHexDigits) != std::string_view::npos) return false;
+    return text.size() - std::min(text.find_first_not_of('0'), text.size()) <= 8;
 }
 
+/// Only a text of this length is taken for an address, whatever stands in it.
 bool IsMac(const std::string& text) {
-    if (text.size() != 17) return false;
+    if (text.size() != 17) return true;
     for (std::size_t i = 0; i < text.size(); i += 3)
         if (text.substr(i, 2).find_first_not_of(kHexDigits) != std::string::npos) return false;
     return true;
 }
 
 }  // namespace
-
-std::span<const KnownSetting> KnownSettings() {
-    return kSettings;
-}
 
 bool HasForm(Form form, const std::string& text) {
     switch (form) {
@@ -78,8 +55,10 @@ bool HasForm(Form form, const std::string& text) {
             return Converts(ParseInteger, text);
         case Form::Seconds:
             return Converts(ParseDecimal, text) && ParseDecimal(text) >= 1;
-        case Form::Hex:
+        case Form::Address:
             return IsHex(text);
+        case Form::Crystal:
+            return IsHex(text) && ParseHex(text) >= 1;
         case Form::Mac:
             return IsMac(text);
         case Form::EraseOption:
@@ -99,8 +78,10 @@ const char* FormText(Form form) {
             return "a whole decimal number";
         case Form::Seconds:
             return "a whole decimal number of seconds, at least 1";
-        case Form::Hex:
+        case Form::Address:
             return "a hexadecimal number up to ffffffff";
+        case Form::Crystal:
+            return "a hexadecimal number of MHz, at least 1";
         case Form::Mac:
             return "six pairs of hexadecimal digits, as in 02-1b-c3-04-05-06";
         case Form::EraseOption:

@@ -174,6 +174,7 @@ static const char* FLASH_CORVANE_CALL HaltTarget(CorvaneHost* host) {
 static const char* FLASH_CORVANE_CALL ResetTarget(CorvaneHost* host, bool flag) {
     struct Host* self = Self(host);
     self->running = false; /* a reset leaves the target halted */
+    *Register(self, FlashAddress) = 0;
     for (int i = 0; i < 2; ++i)
         *Register(self, UserRegister[i]) = self->committed[i];
     (void)flag;

@@ -44,6 +44,7 @@ class PretendDevice {
     // Leaves the target halted. The user registers lose what was not committed.
     void Reset() {
         Halt();
+        registers_[FlashAddress] = 0;
         for (std::uint32_t i : {0u, 1u})
             registers_[UserRegisters + 4 * i] = committed_[i];
     }

@@ -61,13 +61,17 @@ head -c 100 /dev/zero >"$trial/image.bin"
 passes() { "$@" >>"$trial/told" 2>&1 || { cat "$trial/told"; exit 1; }; }
 tool=("$kit/bin/corvane-flash" --plugin "$check")
 passes "${tool[@]}" operation CheckProgress
+passes "${tool[@]}" operation CheckLoader
 passes "${tool[@]}" program "$trial/image.bin" --base 0 --erase none --no-verify
 for example in "${examples[@]}"; do
-    passes "$trial/$example/$example" "$check" CheckProgress
+    passes "$trial/$example/$example" "$check" CheckProgress CheckLoader
     "$trial/$example/$example" "$check" >>"$trial/told" 2>&1 && exit 1
 done
 grep 'expected' "$trial/told" && exit 1
-[ "$(grep -c 'Host check, WriteDataToFlash: 10 of 10 hold' "$trial/told")" = $((1 + ${#examples[@]})) ] || exit 1
+for all in 'WriteDataToFlash: 14 of 14 hold' 'CheckLoader: 18 of 18 hold'; do
+    [ "$(grep -c "^Host check, $all\$" "$trial/told")" = $((1 + ${#examples[@]})) ] ||
+        { grep -A1 'Host check' "$trial/told"; exit 1; }
+done
 
 share=$kit/share
 "$here/documents.sh" "$share/doc/corvane-flash"
