@@ -4,6 +4,7 @@
 
 #include "hostcheck/Checks.h"
 #include "hostcheck/Patterns.h"
+#include "hostcheck/RomAlias.h"
 
 namespace hostcheck {
 
@@ -50,11 +51,24 @@ std::string ReadsFlashOnThatPage(CheckedHost& host) {
     return "";
 }
 
+// The one change of what is read there that harms no flash: the ROM that lies over it goes away.
+std::string ReadsFlashAnew(CheckedHost& host) {
+    host.Reset(true);
+    if (!RomLiesOverFlash(host)) throw NotChecked("after a reset, no ROM lies over the flash");
+    const Bytes rom = host.Read(0, kBlockBytes, 1, kFlashPage);
+    ClearRomAlias(host);
+    if (host.Read(0, kBlockBytes, 1, kFlashPage) == rom)
+        throw Breach("the bytes of the ROM that lay over it, from a cache");
+    return "";
+}
+
 constexpr Check kFlashChecks[] = {
     {Stage::Initialize, "ReadMemory", "2048 bytes of flash on page 0", ReadsFlash},
     {Stage::Initialize, "ReadMemory", "32752 bytes of flash in one call", ReadsTheLargestAmount},
     {Stage::LoadBegins, "ReadMemory", "flash on the page given to WriteDataToFlash",
      ReadsFlashOnThatPage},
+    {Stage::LoadBegins, "ReadMemory", "flash as it is now, not as it was read before",
+     ReadsFlashAnew},
 };
 
 }  // namespace

@@ -7,7 +7,7 @@ namespace hostcheck {
 
 inline constexpr char kUnseenAtStart[] =
     "Not seen by this check: whether settings are what your user chose and outlive a run; whether "
-    "flash is read from a cache; whether other registers are reached than the two that were tried; "
+    "other registers are reached than the two that were tried; "
     "what a dropped connection does.";
 
 inline constexpr char kUnseenInDisplays[] =

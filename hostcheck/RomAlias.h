@@ -7,6 +7,9 @@
 
 namespace hostcheck {
 
+/// Whether there is a ROM, and it lies over the flash.
+bool RomLiesOverFlash(const CheckedHost& host);
+
 /// Lets the flash be seen again. Does nothing where there is no ROM. Breach when a slot fails.
 void ClearRomAlias(const CheckedHost& host);
 

@@ -70,7 +70,10 @@ const char* PretendTarget::Move(const Transfer& t) {
         std::memcpy(t.to, at, bytes);
     if (t.to != nullptr && at == &memory[offset] && &memory == &flash && romInFront)
         std::memset(t.to, 0x20, bytes);
-    if (t.to == nullptr && t.address == kRomControl) romInFront = false;
+    if (t.to == nullptr && t.address == kRomControl) {  // ones clear
+        romInFront = false;
+        registers[kRomControl] = 0;
+    }
     Serve();
     return nullptr;
 }
@@ -89,6 +92,7 @@ void PretendTarget::Halt() {
 void PretendTarget::Reset() {
     Halt();
     registers[0x400FD000] = 0;
+    registers[kRomControl] = 1;
     romInFront = true;
 }
 

@@ -243,6 +243,14 @@ const FaultyHost kFaultyMemory[] = {
              if (t.page == 1 && t.address < 0x8000) t.address += 1;
          });
      }},
+    {"ReadMemory: expected flash as it is now, not as it was read before; came the bytes of the "
+     "ROM",
+     [](CheckedHost& h) {
+         h.reset = [&h, reset = h.reset](bool flag) {
+             Cache(h, [](uint64_t address) { return address < 0x8000; });
+             return reset(flag);
+         };
+     }},
     {"WriteMemory: expected 2048 bytes of RAM while the program runs; came",
      [](CheckedHost& h) {
          h.Bend([&h](Transfer& t) {

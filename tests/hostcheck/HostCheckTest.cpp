@@ -145,6 +145,15 @@ constexpr struct {
      [](CheckedHost& h) { std::ranges::fill(h.target.flash, 0xFF); }},
     {"the sizes of the device make no sense either way",
      [](CheckedHost& h) { h.target.registers[0x400FDFC4] = 0; }},
+    {"not checked: flash as it is now, not as it was read before; after a reset, no ROM",
+     [](CheckedHost& h) {
+         h.reset = [&h, reset = h.reset](bool flag) {
+             const char* const error = reset(flag);
+             h.target.romInFront = false;
+             h.target.registers[0x400FE0F0] = 0;
+             return error;
+         };
+     }},
     {"it reads 0x00030200",
      [](CheckedHost& h) {
          h.target.registers[0x400FE000] = 0x00030200;
