@@ -8,9 +8,10 @@ namespace {
 
 using Table = std::span<const Check> (*)();
 
-// Memory comes before halts: a plug-in begins with a read from the target as it was found.
+// Memory comes before halts: a plug-in begins with a read from the target as it was found. In a
+// load, flash comes behind the resets that its checks need.
 constexpr Table kTables[] = {SettingChecks,     PropertyChecks,   RegisterChecks, RamChecks,
-                             FlashChecks,       RefusalChecks,    CoreChecks,     PauseChecks,
+                             CoreChecks,        FlashChecks,      RefusalChecks,  PauseChecks,
                              LoaderStartChecks, LoaderWorkChecks, DisplayChecks};
 
 }  // namespace

@@ -33,8 +33,7 @@ struct PretendTarget {
     std::vector<unsigned char> ram = std::vector<unsigned char>(16384);
     std::map<uint64_t, uint32_t> registers = {{0x400FE000, 0x100A0000},  // Dorna
                                               {0x400FDFC0, 31},          // 64 KiB of flash
-                                              {0x400FDFC4, 63},          // 16 KiB of RAM
-                                              {0x400FE0F0, 1}};
+                                              {0x400FDFC4, 63}};         // 16 KiB of RAM
     bool running = false;
     bool romInFront = false;  ///< after a reset
     std::chrono::milliseconds chunkTime{30};

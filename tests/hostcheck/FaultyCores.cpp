@@ -129,7 +129,7 @@ const FaultyHost kFaultyCores[] = {
     {"HaltTarget: expected null after a reset; came the error text \"no\"",
      [](CheckedHost& h) { FailHalt(h, "a target that is left halted, so that RAM stays"); }},
     {"HaltTarget: expected null before the loader is loaded; came the error text \"no\"",
-     [](CheckedHost& h) { FailHalt(h, "RAM on the page given to WriteDataToFlash"); }},
+     [](CheckedHost& h) { FailHalt(h, "flash on the page given to WriteDataToFlash"); }},
     {"HaltTarget: expected null for a target that runs; came the error text \"no\"",
      [](CheckedHost& h) { FailHalt(h, "2048 bytes of RAM while the program runs"); }},
     {"GetDirectory: expected a text that ends in a path separator; came \"/opt\"",
