@@ -22,7 +22,7 @@ namespace host {
 
 namespace {
 
-Reporter::Options ReporterOptions(const Options& options) {
+Reporter::Options ReporterOptions(const CommonOptions& options) {
     const int talk = options.quiet ? 0 : std::min(options.verbose, 2) + 1;
     // A trace on the same stream and a bar would spoil each other.
     const bool traced = options.trace == "-" && options.progress == "auto";
@@ -33,7 +33,7 @@ Reporter::Options ReporterOptions(const Options& options) {
 /// (there may be no home directory) is no reason for a command to fail. That another run keeps us
 /// from it is one.
 std::optional<FileBusy> SaveSettings(const Context& context) try {
-    if (!context.options.dryRun)
+    if (!context.isDryRun)
         context.settings.Save(
             [&](const std::string& text) { context.reporter.Say(Talk::Normal, text); });
     return std::nullopt;
@@ -46,13 +46,14 @@ std::optional<FileBusy> SaveSettings(const Context& context) try {
 
 Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
     SettingStore settings;
+    const CommonOptions& options = line.common;
     if (line.command->readsSettings)
-        settings = LoadSettings(line.options.settingsFile.value_or(""), line.options.set);
-    if (line.options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
-    Context context{line.options, reporter, settings};
+        settings = LoadSettings(options.settingsFile.value_or(""), options.set);
+    if (options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
+    Context context{options, reporter, settings};
     Outcome outcome;
     try {
-        outcome = line.command->run(context);
+        outcome = line.command->run(context, line.given);
     } catch (const FileBusy&) {
         throw;  // it has been waited for; nobody wants to wait once more
     } catch (...) {
@@ -107,12 +108,12 @@ int RunTool(const std::vector<std::string>& words) {
         return Outcome{};
     });
     if (line.command == nullptr) {
-        outcome = CheckOutput(outcome, WriteAll(STDOUT_FILENO, line.text), early);
+        outcome = CheckOutput(outcome, WriteAll(STDOUT_FILENO, line.answer), early);
         if (outcome.status != ExitStatus::Done) early.End(outcome);
         return static_cast<int>(outcome.status);
     }
-    Reporter reporter(ReporterOptions(line.options));
-    reporter.Begin(line.options.command);
+    Reporter reporter(ReporterOptions(line.common));
+    reporter.Begin(line.command->name);
     outcome = Guarded(reporter, [&] { return RunCommand(reporter, line); });
     outcome = CheckOutput(std::move(outcome), reporter.OutputError(), reporter);
     reporter.End(outcome);

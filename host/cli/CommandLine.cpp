@@ -7,7 +7,6 @@
 
 #include <algorithm>
 #include <cstdlib>
-#include <type_traits>
 
 #include "host/base/Errors.h"
 #include "host/base/Suggestion.h"
@@ -27,10 +26,10 @@ std::vector<std::string> KnownWords(const CommandRows& commands, const FollowedL
     std::vector<std::string> known;
     const auto add = [&](const std::vector<OptionRow>& rows) {
         for (const OptionRow& row : rows)
-            if (!row.IsArgument()) known.push_back(LongName(row));
+            if (!row.IsArgument()) known.push_back(row.LongName());
     };
-    add(AnsweredOptions());
-    add(GlobalOptions());
+    add(AnsweredRows());
+    add(CommonRows());
     if (line.command != nullptr) add(line.command->options);
     return known;
 }
@@ -56,8 +55,8 @@ std::string StrayText(const CommandRows& commands, const FollowedLine& line) {
 
 std::string MissingArgument(const FollowedLine& line) {
     for (const OptionRow& row : line.command->options)
-        if (row.required && !line.Has(LongName(row)))
-            return fmt::format("{} is required", LongName(row));
+        if (row.isRequired && !line.Has(row.LongName()))
+            return fmt::format("{} is required", row.LongName());
     return "";
 }
 
@@ -87,7 +86,7 @@ void RefuseNonsense(const CommandRows& commands, const FollowedLine& line) {
 /// What the first of the answered options asks for; empty when there is none.
 std::string Answer(const CommandRows& commands, const FollowedLine& line) {
     for (const GivenOption& given : line.given) {
-        const std::string name = LongName(*given.row);
+        const std::string name = given.row->LongName();
         if (name == "--help") return HelpText(commands, line.name);
         if (name == "--version") return "corvane-flash " CORVANE_FLASH_VERSION "\n";
         if (name == "--man") return ManPage(commands);
@@ -95,36 +94,18 @@ std::string Answer(const CommandRows& commands, const FollowedLine& line) {
     return "";
 }
 
-/// The last text of several counts, unless the option collects them.
-void Set(Options& options, const OptionRow& row, const std::string& text) {
-    std::visit(
-        [&](auto member) {
-            auto& target = options.*member;
-            using Target = std::remove_reference_t<decltype(target)>;
-            if constexpr (std::is_same_v<Target, bool>)
-                target = true;
-            else if constexpr (std::is_same_v<Target, int>)
-                ++target;
-            else if constexpr (std::is_same_v<Target, std::vector<std::string>>)
-                target.push_back(text);
-            else
-                target = text;
-        },
-        row.member);
-}
-
 /// What is typed goes before a variable, and so does what is typed in contradiction to it.
 bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
-    if (*row.environment == '\0' || line.Has(LongName(row))) return false;
-    if (line.command->isForSimulated && LongName(row) == "--gdb") return false;
-    return std::none_of(row.overrides.begin(), row.overrides.end(),
+    if (*row.environment == '\0' || line.Has(row.LongName())) return false;
+    if (line.command->isForSimulated && row.LongName() == "--gdb") return false;
+    return std::none_of(row.contraries.begin(), row.contraries.end(),
                         [&](const std::string& name) { return line.Has(name); });
 }
 
 std::vector<GivenOption> WithEnvironment(const FollowedLine& line,
                                          const ReadVariable& environment) {
     std::vector<GivenOption> given = line.given;
-    for (const OptionRow& row : GlobalOptions())
+    for (const OptionRow& row : CommonRows())
         if (HeedsEnvironment(row, line))
             if (const std::string text = environment(row.environment); !text.empty())
                 given.push_back({&row, text, true});
@@ -140,16 +121,16 @@ std::string ProcessEnvironment(const char* name) {
 
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
                             const ReadVariable& environment) {
-    if (const std::string text = Answer(commands, line); !text.empty())
-        return {{}, {}, nullptr, text};
+    ParsedLine parsed;
+    parsed.answer = Answer(commands, line);
+    if (!parsed.answer.empty()) return parsed;
     RefuseNonsense(commands, line);
-    ParsedLine parsed{{}, WithEnvironment(line, environment), line.command, ""};
-    parsed.options.command = line.command->name;
-    for (const GivenOption& given : parsed.given) {
-        Set(parsed.options, *given.row, given.value);
-        if (given.isFromEnvironment && !given.row->overrides.empty())
-            parsed.options.targetVariables.emplace_back(given.row->environment);
-    }
+    parsed.command = line.command;
+    parsed.given = WithEnvironment(line, environment);
+    parsed.common = ValuesOf(CommonOptionTable(), parsed.given);
+    for (const GivenOption& given : parsed.given)
+        if (given.isFromEnvironment && !given.row->contraries.empty())
+            parsed.common.targetVariables.emplace_back(given.row->environment);
     return parsed;
 }
 

@@ -5,15 +5,16 @@
 #include <functional>
 #include <string>
 
+#include "host/cli/CommonOptions.h"
 #include "host/cli/FollowedLine.h"
 
 namespace host {
 
 struct ParsedLine {
-    Options options;
-    std::vector<GivenOption> given;       ///< the line's, then what the environment adds
-    const CommandRow* command = nullptr;  ///< null: `text` is all that was asked for
-    std::string text;                     ///< help, version or man page
+    const CommandRow* command = nullptr;  ///< null: `answer` is all that was asked for
+    GivenOptions given;                   ///< the line's, then what the environment adds
+    CommonOptions common;                 ///< the values of those that every command takes
+    std::string answer;                   ///< help, version or man page
 };
 
 /// A variable's text; empty when it isn't set.

@@ -6,83 +6,83 @@
 
 namespace host {
 
-const std::vector<OptionRow>& GlobalOptions() {
-    static const std::vector<OptionRow> options{
-        {"--sim",
-         "CLASS[,OPTION=VALUE...]",
-         "The simulated device to work on; default: tolva, or what --sim-file holds",
-         &Options::sim,
-         Offers::Devices,
-         {},
-         false,
-         "CORVANE_SIM",
-         {"--gdb"}},
-        {"--sim-file",
-         "PATH",
-         "Keep the simulated device's contents in this file between runs",
-         &Options::simFile,
-         Offers::Files,
-         {},
-         false,
-         "CORVANE_SIM_FILE",
-         {"--gdb"}},
-        {"--gdb",
-         "HOST:PORT",
-         "Work on the target behind a GDB server, in place of a simulated device; :PORT and PORT "
-         "mean this machine",
-         &Options::gdb,
-         Offers::Nothing,
-         {},
-         false,
-         "CORVANE_GDB",
-         {"--sim", "--sim-file"}},
-        {"--gdb-option", "NAME=VALUE[,NAME=VALUE...]",
-         "How to deal with that server; 'help gdb' lists them; may be repeated",
-         &Options::gdbOptions, Offers::GdbOptions},
-        {"--loader", "FILE",
-         "The flash loader's ELF file, for a target behind --gdb; default: where the plug-in looks",
-         &Options::loader, Offers::Files},
-        {"--settings", "FILE",
-         "Settings file instead of ~/.config/corvane-flash/settings.toml; kept values go beside "
-         "it, for x.toml into x.kept.toml",
-         &Options::settingsFile, Offers::Files},
-        {"--set", "KEY=TEXT", "Set one of the plug-in's settings for this run; may be repeated",
-         &Options::set, Offers::SettingAssignments},
-        {"--plugin",
-         "FILE",
-         "The plug-in library, instead of the one installed with the tool",
-         &Options::plugin,
-         Offers::Files,
-         {},
-         false,
-         "CORVANE_PLUGIN"},
-        {"--trace", "FILE",
-         "Write the plug-in's trace lines and all host calls to FILE (- is standard error)",
-         &Options::trace, Offers::Files},
-        {"--force", "", "Write over files that exist (--trace, read)", &Options::force},
-        {"--progress",
-         "MODE",
-         "How progress is shown: auto, bar, plain (for logs), none",
-         &Options::progress,
-         Offers::Nothing,
-         {"auto", "bar", "plain", "none"}},
-        {"--json", "", "One JSON object a line on standard output, all else on standard error",
-         &Options::json},
-        {"-q,--quiet", "", "Say nothing but results and errors", &Options::quiet},
-        {"-v,--verbose", "", "Say more; twice: the plug-in's own verbose messages, too",
-         &Options::verbose},
+const std::vector<Option<CommonOptions>>& CommonOptionTable() {
+    static const std::vector<Option<CommonOptions>> options{
+        {&CommonOptions::sim,
+         {.names = "--sim",
+          .value = "CLASS[,OPTION=VALUE...]",
+          .help = "The simulated device to work on; default: tolva, or what --sim-file holds",
+          .offers = Offers::Devices,
+          .environment = "CORVANE_SIM",
+          .contraries = {"--gdb"}}},
+        {&CommonOptions::simFile,
+         {.names = "--sim-file",
+          .value = "PATH",
+          .help = "Keep the simulated device's contents in this file between runs",
+          .offers = Offers::Files,
+          .environment = "CORVANE_SIM_FILE",
+          .contraries = {"--gdb"}}},
+        {&CommonOptions::gdb,
+         {.names = "--gdb",
+          .value = "HOST:PORT",
+          .help = "Work on the target behind a GDB server, in place of a simulated device; :PORT "
+                  "and PORT mean this machine",
+          .environment = "CORVANE_GDB",
+          .contraries = {"--sim", "--sim-file"}}},
+        {&CommonOptions::gdbOptions,
+         {"--gdb-option", "NAME=VALUE[,NAME=VALUE...]",
+          "How to deal with that server; 'help gdb' lists them; may be repeated",
+          Offers::GdbOptions}},
+        {&CommonOptions::loader,
+         {"--loader", "FILE",
+          "The flash loader's ELF file, for a target behind --gdb; default: where the plug-in "
+          "looks",
+          Offers::Files}},
+        {&CommonOptions::settingsFile,
+         {"--settings", "FILE",
+          "Settings file instead of ~/.config/corvane-flash/settings.toml; kept values go beside "
+          "it, for x.toml into x.kept.toml",
+          Offers::Files}},
+        {&CommonOptions::set,
+         {"--set", "KEY=TEXT", "Set one of the plug-in's settings for this run; may be repeated",
+          Offers::SettingAssignments}},
+        {&CommonOptions::plugin,
+         {.names = "--plugin",
+          .value = "FILE",
+          .help = "The plug-in library, instead of the one installed with the tool",
+          .offers = Offers::Files,
+          .environment = "CORVANE_PLUGIN"}},
+        {&CommonOptions::trace,
+         {"--trace", "FILE",
+          "Write the plug-in's trace lines and all host calls to FILE (- is standard error)",
+          Offers::Files}},
+        {&CommonOptions::force, {"--force", "", "Write over files that exist (--trace, read)"}},
+        {&CommonOptions::progress,
+         {.names = "--progress",
+          .value = "MODE",
+          .help = "How progress is shown: auto, bar, plain (for logs), none",
+          .choices = {"auto", "bar", "plain", "none"}}},
+        {&CommonOptions::json,
+         {"--json", "", "One JSON object a line on standard output, all else on standard error"}},
+        {&CommonOptions::quiet, {"-q,--quiet", "", "Say nothing but results and errors"}},
+        {&CommonOptions::verbose,
+         {"-v,--verbose", "", "Say more; twice: the plug-in's own verbose messages, too"}},
     };
     return options;
 }
 
-const std::vector<OptionRow>& AnsweredOptions() {
-    static constexpr bool Options::*kNoMember = nullptr;
-    static const std::vector<OptionRow> options{
-        {"-h,--help", "", "Show the help, or that of the command", kNoMember},
-        {"--version", "", "Show the version", kNoMember},
-        {"--man", "", "Print the man page, for 'man -l -'", kNoMember},
+const std::vector<OptionRow>& CommonRows() {
+    static const std::vector<OptionRow> rows = RowsOf(CommonOptionTable());
+    return rows;
+}
+
+const std::vector<OptionRow>& AnsweredRows() {
+    static const std::vector<OptionRow> rows{
+        {"-h,--help", "", "Show the help, or that of the command"},
+        {"--version", "", "Show the version"},
+        {"--man", "", "Print the man page, for 'man -l -'"},
     };
-    return options;
+    return rows;
 }
 
 const char* GroupHelp(const std::string& word) {

@@ -32,17 +32,17 @@ class Completer {
     Completions AtOption(const std::string& cursor) const {
         if (const auto equals = cursor.find('='); equals != std::string::npos) {
             const OptionRow* row = line_.FindOption(cursor.substr(0, equals));
-            if (row == nullptr || row->IsSwitch()) return {};
+            if (row == nullptr || row->isSwitch) return {};
             return OfferedValues(*row, cursor.substr(0, equals + 1), cursor.substr(equals + 1));
         }
-        Completions offered = OptionWords(GlobalOptions());
+        Completions offered = OptionWords(CommonRows());
         if (line_.command != nullptr) {
             const Completions own = OptionWords(line_.command->options);
             offered.words.insert(offered.words.begin(), own.words.begin(), own.words.end());
         }
-        for (const OptionRow& row : AnsweredOptions())
-            if (line_.name.empty() || LongName(row) == "--help")
-                offered.words.push_back({LongName(row), row.help});
+        for (const OptionRow& row : AnsweredRows())
+            if (line_.name.empty() || row.LongName() == "--help")
+                offered.words.push_back({row.LongName(), row.help});
         return offered;
     }
 
@@ -50,8 +50,8 @@ class Completer {
     Completions OptionWords(const std::vector<OptionRow>& rows) const {
         Completions offered;
         for (const OptionRow& row : rows) {
-            if (row.IsArgument() || (line_.Has(LongName(row)) && !row.IsRepeated())) continue;
-            for (const std::string& name : SplitNames(row))
+            if (row.IsArgument() || (line_.Has(row.LongName()) && !row.isRepeated)) continue;
+            for (const std::string& name : row.Names())
                 offered.words.push_back({name, row.help});
         }
         return offered;

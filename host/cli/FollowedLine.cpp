@@ -25,7 +25,7 @@ std::string AnyOf(const std::vector<std::string>& words) {
 
 /// What is wrong with a value, in a sentence; empty for one that the command shall look at.
 std::string Objection(const OptionRow& row, const std::string& value) {
-    const std::string name = LongName(row);
+    const std::string name = row.LongName();
     if (row.offers == Offers::Files && value.empty())
         return fmt::format("{}: the name of the file is empty", name);
     const std::vector<std::string>& choices = row.choices;
@@ -73,11 +73,11 @@ class Follower {
         const OptionRow* row = line_.FindOption(word.substr(0, equals));
         if (row == nullptr)
             TakeLetters(word);
-        else if (equals == std::string::npos && row->IsSwitch())
+        else if (equals == std::string::npos && row->isSwitch)
             Give(*row, "");
         else if (equals == std::string::npos)
             line_.awaited = row;
-        else if (row->IsSwitch())
+        else if (row->isSwitch)
             Complain(fmt::format("{} takes no value; leave out '{}'", word.substr(0, equals),
                                  word.substr(equals)));
         else
@@ -91,7 +91,7 @@ class Follower {
             return line_.FindOption({'-', letter});
         });
         const bool known = std::all_of(rows.begin(), rows.end(), [](const OptionRow* row) {
-            return row != nullptr && row->IsSwitch();
+            return row != nullptr && row->isSwitch;
         });
         if (!known) return AddStray(word);
         for (const OptionRow* row : rows)
@@ -134,12 +134,12 @@ bool IsOption(const std::string& word) {
 }
 
 std::string ValueMissing(const OptionRow& row) {
-    return fmt::format("{}: its value is missing", LongName(row));
+    return fmt::format("{}: its value is missing", row.LongName());
 }
 
 bool FollowedLine::Has(const std::string& option) const {
     return std::any_of(given.begin(), given.end(),
-                       [&](const GivenOption& one) { return LongName(*one.row) == option; });
+                       [&](const GivenOption& one) { return one.row->LongName() == option; });
 }
 
 bool FollowedLine::MayNameCommand() const {
@@ -150,7 +150,7 @@ bool FollowedLine::MayNameCommand() const {
 
 const OptionRow* FollowedLine::NextArgument() const {
     if (command == nullptr) return nullptr;
-    const auto isTaken = [&](const OptionRow& row) { return !row.IsRepeated() && Has(row.names); };
+    const auto isTaken = [&](const OptionRow& row) { return !row.isRepeated && Has(row.names); };
     for (const OptionRow& row : command->options)
         if (row.IsArgument() && !isTaken(row)) return &row;
     return nullptr;
@@ -159,13 +159,13 @@ const OptionRow* FollowedLine::NextArgument() const {
 const OptionRow* FollowedLine::FindOption(const std::string& option) const {
     const auto among = [&](const std::vector<OptionRow>& rows) -> const OptionRow* {
         for (const OptionRow& row : rows)
-            for (const std::string& known : SplitNames(row))
+            for (const std::string& known : row.Names())
                 if (known == option && !row.IsArgument()) return &row;
         return nullptr;
     };
     const OptionRow* row = command == nullptr ? nullptr : among(command->options);
-    if (row == nullptr) row = among(GlobalOptions());
-    return row != nullptr ? row : among(AnsweredOptions());
+    if (row == nullptr) row = among(CommonRows());
+    return row != nullptr ? row : among(AnsweredRows());
 }
 
 FollowedLine FollowLine(const CommandRows& commands, std::span<const std::string> words) {

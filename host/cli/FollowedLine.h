@@ -19,13 +19,6 @@
 
 namespace host {
 
-/// An option or argument that stands in the line.
-struct GivenOption {
-    const OptionRow* row;
-    std::string value;  ///< of an argument, the word itself; of a switch, empty
-    bool isFromEnvironment = false;
-};
-
 struct StrayWord {
     std::string text;
     bool isLiteral;  ///< it stands behind "--"
@@ -34,7 +27,7 @@ struct StrayWord {
 struct FollowedLine {
     std::string name;  ///< of the command, as far as it goes: "", "mac", "mac read"
     const CommandRow* command = nullptr;  ///< null while `name` isn't that of one
-    std::vector<GivenOption> given;       ///< in the order of the line
+    GivenOptions given;                   ///< in the order of the line
     std::vector<StrayWord> strays;
     std::string complaint;               ///< of the first value that can't be: which, and why
     const OptionRow* awaited = nullptr;  ///< the option whose value is the next word

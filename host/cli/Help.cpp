@@ -51,8 +51,8 @@ std::string ToolHelp(const CommandRows& commands) {
     for (const std::string& word : FirstWords(commands))
         text += Entry(word, FirstWordHelp(commands, word), kCommandColumns);
     std::string options = "Options:";
-    for (const OptionRow& row : GlobalOptions())
-        options += " " + SplitNames(row).front();
+    for (const OptionRow& row : CommonRows())
+        options += " " + row.Names().front();
     std::string topics;
     for (const Topic& topic : Topics())
         topics += fmt::format("{}{}", topics.empty() ? "" : ", ", topic.name);

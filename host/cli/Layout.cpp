@@ -56,7 +56,7 @@ std::string Entry(const std::string& term, std::string_view text, std::size_t te
 }
 
 std::string OptionEntry(const OptionRow& row) {
-    const std::vector<std::string> names = SplitNames(row);
+    const std::vector<std::string> names = row.Names();
     std::string term = names.front();
     if (names.size() > 1)
         term += ", " + names.back();

@@ -29,9 +29,9 @@ std::string Roff(std::string_view text) {
     return escaped;
 }
 
-std::string Option(const OptionRow& row) {
+std::string OptionText(const OptionRow& row) {
     std::string line;
-    for (const std::string& name : SplitNames(row))
+    for (const std::string& name : row.Names())
         line += fmt::format(R"({}\fB{}\fR)", line.empty() ? "" : ", ", Roff(name));
     if (*row.value != '\0') line += fmt::format(R"( \fI{}\fR)", Roff(row.value));
     const std::string environment =
@@ -56,11 +56,11 @@ std::string Synopsis(const CommandRow& command) {
     return line;
 }
 
-std::string Command(const CommandRow& command) {
+std::string CommandText(const CommandRow& command) {
     std::string text = fmt::format(".SS {}\n{}.\n", Synopsis(command), Roff(command.help));
     if (*command.details != '\0') text += Roff(command.details) + "\n";
     for (const OptionRow& row : command.options)
-        text += Option(row);
+        text += OptionText(row);
     return text + fmt::format(".PP\nExample:\n.PP\n.nf\n{}\n.fi\n", Roff(command.example));
 }
 
@@ -90,11 +90,11 @@ constexpr char kTail[] =
 std::string ManPage(const CommandRows& commands) {
     std::string page = kHead;
     page += ".SH OPTIONS\nEvery command takes them, before or behind its own.\n";
-    for (const OptionRow& row : GlobalOptions())
-        page += Option(row);
+    for (const OptionRow& row : CommonRows())
+        page += OptionText(row);
     page += ".SH COMMANDS\n";
     for (const CommandRow& command : commands)
-        page += Command(command);
+        page += CommandText(command);
     page += ".SH SIMULATED DEVICES\n.nf\n" + Roff(target::DeviceOptionsHelp()) + "\n.fi\n";
     page +=
         ".SH GDB SERVERS\nWith \\fB\\-\\-gdb\\fR the target is a board behind a GDB server. "

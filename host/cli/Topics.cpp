@@ -55,9 +55,9 @@ std::string GdbHelp() {
 
 std::string OptionsHelp() {
     std::string text = "Every command takes these options, before or behind its own:\n";
-    for (const OptionRow& row : GlobalOptions())
+    for (const OptionRow& row : CommonRows())
         text += OptionEntry(row);
-    for (const OptionRow& row : AnsweredOptions())
+    for (const OptionRow& row : AnsweredRows())
         text += OptionEntry(row);
     return text + "\n" +
            Wrap(

@@ -6,17 +6,6 @@
 
 namespace host {
 
-std::vector<std::string> SplitNames(const OptionRow& row) {
-    const std::string names = row.names;
-    const auto comma = names.find(',');
-    if (comma == std::string::npos) return {names};
-    return {names.substr(0, comma), names.substr(comma + 1)};
-}
-
-std::string LongName(const OptionRow& row) {
-    return SplitNames(row).back();
-}
-
 std::vector<std::string> FirstWords(const CommandRows& commands) {
     std::vector<std::string> words;
     for (const CommandRow& command : commands) {
@@ -41,8 +30,8 @@ std::vector<std::string> UsageWords(const CommandRow& command) {
     for (const OptionRow& row : command.options) {
         options = options || !row.IsArgument();
         if (!row.IsArgument()) continue;
-        const std::string name = row.required ? row.names : "[" + std::string(row.names) + "]";
-        words.push_back(name + (row.IsRepeated() ? "..." : ""));
+        const std::string name = row.isRequired ? row.names : "[" + std::string(row.names) + "]";
+        words.push_back(name + (row.isRepeated ? "..." : ""));
     }
     if (options) words.emplace_back("[OPTION]...");
     return words;

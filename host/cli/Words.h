@@ -9,12 +9,6 @@
 
 namespace host {
 
-/// "-q,--quiet" as {"-q", "--quiet"}.
-std::vector<std::string> SplitNames(const OptionRow& row);
-
-/// "--quiet"; of an argument, its name.
-std::string LongName(const OptionRow& row);
-
 /// The words that a command line can begin with, each once.
 std::vector<std::string> FirstWords(const CommandRows& commands);
 

@@ -2,7 +2,9 @@
 
 #include <fmt/format.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/RangeOperation.h"
 
@@ -10,27 +12,28 @@ namespace host::commands {
 
 namespace {
 
-Outcome BlankCheckOn(Context& context, FlashDevice& device) {
-    const base::AddressRange range = ChooseRange(device, kBlankCheckKeys, context.options.range);
+Outcome BlankCheckOn(Context& context, FlashDevice& device, const RangeChoice& options) {
+    const base::AddressRange range = ChooseRange(device, kBlankCheckKeys, options.range);
     Outcome outcome = RunOperation(device, plugin::kBlankCheck, Talk::Verbose);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
     context.reporter.Result(RangeText(range) + " is blank");
     return outcome;
 }
 
-Outcome RunBlankCheck(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return BlankCheckOn(context, device); });
+Outcome RunBlankCheck(Context& context, const RangeChoice& options) {
+    return WithDevice(context,
+                      [&](FlashDevice& device) { return BlankCheckOn(context, device, options); });
 }
 
 }  // namespace
 
 CommandRow BlankCheck() {
-    return {"blank-check",
-            "Check that the flash, or a range of it, is erased",
-            "The exit status is 5 when a byte isn't 0xFF.",
-            "  corvane-flash blank-check --range 0x8000-0x8fff",
-            {RangeOption("The addresses to check; default: the whole flash")},
-            RunBlankCheck};
+    return Command<RangeChoice>({.name = "blank-check",
+                                 .help = "Check that the flash, or a range of it, is erased",
+                                 .details = "The exit status is 5 when a byte isn't 0xFF.",
+                                 .example = "  corvane-flash blank-check --range 0x8000-0x8fff"},
+                                {RangeOption("The addresses to check; default: the whole flash")},
+                                RunBlankCheck);
 }
 
 }  // namespace host::commands

@@ -7,7 +7,9 @@
 #include <vector>
 
 #include "base/Hex.h"
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
 #include "host/flashing/ImageSet.h"
@@ -16,6 +18,10 @@
 namespace host::commands {
 
 namespace {
+
+struct ChecksumOptions : RangeChoice, ImageForm {
+    std::optional<std::string> imageFile;
+};
 
 /// The CRC-32 of the range as flash would hold the image, erased where the image says nothing.
 std::uint32_t ImageChecksum(const image::Image& image, const base::AddressRange& range) {
@@ -47,17 +53,18 @@ Outcome Answer(Context& context, const base::AddressRange& range, const std::str
     return {.result = {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}}};
 }
 
-Outcome OfImage(Context& context, const LoadedImages& images) {
+Outcome OfImage(Context& context, const ChecksumOptions& options) {
+    const LoadedImages images = ReadNamed(context, {*options.imageFile}, options);
     return WithDevice(context, [&](FlashDevice& device) {
         RequireFit(device, device.Info(), images);
-        const base::AddressRange range = device.RangeInFlash(context.options.range);
+        const base::AddressRange range = device.RangeInFlash(options.range);
         return Answer(context, range, base::HexText(ImageChecksum(images.image, range)));
     });
 }
 
-Outcome OfFlash(Context& context) {
+Outcome OfFlash(Context& context, const ChecksumOptions& options) {
     return WithDevice(context, [&](FlashDevice& device) {
-        const base::AddressRange range = ChooseRange(device, kChecksumKeys, context.options.range);
+        const base::AddressRange range = ChooseRange(device, kChecksumKeys, options.range);
         const Outcome operation = RunOperation(device, plugin::kCalculateChecksum, Talk::Verbose);
         Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
         outcome.result.update(operation.result);
@@ -65,28 +72,28 @@ Outcome OfFlash(Context& context) {
     });
 }
 
-Outcome RunChecksum(Context& context) {
-    std::vector<std::string> files;
-    if (context.options.imageOf) files = {*context.options.imageOf};
-    const LoadedImages images = ReadImages(files, ImageOptions(context.options));
-    return files.empty() ? OfFlash(context) : OfImage(context, images);
+Outcome RunChecksum(Context& context, const ChecksumOptions& options) {
+    if (options.imageFile) return OfImage(context, options);
+    ReadNamed(context, {}, options);  // refuses what only images have
+    return OfFlash(context, options);
 }
 
 }  // namespace
 
 CommandRow Checksum() {
-    return {
-        "checksum",
-        "Calculate the CRC-32 of the flash, a range or an image",
-        "With --of, the host computes what the device would answer if its flash held the "
-        "image and nothing else.",
-        "  corvane-flash checksum\n"
-        "  corvane-flash checksum --of firmware.elf",
+    return Command<ChecksumOptions>(
+        {.name = "checksum",
+         .help = "Calculate the CRC-32 of the flash, a range or an image",
+         .details = "With --of, the host computes what the device would answer if its flash held "
+                    "the image and nothing else.",
+         .example = "  corvane-flash checksum\n"
+                    "  corvane-flash checksum --of firmware.elf"},
         {RangeOption("The addresses to cover; default: the whole flash"),
-         {"--of", "FILE", "Of this image file, not of the flash", &Options::imageOf, Offers::Files},
+         {&ChecksumOptions::imageFile,
+          {"--of", "FILE", "Of this image file, not of the flash", Offers::Files}},
          FormatOption(),
          BaseOption()},
-        RunChecksum};
+        RunChecksum);
 }
 
 }  // namespace host::commands

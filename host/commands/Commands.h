@@ -33,14 +33,4 @@ CommandRow Settings();
 CommandRow Completion();
 CommandRow Help();
 
-// Options that several commands share.
-OptionRow RangeOption(const char* help);
-OptionRow ImagesArgument();
-OptionRow FormatOption();
-OptionRow BaseOption();
-OptionRow DryRunOption();
-OptionRow NoVerifyOption();
-OptionRow CommitOption();
-OptionRow RunOption(const char* help);
-
 }  // namespace host::commands

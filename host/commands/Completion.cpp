@@ -5,6 +5,7 @@
 #include <fmt/format.h>
 
 #include "host/cli/CompletionScripts.h"
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 
 namespace host::commands {
@@ -13,8 +14,13 @@ namespace {
 
 constexpr char kWords[] = "words";
 
-Outcome Answer(Context& context) {
-    const Completions offered = Complete(AllCommands(), context.options.words);
+struct CompletionOptions {
+    std::string shell;
+    std::vector<std::string> words;
+};
+
+Outcome Answer(Context& context, const std::vector<std::string>& line) {
+    const Completions offered = Complete(AllCommands(), line);
     Json words = Json::array();
     for (const auto& [text, help] : offered.words) {
         context.reporter.Result(fmt::format("{}\t{}", text, help));
@@ -27,15 +33,14 @@ Outcome Answer(Context& context) {
                 {"filesBehind", offered.filesBehind ? Json(*offered.filesBehind) : Json(nullptr)}}};
 }
 
-Outcome RunCompletion(Context& context) {
-    const std::string& shell = *context.options.argument;
-    if (shell == kWords) return Answer(context);
+Outcome RunCompletion(Context& context, const CompletionOptions& options) {
+    if (options.shell == kWords) return Answer(context, options.words);
     std::string text;
     for (const CompletionScript& script : CompletionScripts())
-        if (shell == script.shell) text = script.text;
+        if (options.shell == script.shell) text = script.text;
     text.pop_back();  // the last line break comes with the result
     context.reporter.Result(text);
-    return {.result = {{"shell", shell}, {"script", text}}};
+    return {.result = {{"shell", options.shell}, {"script", text}}};
 }
 
 std::vector<std::string> Choices() {
@@ -49,19 +54,24 @@ std::vector<std::string> Choices() {
 }  // namespace
 
 CommandRow Completion() {
-    return {"completion",
-            "Print the completion script of a shell: bash, zsh or fish",
-            "The scripts ask the tool itself what may stand at the cursor: 'completion words -- "
-            "WORD...' answers with a line for each word that may take the place of the last WORD, "
-            "with a tab before what it means.",
-            "  corvane-flash completion bash > ~/.local/share/bash-completion/completions/"
-            "corvane-flash\n"
-            "  corvane-flash completion words -- erase --",
-            {{"SHELL", "", "bash, zsh, fish, or words", &Options::argument, Offers::Nothing,
-              Choices(), true},
-             {"WORD", "", "The words of a command line up to the cursor", &Options::words}},
-            RunCompletion,
-            false};
+    return Command<CompletionOptions>(
+        {.name = "completion",
+         .help = "Print the completion script of a shell: bash, zsh or fish",
+         .details = "The scripts ask the tool itself what may stand at the cursor: 'completion "
+                    "words -- WORD...' answers with a line for each word that may take the place "
+                    "of the last WORD, with a tab before what it means.",
+         .example = "  corvane-flash completion bash > "
+                    "~/.local/share/bash-completion/completions/corvane-flash\n"
+                    "  corvane-flash completion words -- erase --",
+         .readsSettings = false},
+        {{&CompletionOptions::shell,
+          {.names = "SHELL",
+           .help = "bash, zsh, fish, or words",
+           .choices = Choices(),
+           .isRequired = true}},
+         {&CompletionOptions::words,
+          {.names = "WORD", .help = "The words of a command line up to the cursor"}}},
+        RunCompletion);
 }
 
 }  // namespace host::commands

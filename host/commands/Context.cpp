@@ -11,19 +11,19 @@ namespace host {
 
 // What is typed beats the variables of the other kind, so that two kinds without a typed option
 // stem from variables alone.
-TargetOptions TargetOf(const Options& options) {
+const TargetOptions& TargetOf(const CommonOptions& options) {
     if (options.gdb && (options.sim || options.simFile) && !options.targetVariables.empty())
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("the environment names a simulated target and a real one, with "
                                   "{}; unset one of them, or say --sim or --gdb",
                                   fmt::join(options.targetVariables, " and ")));
-    return {options.sim, options.simFile, options.gdb, options.gdbOptions, options.loader};
+    return options;
 }
 
 namespace {
 
 Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(FlashDevice&)>& work) {
-    const Options& options = context.options;
+    const CommonOptions& options = context.options;
     const DeviceOptions named{TargetOf(options), options.plugin, trace};
     FlashDevice device(named, context.settings, context.reporter);
     Outcome outcome;
@@ -32,13 +32,13 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
     } catch (...) {
         device.LeaveHalted();
         try {
-            device.Close(options.dryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
+            device.Close(context.isDryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
         } catch (const Failure& second) {
             context.reporter.Error(second.what());
         }
         throw;
     }
-    device.Close(options.dryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
+    device.Close(context.isDryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
     return outcome;
 }
 
@@ -74,11 +74,10 @@ Outcome NothingTouched(Context& context, Json plan) {
 }
 
 FilesInUse InputFiles(const Context& context) {
-    const Options& options = context.options;
+    const CommonOptions& options = context.options;
     FilesInUse files;
-    for (const std::string& file : options.files)
+    for (const std::string& file : context.imageFiles)
         files.Add(SplitAddress(file).path, "an image file");
-    files.Add(SplitAddress(options.imageOf.value_or("")).path, "the image file");
     files.AddLocked(options.simFile.value_or(""), "the device file");
     files.Add(options.loader.value_or(""), "the loader");
     files.Add(context.settings.Paths().user, "the settings file");
@@ -87,15 +86,8 @@ FilesInUse InputFiles(const Context& context) {
     return files;
 }
 
-Existing ExistingFiles(const Options& options) {
+Existing ExistingFiles(const CommonOptions& options) {
     return options.force ? Existing::Replace : Existing::Keep;
-}
-
-image::ReadOptions ImageOptions(const Options& options) {
-    image::ReadOptions read;
-    if (options.format) read.format = image::FormatFromName(*options.format);
-    if (options.base) read.base = ParseHexArgument(*options.base, "--base");
-    return read;
 }
 
 }  // namespace host

@@ -4,7 +4,7 @@
 
 #include <functional>
 
-#include "host/cli/Options.h"
+#include "host/cli/CommonOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/files/FilesInUse.h"
 #include "host/files/OutputFile.h"
@@ -15,30 +15,33 @@
 namespace host {
 
 struct Context {
-    const Options& options;
+    const CommonOptions& options;
     Reporter& reporter;
     SettingStore& settings;
+
+    /// The image files of the command, as it names them: nothing may be written over them.
+    std::vector<std::string> imageFiles = {};
+
+    /// A dry run: neither the simulated device's contents nor settings are kept.
+    bool isDryRun = false;
 };
 
 /// The target that the options ask for. Failure (WrongUsage) when variables of the environment ask
 /// for two.
-TargetOptions TargetOf(const Options& options);
+const TargetOptions& TargetOf(const CommonOptions& options);
 
 /// Runs a command's work on the device. Whatever becomes of it, the simulated device's contents
-/// are kept, except after a mere look (`dryRun`); whatever it throws, the target is left halted. A
-/// real one is released; a trace that isn't whole is a failure.
+/// are kept, except after a dry run; whatever it throws, the target is left halted. A real one is
+/// released; a trace that isn't whole is a failure.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
-/// What ends a --dry-run: `plan` is what would be done.
+/// What ends a dry run: `plan` is what would be done.
 Outcome NothingTouched(Context& context, Json plan);
 
 /// What the command line names to be read or kept, which nothing may be written over.
 FilesInUse InputFiles(const Context& context);
 
 /// --force.
-Existing ExistingFiles(const Options& options);
-
-/// --format and --base.
-image::ReadOptions ImageOptions(const Options& options);
+Existing ExistingFiles(const CommonOptions& options);
 
 }  // namespace host

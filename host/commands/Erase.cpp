@@ -2,7 +2,9 @@
 
 #include <fmt/format.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/RangeOperation.h"
@@ -11,14 +13,18 @@ namespace host::commands {
 
 namespace {
 
-Outcome EraseOn(Context& context, FlashDevice& device) {
-    const base::AddressRange range = ChooseRange(device, kEraseKeys, context.options.range);
-    if (context.options.all) RequireWholeErase(device.Info(), "--range");
+struct EraseOptions : RangeChoice, Comparing, DryRun {
+    bool all = false;
+};
+
+Outcome EraseOn(Context& context, FlashDevice& device, const EraseOptions& options) {
+    const base::AddressRange range = ChooseRange(device, kEraseKeys, options.range);
+    if (options.all) RequireWholeErase(device.Info(), "--range");
     const FlashGeometry flash = GeometryOf(device.Info());
     const base::AddressRange covered = SectorsCovering(range, flash);
     const std::uint64_t sectors = SectorCount(covered, flash);
     Json members{{"address", covered.first}, {"bytes", covered.Size()}, {"sectors", sectors}};
-    if (context.options.dryRun) {
+    if (options.dryRun) {
         context.reporter.Result(
             fmt::format("would erase {}: {}, {}; {} of flash are left as they are",
                         RangeText(covered), CountText(sectors, "sector"), SizeText(covered.Size()),
@@ -26,7 +32,7 @@ Outcome EraseOn(Context& context, FlashDevice& device) {
         return NothingTouched(context, members);
     }
     device.AddToFailures(members);
-    const bool verify = !context.options.noVerify;
+    const bool verify = !options.noVerify;
     Outcome outcome = RunOperation(device, plugin::kErase, Talk::Verbose, verify);
     outcome.result.update(members);
     if (outcome.status == ExitStatus::Done)
@@ -36,29 +42,32 @@ Outcome EraseOn(Context& context, FlashDevice& device) {
     return outcome;
 }
 
-Outcome RunErase(Context& context) {
-    if (context.options.all == context.options.range.has_value())
+Outcome RunErase(Context& context, const EraseOptions& options) {
+    context.isDryRun = options.dryRun;
+    if (options.all == options.range.has_value())
         throw Failure(ExitStatus::WrongUsage,
-                      context.options.all
+                      options.all
                           ? "erase takes --all or --range A-B, not both"
                           : "erase what? --all for the whole flash, or --range A-B for the sectors "
                             "that hold these addresses");
-    return WithDevice(context, [&](FlashDevice& device) { return EraseOn(context, device); });
+    return WithDevice(context,
+                      [&](FlashDevice& device) { return EraseOn(context, device, options); });
 }
 
 }  // namespace
 
 CommandRow Erase() {
-    return {"erase",
-            "Erase the whole flash, or the sectors of a range",
-            "A sector is erased whole: what it holds outside of the range is lost as well.",
-            "  corvane-flash erase --range 0x8000-0x8fff\n"
-            "  corvane-flash erase --all --dry-run",
-            {{"--all", "", "Erase the whole flash", &Options::all},
-             RangeOption("Erase the sectors that hold these addresses"),
-             NoVerifyOption(),
-             DryRunOption()},
-            RunErase};
+    return Command<EraseOptions>(
+        {.name = "erase",
+         .help = "Erase the whole flash, or the sectors of a range",
+         .details = "A sector is erased whole: what it holds outside of the range is lost as well.",
+         .example = "  corvane-flash erase --range 0x8000-0x8fff\n"
+                    "  corvane-flash erase --all --dry-run"},
+        {{&EraseOptions::all, {"--all", "", "Erase the whole flash"}},
+         RangeOption("Erase the sectors that hold these addresses"),
+         NoVerifyOption(),
+         DryRunOption()},
+        RunErase);
 }
 
 }  // namespace host::commands

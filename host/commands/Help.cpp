@@ -5,14 +5,19 @@
 #include <fmt/format.h>
 #include <fmt/ranges.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 
 namespace host::commands {
 
 namespace {
 
-Outcome RunHelp(Context& context) {
-    const std::string about = fmt::format("{}", fmt::join(context.options.words, " "));
+struct HelpOptions {
+    std::vector<std::string> about;
+};
+
+Outcome RunHelp(Context& context, const HelpOptions& options) {
+    const std::string about = fmt::format("{}", fmt::join(options.about, " "));
     std::string text = HelpText(AllCommands(), about);
     text.pop_back();  // the last line break comes with the result
     context.reporter.Result(text);
@@ -22,16 +27,17 @@ Outcome RunHelp(Context& context) {
 }  // namespace
 
 CommandRow Help() {
-    return {"help",
-            "Explain a command or a topic",
-            "",
-            "  corvane-flash help program\n"
-            "  corvane-flash help mac read\n"
-            "  corvane-flash help sim",
-            {{"COMMAND", "", "A command or a topic; default: what there is", &Options::words,
-              Offers::HelpWords}},
-            RunHelp,
-            false};
+    return Command<HelpOptions>({.name = "help",
+                                 .help = "Explain a command or a topic",
+                                 .example = "  corvane-flash help program\n"
+                                            "  corvane-flash help mac read\n"
+                                            "  corvane-flash help sim",
+                                 .readsSettings = false},
+                                {{&HelpOptions::about,
+                                  {.names = "COMMAND",
+                                   .help = "A command or a topic; default: what there is",
+                                   .offers = Offers::HelpWords}}},
+                                RunHelp);
 }
 
 }  // namespace host::commands

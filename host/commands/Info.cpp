@@ -2,6 +2,7 @@
 
 #include <fmt/format.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 
@@ -32,16 +33,18 @@ Outcome ShowInfo(Context& context, FlashDevice& device) {
                        {"plugin", device.LibraryPath()}}};
 }
 
-Outcome RunInfo(Context& context) {
+Outcome RunInfo(Context& context, const NoOptions& /*options*/) {
     return WithDevice(context, [&](FlashDevice& device) { return ShowInfo(context, device); });
 }
 
 }  // namespace
 
 CommandRow Info() {
-    return {"info", "Show the device: family, id, flash, sectors, RAM, operations",
-            "",     "  corvane-flash --sim quen,flash=512K info",
-            {},     RunInfo};
+    return Command<NoOptions>(
+        {.name = "info",
+         .help = "Show the device: family, id, flash, sectors, RAM, operations",
+         .example = "  corvane-flash --sim quen,flash=512K info"},
+        {}, RunInfo);
 }
 
 }  // namespace host::commands

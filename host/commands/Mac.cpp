@@ -3,7 +3,9 @@
 #include <fmt/format.h>
 
 #include "host/base/MacAddress.h"
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
 #include "host/flashing/UserRegisters.h"
@@ -11,6 +13,11 @@
 namespace host::commands {
 
 namespace {
+
+struct MacOptions : Committing {
+    std::string address;
+    bool force = false;  ///< program one that no device should have
+};
 
 /// Read through the plug-in; the host has padded it to two digits a byte.
 std::string ReadMac(FlashDevice& device) {
@@ -24,10 +31,10 @@ Outcome ShowMac(Context& context, FlashDevice& device) {
     return {.result = {{"mac", mac}}};
 }
 
-Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
+Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac, bool commit) {
     const std::string old = ReadMac(device);
     context.settings.Set(Origin::CommandLine, keys::kMacInput, mac.Text());
-    ChooseCommit(context.settings, context.reporter, keys::kMacCommit, context.options.commit);
+    ChooseCommit(context.settings, context.reporter, keys::kMacCommit, commit);
     device.Perform(plugin::kProgramMac);
     Outcome outcome;
     const RegisterValues values =
@@ -39,8 +46,8 @@ Outcome Write(Context& context, FlashDevice& device, const MacAddress& mac) {
     return outcome;
 }
 
-MacAddress RequireMac(const Options& options) {
-    const std::string& text = *options.argument;
+MacAddress RequireMac(const MacOptions& options) {
+    const std::string& text = options.address;
     const auto mac = ParseMacAddress(text);
     if (!mac)
         throw Failure(ExitStatus::WrongUsage,
@@ -56,37 +63,39 @@ MacAddress RequireMac(const Options& options) {
     return *mac;
 }
 
-Outcome RunReadMac(Context& context) {
+Outcome RunReadMac(Context& context, const NoOptions& /*options*/) {
     return WithDevice(context, [&](FlashDevice& device) { return ShowMac(context, device); });
 }
 
-Outcome RunProgramMac(Context& context) {
-    const MacAddress mac = RequireMac(context.options);
-    return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, mac); });
+Outcome RunProgramMac(Context& context, const MacOptions& options) {
+    const MacAddress mac = RequireMac(options);
+    return WithDevice(
+        context, [&](FlashDevice& device) { return Write(context, device, mac, options.commit); });
 }
 
 }  // namespace
 
 CommandRow MacRead() {
-    return {"mac read", "Read the MAC address", "", "  corvane-flash mac read", {}, RunReadMac};
+    return Command<NoOptions>(
+        {.name = "mac read", .help = "Read the MAC address", .example = "  corvane-flash mac read"},
+        {}, RunReadMac);
 }
 
 CommandRow MacProgram() {
-    return {
-        "mac program",
-        "Program the MAC address",
-        "Without --commit the next reset of the device brings back what was committed last.",
-        "  corvane-flash mac program 02-1b-c3-04-05-06 --commit",
-        {{"ADDRESS",
-          "",
-          "Six hexadecimal bytes, separated by - or : or not at all",
-          &Options::argument,
-          Offers::Nothing,
-          {},
-          true},
+    return Command<MacOptions>(
+        {.name = "mac program",
+         .help = "Program the MAC address",
+         .details = "Without --commit the next reset of the device brings back what was committed "
+                    "last.",
+         .example = "  corvane-flash mac program 02-1b-c3-04-05-06 --commit"},
+        {{&MacOptions::address,
+          {.names = "ADDRESS",
+           .help = "Six hexadecimal bytes, separated by - or : or not at all",
+           .isRequired = true}},
          CommitOption(),
-         {"--force", "", "Program a multicast, all-zeros or all-ones address", &Options::force}},
-        RunProgramMac};
+         {&MacOptions::force,
+          {"--force", "", "Program a multicast, all-zeros or all-ones address"}}},
+        RunProgramMac);
 }
 
 }  // namespace host::commands

@@ -1,6 +1,8 @@
 // corvane-flash map: what the flash holds, and what images would do to it.
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/FlashMap.h"
@@ -26,24 +28,22 @@ Outcome MapOn(Context& context, FlashDevice& device, const LoadedImages& images)
                        {"runs", std::move(runs)}}};
 }
 
-Outcome RunMap(Context& context) {
-    const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
+Outcome RunMap(Context& context, const ImageFiles& options) {
+    const LoadedImages images = ReadNamed(context, options.files, options);
     return WithDevice(context, [&](FlashDevice& device) { return MapOn(context, device, images); });
 }
 
 }  // namespace
 
 CommandRow Map() {
-    OptionRow images = ImagesArgument();
-    images.required = false;
-    return {"map",
-            "Draw what the flash holds, and what images would change",
-            "The flash is read, and nothing is touched. With image files, the map shows what "
-            "'program' would do with them.",
-            "  corvane-flash map\n"
-            "  corvane-flash map firmware.elf",
-            {images, FormatOption(), BaseOption()},
-            RunMap};
+    return Command<ImageFiles>(
+        {.name = "map",
+         .help = "Draw what the flash holds, and what images would change",
+         .details = "The flash is read, and nothing is touched. With image files, the map shows "
+                    "what 'program' would do with them.",
+         .example = "  corvane-flash map\n"
+                    "  corvane-flash map firmware.elf"},
+        {ImagesArgument(false), FormatOption(), BaseOption()}, RunMap);
 }
 
 }  // namespace host::commands

@@ -9,6 +9,7 @@
 
 #include "host/base/MacAddress.h"
 #include "host/base/Suggestion.h"
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
@@ -18,6 +19,10 @@
 namespace host::commands {
 
 namespace {
+
+struct OperationOptions {
+    std::string name;
+};
 
 /// A register value to program must have been named; no default is meant for a board.
 void RequireRegisterSetting(const Context& context, unsigned index) {
@@ -71,8 +76,8 @@ Outcome OperationOn(FlashDevice& device, const std::string& name) {
     return outcome;
 }
 
-Outcome RunNamed(Context& context) {
-    const std::string& name = *context.options.argument;
+Outcome RunNamed(Context& context, const OperationOptions& options) {
+    const std::string& name = options.name;
     RequireInput(context, name);
     return WithDevice(context, [&](FlashDevice& device) {
         try {
@@ -91,19 +96,19 @@ Outcome RunNamed(Context& context) {
 }  // namespace
 
 CommandRow Operation() {
-    return {"operation",
-            "Run one of the plug-in's operations by its name",
-            "It works with the settings as they are. 'corvane-flash info' lists the names.",
-            "  corvane-flash operation BlankCheck\n"
-            "  corvane-flash --set FlashEraseType='Entire Flash' operation Erase",
-            {{"NAME",
-              "",
-              "The operation's exact name",
-              &Options::argument,
-              Offers::SomeChoices,
-              {std::begin(plugin::kOperations), std::end(plugin::kOperations)},
-              true}},
-            RunNamed};
+    return Command<OperationOptions>(
+        {.name = "operation",
+         .help = "Run one of the plug-in's operations by its name",
+         .details = "It works with the settings as they are. 'corvane-flash info' lists the names.",
+         .example = "  corvane-flash operation BlankCheck\n"
+                    "  corvane-flash --set FlashEraseType='Entire Flash' operation Erase"},
+        {{&OperationOptions::name,
+          {.names = "NAME",
+           .help = "The operation's exact name",
+           .offers = Offers::SomeChoices,
+           .choices = {std::begin(plugin::kOperations), std::end(plugin::kOperations)},
+           .isRequired = true}}},
+        RunNamed);
 }
 
 }  // namespace host::commands

@@ -4,7 +4,9 @@
 
 #include <string>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/FlashMap.h"
@@ -18,6 +20,14 @@ namespace host::commands {
 
 namespace {
 
+struct ProgramOptions : ImageFiles, Comparing, Running, DryRun {
+    std::optional<std::string> erase;
+    bool keep = false;
+    bool blankCheck = false;
+    bool crc = false;
+    bool rewrite = false;
+};
+
 /// --erase necessary|none|all|A-B.
 EraseChoice ChosenErase(FlashDevice& device, const std::string& choice) {
     using Kind = EraseChoice::Kind;
@@ -28,9 +38,9 @@ EraseChoice ChosenErase(FlashDevice& device, const std::string& choice) {
 }
 
 /// What the settings ask for, unless an option says it otherwise.
-LoadRequest Request(const Context& context, FlashDevice& device) {
-    const Options& options = context.options;
-    LoadRequest request = RequestedLoad(context.settings);
+LoadRequest Request(const SettingStore& settings, const ProgramOptions& options,
+                    FlashDevice& device) {
+    LoadRequest request = RequestedLoad(settings);
     if (options.erase) request.erase = ChosenErase(device, *options.erase);
     request.checks.checksum = request.checks.checksum || options.crc;
     request.checks.blankCheck = request.checks.blankCheck || options.blankCheck;
@@ -60,7 +70,7 @@ void ShowPlan(Context& context, const DeviceInfo& info, const LoadPlan& plan, st
                                   keeping, CountText(plan.sections.size(), "section"), info.family,
                                   SizeText(info.flashBytes)));
     for (const std::string& line : Describe(plan, GeometryOf(info))) {
-        if (context.options.dryRun)
+        if (context.isDryRun)
             context.reporter.Result(line);
         else
             context.reporter.Say(Talk::Verbose, line);
@@ -79,7 +89,7 @@ const char* DoneText(const LoadPlan& plan) {
 }
 
 Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
-             const LoadPlan& plan) {
+             const LoadPlan& plan, bool runAfterwards) {
     const LoadResult load = RunLoad(device, plan, images.image);
     Outcome outcome{.result = ToJson(plan)};
     if (load.checksum) outcome.result["checksum"] = *load.checksum;
@@ -89,32 +99,33 @@ Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
     ShowSummary(context.reporter, device.Meter().Phases());
     ShowUnchanged(context.reporter, plan);
     if (outcome.status != ExitStatus::Done) return outcome;
-    if (context.options.run) device.StartProgram();
+    if (runAfterwards) device.StartProgram();
     context.reporter.Done(DoneText(plan));
     return outcome;
 }
 
-Outcome ProgramOn(Context& context, FlashDevice& device, LoadedImages images) {
+Outcome ProgramOn(Context& context, FlashDevice& device, const ProgramOptions& options,
+                  LoadedImages images) {
     const DeviceInfo& info = device.Info();
     RequireFit(device, info, images);
-    const LoadRequest request = Request(context, device);
-    const std::uint64_t kept = context.options.keep ? KeepOthers(device, images, request.erase) : 0;
+    const LoadRequest request = Request(context.settings, options, device);
+    const std::uint64_t kept = options.keep ? KeepOthers(device, images, request.erase) : 0;
     const LoadPlan plan = PlanOnDevice(device, request, images.image);
     ShowPlan(context, info, plan, kept);
     Json planned = ToJson(plan);
     planned["keptBytes"] = kept;
-    if (context.options.dryRun) {
+    if (context.isDryRun) {
         planned["runs"] =
             ShowMap(context.reporter, device, device.Meter(), GeometryOf(info), images.image, plan);
         return NothingTouched(context, planned);
     }
     device.AddToFailures(planned);
-    Outcome outcome = Load(context, device, images, plan);
+    Outcome outcome = Load(context, device, images, plan, options.run);
     outcome.result["keptBytes"] = kept;
     return outcome;
 }
 
-void CheckEraseOption(const Options& options) {
+void CheckEraseOption(const ProgramOptions& options) {
     if (!options.erase || options.erase->find_first_of("-+") != std::string::npos) return;
     for (const char* word : {"necessary", "none", "all"})
         if (*options.erase == word) return;
@@ -123,47 +134,50 @@ void CheckEraseOption(const Options& options) {
         fmt::format("--erase takes necessary, none, all or a range A-B, not '{}'", *options.erase));
 }
 
-Outcome RunProgram(Context& context) {
-    CheckEraseOption(context.options);
-    LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
+Outcome RunProgram(Context& context, const ProgramOptions& options) {
+    CheckEraseOption(options);
+    context.isDryRun = options.dryRun;
+    LoadedImages images = ReadNamed(context, options.files, options);
     return WithDevice(context, [&](FlashDevice& device) {
-        return ProgramOn(context, device, std::move(images));
+        return ProgramOn(context, device, options, std::move(images));
     });
 }
 
 }  // namespace
 
 CommandRow Program() {
-    return {"program",
-            "Program image files into flash and compare the result",
-            "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors that the "
-            "image touches are erased whole, so what else they hold is lost, unless --keep keeps "
-            "it (not when the load fails: 'read' makes a copy). Sectors that hold the image's "
-            "bytes already are left alone.",
-            "  corvane-flash program firmware.elf\n"
-            "  corvane-flash program boot.hex app.srec --crc\n"
-            "  corvane-flash program data.bin --base 0x8000 --erase none",
-            {ImagesArgument(),
-             FormatOption(),
-             BaseOption(),
-             {"--erase",
-              "WHAT",
-              "What is erased first: necessary (the image's sectors), none, all, or a range A-B",
-              &Options::erase,
-              Offers::SomeChoices,
-              {"necessary", "none", "all"}},
-             {"--keep", "",
-              "Read what else the image's sectors hold, and program it back with the image",
-              &Options::keep},
-             {"--blank-check", "", "Check that the flash is blank before programming it",
-              &Options::blankCheck},
-             {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards", &Options::crc},
-             {"--rewrite", "", "Erase and program also what the flash holds already",
-              &Options::rewrite},
-             NoVerifyOption(),
-             RunOption("Reset the device afterwards and let it run its program"),
-             DryRunOption()},
-            RunProgram};
+    return Command<ProgramOptions>(
+        {.name = "program",
+         .help = "Program image files into flash and compare the result",
+         .details = "Files may be ELF, Intel HEX, S-record or, with --base, raw binary. Sectors "
+                    "that the image touches are erased whole, so what else they hold is lost, "
+                    "unless --keep keeps it (not when the load fails: 'read' makes a copy). "
+                    "Sectors that hold the image's bytes already are left alone.",
+         .example = "  corvane-flash program firmware.elf\n"
+                    "  corvane-flash program boot.hex app.srec --crc\n"
+                    "  corvane-flash program data.bin --base 0x8000 --erase none"},
+        {ImagesArgument(true),
+         FormatOption(),
+         BaseOption(),
+         {&ProgramOptions::erase,
+          {"--erase",
+           "WHAT",
+           "What is erased first: necessary (the image's sectors), none, all, or a range A-B",
+           Offers::SomeChoices,
+           {"necessary", "none", "all"}}},
+         {&ProgramOptions::keep,
+          {"--keep", "",
+           "Read what else the image's sectors hold, and program it back with the image"}},
+         {&ProgramOptions::blankCheck,
+          {"--blank-check", "", "Check that the flash is blank before programming it"}},
+         {&ProgramOptions::crc,
+          {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards"}},
+         {&ProgramOptions::rewrite,
+          {"--rewrite", "", "Erase and program also what the flash holds already"}},
+         NoVerifyOption(),
+         RunOption("Reset the device afterwards and let it run its program"),
+         DryRunOption()},
+        RunProgram);
 }
 
 }  // namespace host::commands

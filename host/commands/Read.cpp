@@ -3,7 +3,9 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/output/Summary.h"
 
@@ -11,9 +13,14 @@ namespace host::commands {
 
 namespace {
 
+struct ReadOptions : RangeChoice {
+    std::string file;
+    std::optional<std::string> format;
+};
+
 /// What can be known to be wrong before the device is asked for anything.
-image::Format CheckTarget(const Context& context, const std::string& path) {
-    const Options& options = context.options;
+image::Format CheckOutput(const Context& context, const ReadOptions& options) {
+    const std::string& path = options.file;
     const image::Format format =
         options.format ? *image::FormatFromName(*options.format) : image::FormatForWriting(path);
     if (format == image::Format::Elf)
@@ -21,13 +28,13 @@ image::Format CheckTarget(const Context& context, const std::string& path) {
                       fmt::format("{}: flash can't be written as an ELF file; name a .bin, .hex or "
                                   ".srec file",
                                   path));
-    if (path == "-" && options.json)
+    if (path == "-" && context.options.json)
         throw Failure(ExitStatus::WrongUsage,
                       "'read -' and --json both want standard output; name a file");
     FilesInUse files = InputFiles(context);
-    files.Add(options.trace.value_or(""), "the trace");
+    files.Add(context.options.trace.value_or(""), "the trace");
     files.RequireOther(path, "the flash contents");
-    if (path != "-") RequireWritable(image::kImageFile, path, ExistingFiles(options));
+    if (path != "-") RequireWritable(image::kImageFile, path, ExistingFiles(context.options));
     return format;
 }
 
@@ -36,9 +43,10 @@ bool WantsDump(const std::string& path, image::Format format) {
     return path == "-" && format == image::Format::Binary && isatty(STDOUT_FILENO) != 0;
 }
 
-Outcome ReadOn(Context& context, FlashDevice& device, const std::string& path,
+Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options,
                image::Format format) {
-    const base::AddressRange range = device.RangeInFlash(context.options.range);
+    const std::string& path = options.file;
+    const base::AddressRange range = device.RangeInFlash(options.range);
     device.Halt();
     device.Meter().Expect(Phase::Read, range.Size());
     device.Meter().Begin(Phase::Read);
@@ -60,38 +68,36 @@ Outcome ReadOn(Context& context, FlashDevice& device, const std::string& path,
                        {"phases", PhasesJson(device.Meter().Phases())}}};
 }
 
-Outcome RunRead(Context& context) {
-    const std::string path = context.options.argument.value_or("");
-    const image::Format format = CheckTarget(context, path);
-    return WithDevice(context,
-                      [&](FlashDevice& device) { return ReadOn(context, device, path, format); });
+Outcome RunRead(Context& context, const ReadOptions& options) {
+    const image::Format format = CheckOutput(context, options);
+    return WithDevice(
+        context, [&](FlashDevice& device) { return ReadOn(context, device, options, format); });
 }
 
 }  // namespace
 
 CommandRow Read() {
-    return {"read",
-            "Read flash back into a file",
-            "The extension chooses the format: .hex, .ihex for Intel HEX, .srec, .s19 and the like "
-            "for S-records, raw binary for all others. A terminal shows raw binary as a hex dump.",
-            "  corvane-flash read backup.hex\n"
-            "  corvane-flash read page.bin --range 0x400-0x7ff\n"
-            "  corvane-flash read - | sha256sum",
-            {{"FILE",
-              "",
-              "The file to write; - is standard output",
-              &Options::argument,
-              Offers::Files,
-              {},
-              true},
-             RangeOption("The addresses to read; default: the whole flash"),
-             {"--format",
-              "FORMAT",
-              "Write ihex, srec or bin, whatever the extension says",
-              &Options::format,
-              Offers::Nothing,
-              {"ihex", "srec", "bin"}}},
-            RunRead};
+    return Command<ReadOptions>(
+        {.name = "read",
+         .help = "Read flash back into a file",
+         .details = "The extension chooses the format: .hex, .ihex for Intel HEX, .srec, .s19 and "
+                    "the like for S-records, raw binary for all others. A terminal shows raw "
+                    "binary as a hex dump.",
+         .example = "  corvane-flash read backup.hex\n"
+                    "  corvane-flash read page.bin --range 0x400-0x7ff\n"
+                    "  corvane-flash read - | sha256sum"},
+        {{&ReadOptions::file,
+          {.names = "FILE",
+           .help = "The file to write; - is standard output",
+           .offers = Offers::Files,
+           .isRequired = true}},
+         RangeOption("The addresses to read; default: the whole flash"),
+         {&ReadOptions::format,
+          {.names = "--format",
+           .value = "FORMAT",
+           .help = "Write ihex, srec or bin, whatever the extension says",
+           .choices = {"ihex", "srec", "bin"}}}},
+        RunRead);
 }
 
 }  // namespace host::commands

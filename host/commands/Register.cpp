@@ -3,7 +3,9 @@
 #include <fmt/format.h>
 
 #include "base/Hex.h"
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
 #include "host/flashing/UserRegisters.h"
@@ -12,27 +14,33 @@ namespace host::commands {
 
 namespace {
 
-unsigned Index(const Context& context) {
-    return context.options.index == "1" ? 1 : 0;
+struct RegisterOptions {
+    std::string index;
+
+    unsigned Index() const { return index == "1" ? 1 : 0; }
+};
+
+struct RegisterProgramOptions : RegisterOptions, Committing {
+    std::string value;
+};
+
+Option<RegisterOptions> IndexArgument() {
+    return {&RegisterOptions::index,
+            {.names = "INDEX", .help = "0 or 1", .choices = {"0", "1"}, .isRequired = true}};
 }
 
-OptionRow IndexArgument() {
-    return {"INDEX", "", "0 or 1", &Options::index, Offers::Nothing, {"0", "1"}, true};
-}
-
-Outcome ShowRegister(Context& context, FlashDevice& device) {
-    const unsigned index = Index(context);
+Outcome ShowRegister(Context& context, FlashDevice& device, unsigned index) {
     const std::uint32_t value = ReadRegister(device, index);
     context.reporter.Result(fmt::format("{:#010x}", value));
     return {.result = {{"register", index}, {"value", value}}};
 }
 
-Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
-    const unsigned index = Index(context);
+Outcome Write(Context& context, FlashDevice& device, const RegisterProgramOptions& options,
+              std::uint32_t value) {
+    const unsigned index = options.Index();
     const std::uint32_t old = ReadRegister(device, index);
     context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], base::HexText(value));
-    ChooseCommit(context.settings, context.reporter, keys::kRegisterCommits[index],
-                 context.options.commit);
+    ChooseCommit(context.settings, context.reporter, keys::kRegisterCommits[index], options.commit);
     device.Perform(plugin::ProgramRegisterOperation(index));
     Outcome outcome;
     RegisterValues expected;
@@ -45,32 +53,39 @@ Outcome Write(Context& context, FlashDevice& device, std::uint32_t value) {
     return outcome;
 }
 
-Outcome RunReadRegister(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return ShowRegister(context, device); });
+Outcome RunReadRegister(Context& context, const RegisterOptions& options) {
+    return WithDevice(context, [&](FlashDevice& device) {
+        return ShowRegister(context, device, options.Index());
+    });
 }
 
-Outcome RunProgramRegister(Context& context) {
-    const std::uint32_t value = ParseHexArgument(*context.options.value, "the value");
-    return WithDevice(context, [&](FlashDevice& device) { return Write(context, device, value); });
+Outcome RunProgramRegister(Context& context, const RegisterProgramOptions& options) {
+    const std::uint32_t value = ParseHexArgument(options.value, "the value");
+    return WithDevice(context,
+                      [&](FlashDevice& device) { return Write(context, device, options, value); });
 }
 
 }  // namespace
 
 CommandRow RegisterRead() {
-    return {"register read",   "Read a user register", "", "  corvane-flash register read 0",
-            {IndexArgument()}, RunReadRegister};
+    return Command<RegisterOptions>({.name = "register read",
+                                     .help = "Read a user register",
+                                     .example = "  corvane-flash register read 0"},
+                                    {IndexArgument()}, RunReadRegister);
 }
 
 CommandRow RegisterProgram() {
-    return {
-        "register program",
-        "Program a user register",
-        "Without --commit the next reset of the device brings back what was committed last.",
-        "  corvane-flash register program 0 0x12ab --commit",
+    return Command<RegisterProgramOptions>(
+        {.name = "register program",
+         .help = "Program a user register",
+         .details = "Without --commit the next reset of the device brings back what was committed "
+                    "last.",
+         .example = "  corvane-flash register program 0 0x12ab --commit"},
         {IndexArgument(),
-         {"VALUE", "", "Hexadecimal, up to 32 bits", &Options::value, Offers::Nothing, {}, true},
+         {&RegisterProgramOptions::value,
+          {.names = "VALUE", .help = "Hexadecimal, up to 32 bits", .isRequired = true}},
          CommitOption()},
-        RunProgramRegister};
+        RunProgramRegister);
 }
 
 }  // namespace host::commands

@@ -1,33 +1,34 @@
 // corvane-flash reset: resets the device and leaves it halted, or running its program.
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 
 namespace host::commands {
 
 namespace {
 
-Outcome Reset(Context& context, FlashDevice& device) {
-    if (context.options.run)
+Outcome ResetDevice(FlashDevice& device, bool run) {
+    if (run)
         device.StartProgram();
     else
         device.Reset();
-    return {.result = {{"running", context.options.run}}};
+    return {.result = {{"running", run}}};
 }
 
-Outcome RunReset(Context& context) {
-    return WithDevice(context, [&](FlashDevice& device) { return Reset(context, device); });
+Outcome RunReset(Context& context, const Running& options) {
+    return WithDevice(context,
+                      [&](FlashDevice& device) { return ResetDevice(device, options.run); });
 }
 
 }  // namespace
 
 CommandRow Reset() {
-    return {"reset",
-            "Reset the device, and leave it halted or let it run",
-            "",
-            "  corvane-flash --gdb :3333 reset --run",
-            {RunOption("Let the device run its program afterwards")},
-            RunReset};
+    return Command<Running>({.name = "reset",
+                             .help = "Reset the device, and leave it halted or let it run",
+                             .example = "  corvane-flash --gdb :3333 reset --run"},
+                            {RunOption("Let the device run its program afterwards")}, RunReset);
 }
 
 }  // namespace host::commands

@@ -2,6 +2,7 @@
 
 #include <fmt/format.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/targets/TargetServer.h"
 
@@ -9,10 +10,14 @@ namespace host::commands {
 
 namespace {
 
-Outcome RunServe(Context& context) {
+struct ServeOptions {
+    std::string address;
+};
+
+Outcome RunServe(Context& context, const ServeOptions& options) {
     Reporter& reporter = context.reporter;
     TargetServer server(
-        TargetOf(context.options), *context.options.argument,
+        TargetOf(context.options), options.address,
         [&](const std::string& text) { reporter.Error(text); },
         [&](const std::string& text) { reporter.Say(Talk::Normal, text); });
     const Json where{{"host", server.Where().host}, {"port", server.Port()}};
@@ -24,18 +29,20 @@ Outcome RunServe(Context& context) {
 }  // namespace
 
 CommandRow Serve() {
-    return {"serve",
-            "Serve the simulated device as a GDB server, until Ctrl-C",
-            "For GDB (target remote :PORT, then load), and for hosts to be tested. One client at a "
-            "time; the contents are kept in --sim-file whenever one has gone. What the device "
-            "refuses is shown on standard error. Without HOST only this machine can connect; port "
-            "0 takes a free one.",
-            "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
-            "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
-            {{"[HOST:]PORT", "", "Where to listen", &Options::argument, Offers::Nothing, {}, true}},
-            RunServe,
-            false,
-            true};
+    return Command<ServeOptions>(
+        {.name = "serve",
+         .help = "Serve the simulated device as a GDB server, until Ctrl-C",
+         .details = "For GDB (target remote :PORT, then load), and for hosts to be tested. One "
+                    "client at a time; the contents are kept in --sim-file whenever one has gone. "
+                    "What the device refuses is shown on standard error. Without HOST only this "
+                    "machine can connect; port 0 takes a free one.",
+         .example = "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
+                    "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
+         .readsSettings = false,
+         .isForSimulated = true},
+        {{&ServeOptions::address,
+          {.names = "[HOST:]PORT", .help = "Where to listen", .isRequired = true}}},
+        RunServe);
 }
 
 }  // namespace host::commands

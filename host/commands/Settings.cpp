@@ -2,11 +2,17 @@
 
 #include <fmt/format.h>
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 
 namespace host::commands {
 
 namespace {
+
+struct SettingsOptions {
+    std::optional<std::string> setting;  ///< KEY or KEY=TEXT
+    std::optional<std::string> forget;
+};
 
 Json ToJson(const Context& context, const SettingInfo& info) {
     const auto [text, origin] = context.settings.Get(info.key);
@@ -73,14 +79,14 @@ Outcome Forget(Context& context, const std::string& key) {
     return {.result = ToJson(context, info)};
 }
 
-Outcome RunSettings(Context& context) {
-    if (context.options.forget && context.options.argument)
+Outcome RunSettings(Context& context, const SettingsOptions& options) {
+    if (options.forget && options.setting)
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("--forget {} and {} are two wishes; say one at a time",
-                                  *context.options.forget, *context.options.argument));
-    if (context.options.forget) return Forget(context, *context.options.forget);
-    if (!context.options.argument) return List(context);
-    const std::string& argument = *context.options.argument;
+                                  *options.forget, *options.setting));
+    if (options.forget) return Forget(context, *options.forget);
+    if (!options.setting) return List(context);
+    const std::string& argument = *options.setting;
     const auto equals = argument.find('=');
     const SettingInfo& info = RequireSetting(argument.substr(0, equals), "settings");
     if (equals != std::string::npos) return Keep(context, info, argument.substr(equals + 1));
@@ -91,19 +97,22 @@ Outcome RunSettings(Context& context) {
 }  // namespace
 
 CommandRow Settings() {
-    return {"settings",
-            "List the settings, or show, keep or drop one",
-            "Each is shown with its origin, its meaning and the texts that it takes. A value comes "
-            "from the first of: command line, environment variable CORVANE_SET_KEY, "
-            "your settings file, kept value (KEY=TEXT here, and what the plug-in publishes), "
-            "default. With -q, only the values are shown.",
-            "  corvane-flash settings FlashTimeoutValue\n"
-            "  corvane-flash settings FlashCrystalFreq=10",
-            {{"KEY", "", "The setting to show; as KEY=TEXT, the setting to keep with this text",
-              &Options::argument, Offers::Settings},
-             {"--forget", "KEY", "Drop the kept value of a setting", &Options::forget,
-              Offers::Settings}},
-            RunSettings};
+    return Command<SettingsOptions>(
+        {.name = "settings",
+         .help = "List the settings, or show, keep or drop one",
+         .details = "Each is shown with its origin, its meaning and the texts that it takes. A "
+                    "value comes from the first of: command line, environment variable "
+                    "CORVANE_SET_KEY, your settings file, kept value (KEY=TEXT here, and what the "
+                    "plug-in publishes), default. With -q, only the values are shown.",
+         .example = "  corvane-flash settings FlashTimeoutValue\n"
+                    "  corvane-flash settings FlashCrystalFreq=10"},
+        {{&SettingsOptions::setting,
+          {.names = "KEY",
+           .help = "The setting to show; as KEY=TEXT, the setting to keep with this text",
+           .offers = Offers::Settings}},
+         {&SettingsOptions::forget,
+          {"--forget", "KEY", "Drop the kept value of a setting", Offers::Settings}}},
+        RunSettings);
 }
 
 }  // namespace host::commands

@@ -1,6 +1,8 @@
 // corvane-flash verify: compare flash with image files.
 
+#include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/Comparison.h"
 #include "host/flashing/ImageSet.h"
@@ -10,8 +12,10 @@ namespace host::commands {
 
 namespace {
 
-Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all) {
-    const auto& range = context.options.range;
+struct VerifyOptions : ImageFiles, RangeChoice {};
+
+Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
+                 const std::optional<std::string>& range) {
     const LoadedImages images = range ? Within(all, device.RangeInFlash(range)) : all;
     RequireFit(device, device.Info(), images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
@@ -26,22 +30,24 @@ Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all)
     return outcome;
 }
 
-Outcome RunVerify(Context& context) {
-    const LoadedImages images = ReadImages(context.options.files, ImageOptions(context.options));
-    return WithDevice(context,
-                      [&](FlashDevice& device) { return VerifyOn(context, device, images); });
+Outcome RunVerify(Context& context, const VerifyOptions& options) {
+    const LoadedImages images = ReadNamed(context, options.files, options);
+    return WithDevice(context, [&](FlashDevice& device) {
+        return VerifyOn(context, device, images, options.range);
+    });
 }
 
 }  // namespace
 
 CommandRow Verify() {
-    return {"verify",
-            "Compare flash with image files",
-            "The exit status is 5 when a byte differs.",
-            "  corvane-flash verify firmware.elf",
-            {ImagesArgument(), FormatOption(), BaseOption(),
-             RangeOption("Compare only these addresses; default: all of the image")},
-            RunVerify};
+    return Command<VerifyOptions>({.name = "verify",
+                                   .help = "Compare flash with image files",
+                                   .details = "The exit status is 5 when a byte differs.",
+                                   .example = "  corvane-flash verify firmware.elf"},
+                                  {ImagesArgument(true), FormatOption(), BaseOption(),
+                                   RangeOption("Compare only these addresses; default: all of the "
+                                               "image")},
+                                  RunVerify);
 }
 
 }  // namespace host::commands

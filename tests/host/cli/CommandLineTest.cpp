@@ -133,10 +133,10 @@ std::string Meaning(Words words) {
     try {
         const ParsedLine parsed = ParseCommandLine(
             AllCommands(), line, [&](const char* name) { return variables[name]; });
-        if (parsed.command == nullptr) return parsed.text;
+        if (parsed.command == nullptr) return parsed.answer;
         std::string text = parsed.command->name;
         for (const GivenOption& given : parsed.given)
-            text += fmt::format(" {}{}{}{}", LongName(*given.row), given.row->IsSwitch() ? "" : "=",
+            text += fmt::format(" {}{}{}{}", given.row->LongName(), given.row->isSwitch ? "" : "=",
                                 given.value, given.isFromEnvironment ? " (environment)" : "");
         return text;
     } catch (const Failure& failure) {
@@ -209,9 +209,9 @@ TEST(CommandTable, EveryCommandAndOptionIsInHelpAndManPage) {
     std::vector<std::vector<std::string>> options;
     const auto add = [&](const std::vector<OptionRow>& rows) {
         for (const OptionRow& row : rows)
-            if (!row.IsArgument()) options.push_back(SplitNames(row));
+            if (!row.IsArgument()) options.push_back(row.Names());
     };
-    add(GlobalOptions());
+    add(CommonRows());
     std::string help = HelpText(AllCommands(), "");
     std::string man = ManPage(AllCommands());
     man.erase(std::remove(man.begin(), man.end(), '\\'), man.end());

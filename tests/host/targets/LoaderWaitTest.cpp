@@ -9,6 +9,7 @@
 #include <fstream>
 #include <sstream>
 
+#include "host/cli/CommandLine.h"
 #include "host/commands/Commands.h"
 #include "host/facts/LoaderMemory.h"
 #include "host/targets/LoaderWait.h"
@@ -171,24 +172,23 @@ struct Tool {
         std::filesystem::remove(trace);
     }
 
-    Outcome Program(const std::string& bytes, const std::string& base, Options options = {}) {
+    Outcome Program(const std::string& bytes, const std::string& base,
+                    const std::vector<std::string>& more = {}) {
         std::ofstream(image) << bytes;
         Reporter reporter({Talk::Quiet, false, "none"});
         SettingStore settings;
-        options.sim = sim;
-        options.plugin = FLASH_CORVANE_LIBRARY;
-        options.files = {image};
-        options.base = base;
-        Context context{options, reporter, settings};
-        return commands::Program().run(context);
+        std::vector<std::string> words{"program", image, "--base",   base,
+                                       "--sim",   sim,   "--plugin", FLASH_CORVANE_LIBRARY};
+        words.insert(words.end(), more.begin(), more.end());
+        const ParsedLine line = ParseCommandLine(AllCommands(), FollowLine(AllCommands(), words));
+        Context context{line.common, reporter, settings};
+        return line.command->run(context, line.given);
     }
 
     /// The same on a device that stays. How many bytes were erased and written.
     std::pair<int, int> Update(const std::string& bytes, bool rewrite = false) {
-        Options options;
-        options.simFile = contents;
-        options.rewrite = rewrite;
-        options.trace = trace;
+        std::vector<std::string> options{"--sim-file", contents, "--trace", trace};
+        if (rewrite) options.emplace_back("--rewrite");
         const Outcome outcome = Program(bytes, "0", options);
         EXPECT_EQ(outcome.status, ExitStatus::Done) << outcome.error;
         const auto device =

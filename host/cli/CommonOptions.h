@@ -1,0 +1,35 @@
+// The values of the options that every command takes. Texts stay texts: whoever uses one reads it,
+// and says what is wrong with it.
+
+#pragma once
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "host/targets/OpenTarget.h"
+
+namespace host {
+
+struct SettingOptions {
+    std::optional<std::string> settingsFile;
+    std::vector<std::string> set;  ///< as KEY=TEXT
+};
+
+struct OutputOptions {
+    std::string progress = "auto";
+    bool json = false;
+    bool quiet = false;
+    int verbose = 0;
+};
+
+struct CommonOptions : TargetOptions, SettingOptions, OutputOptions {
+    std::optional<std::string> plugin;
+    std::optional<std::string> trace;
+    bool force = false;  ///< existing files may be written over
+
+    /// Those variables of the environment that have named a target.
+    std::vector<std::string> targetVariables;
+};
+
+}  // namespace host

@@ -1,0 +1,55 @@
+// The options that several commands share, as structs for theirs to stand on, and their rows.
+
+#pragma once
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "host/cli/Option.h"
+#include "host/commands/Context.h"
+
+namespace host::commands {
+
+struct RangeChoice {
+    std::optional<std::string> range;
+};
+Option<RangeChoice> RangeOption(const char* help);
+
+struct ImageForm {
+    std::optional<std::string> format;
+    std::optional<std::string> base;
+};
+Option<ImageForm> FormatOption();
+Option<ImageForm> BaseOption();
+
+struct ImageFiles : ImageForm {
+    std::vector<std::string> files;
+};
+Option<ImageFiles> ImagesArgument(bool isRequired);
+
+/// The images that a command names, which from now on are files in use. Failure.
+LoadedImages ReadNamed(Context& context, const std::vector<std::string>& files,
+                       const ImageForm& form);
+
+struct DryRun {
+    bool dryRun = false;
+};
+Option<DryRun> DryRunOption();
+
+struct Comparing {
+    bool noVerify = false;
+};
+Option<Comparing> NoVerifyOption();
+
+struct Committing {
+    bool commit = false;
+};
+Option<Committing> CommitOption();
+
+struct Running {
+    bool run = false;
+};
+Option<Running> RunOption(const char* help);
+
+}  // namespace host::commands
