@@ -1,6 +1,5 @@
 # What `cmake --install` puts where. There are two components: the tool with the libraries that it
-# loads, and what makers of debuggers need besides. The man page and the completions come out of the
-# tool itself, so that they can't drift from its help.
+# loads, and what makers of debuggers need besides.
 
 # The libraries are loaded, not linked, and the maker's logger has the file name of the stand-in:
 # they stay out of the directory that everybody's libraries lie in.

@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
 # guide.sh TOOL [--write]: compares what the documents for makers of hosts take from the tool, the
-# table of settings and the transcript, with what the tool says now; or writes it there.
+# table of settings and the transcript, with what the tool says now, and its man page; or writes them.
 set -euo pipefail
 tool=$(realpath "$1")
-docs=$(cd "$(dirname "$0")/../../docs" && pwd)
+root=$(cd "$(dirname "$0")/../.." && pwd)
+docs=$root/docs
 trial=$(mktemp -d)
 trap 'rm -rf "$trial"' EXIT
 cd "$trial"
@@ -58,4 +59,13 @@ for row in "settings host-guide.md" "transcript host-transcript.md"; do
         failed=1
     fi
 done
+
+manual=$root/host/cli/corvane-flash.1
+"$tool" --man >manual
+if [ "${2:-}" = --write ]; then
+    cp manual "$manual"
+elif ! diff -u "$manual" manual; then
+    echo "the man page isn't what the tool says; run tests/kit/guide.sh build/bin/corvane-flash --write"
+    failed=1
+fi
 exit $failed
