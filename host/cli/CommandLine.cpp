@@ -60,7 +60,7 @@ std::string MissingArgument(const FollowedLine& line) {
     return "";
 }
 
-/// What is wrong with the line; empty when nothing is, but that it may have no command.
+/// What is wrong with the line, empty when nothing is. A line without a command is another matter.
 std::string Complaint(const CommandRows& commands, const FollowedLine& line) {
     const auto below = SecondWords(commands, line.name);
     if (line.command == nullptr && !below.empty())
@@ -94,7 +94,7 @@ std::string Answer(const CommandRows& commands, const FollowedLine& line) {
     return "";
 }
 
-/// What is typed goes before a variable, and so does what is typed in contradiction to it.
+/// A variable counts unless its option is typed, or one that contradicts it.
 bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
     if (*row.environment == '\0' || line.Has(row.LongName())) return false;
     if (line.command->isForSimulated && row.LongName() == "--gdb") return false;

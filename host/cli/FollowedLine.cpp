@@ -23,7 +23,7 @@ std::string AnyOf(const std::vector<std::string>& words) {
     return text;
 }
 
-/// What is wrong with a value, in a sentence; empty for one that the command shall look at.
+/// What is wrong with a value; empty when the rows have nothing against it.
 std::string Objection(const OptionRow& row, const std::string& value) {
     const std::string name = row.LongName();
     if (row.offers == Offers::Files && value.empty())

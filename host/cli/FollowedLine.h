@@ -1,13 +1,14 @@
 // A command line followed word by word through the tables of commands and options. The parser reads
 // from it what was asked for, the completion what may come next.
 //
-// What a word is, the first that fits:
-//   the value of `awaited`   when the option before it takes one: whatever the word is, but "--"
-//   "--"                     the end of the options
-//   an option                one that begins with "-" (not "-" itself), until the options have
-//   ended a word of the command    until `name` is that of a command an argument              of
-//   the command, as many as it takes a stray                  anything else; behind one that is no
-//   option, none names the command
+// A word is the first of these that fits:
+// - the value of `awaited`, when the option before it takes one: any word but "--"
+// - "--", the end of the options
+// - an option: it begins with "-", isn't "-" itself, and the options haven't ended
+// - a word of the command's name, until `name` is that of a command
+// - an argument, while the command takes one more
+// - a stray: it has no place in the line. No word behind a stray names the command, unless the
+//   stray looks like an option.
 
 #pragma once
 

@@ -9,8 +9,8 @@
 
 namespace host {
 
-// What is typed beats the variables of the other kind, so that two kinds without a typed option
-// stem from variables alone.
+// A typed option silences the variables of the other kind of target. So two kinds can only come
+// from two variables, or from two typed options, which are refused where the target is opened.
 const TargetOptions& TargetOf(const CommonOptions& options) {
     if (options.gdb && (options.sim || options.simFile) && !options.targetVariables.empty())
         throw Failure(ExitStatus::WrongUsage,

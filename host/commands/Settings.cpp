@@ -82,7 +82,7 @@ Outcome Forget(Context& context, const std::string& key) {
 Outcome RunSettings(Context& context, const SettingsOptions& options) {
     if (options.forget && options.setting)
         throw Failure(ExitStatus::WrongUsage,
-                      fmt::format("--forget {} and {} are two wishes; say one at a time",
+                      fmt::format("--forget {} and {} don't go together; name one of them",
                                   *options.forget, *options.setting));
     if (options.forget) return Forget(context, *options.forget);
     if (!options.setting) return List(context);

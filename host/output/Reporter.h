@@ -1,5 +1,5 @@
-// Everything that the tool says: results on standard output, talk and progress on standard error,
-// or JSON lines on standard output and everything else on standard error.
+// Everything that the tool says: results on standard output, messages and progress on standard
+// error, or JSON lines on standard output and everything else on standard error.
 
 #pragma once
 
