@@ -23,10 +23,10 @@ namespace host {
 namespace {
 
 Reporter::Options ReporterOptions(const CommonOptions& options) {
-    const int talk = options.quiet ? 0 : std::min(options.verbose, 2) + 1;
+    const int level = options.quiet ? 0 : std::min(options.verbose, 2) + 1;
     // A trace on the same stream and a bar would spoil each other.
     const bool traced = options.trace == "-" && options.progress == "auto";
-    return {static_cast<Talk>(talk), options.json, traced ? "none" : options.progress};
+    return {static_cast<Verbosity>(level), options.json, traced ? "none" : options.progress};
 }
 
 /// What was published on the way is worth keeping after a failure as well; that it can't be kept
@@ -35,12 +35,12 @@ Reporter::Options ReporterOptions(const CommonOptions& options) {
 std::optional<FileBusy> SaveSettings(const Context& context) try {
     if (!context.isDryRun)
         context.settings.Save(
-            [&](const std::string& text) { context.reporter.Say(Talk::Normal, text); });
+            [&](const std::string& text) { context.reporter.Say(Verbosity::Normal, text); });
     return std::nullopt;
 } catch (const FileBusy& busy) {
     return busy;
 } catch (const Failure& failure) {
-    context.reporter.Say(Talk::Verbose, failure.what());
+    context.reporter.Say(Verbosity::Verbose, failure.what());
     return std::nullopt;
 }
 
@@ -102,7 +102,7 @@ int RunTool(const std::vector<std::string>& words) {
     // Whoever asked for JSON gets the end line of a command line that can't be read, too.
     const FollowedLine followed = FollowLine(AllCommands(), words);
     ParsedLine line;
-    Reporter early({Talk::Normal, followed.Has("--json"), "none"});
+    Reporter early({Verbosity::Normal, followed.Has("--json"), "none"});
     Outcome outcome = Guarded(early, [&] {
         line = ParseCommandLine(AllCommands(), followed);
         return Outcome{};

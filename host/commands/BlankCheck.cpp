@@ -14,7 +14,7 @@ namespace {
 
 Outcome BlankCheckOn(Context& context, FlashDevice& device, const RangeChoice& options) {
     const base::AddressRange range = ChooseRange(device, kBlankCheckKeys, options.range);
-    Outcome outcome = RunOperation(device, plugin::kBlankCheck, Talk::Verbose);
+    Outcome outcome = RunOperation(device, plugin::kBlankCheck, Verbosity::Verbose);
     outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
     context.reporter.Result(RangeText(range) + " is blank");
     return outcome;

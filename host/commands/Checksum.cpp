@@ -65,7 +65,8 @@ Outcome OfImage(Context& context, const ChecksumOptions& options) {
 Outcome OfFlash(Context& context, const ChecksumOptions& options) {
     return WithDevice(context, [&](FlashDevice& device) {
         const base::AddressRange range = ChooseRange(device, kChecksumKeys, options.range);
-        const Outcome operation = RunOperation(device, plugin::kCalculateChecksum, Talk::Verbose);
+        const Outcome operation =
+            RunOperation(device, plugin::kCalculateChecksum, Verbosity::Verbose);
         Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
         outcome.result.update(operation.result);
         return outcome;

@@ -33,7 +33,7 @@ Outcome EraseOn(Context& context, FlashDevice& device, const EraseOptions& optio
     }
     device.AddToFailures(members);
     const bool verify = !options.noVerify;
-    Outcome outcome = RunOperation(device, plugin::kErase, Talk::Verbose, verify);
+    Outcome outcome = RunOperation(device, plugin::kErase, Verbosity::Verbose, verify);
     outcome.result.update(members);
     if (outcome.status == ExitStatus::Done)
         context.reporter.Done(verify ? fmt::format("Done: {} is blank", RangeText(covered))

@@ -21,7 +21,7 @@ struct MacOptions : Committing {
 
 /// Read through the plug-in; the host has padded it to two digits a byte.
 std::string ReadMac(FlashDevice& device) {
-    device.Perform(plugin::kReadMac, Talk::Verbose);
+    device.Perform(plugin::kReadMac, Verbosity::Verbose);
     return device.Published(keys::kMacInput);
 }
 

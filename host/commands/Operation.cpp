@@ -63,7 +63,7 @@ Json Found(const FlashDevice& device, const std::string& name) {
 }
 
 Outcome OperationOn(FlashDevice& device, const std::string& name) {
-    Outcome outcome = RunOperation(device, name, Talk::Normal);
+    Outcome outcome = RunOperation(device, name, Verbosity::Normal);
     outcome.result.update(Found(device, name));
     const auto& registers = device.UserRegisters().registers;
     const RegisterValues written{registers[0].written, registers[1].written};

@@ -65,20 +65,20 @@ std::uint64_t KeepOthers(FlashDevice& device, LoadedImages& images, const EraseC
 void ShowPlan(Context& context, const DeviceInfo& info, const LoadPlan& plan, std::uint64_t kept) {
     const std::string keeping =
         kept == 0 ? "" : fmt::format(" ({} of it kept from the flash)", SizeText(kept));
-    context.reporter.Say(
-        Talk::Normal, fmt::format("{}{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
-                                  keeping, CountText(plan.sections.size(), "section"), info.family,
-                                  SizeText(info.flashBytes)));
+    context.reporter.Say(Verbosity::Normal,
+                         fmt::format("{}{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
+                                     keeping, CountText(plan.sections.size(), "section"),
+                                     info.family, SizeText(info.flashBytes)));
     for (const std::string& line : Describe(plan, GeometryOf(info))) {
         if (context.isDryRun)
             context.reporter.Result(line);
         else
-            context.reporter.Say(Talk::Verbose, line);
+            context.reporter.Say(Verbosity::Verbose, line);
     }
 }
 
 void ShowUnchanged(Reporter& reporter, const LoadPlan& plan) {
-    if (plan.unchangedBytes != 0 && reporter.Hears(Talk::Normal))
+    if (plan.unchangedBytes != 0 && reporter.Hears(Verbosity::Normal))
         reporter.Result(fmt::format("{:<13} {}", "Left alone", SizeText(plan.unchangedBytes)));
 }
 

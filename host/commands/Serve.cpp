@@ -19,7 +19,7 @@ Outcome RunServe(Context& context, const ServeOptions& options) {
     TargetServer server(
         TargetOf(context.options), options.address,
         [&](const std::string& text) { reporter.Error(text); },
-        [&](const std::string& text) { reporter.Say(Talk::Normal, text); });
+        [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); });
     const Json where{{"host", server.Where().host}, {"port", server.Port()}};
     reporter.Listening(server.Where().Text(), where);
     server.Run();

@@ -25,7 +25,7 @@ Json ToJson(const Context& context, const SettingInfo& info) {
 
 void ShowOne(Context& context, const SettingInfo& info) {
     const auto [text, origin] = context.settings.Get(info.key);
-    if (!context.reporter.Hears(Talk::Normal)) return context.reporter.Result(text);
+    if (!context.reporter.Hears(Verbosity::Normal)) return context.reporter.Result(text);
     context.reporter.Result(fmt::format("{} = \"{}\"  ({})", info.key, text,
                                         OriginText(origin, context.settings.Paths())));
     context.reporter.Result(fmt::format("    {}; takes {}", info.meaning, AcceptedTexts(info)));
@@ -34,7 +34,7 @@ void ShowOne(Context& context, const SettingInfo& info) {
 Outcome List(Context& context) {
     Json all = Json::array();
     for (const SettingInfo& info : SettingCatalogue()) {
-        if (context.reporter.Hears(Talk::Normal))
+        if (context.reporter.Hears(Verbosity::Normal))
             ShowOne(context, info);
         else
             context.reporter.Result(
@@ -42,7 +42,7 @@ Outcome List(Context& context) {
         all.push_back(ToJson(context, info));
     }
     const SettingPaths& paths = context.settings.Paths();
-    context.reporter.Say(Talk::Verbose,
+    context.reporter.Say(Verbosity::Verbose,
                          fmt::format("Your file: {}\nKept values: {}", paths.user, paths.kept));
     return {.result = {{"settings", all}}};
 }
@@ -50,7 +50,7 @@ Outcome List(Context& context) {
 /// Keeping is what the command is for, so that it fails when nothing can be kept.
 void Save(Context& context) {
     context.settings.Save(
-        [&](const std::string& text) { context.reporter.Say(Talk::Normal, text); });
+        [&](const std::string& text) { context.reporter.Say(Verbosity::Normal, text); });
 }
 
 Outcome Keep(Context& context, const SettingInfo& info, const std::string& text) {
@@ -65,7 +65,7 @@ Outcome Keep(Context& context, const SettingInfo& info, const std::string& text)
     const auto [now, origin] = context.settings.Get(info.key);
     ShowOne(context, info);
     if (origin < Origin::Kept)
-        context.reporter.Say(Talk::Normal,
+        context.reporter.Say(Verbosity::Normal,
                              fmt::format("Kept \"{}\", but the value of the {} goes before it",
                                          checked, OriginText(origin, context.settings.Paths())));
     return {.result = ToJson(context, info)};

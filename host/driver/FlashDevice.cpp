@@ -44,7 +44,7 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
     : settings_(settings),
       reporter_(reporter),
       target_(Open(options.target, LinesTo(options.trace),
-                   [&](const std::string& text) { reporter.Say(Talk::Normal, text); })),
+                   [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); })),
       meter_(reporter),
       watch_(meter_),
       loader_(target_->Get(), watch_),
@@ -60,7 +60,7 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
     Create();
     Initialize();
     identified_ = true;
-    reporter_.Say(Talk::Verbose, fmt::format("Plug-in {}", library_.Path()));
+    reporter_.Say(Verbosity::Verbose, fmt::format("Plug-in {}", library_.Path()));
 }
 
 void FlashDevice::Create() {
@@ -149,11 +149,11 @@ std::string FlashDevice::AwaitLoader() try {
     return error.what();
 }
 
-void FlashDevice::Perform(const std::string& operation, Talk level) {
+void FlashDevice::Perform(const std::string& operation, Verbosity level) {
     host_.SetMessageLevel(level);
     Call("operation " + operation, "PerformOperation " + operation, [&] {
         const char* error = device_->PerformOperation(operation.c_str());
-        host_.SetMessageLevel(Talk::Normal);
+        host_.SetMessageLevel(Verbosity::Normal);
         return error;
     });
 }

@@ -71,7 +71,7 @@ class FlashDevice final : public FlashReader {
     void LimitLastChunk(std::chrono::milliseconds limit) { loader_.SetLimit(limit); }
 
     /// Runs a named operation, its messages shown at `level`.
-    void Perform(const std::string& operation, Talk level = Talk::Normal);
+    void Perform(const std::string& operation, Verbosity level = Verbosity::Normal);
 
     /// What the last call has published. Failure (DeviceFailed) when it is nothing.
     std::string Published(const std::string& key) const;

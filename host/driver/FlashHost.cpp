@@ -156,10 +156,10 @@ const char* FlashHost::ShowError(const char* text) {
         const bool echo = !errors_.empty() && std::string_view(text).ends_with(plugin::kStepFailed);
         errors_.emplace_back(text);
         if (Interrupted())
-            reporter_.PluginMessage(Talk::Verbose, text);
+            reporter_.PluginMessage(Verbosity::Verbose, text);
         else
-            reporter_.PluginError(echo || watch_.FirstNotBlank() ? Talk::Verbose : Talk::Quiet,
-                                  text);
+            reporter_.PluginError(
+                echo || watch_.FirstNotBlank() ? Verbosity::Verbose : Verbosity::Quiet, text);
     });
 }
 
@@ -171,7 +171,7 @@ const char* FlashHost::ShowMessage(const char* text) {
             message.replace(message.size() - publishedMac_.size(), publishedMac_.size(),
                             settings_.Published(keys::kMacInput));
         const bool told = message == plugin::kStepDone;
-        reporter_.PluginMessage(told ? std::max(messageLevel_, Talk::Verbose) : messageLevel_,
+        reporter_.PluginMessage(told ? std::max(messageLevel_, Verbosity::Verbose) : messageLevel_,
                                 message);
     });
 }

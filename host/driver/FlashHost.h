@@ -27,7 +27,7 @@ class FlashHost final : public IFlashHost {
     const std::vector<std::string>& Errors() const { return errors_; }
 
     /// The level at which the plug-in's messages are shown; errors are always shown.
-    void SetMessageLevel(Talk level) { messageLevel_ = level; }
+    void SetMessageLevel(Verbosity level) { messageLevel_ = level; }
 
     /// To be called around each call into the plug-in: what an earlier one left doesn't count for
     /// it, and no display may be open when it returns.
@@ -89,7 +89,7 @@ class FlashHost final : public IFlashHost {
     std::string publishedMac_;
     std::vector<std::string> errors_;
     RegisterWatch registers_;
-    Talk messageLevel_ = Talk::Normal;
+    Verbosity messageLevel_ = Verbosity::Normal;
     bool closing_ = false;
     bool displayOpen_ = false;
 };

@@ -48,7 +48,7 @@ std::optional<base::AddressRange> Announce(FlashDevice& device, const RangeOpera
     device.Meter().Expect(operation.phase, covered->Size());
     if (operation.phase != Phase::Erase) return std::nullopt;
     device.Output().Say(
-        Talk::Normal,
+        Verbosity::Normal,
         fmt::format("Erase covers {}: {}", RangeText(*covered),
                     CountText(SectorCount(*covered, GeometryOf(device.Info())), "sector")));
     if (!verifyErase) return std::nullopt;
@@ -65,7 +65,8 @@ base::AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
     return range;
 }
 
-Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level, bool verifyErase) {
+Outcome RunOperation(FlashDevice& device, const std::string& name, Verbosity level,
+                     bool verifyErase) {
     std::optional<base::AddressRange> erased;
     for (const RangeOperation& operation : kRangeOperations)
         if (name == operation.name) erased = Announce(device, operation, verifyErase);

@@ -23,7 +23,7 @@ base::AddressRange ChooseRange(FlashDevice& device, const RangeKeys& keys,
 /// any of the plug-in's, its messages shown at `level`; reads back what an erase has covered unless
 /// that is unwanted; and shows the summary. The outcome holds the phases, and is a failure
 /// (ContentsDiffer) when the erased range isn't blank.
-Outcome RunOperation(FlashDevice& device, const std::string& name, Talk level,
+Outcome RunOperation(FlashDevice& device, const std::string& name, Verbosity level,
                      bool verifyErase = true);
 
 }  // namespace host

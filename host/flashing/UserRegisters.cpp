@@ -13,7 +13,7 @@
 namespace host {
 
 std::uint32_t ReadRegister(FlashDevice& device, unsigned index) {
-    device.Perform(plugin::ReadRegisterOperation(index), Talk::Verbose);
+    device.Perform(plugin::ReadRegisterOperation(index), Verbosity::Verbose);
     return PublishedRegister(device, index);
 }
 
@@ -26,7 +26,7 @@ void ChooseCommit(SettingStore& settings, Reporter& reporter, const char* key, b
     if (asked) return settings.Set(Origin::CommandLine, key, "1");
     const auto [text, origin] = settings.Get(key);
     if (origin == Origin::Default) return;
-    reporter.Say(Talk::Normal,
+    reporter.Say(Verbosity::Normal,
                  fmt::format("{} is {} ({})", key, text, OriginText(origin, settings.Paths())));
 }
 
@@ -52,7 +52,7 @@ void SayWhetherCommitted(Reporter& reporter, const UserRegisterWork& work, Outco
     });
     outcome.result["committed"] = committed;
     if (outcome.status != ExitStatus::Done) return;
-    reporter.Say(Talk::Normal,
+    reporter.Say(Verbosity::Normal,
                  committed ? "Committed: the value stays after a reset."
                            : "Not committed: the next reset of the device (a simulated one is "
                              "reset after each run) brings back what was committed last; "

@@ -25,8 +25,8 @@ bool WantsColour(std::FILE* stream) {
 }
 
 ProgressStyle Style(const Reporter::Options& options) {
-    return options.talk == Talk::Quiet ? ProgressStyle::None
-                                       : ChooseStyle(options.progress, stderr);
+    return options.verbosity == Verbosity::Quiet ? ProgressStyle::None
+                                                 : ChooseStyle(options.progress, stderr);
 }
 
 }  // namespace
@@ -49,7 +49,7 @@ void Reporter::Data(const std::string& bytes) {
     Write(stdout, bytes);
 }
 
-void Reporter::Say(Talk level, const std::string& text) {
+void Reporter::Say(Verbosity level, const std::string& text) {
     if (!Hears(level)) return;
     JsonLine("message", {{"from", "host"}, {"level", "info"}, {"text", text}});
     Line(stderr, text);
@@ -61,12 +61,12 @@ void Reporter::Listening(const std::string& address, const Json& parts) {
     std::fflush(out_);
 }
 
-void Reporter::PluginMessage(Talk level, const std::string& text) {
+void Reporter::PluginMessage(Verbosity level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "info"}, {"text", text}});
     if (Hears(level)) Line(stderr, text);
 }
 
-void Reporter::PluginError(Talk level, const std::string& text) {
+void Reporter::PluginError(Verbosity level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "error"}, {"text", text}});
     if (Hears(level)) ClosingError(text);
 }

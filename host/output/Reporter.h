@@ -14,7 +14,7 @@
 
 namespace host {
 
-enum class Talk { Quiet, Normal, Verbose, Debug };
+enum class Verbosity { Quiet, Normal, Verbose, Debug };
 
 /// How a command ended. A failure whose text has been shown already leaves `error` to the JSON.
 struct Outcome {
@@ -27,7 +27,7 @@ struct Outcome {
 class Reporter {
   public:
     struct Options {
-        Talk talk = Talk::Normal;
+        Verbosity verbosity = Verbosity::Normal;
         bool json = false;
         std::string progress = "auto";
     };
@@ -43,19 +43,19 @@ class Reporter {
     void Data(const std::string& bytes);
 
     /// A line for those who want to hear this much.
-    void Say(Talk level, const std::string& text);
+    void Say(Verbosity level, const std::string& text);
 
     /// What the command has done, the last line of its summary.
     void Done(const std::string& text) {
-        if (Hears(Talk::Normal)) Result(text);
+        if (Hears(Verbosity::Normal)) Result(text);
     }
 
     /// Where clients may connect from now on: as text, and its parts for JSON.
     void Listening(const std::string& address, const Json& parts);
 
     /// A message or an error that the plug-in shows its user.
-    void PluginMessage(Talk level, const std::string& text);
-    void PluginError(Talk level, const std::string& text);
+    void PluginMessage(Verbosity level, const std::string& text);
+    void PluginError(Verbosity level, const std::string& text);
 
     /// An error beside the one that the command ends with.
     void Error(const std::string& text);
@@ -74,7 +74,7 @@ class Reporter {
     /// How wide the terminal is that shows results.
     std::size_t Columns() const { return TerminalColumns(out_); }
 
-    bool Hears(Talk level) const { return options_.talk >= level; }
+    bool Hears(Verbosity level) const { return options_.verbosity >= level; }
 
   private:
     void JsonLine(const char* event, const Json& members);

@@ -9,7 +9,7 @@
 namespace host {
 
 void ShowSummary(Reporter& reporter, const PhaseRecord& phases) {
-    if (!reporter.Hears(Talk::Normal)) return;
+    if (!reporter.Hears(Verbosity::Normal)) return;
     for (std::size_t i = 0; i < kPhaseNames.size(); ++i) {
         const PhaseProgress& progress = phases[static_cast<Phase>(i)];
         if (progress.doneBytes == 0) continue;

@@ -443,7 +443,7 @@ struct HostUnderTest {
 
     target::SimulatedDevice target;
     SettingStore settings;
-    Reporter reporter{Reporter::Options{Talk::Quiet, false, "none"}};
+    Reporter reporter{Reporter::Options{Verbosity::Quiet, false, "none"}};
     WorkMeter meter{reporter};
     FlashWatch watch{meter};
     FlashHost host{target, settings, reporter, watch, "dir/"};

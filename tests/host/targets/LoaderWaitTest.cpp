@@ -175,7 +175,7 @@ struct Tool {
     Outcome Program(const std::string& bytes, const std::string& base,
                     const std::vector<std::string>& more = {}) {
         std::ofstream(image) << bytes;
-        Reporter reporter({Talk::Quiet, false, "none"});
+        Reporter reporter({Verbosity::Quiet, false, "none"});
         SettingStore settings;
         std::vector<std::string> words{"program", image, "--base",   base,
                                        "--sim",   sim,   "--plugin", FLASH_CORVANE_LIBRARY};
