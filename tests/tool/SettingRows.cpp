@@ -47,11 +47,6 @@ const Row kSettingStories[] = {
      "c=$?; kill $a $b; exit $c",
      4, "3\n", "another run has been using the contents file of the simulated device d for 10 s"},
     {"tool settings | head -1", 0, "FlashProgramOption", ""},
-    {"tool --settings wrong.toml completion bash >c; PATH=" CORVANE_FLASH_DIRECTORY
-     ":$PATH bash -c '. "
-     "./c; COMP_LINE=\"corvane-flash program --erase=n\" COMP_POINT=31 COMP_CWORD=4 "
-     "COMP_WORDS=(corvane-flash program --erase = n); _corvane_flash; echo \"${COMPREPLY[@]}\"'",
-     0, "necessary none\n", ""},
 };
 
 INSTANTIATE_TEST_SUITE_P(Setting, CommandLineStory, testing::ValuesIn(kSettingStories));
