@@ -172,7 +172,7 @@ const LineRow kOffers[] = {
     {"program -v -",
      "--format --base --erase --keep --blank-check --crc --rewrite --no-verify --run --dry-run "
      "--sim --sim-file --gdb --gdb-option --loader --settings --set --plugin --trace --force "
-     "--progress --json -q --quiet --help"},
+     "--progress --json -q --quiet -v --verbose --help"},
     {"program ''", ":files"},
     {"program -- x --", ":files"},
     {"program --erase a", "all"},
