@@ -220,9 +220,11 @@ void FlashController::EraseEnabledBlocks(const Running& erase, Time now) {
         return unsettled_.Erase(erase.address, erase.sizeBytes, now);
     }
     const std::uint32_t end = erase.address + erase.sizeBytes;
-    for (std::uint32_t start = erase.address, next = start; start < end; start = next) {
-        next = std::min(end, (start / kFlashBlockSizeBytes + 1) * kFlashBlockSizeBytes);
+    for (std::uint32_t start = erase.address; start < end;) {
+        const std::uint32_t next =
+            std::min(end, (start / kFlashBlockSizeBytes + 1) * kFlashBlockSizeBytes);
         if (IsBlockEnabled(start)) unsettled_.Erase(start, next - start, now);
+        start = next;
     }
 }
 

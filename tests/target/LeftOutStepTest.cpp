@@ -22,7 +22,6 @@ namespace {
 using test::Plugin;
 using test::RecordingHost;
 using test::Settings;
-using test::TextOf;
 using Bytes = std::vector<std::uint8_t>;
 
 /// What an access is to whoever reads the plug-in: which register, or what in RAM and flash.
