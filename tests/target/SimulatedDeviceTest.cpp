@@ -199,10 +199,10 @@ TEST(Rules, RefusedAccessNamesTheRule) {
          }},
     };
     for (const auto& [text, access] : cases) {
-        DebuggedDevice rig;
-        const std::string error = ErrorOf([&, &run = access] { run(rig); });
+        DebuggedDevice debugged;
+        const std::string error = ErrorOf([&, &run = access] { run(debugged); });
         EXPECT_TRUE(error.ends_with(text)) << error << " instead of " << text;
-        EXPECT_EQ(rig.device.Violations(), std::vector{error});
+        EXPECT_EQ(debugged.device.Violations(), std::vector{error});
     }
 }
 
@@ -219,24 +219,25 @@ TEST(WriteKey, WrongOneDoesNothing) {
                  {"dorna,keyconfig=0x10", 0xA442, 0x71D5},
                  {"dorna", 0x71D5, 0}};
     for (const auto& [options, right, wrong] : cases) {
-        DebuggedDevice rig(options);
-        rig.device.Flash().Preset(0x4000, Bytes{0});
+        DebuggedDevice debugged(options);
+        debugged.device.Flash().Preset(0x4000, Bytes{0});
         for (const std::uint32_t key : {wrong, right}) {
             for (const std::uint32_t command : {2U, 4U, 8U}) {
-                rig.SetWord(kUser0, command);
-                rig.Command(command == 8   ? 0x80000000
-                            : command == 4 ? 0
-                                           : 0x4000,
-                            key << 16 | command);
-                if (command != 8) rig.device.Pause(2 * command);  // shows by then
-                EXPECT_EQ(rig.Word(kFlashCommand), key == right ? command : 0) << options;
-                rig.device.Pause(100);
-                EXPECT_EQ(rig.Word(kFlashCommand), 0U) << options;
+                debugged.SetWord(kUser0, command);
+                debugged.Command(command == 8   ? 0x80000000
+                                 : command == 4 ? 0
+                                                : 0x4000,
+                                 key << 16 | command);
+                if (command != 8) debugged.device.Pause(2 * command);  // shows by then
+                EXPECT_EQ(debugged.Word(kFlashCommand), key == right ? command : 0) << options;
+                debugged.device.Pause(100);
+                EXPECT_EQ(debugged.Word(kFlashCommand), 0U) << options;
             }
-            EXPECT_EQ(rig.Flash(0x4000, 1)[0], key == right ? 0xFF : 0) << options;
-            EXPECT_EQ(rig.device.CommittedUserRegisters()[0], key == right ? 8 : kBusy) << options;
+            EXPECT_EQ(debugged.Flash(0x4000, 1)[0], key == right ? 0xFF : 0) << options;
+            EXPECT_EQ(debugged.device.CommittedUserRegisters()[0], key == right ? 8 : kBusy)
+                << options;
         }
-        EXPECT_EQ(rig.device.Violations().size(), 3U);
+        EXPECT_EQ(debugged.device.Violations().size(), 3U);
     }
 }
 
@@ -293,11 +294,11 @@ TEST(Rules, WaitsAreExact) {
     for (const auto& [rule, device, waitMs, before, after] : cases) {
         for (const bool enough : {false, true}) {
             SCOPED_TRACE(testing::Message() << rule << " " << waitMs << " " << enough);
-            DebuggedDevice rig(device + std::string(",latency=0,bandwidth=0"));
-            before(rig);
-            rig.device.Pause(enough ? waitMs : waitMs - 1);
-            after(rig);
-            const auto broken = rig.device.TakeViolations();
+            DebuggedDevice debugged(device + std::string(",latency=0,bandwidth=0"));
+            before(debugged);
+            debugged.device.Pause(enough ? waitMs : waitMs - 1);
+            after(debugged);
+            const auto broken = debugged.device.TakeViolations();
             EXPECT_EQ(broken.empty(), enough);
             for (const std::string& text : broken)
                 EXPECT_TRUE(text.ends_with(std::string("[") + rule + "]")) << text;
@@ -309,75 +310,76 @@ TEST(Rules, WaitsAreExact) {
 TEST(Rules, ClockTakesExactWords) {
     for (std::size_t word = 0; word < 3; ++word) {
         for (int bit = 0; bit < 32; ++bit) {
-            Rig rig("ravik", false);
-            rig.SetWord(0x400FE140, 7);
-            rig.device.Pause(16);
+            DebuggedDevice debugged("ravik", false);
+            debugged.SetWord(0x400FE140, 7);
+            debugged.device.Pause(16);
             std::array<std::uint32_t, 3> words = {0x01803FF3, 0x01803F80, 0x07803F82};
             words[word] ^= 1U << bit;
-            rig.SetClock(words);
-            rig.device.Pause(16);
-            rig.Command(0, 0xA4420002);
+            debugged.SetClock(words);
+            debugged.device.Pause(16);
+            debugged.Command(0, 0xA4420002);
             const bool free = word == 1 && (0x079E0000 >> bit & 1) != 0;
-            EXPECT_EQ(rig.device.Violations().empty(), free) << word << " " << bit;
+            EXPECT_EQ(debugged.device.Violations().empty(), free) << word << " " << bit;
         }
     }
 }
 
 TEST(Rules, WatchdogsAreResetAtAnyTime) {
-    Rig rig("pell");
-    rig.device.Reset(true);
-    rig.SetWord(0x400FE040, 0x10000008);
-    rig.device.Pause(4);
-    rig.HoldPeripherals(kBusy);
-    rig.device.Pause(4);
-    rig.HoldPeripherals(0);
-    rig.SetWord(0x400FE040, 0x10000008);
-    rig.Command(0, 0xA4420002);
-    EXPECT_EQ(rig.device.Violations(), std::vector<std::string>());
+    DebuggedDevice debugged("pell");
+    debugged.device.Reset(true);
+    debugged.SetWord(0x400FE040, 0x10000008);
+    debugged.device.Pause(4);
+    debugged.HoldPeripherals(kBusy);
+    debugged.device.Pause(4);
+    debugged.HoldPeripherals(0);
+    debugged.SetWord(0x400FE040, 0x10000008);
+    debugged.Command(0, 0xA4420002);
+    EXPECT_EQ(debugged.device.Violations(), std::vector<std::string>());
 }
 
 // Of what was erased too short a time before, only the pages that are programmed come back.
 TEST(Erase, IsUndoneForThePagesInUse) {
     for (const std::uint32_t address : {0x780U, 0x800U}) {
-        Rig rig("ravik");
-        rig.device.Flash().Preset(0x400, Bytes(0x800, 0xAA));
+        DebuggedDevice debugged("ravik");
+        debugged.device.Flash().Preset(0x400, Bytes(0x800, 0xAA));
         for (const std::uint32_t sector : {0x400U, 0x800U}) {
-            rig.Command(sector, 0xA4420002);
-            rig.device.Pause(12);
+            debugged.Command(sector, 0xA4420002);
+            debugged.device.Pause(12);
         }
-        rig.device.Reset(false);
-        rig.Program(address);
-        EXPECT_EQ(rig.Cells(0x700, 1)[0], address == 0x780 ? 0xAA : 0xFF);
-        EXPECT_EQ(rig.Cells(0x900, 1)[0], address == 0x780 ? 0xFF : 0xAA);
+        debugged.device.Reset(false);
+        debugged.Program(address);
+        EXPECT_EQ(debugged.Cells(0x700, 1)[0], address == 0x780 ? 0xAA : 0xFF);
+        EXPECT_EQ(debugged.Cells(0x900, 1)[0], address == 0x780 ? 0xFF : 0xAA);
     }
 }
 
 TEST(Registers, AreTransferredInARow) {
-    Rig rig("mesk");
+    DebuggedDevice debugged("mesk");
     const std::uint32_t words[] = {0x11, 0x22};
-    rig.device.Write(words, 2, kUser0, 1, 4);
+    debugged.device.Write(words, 2, kUser0, 1, 4);
     std::uint32_t read[2] = {};
-    rig.device.Read(read, 2, kUser0, 1, 4);
+    debugged.device.Read(read, 2, kUser0, 1, 4);
     EXPECT_TRUE(std::equal(std::begin(words), std::end(words), read));
 }
 
 TEST(Erase, TakesPollsAndKeepsToItsSector) {
-    DebuggedDevice rig("velk,sector=2K");
-    rig.device.Flash().Preset(0, Bytes(0x3000, 0));
-    const auto polls = [&rig](std::uint32_t address, std::uint32_t command, std::uint32_t pauseMs) {
-        rig.Command(address, command);
+    DebuggedDevice debugged("velk,sector=2K");
+    debugged.device.Flash().Preset(0, Bytes(0x3000, 0));
+    const auto polls = [&debugged](std::uint32_t address, std::uint32_t command,
+                                   std::uint32_t pauseMs) {
+        debugged.Command(address, command);
         int busy = 0;
-        for (rig.device.Pause(pauseMs); rig.Word(kFlashCommand) != 0; ++busy) {
-            rig.device.Pause(pauseMs);
+        for (debugged.device.Pause(pauseMs); debugged.Word(kFlashCommand) != 0; ++busy) {
+            debugged.device.Pause(pauseMs);
         }
         return busy;
     };
     EXPECT_EQ(polls(0x800, 0x71D50002, 5), 1);
     Bytes expected(0x3000, 0);
     std::fill_n(expected.begin() + 0x800, 0x800, std::uint8_t{0xFF});
-    EXPECT_EQ(rig.Flash(0, 0x3000), expected);
+    EXPECT_EQ(debugged.Flash(0, 0x3000), expected);
     EXPECT_EQ(polls(0x20000, 0x71D50004, 10), 5);
-    EXPECT_EQ(rig.device.FlashContents(), Bytes(0x80000, 0xFF));
+    EXPECT_EQ(debugged.device.FlashContents(), Bytes(0x80000, 0xFF));
 }
 
 TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
@@ -395,65 +397,66 @@ TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
                  {"128K", {0, 0, 0, 0x80000000}, false},
                  {"256K", {kBusy, kBusy, kBusy, kBusy}, true}};
     for (const auto& c : cases) {
-        DebuggedDevice rig(std::string("mesk,flash=") + c.flash);
+        DebuggedDevice debugged(std::string("mesk,flash=") + c.flash);
         for (std::uint32_t i = 0; i < 4; ++i) {
-            rig.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
-            rig.device.Pause(8);
+            debugged.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
+            debugged.device.Pause(8);
         }
-        rig.Command(0, 0xA4420004);
-        rig.device.Pause(8);
-        EXPECT_EQ(rig.Word(kFlashCommand) == 4, c.erases) << c.flash;
-        EXPECT_EQ(rig.device.Violations().empty(), c.erases);
+        debugged.Command(0, 0xA4420004);
+        debugged.device.Pause(8);
+        EXPECT_EQ(debugged.Word(kFlashCommand) == 4, c.erases) << c.flash;
+        EXPECT_EQ(debugged.device.Violations().empty(), c.erases);
     }
 }
 
 TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
-    DebuggedDevice rig;
+    DebuggedDevice debugged;
     const Bytes image = Pattern(5 * 2048 + 128);
-    rig.StartLoader();
-    EXPECT_EQ(rig.Word(kStatus[1]), 0U);
+    debugged.StartLoader();
+    EXPECT_EQ(debugged.Word(kStatus[1]), 0U);
     int block = 0;
     for (std::uint32_t offset = 0; offset < image.size(); offset += 2048, block ^= 1) {
         const auto end = std::min<std::ptrdiff_t>(offset + 2048, std::ssize(image));
-        rig.HandOver(block, 0x1000 + offset, Bytes(image.begin() + offset, image.begin() + end));
-        EXPECT_EQ(rig.Word(kStatus[block]), kBusy);
-        EXPECT_EQ(rig.Word(kStatus[block ^ 1]), 0U) << "a poll found a default loader busy";
+        debugged.HandOver(block, 0x1000 + offset,
+                          Bytes(image.begin() + offset, image.begin() + end));
+        EXPECT_EQ(debugged.Word(kStatus[block]), kBusy);
+        EXPECT_EQ(debugged.Word(kStatus[block ^ 1]), 0U) << "a poll found a default loader busy";
     }
-    rig.device.Pause(1);
-    EXPECT_EQ(rig.Flash(0x1000, image.size()), image);
-    EXPECT_EQ(rig.device.LoaderBusyTime(), 6 * 200us);
-    EXPECT_TRUE(rig.device.Violations().empty());
+    debugged.device.Pause(1);
+    EXPECT_EQ(debugged.Flash(0x1000, image.size()), image);
+    EXPECT_EQ(debugged.device.LoaderBusyTime(), 6 * 200us);
+    EXPECT_TRUE(debugged.device.Violations().empty());
 }
 
 TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
-    DebuggedDevice rig("tolva,chunk-time=10ms,latency=0,bandwidth=0");
-    rig.StartLoader();
-    rig.HandOver(1, 0x800, Pattern(128));  // must wait for block 0
-    rig.clock.Advance(1s);
-    rig.HandOver(0, 0, Pattern(128));
+    DebuggedDevice debugged("tolva,chunk-time=10ms,latency=0,bandwidth=0");
+    debugged.StartLoader();
+    debugged.HandOver(1, 0x800, Pattern(128));  // must wait for block 0
+    debugged.clock.Advance(1s);
+    debugged.HandOver(0, 0, Pattern(128));
     std::vector<std::array<std::uint32_t, 2>> seen;
     for (const auto step : {0us, 9999us, 2us, 9999us}) {
-        rig.clock.Advance(step);
-        seen.push_back({rig.Word(kStatus[0]), rig.Word(kStatus[1])});
+        debugged.clock.Advance(step);
+        seen.push_back({debugged.Word(kStatus[0]), debugged.Word(kStatus[1])});
     }
     EXPECT_EQ(seen, (decltype(seen){{kBusy, kBusy}, {kBusy, kBusy}, {0, kBusy}, {0, 0}}));
 }
 
 TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
     for (const bool reset : {false, true}) {
-        DebuggedDevice rig;
-        rig.StartLoader();
-        rig.HandOver(0, 0, Bytes(256, 0));
+        DebuggedDevice debugged;
+        debugged.StartLoader();
+        debugged.HandOver(0, 0, Bytes(256, 0));
         if (reset) {
-            rig.device.Reset(false);
+            debugged.device.Reset(false);
         } else {
-            rig.device.Halt();
+            debugged.device.Halt();
         }
-        rig.device.Pause(1000);
+        debugged.device.Pause(1000);
         Bytes expected(256, 0xFF);
         std::fill_n(expected.begin(), 128, std::uint8_t{0});
-        EXPECT_EQ(rig.Cells(0, 256), expected);
-        EXPECT_EQ(rig.Word(kStatus[0]), kBusy);
+        EXPECT_EQ(debugged.Cells(0, 256), expected);
+        EXPECT_EQ(debugged.Word(kStatus[0]), kBusy);
     }
 }
 
@@ -468,31 +471,34 @@ TEST(Loader, SaysWhatItCannotTellTheDebugger) {
                  {kBusy - 127, 128, "[loader-parameters]"},
                  {0x400, 128, "[erased-cells]"}};
     for (const auto& [address, size, rule] : cases) {
-        DebuggedDevice rig;
-        rig.device.Flash().Preset(0x410, Bytes{0xF0});
-        rig.StartLoader();
-        rig.HandOver(0, address, Bytes(size, 0x3C));
-        rig.device.Pause(1);
-        EXPECT_NE(rig.Word(kStatus[0]), kBusy);
-        ASSERT_EQ(rig.device.Violations().size(), 1U);
-        EXPECT_TRUE(rig.device.Violations()[0].ends_with(rule)) << rig.device.Violations()[0];
-        EXPECT_EQ(rig.Flash(0x410, 1)[0], address == 0x400 ? 0x30 : 0xF0);
+        DebuggedDevice debugged;
+        debugged.device.Flash().Preset(0x410, Bytes{0xF0});
+        debugged.StartLoader();
+        debugged.HandOver(0, address, Bytes(size, 0x3C));
+        debugged.device.Pause(1);
+        EXPECT_NE(debugged.Word(kStatus[0]), kBusy);
+        ASSERT_EQ(debugged.device.Violations().size(), 1U);
+        EXPECT_TRUE(debugged.device.Violations()[0].ends_with(rule))
+            << debugged.device.Violations()[0];
+        EXPECT_EQ(debugged.Flash(0x410, 1)[0], address == 0x400 ? 0x30 : 0xF0);
     }
 }
 
 TEST(UserRegisters, AreVolatileUntilCommitted) {
-    DebuggedDevice rig;
-    const auto values = [&rig] { return std::array{rig.Word(kUser0), rig.Word(kUser0 + 4)}; };
-    rig.SetWord(kUser0, 0x11);
-    rig.SetWord(kUser0 + 4, 0x22);
-    rig.Command(0x80000001, 0xA4420008);
-    rig.device.Pause(1);
+    DebuggedDevice debugged;
+    const auto values = [&debugged] {
+        return std::array{debugged.Word(kUser0), debugged.Word(kUser0 + 4)};
+    };
+    debugged.SetWord(kUser0, 0x11);
+    debugged.SetWord(kUser0 + 4, 0x22);
+    debugged.Command(0x80000001, 0xA4420008);
+    debugged.device.Pause(1);
     EXPECT_EQ(values(), (std::array{0x11U, 0x22U}));
-    rig.device.Reset(true);
+    debugged.device.Reset(true);
     EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
-    rig.Command(0x80000000, 0xA4420008);
-    rig.SetWord(kUser0 + 4, 0x33);
-    rig.device.PowerCycle();
+    debugged.Command(0x80000000, 0xA4420008);
+    debugged.SetWord(kUser0 + 4, 0x33);
+    debugged.device.PowerCycle();
     EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
 }
 
@@ -529,22 +535,22 @@ TEST(Faults, ComeAsAsked) {
 
     for (const auto& [options, idle] :
          {std::pair{"tolva,loader=hangs", 0U}, {"tolva,loader=dead", kBusy}}) {
-        DebuggedDevice rig(options);
-        rig.StartLoader();
-        EXPECT_EQ(rig.Word(kStatus[1]), idle);
-        rig.HandOver(0, 0, Pattern(128));
-        rig.device.Pause(60'000);
-        EXPECT_EQ(rig.Word(kStatus[0]), kBusy);
+        DebuggedDevice debugged(options);
+        debugged.StartLoader();
+        EXPECT_EQ(debugged.Word(kStatus[1]), idle);
+        debugged.HandOver(0, 0, Pattern(128));
+        debugged.device.Pause(60'000);
+        EXPECT_EQ(debugged.Word(kStatus[0]), kBusy);
     }
 }
 
 TEST(Time, CannotBeWaitedIntoAnOverflow) {
-    DebuggedDevice rig;
+    DebuggedDevice debugged;
     for (int i = 0; i < 5000; ++i)
-        rig.device.Pause(0xFFFFFFFF);
-    rig.Command(0, 0xA4420002);
-    rig.clock.Advance(1s);
-    EXPECT_EQ(rig.Word(kFlashCommand), 0U);
+        debugged.device.Pause(0xFFFFFFFF);
+    debugged.Command(0, 0xA4420002);
+    debugged.clock.Advance(1s);
+    EXPECT_EQ(debugged.Word(kFlashCommand), 0U);
 }
 
 TEST(Options, BadOnesAreNamed) {
