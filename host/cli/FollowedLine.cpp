@@ -43,11 +43,9 @@ class Follower {
     void Take(const std::string& word) {
         if (line_.awaited != nullptr)
             TakeValue(word);
-        else if (line_.optionsEnded)
-            TakeArgument(word);
-        else if (word == "--")
+        else if (!line_.optionsEnded && word == "--")
             line_.optionsEnded = true;
-        else if (IsOption(word))
+        else if (!line_.optionsEnded && IsOption(word))
             TakeOption(word);
         else if (line_.MayNameCommand())
             TakeCommandWord(word);
