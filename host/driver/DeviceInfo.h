@@ -16,7 +16,7 @@ struct DeviceInfo {
     std::uint32_t sectorBytes = 0;
     std::uint32_t identification = 0;
     bool hasFlash = false;
-    std::string operations;  ///< joined by " | "
+    std::string operations = {};  ///< joined by " | "
 
     base::AddressRange Flash() const { return {0, static_cast<std::uint32_t>(flashBytes - 1)}; }
 };

@@ -18,8 +18,8 @@
 namespace host {
 
 struct LoadPlan {
-    std::vector<image::Section> sections;    ///< as handed to the plug-in, one loader start each
-    std::vector<base::AddressRange> erased;  ///< runs of whole sectors, in address order
+    std::vector<image::Section> sections = {};  ///< as handed to the plug-in, one loader start each
+    std::vector<base::AddressRange> erased = {};  ///< runs of whole sectors, in address order
     std::uint64_t erasedBytes = 0;
     std::uint64_t sectorCount = 0;
     std::uint64_t imageBytes = 0;

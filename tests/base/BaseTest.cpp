@@ -1,0 +1,55 @@
+// Hexadecimal texts and sets of addresses.
+
+#include <gtest/gtest.h>
+
+#include <optional>
+#include <utility>
+
+#include "base/AddressSet.h"
+#include "base/Hex.h"
+
+namespace base {
+namespace {
+
+TEST(Hex, NumbersAreReadWhole) {
+    const std::pair<const char*, std::optional<std::uint32_t>> cases[] = {
+        {"0", 0},
+        {"0x3FFFF", 0x3FFFF},
+        {"3ffff", 0x3FFFF},
+        {"0XfFfFfFfF", 0xFFFFFFFF},
+        {"", {}},
+        {"0x", {}},
+        {"100000000", {}},
+        {"12-34", {}},
+        {" 1", {}},
+        {"1 ", {}},
+        {"-1", {}},
+        {"+1", {}},
+        {"G1", {}},
+        {"0x0x1", {}},
+        {"0000000000001", 0x1},
+        {"1K", {}},
+    };
+    for (const auto& [text, expected] : cases)
+        EXPECT_EQ(ParseHex32(text), expected) << text;
+}
+
+TEST(AddressSet, JoinsWhatOverlapsOrTouches) {
+    AddressSet set;
+    for (const AddressRange& range : {AddressRange{0x40, 0x4F},
+                                      {0x80, 0x8F},
+                                      {0x10, 0x1F},
+                                      {0x20, 0x2F},
+                                      {0x48, 0x58},
+                                      {0xFFFFFFF0, 0xFFFFFFFF}})
+        set.Add(range);
+    EXPECT_EQ(set.Ranges(),
+              (std::vector<AddressRange>{
+                  {0x10, 0x2F}, {0x40, 0x58}, {0x80, 0x8F}, {0xFFFFFFF0, 0xFFFFFFFF}}));
+    EXPECT_EQ(set.BytesIn({0x2F, 0x80}), 0x1BU);
+    set.Add({0x18, 0xFFFFFFFF});
+    EXPECT_EQ(set.Bytes(), 0xFFFFFFF0U);
+}
+
+}  // namespace
+}  // namespace base

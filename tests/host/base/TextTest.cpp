@@ -1,0 +1,68 @@
+// Ranges, amounts and MAC addresses as people write and read them.
+
+#include <gtest/gtest.h>
+
+#include <utility>
+
+#include "host/base/MacAddress.h"
+#include "host/base/Text.h"
+#include "tests/support/FailureOf.h"
+
+namespace host {
+namespace {
+
+using test::FailureOf;
+
+TEST(Text, ReadsRangesAndNamesWhatIsWrong) {
+    EXPECT_EQ(ParseRange("0x400-7ff"), (base::AddressRange{0x400, 0x7FF}));
+    EXPECT_EQ(ParseRange("0-ffffffff").Size(), 0x100000000U);
+    const std::pair<const char*, const char*> wrong[] = {
+        {"400", "2: '400' is no address range"},
+        {"", "2: '' is no address range"},
+        {"-400", "2: the range's first address '' is no hexadecimal number"},
+        {"0-x", "2: the range's last address 'x' is no hexadecimal number"},
+        {"0-1-2", "2: the range's last address '1-2' is no hexadecimal number"},
+        {"800-7ff", "2: the range '800-7ff' ends before it starts"},
+    };
+    for (const auto& [text, expected] : wrong)
+        EXPECT_TRUE(FailureOf([range = text] { ParseRange(range); }).starts_with(expected)) << text;
+}
+
+TEST(Text, NeverRoundsUpToAThousandOfAUnit) {
+    EXPECT_EQ(SizeText(1047552) + SizeText(1048575) + SizeText(1048576), "1023 KiB1.0 MiB1 MiB");
+    EXPECT_EQ(DurationText(0.9994) + DurationText(0.9996) + DurationText(59.94),
+              "999 ms1.0 s59.9 s");
+    EXPECT_EQ(DurationText(59.96) + DurationText(119.6), "1:002:00");
+}
+
+TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"02-1B-C3-04-05-06", "02-1b-c3-04-05-06"},
+        {"02:1b:c3:04:05:06", "02-1b-c3-04-05-06"},
+        {"2-1b-c3-4-5-6", "02-1b-c3-04-05-06"},
+        {"021BC3040506", "02-1b-c3-04-05-06"},
+        {"", nullptr},
+        {"21BC3040506", nullptr},
+        {"021BC30405063", nullptr},
+        {"02-1B-C3-04-05", nullptr},
+        {"02-1B-C3-04-05-06-04", nullptr},
+        {"02-1B:C3-04-05-06", nullptr},
+        {"02--1B-C3-04-05-03", nullptr},
+        {"02-1B-C3-04-05-06-", nullptr},
+        {"002-1B-C3-04-05-06", nullptr},
+        {"0G-1B-C3-04-05-06", nullptr},
+    };
+    for (const auto& [text, expected] : cases) {
+        const auto mac = ParseMacAddress(text);
+        EXPECT_EQ(mac ? mac->Text() : "refused", expected ? expected : "refused") << text;
+    }
+    const MacAddress mac = *ParseMacAddress("02-1B-C3-04-05-06");
+    EXPECT_EQ(mac.Register(0), 0x00C31B02U);
+    EXPECT_EQ(mac.Register(1), 0x00060504U);
+    EXPECT_EQ(mac.Objection(), "");
+    for (const char* text : {"000000000000", "ffffffffffff", "03-1b-c3-04-05-06"})
+        EXPECT_NE(ParseMacAddress(text)->Objection(), "") << text;
+}
+
+}  // namespace
+}  // namespace host

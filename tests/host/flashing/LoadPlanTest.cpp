@@ -1,0 +1,122 @@
+// The plan of a load.
+
+#include <gtest/gtest.h>
+
+#include <random>
+
+#include "host/base/Text.h"
+#include "host/flashing/LoadPlan.h"
+
+namespace host {
+namespace {
+
+using namespace std::chrono_literals;
+
+image::Section Bytes(std::uint32_t address, std::size_t count, std::uint8_t value) {
+    return {address, std::vector<std::uint8_t>(count, value)};
+}
+
+image::Section Joined(image::Section section, const std::vector<image::Section>& more) {
+    for (const image::Section& next : more) {
+        section.bytes.resize(next.address - section.address, 0xFF);
+        section.bytes.insert(section.bytes.end(), next.bytes.begin(), next.bytes.end());
+    }
+    return section;
+}
+
+TEST(LoadPlan, ErasesJoinsAndCounts) {
+    using Kind = EraseChoice::Kind;
+    const FlashGeometry flash{0x10000, 0x400};
+    const image::Section a = Bytes(0x10, 0x20, 1);   // sector 0
+    const image::Section b = Bytes(0x600, 0x10, 2);  // sector 1, behind a short gap
+    const image::Section c =
+        Bytes(0x1000, 0x801, 3);  // sectors 4 to 6, behind a gap of more than one chunk
+    const struct {
+        EraseChoice erase;
+        LoadPlan expected;
+    } cases[] = {
+        {{Kind::Necessary, {}},
+         {{Joined(a, {b}), c},
+          {{0, 0x7FF}, {0x1000, 0x1BFF}},
+          0x1400,
+          5,
+          0x831,
+          0xF00,
+          0xBCF,
+          {Kind::Necessary}}},
+        {{Kind::Nothing, {}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Nothing}}},
+        {{Kind::Everything, {}},
+         {{Joined(a, {b}), c},
+          {{0, 0xFFFF}},
+          0x10000,
+          64,
+          0x831,
+          0xF00,
+          0xF7CF,
+          {Kind::Everything}}},
+        {{Kind::Range, {0x3FF, 0x400}},
+         {{Joined(a, {b}), c},
+          {{0, 0x7FF}},
+          0x800,
+          2,
+          0x831,
+          0xF00,
+          0x7D0,
+          {Kind::Range, {0x3FF, 0x400}}}},
+        {{Kind::Range, {0x5FF, 0x600}},
+         {{a, b, c},
+          {{0x400, 0x7FF}},
+          0x400,
+          1,
+          0x831,
+          0x980,
+          0x3F0,
+          {Kind::Range, {0x5FF, 0x600}}}},
+        {{Kind::Range, {2, 1}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Range, {2, 1}}}},
+    };
+    image::Image image;
+    for (const image::Section& section : {a, b, c})
+        image.Add(section.address, section.bytes, "test");
+    for (const auto& [erase, expected] : cases) {
+        EXPECT_EQ(PlanLoad({.erase = erase, .time = {0s, true}}, image, {}, flash), expected)
+            << static_cast<int>(erase.kind) << " " << RangeText(erase.range);
+    }
+}
+
+/// What flash holds after erasing the runs and programming the sections: cells only lose bits.
+std::vector<std::uint8_t> FlashAfter(const std::vector<base::AddressRange>& erased,
+                                     const std::vector<image::Section>& sections) {
+    std::vector<std::uint8_t> flash(0x8000, 0x5A);
+    for (const base::AddressRange& run : erased)
+        std::fill(flash.begin() + run.first, flash.begin() + run.last + 1, std::uint8_t{0xFF});
+    for (const image::Section& section : sections)
+        for (std::size_t i = 0; i < section.bytes.size(); ++i)
+            flash[section.address + i] &= section.bytes[i];
+    return flash;
+}
+
+TEST(LoadPlan, JoiningChangesNoByteOfFlash) {
+    std::mt19937 engine(4711);
+    const auto random = [&](std::uint32_t below) {
+        return static_cast<std::uint32_t>(engine() % below);
+    };
+    for (int round = 0; round < 200; ++round) {
+        image::Image image;
+        for (std::uint32_t address = 0; address < 0x7000;) {
+            const std::uint32_t count = 1 + random(700);
+            image.Add(address,
+                      std::vector<std::uint8_t>(count, static_cast<std::uint8_t>(random(256))),
+                      "test");
+            address += count + random(4000);
+        }
+        const EraseChoice erase{static_cast<EraseChoice::Kind>(random(4)),
+                                {random(0x4000), 0x4000 + random(0x4000)}};
+        const LoadPlan plan = PlanLoad({.erase = erase}, image, {}, {0x8000, 0x400});
+        EXPECT_LE(plan.sections.size(), image.Sections().size());
+        EXPECT_EQ(FlashAfter(plan.erased, plan.sections), FlashAfter(plan.erased, image.Sections()))
+            << "round " << round;
+    }
+}
+
+}  // namespace
+}  // namespace host
