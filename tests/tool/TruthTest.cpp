@@ -11,12 +11,12 @@
 #include <filesystem>
 #include <fstream>
 #include <nlohmann/json.hpp>
-#include <sstream>
 
 #include "host/Tool.h"
 #include "host/targets/SimulatedTarget.h"
 #include "target/simulated/Contents.h"
 #include "tests/gdb/Peer.h"
+#include "tests/support/TemporaryDirectory.h"
 #include "tests/support/VirtualTime.h"
 
 namespace host {
@@ -76,19 +76,11 @@ struct Said {
     std::array<std::uint32_t, 2> written;  ///< what the user registers hold until power goes
 };
 
-std::string Slurp(const std::string& path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
-}
-
 class Bench {
   public:
     Bench() {
-        std::string name = fs::temp_directory_path() / "truth-test-XXXXXX";
-        directory_ = mkdtemp(name.data());
-        fs::current_path(directory_);
-        setenv("XDG_CONFIG_HOME", directory_.c_str(), 1);
+        fs::current_path(directory_.Path());
+        setenv("XDG_CONFIG_HOME", directory_.Path().c_str(), 1);
         for (std::uint32_t i = 0; i < kImageBytes; ++i)
             image_ += static_cast<char>(1 + i % 251);
         std::ofstream("new.bin").write(image_.data(), kImageBytes);
@@ -96,12 +88,9 @@ class Bench {
         Run({"program", "old.bin", "--base", "0"}, "");
         Run({"register", "program", "0", "abc", "--commit"}, "");
         Run({"register", "program", "1", "def", "--commit"}, "");
-        device_ = Slurp("device");
+        device_ = test::Contents("device");
     }
-    ~Bench() {
-        fs::current_path("/");
-        fs::remove_all(directory_);
-    }
+    ~Bench() { fs::current_path("/"); }
 
     void PutBack() const { std::ofstream("device", std::ios::binary) << device_; }
 
@@ -161,7 +150,7 @@ class Bench {
     std::vector<std::string> Lies(const Work& work, const Said& said, const Contents& now) const;
 
   private:
-    fs::path directory_;
+    test::TemporaryDirectory directory_;
     std::string image_;
     std::string device_;
 };
