@@ -2,10 +2,17 @@
 
 #include <gtest/gtest.h>
 
+#include <optional>
 #include <random>
+#include <string>
+#include <utility>
+#include <vector>
 
 #include "host/base/Text.h"
+#include "host/flashing/DeviceGeometry.h"
+#include "host/flashing/Load.h"
 #include "host/flashing/LoadPlan.h"
+#include "tests/support/FailureOf.h"
 
 namespace host {
 namespace {
@@ -115,6 +122,79 @@ TEST(LoadPlan, JoiningChangesNoByteOfFlash) {
         EXPECT_LE(plan.sections.size(), image.Sections().size());
         EXPECT_EQ(FlashAfter(plan.erased, plan.sections), FlashAfter(plan.erased, image.Sections()))
             << "round " << round;
+    }
+}
+
+TEST(LoadPlan, GivesEachStepItsTimeAndItsTotal) {
+    image::Image image;
+    image.Add(0x102, std::vector<std::uint8_t>(30000), "test");
+    LoadRequest request{.checks = {true, true, true}};
+    const FlashGeometry flash{0x10000, 0x400};
+    const LoadPlan plan = PlanLoad(request, image, {}, flash);
+    EXPECT_EQ(plan.chunkTime, 30s);
+    EXPECT_EQ(plan.sectionTime, 32s);  // 15 chunks, and a second for 5 of them
+    request.time.chosen = true;
+    EXPECT_EQ(PlanLoad(request, image, {}, flash).sectionTime, 30s);
+    const std::pair<Phase, std::uint64_t> totals[] = {
+        {Phase::Erase, 0x7800}, {Phase::Program, 30080},    {Phase::BlankCheck, 30004},
+        {Phase::Look, 0},       {Phase::Checksum, 0x10000}, {Phase::Verify, 30000},
+    };
+    Reporter reporter({Talk::Quiet, false, "none"});
+    WorkMeter all(reporter);
+    ExpectLoad(all, plan, flash);
+    for (const auto& [phase, total] : totals)
+        EXPECT_EQ(all.Phases()[phase].totalBytes, total) << Name(phase).id;
+    WorkMeter few(reporter);
+    ExpectLoad(few, PlanLoad({.checks = {false, false, false}}, image, {}, flash), flash);
+    for (const Phase phase : {Phase::BlankCheck, Phase::Checksum, Phase::Verify})
+        EXPECT_EQ(few.Phases()[phase].totalBytes, 0U);
+}
+
+TEST(LoadPlan, LeavesAloneWhatHoldsTheImage) {
+    image::Image image;
+    image.Add(0x400, std::vector<std::uint8_t>(0xC00, 0x11), "test");
+    image::Image now;
+    now.Add(0xC00, std::vector<std::uint8_t>(0x400, 0x11), "test");
+    const LoadPlan plan = PlanLoad({}, image, now, {0x1000, 0x400, true});
+    EXPECT_EQ(plan.unchanged.Ranges(), (std::vector<base::AddressRange>{{0xC00, 0xFFF}}));
+    EXPECT_EQ(plan.erased, (std::vector<base::AddressRange>{{0x400, 0xBFF}}));
+    EXPECT_EQ(plan.sections, (std::vector<image::Section>{Bytes(0x400, 0x800, 0x11)}));
+    EXPECT_EQ(plan.unchangedBytes, 0x400U);
+    EXPECT_FALSE(plan.ErasesWhole());
+    image.Add(0, std::vector<std::uint8_t>(1), "test");
+    EXPECT_TRUE(PlanLoad({}, image, {}, {0x1000, 0x400, true}).ErasesWhole());
+    EXPECT_FALSE(PlanLoad({}, image, {}, {0x1000, 0x400, false}).ErasesWhole());
+}
+
+TEST(Load, SaysWhatCanStillBeTriedAndRefusesWhatCannotBeErased) {
+    LoadPlan plan;
+    plan.erased = {{0x400, 0x7FF}};
+    const std::pair<std::optional<std::uint32_t>, const char*> advice[] = {
+        {{}, "these bytes were not programmed"},
+        {0x7FF, "some bits stay 0 although"},
+        {0x800, "some bits were not erased first"},
+    };
+    for (const auto& [address, expected] : advice)
+        EXPECT_TRUE(AdviceAfter(plan, {.notErased = address}).starts_with(expected));
+    using Kind = EraseChoice::Kind;
+    const struct {
+        const char* family;
+        EraseChoice erase;
+        const char* failure;
+    } cases[] = {
+        {"Mesk", {Kind::Everything}, "1: the plug-in can't erase a flash of 256 KiB (Mesk) all"},
+        {"Quen", {Kind::Everything}, ""},
+        {"Mesk", {Kind::Range, {0, 0x3FFFF}}, ""},
+        {"Mesk", {Kind::Range, {0, 0x40000}}, "2: the settings FlashEraseStartAddr and"},
+        {"Mesk", {Kind::Range, {0x40000, 0}}, "2: the settings FlashEraseStartAddr and"},
+        {"Mesk", {Kind::Necessary, {0, 0x40000}}, ""},
+    };
+    for (const auto& [family, erase, expected] : cases) {
+        const DeviceInfo info{.family = family, .flashBytes = 0x40000};
+        const std::string failure =
+            test::FailureOf([&, choice = erase] { RequireErasable(info, choice); });
+        EXPECT_TRUE(failure.starts_with(expected)) << failure;
+        EXPECT_EQ(failure.empty(), *expected == '\0') << failure;
     }
 }
 
