@@ -9,13 +9,13 @@
 namespace host {
 namespace {
 
-struct Bytes {
+struct Amount {
     std::uint64_t done;
     std::uint64_t total;
 };
 
 /// A state whose flash was attempted, erased, handed over and programmed from 0 on.
-KnownState Touched(Bytes erase, Bytes program, std::uint32_t handedOver = 0) {
+KnownState Touched(Amount erase, Amount program, std::uint32_t handedOver = 0) {
     KnownState state;
     const auto add = [](base::AddressSet& set, std::uint64_t bytes) {
         if (bytes != 0) set.Add({0, static_cast<std::uint32_t>(bytes - 1)});
