@@ -139,7 +139,7 @@ TEST(LoadPlan, GivesEachStepItsTimeAndItsTotal) {
         {Phase::Erase, 0x7800}, {Phase::Program, 30080},    {Phase::BlankCheck, 30004},
         {Phase::Look, 0},       {Phase::Checksum, 0x10000}, {Phase::Verify, 30000},
     };
-    Reporter reporter({Talk::Quiet, false, "none"});
+    Reporter reporter({Verbosity::Quiet, false, "none"});
     WorkMeter all(reporter);
     ExpectLoad(all, plan, flash);
     for (const auto& [phase, total] : totals)
