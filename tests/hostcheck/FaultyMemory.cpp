@@ -78,7 +78,8 @@ const FaultyHost kFaultyMemory[] = {
     {"ReadMemory: expected a word of RAM during CreateFlashDevice2; came bytes in front of the buf",
      [](CheckedHost& h) {
          h.Bend([](Transfer& t) {
-             if (t.to != nullptr && t.address < kRegisters) static_cast<char*>(t.to)[-1] = 0;
+             const bool ram = t.address >= 0x20000000 && t.address < kRegisters;
+             if (t.to != nullptr && ram) static_cast<char*>(t.to)[-1] = 0;
          });
      }},
     {"ReadMemory: expected registers with the least significant byte first; came 0x00000A10 for "

@@ -101,10 +101,11 @@ TEST(OutputFile, IsRefusedBeforeAnythingIsWritten) {
          "3: can't write the note " + directory.File("loop") +
              ": Too many levels of symbolic links"},
     };
-    for (const auto& [path, existing, failure] : cases) {
-        EXPECT_EQ(FailureOf([&] { RequireWritable(kNote, path, existing); }), failure);
-        if (failure.empty()) continue;
-        EXPECT_EQ(FailureOf([&] { WriteWholeFile(kNote, path, "x", existing); }), failure);
+    for (const auto& row : cases) {
+        EXPECT_EQ(FailureOf([&] { RequireWritable(kNote, row.path, row.existing); }), row.failure);
+        if (row.failure.empty()) continue;
+        EXPECT_EQ(FailureOf([&] { WriteWholeFile(kNote, row.path, "x", row.existing); }),
+                  row.failure);
     }
     EXPECT_EQ(test::Contents(file) + test::Contents(locked), "oldold");
 }
