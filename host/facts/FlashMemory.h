@@ -15,6 +15,14 @@ inline constexpr std::int16_t kFlashPage = 0;
 inline constexpr std::int16_t kRamPage = 1;
 
 inline constexpr std::uint32_t kIdentificationRegister = 0x400FE000;
+
+/// No device of the family has anything on its bus here.
+inline constexpr std::uint32_t kNothingAt = 0x10000000;
+
+/// The core's debug control and status register: that a debugger is at work, and has halted it.
+inline constexpr std::uint32_t kDebugStatusRegister = 0xE000EDF0;
+inline constexpr std::uint32_t kDebuggedBit = 0x1;
+inline constexpr std::uint32_t kHaltedBit = 0x20000;
 inline constexpr std::array<std::uint32_t, 2> kUserRegisters{0x400FE1E0, 0x400FE1E4};
 
 // The flash command register takes an erase command in its low bits, under a key in the high half,

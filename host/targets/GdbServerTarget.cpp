@@ -6,6 +6,7 @@
 
 #include "host/base/Errors.h"
 #include "host/base/Interrupt.h"
+#include "host/facts/FlashMemory.h"
 #include "host/facts/LoaderMemory.h"
 
 namespace host {
@@ -26,6 +27,11 @@ gdb::GdbOptions ParseOptions(const TargetOptions& options) {
     for (const std::string& text : options.gdbOptions)
         gdb::ParseGdbOption(text, parsed);
     parsed.loader = options.loader.value_or("");
+    parsed.device = {
+        plugin::kLoaderBuffers,
+        plugin::kNothingAt,
+        {{plugin::kDebugStatusRegister, plugin::kDebuggedBit, plugin::kHaltedBit}},
+    };
     return parsed;
 }
 

@@ -6,8 +6,10 @@
 
 #include <algorithm>
 #include <chrono>
+#include <fstream>
 #include <functional>
 #include <random>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -84,6 +86,7 @@ TEST(GdbFrames, AreReadAsTheyStandOnTheWire) {
 
 GdbOptions Quick(std::chrono::milliseconds timeout = 500ms) {
     GdbOptions options;
+    options.server = FindProfile("corvane");
     options.timeout = timeout;
     return options;
 }
@@ -151,6 +154,7 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         // Accesses.
         {"m20000100", "$E03#a8", "Reading 64 x 1 bytes at 0x20000100: the GDB server at"},
         {"m20000100", "$00#60", "answered \"00\" to \"m20000100,40\""},
+        {"m20000100", "$00050a0f14#51", "done"},
         {"m20000100", "$0g#97", "answered \"0g\""},
         {"m20000100", "$00#61", "sent a packet with a wrong checksum"},
         {"m20000100", "$0", "sent no reply to \"m20000100,40\" within 0.5 s"},
@@ -160,7 +164,8 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         // Run control.
         {"vCont?", "$#00", "done"},
         {"vCont;c", "$E01#a6", "\"E01\""},
-        {"vCont;c", "$T0b#e6", "stopped by itself: SIGSEGV"},
+        {"vCont;c", "$T0b#e6", "stopped by itself: SIGSEGV at pc 0x20002000"},
+        {"vCont;c", "$T05#b9", "stopped by itself: SIGTRAP at pc 0x20002000"},
         {"vCont;c", "$W00#b7", "has ended"},
         {"\x03", "$O41#b4$T05#b9", "done"},
         {"\x03", "$T05#b9$T02#b6", "done"},
@@ -174,14 +179,19 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         {"qXfer:features", "$m#6d", "sends its document target.xml without end"},
         {"m20002000", "$fee7fee600000000#4d", "0x20002003 doesn't hold what was written there"},
         {"P10", "$O48#bb$OK#9a", "done"},
+        {"P10", "$O#4f$OK#9a", "done"},
+        {"P10", "$E.no such register#a8", "answered \"no such register\" to \"P10"},
         {"P10", "$E01#a6", "answered \"E01\" to \"P10=00000001\""},
         {"P", "$#00", "Loading the program"},
         // The monitor.
         {"qRcmd", "$#00", "takes no monitor commands"},
         {"qRcmd", "$O41#b4$E01#a6", "answered \"E01\" to the monitor command \"reset halt\": A"},
         {"qRcmd", "$O41#b4$O42#b5$OK#9a", "done"},
+        {"qRcmd", "$O#4f$T05#b9$OK#9a", "done"},
+        {"qRcmd", "$garbage#c9$OK#9a", "answered \"garbage\" to \"qRcmd"},
+        {"qRcmd", "$41#65$OK#9a", "sent \"OK\" without being asked"},
         {"qRcmd", "$41#65", "done"},
-        {"qRcmd", "$O41#b4", "didn't end the monitor command"},
+        {"qRcmd", "$O41#b4", "sent no reply to \"qRcmd"},
     };
     for (const Quirk& quirk : quirks) {
         SCOPED_TRACE(testing::Message() << testing::PrintToString(quirk.payload) << " -> "
@@ -194,6 +204,127 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
         const std::string result = ResultOf([&] { return Work(peer.Where()); });
         EXPECT_NE(result.find(quirk.result), std::string::npos) << result;
     }
+}
+
+/// The session's answer, and more behind it. A program of ours that runs is never taken for
+/// crashed.
+TEST(GdbClient, TakesNoStopFromBeforeForACrash) {
+    const struct {
+        const char* payload;  ///< begins so
+        const char* more;
+    } rows[] = {
+        {"?", "$T05#b9"},    {"P10", "%Stop:T05#99"},         {"vCont;c", "$T05#b9"},
+        {"\x03", "$T02#b6"}, {"\x03", "$T02#b6%Stop:T02#96"},
+    };
+    for (const auto& row : rows) {
+        Peer peer([](const std::string&) { return std::nullopt; },
+                  [&](const std::string& payload, std::string& wire) {
+                      if (payload.starts_with(row.payload)) wire += row.more;
+                  },
+                  std::make_unique<SimulatedDevice>(ParseDeviceOptions("quen")));
+        EXPECT_EQ(ResultOf([&] { return Work(peer.Where()); }), "done")
+            << testing::PrintToString(row.payload) << row.more;
+    }
+}
+
+// What a server in all-stop mode makes of a read while the program runs.
+TEST(GdbClient, TriesWhetherARunningTargetCanBeAsked) {
+    const struct {
+        std::string answer;
+        const char* result;
+        bool live;
+    } rows[] = {
+        {Framed("00000000"), "done", true},
+        {Framed("E01"), "done", false},
+        {"", "done", false},
+        {Framed("T0b"), "stopped by itself: SIGSEGV", false},
+        {Framed("garbage"), "answered \"garbage\"", false},
+    };
+    for (const auto& row : rows) {
+        bool running = false;
+        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+            if (payload == "\x03") running = false;
+            if (payload == "vCont;c") running = true;
+            if (!running || payload[0] != 'm') return std::nullopt;
+            return row.answer;
+        });
+        GdbOptions options = Quick();
+        options.server = FindProfile("generic");
+        const std::string result = ResultOf([&] { return Work(peer.Where(), options); });
+        EXPECT_NE(result.find(row.result), std::string::npos) << row.answer << ": " << result;
+        const auto log = peer.Log();
+        EXPECT_EQ(std::count(log.begin(), log.end(), "m2000100c,4"), row.live) << row.answer;
+    }
+}
+
+// What is refused before anything is touched, and the option that lets it pass.
+TEST(GdbClient, FindsOutWhatServersHide) {
+    const struct {
+        const char* payload;
+        const char* wire;
+        const char* options;
+        const char* result;
+    } rows[] = {
+        {"m10000000", "$00000000#80", "server=pyocd", "hides reads that fail: it answers"},
+        {"m10000000", "$00000000#80", "reads=trusted", "done"},
+        {"me000edf0", "$01000000#81", "server=pyocd", "didn't halt the target: it still runs"},
+        {"me000edf0", "$03000200#85", "server=pyocd", "done"},
+        {"qRcmd,76657273696f6e", "$O426c61636b204d61676963#5c$OK#9a", "timeout=300ms",
+         "(packet:vRun)"},
+        {"vRun;", "$T05#b9", "reset=packet:vRun", "done"},
+        {"R00", "", "reset=packet:R", "done"},
+    };
+    for (const auto& row : rows) {
+        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
+            if (!payload.starts_with(row.payload)) return std::nullopt;
+            return row.wire;
+        });
+        GdbOptions options;
+        options.timeout = 500ms;
+        options.device = {0x20000000, 0x10000000, {{0xE000EDF0, 1, 0x20000}}};
+        ParseGdbOption(row.options, options);
+        const std::string result = ResultOf([&] { return Work(peer.Where(), options); });
+        EXPECT_NE(result.find(row.result), std::string::npos) << row.options << ": " << result;
+    }
+}
+
+TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
+    const struct {
+        std::uint32_t ramStart;
+        std::uint32_t ramEnd;
+        std::uint32_t mailbox;
+        const char* refusal;
+    } rows[] = {
+        {0x20000000, 0x20010000, 0x20001000, ""},
+        {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000FFFF)"},
+        {0x20000000, 0x20002004, 0x20001000, "outside the RAM"},
+        {0x20000000, 0x20010000, 0x20001FF0, "where its buffers and parameter blocks are"},
+    };
+    for (const auto& row : rows) {
+        Peer peer([](const std::string&) { return std::nullopt; });
+        GdbOptions options = Quick();
+        options.loader = LoaderFile();
+        options.ramEnd = row.ramEnd;
+        options.device.ramStart = row.ramStart;
+        GdbTarget target(peer.Where(), options, {row.mailbox, 32, 0xFFFFFFFF}, {}, {});
+        const std::string result = ResultOf([&] { return target.RequireProgram("", ""), ""; });
+        EXPECT_NE(result.find(row.refusal), std::string::npos) << result;
+        EXPECT_EQ(result.empty(), *row.refusal == 0) << result;
+    }
+}
+
+// The manual's table is the one in the source.
+TEST(GdbProfiles, AreInTheManual) {
+    std::ostringstream text;
+    text << std::ifstream(BOARDS_MANUAL).rdbuf();
+    const std::string manual = text.str();
+    for (const Profile& row : Profiles()) {
+        const std::string line = std::string("| ") + row.title + " | `" + row.name + "` | `" +
+                                 row.start + "` | `" + row.options + "` | " + row.tried + " |\n";
+        EXPECT_NE(manual.find(line), std::string::npos) << line;
+    }
+    for (const GdbOptionRow& row : GdbOptionTable())
+        EXPECT_NE(manual.find(std::string("`") + row.name + "="), std::string::npos) << row.name;
 }
 
 bool IsOptional(const std::string& payload) {

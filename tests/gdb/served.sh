@@ -37,7 +37,7 @@ CORVANE_SIM=velk expect 0 'Quen' --gdb ":$port" info
 CORVANE_GDB=:1 expect 0 'Velk\|none' --sim velk info
 hanging=$(cat "/proc/$server/task/$server/children")
 kill -STOP $hanging
-expect 4 'no packet in time' --gdb ":$port" --gdb-option timeout=300ms info
+expect 4 'no packet within 0.3 s' --gdb ":$port" --gdb-option timeout=300ms info
 "$tool" --gdb ":$port" --gdb-option timeout=60s info >said 2>&1 </dev/null &
 client=$!
 sleep 0.5

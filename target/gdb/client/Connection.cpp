@@ -4,9 +4,8 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <utility>
-
-#include "target/gdb/wire/Replies.h"
 
 namespace target::gdb {
 
@@ -14,19 +13,16 @@ namespace {
 
 using std::chrono::milliseconds;
 
-bool IsStopReply(const std::string& packet) {
-    const auto reply = ParseStopReply(packet);
-    return reply && reply->kind == StopReply::Kind::Stopped;
-}
+// A server that only shows that it is alive, and never comes to an end, keeps nobody for longer
+// than so many times the time that a reply may take.
+constexpr int kOutputLimit = 12;
 
-bool IsOutput(const std::string& packet) {
-    const auto reply = ParseStopReply(packet);
-    return reply && reply->kind == StopReply::Kind::Output;
-}
+// As much of a command's output as anybody reads.
+constexpr std::size_t kOutputMax = std::size_t{64} << 10;
 
 bool AnsweredByStopReply(const std::string& request) {
-    return request == "?" || request == "c" || request == "vCont;c" || request == "vStopped" ||
-           request.starts_with("vAttach;");
+    return request == "?" || request == "vStopped" || request.starts_with("vAttach;") ||
+           request.starts_with("vRun;");
 }
 
 }  // namespace
@@ -49,21 +45,17 @@ Connection::Connection(Socket socket, milliseconds timeout, PacketTrace trace)
 
 std::string Connection::Ask(const std::string& request) {
     Send(request);
-    Deadline deadline = After(timeout_);
-    return AwaitReply(request, deadline);
+    Wait wait = Patience();
+    return AwaitReply(request, wait);
 }
 
-std::string Connection::AwaitReply(const std::string& request, Deadline& deadline) {
-    const bool outputExpected = request.starts_with("qRcmd,");
-    for (;;) {
-        const auto reply = Receive(deadline);
-        if (!reply)
-            Lose(fmt::format("sent no reply to \"{}\" within {} s", Shown(request),
-                             std::chrono::duration<double>(timeout_).count()));
-        if (!outputExpected && IsOutput(*reply)) continue;
-        // An interrupt may have crossed a stop, which is then told twice.
-        if (stopExpected_ || !IsStopReply(*reply)) return *reply;
+std::string Connection::AwaitReply(const std::string& request, Wait& wait) {
+    while (!packet_) {
+        if (!Step(wait))
+            Lose(fmt::format("sent no reply to \"{}\" {}", Shown(request), WithinTimeout()));
     }
+    lastReply_ = *packet_;
+    return *TakePacket();
 }
 
 void Connection::RequireOk(const std::string& request) {
@@ -78,37 +70,51 @@ bool Connection::Agrees(const std::string& request) {
 }
 
 void Connection::Reject(const std::string& request, const std::string& reply) {
-    const std::string why = fmt::format(R"(answered "{}" to "{}")", Shown(reply), Shown(request));
+    const std::string why =
+        fmt::format(R"(answered "{}" to "{}")", IsError(reply) ? ErrorText(reply) : Shown(reply),
+                    Shown(request));
     if (!IsRefusal(reply)) Lose(why);
     throw ProtocolError(why);
 }
 
 void Connection::Send(const std::string& request) {
-    if (IsLost()) throw ProtocolError(lost_);
+    TakeArrived();
+    RefuseUnasked();
     if (trace_) trace_("->", Shown(request));
-    packet_.reset();
+    output_.clear();
     damageSeen_ = false;
     stopExpected_ = AnsweredByStopReply(request);
     const std::string frame = Framed(request);
-    Deadline deadline = After(timeout_);
+    Wait wait = Patience();
     ++sentCount_;
     // A packet that got no answer may have been acted upon, so it isn't sent again.
     for (int tries = 0; tries < 2; ++tries) {
         Write(frame);
-        if (!acknowledged_ || AwaitAck(deadline)) return;
+        if (!acknowledged_ || AwaitAck(wait)) return;
     }
     Lose(fmt::format("refused \"{}\" twice as garbled", Shown(request)));
 }
 
+/// With nothing out there is no reply to come. The last one once more is no fault as long as
+/// packets are acknowledged: the acknowledgement may have been garbled on its way.
+void Connection::RefuseUnasked() {
+    const auto unasked = TakePacket();
+    if (!unasked || (acknowledged_ && *unasked == lastReply_)) return;
+    Lose(fmt::format("sent \"{}\" without being asked; its replies can't be told apart any more",
+                     Shown(*unasked)));
+}
+
 /// False when the packet was refused. A packet in front of the acknowledgement answers something
 /// older: one that was sent twice, since an acknowledgement was garbled on its way.
-bool Connection::AwaitAck(Deadline& deadline) {
+bool Connection::AwaitAck(Wait& wait) {
     for (;;) {
-        auto frame = NextFrame(deadline);
-        if (!frame) Lose("acknowledged no packet in time");
+        auto frame = NextFrame(wait.deadline);
+        if (!frame) Lose("acknowledged no packet " + WithinTimeout());
         if (frame->kind == Frame::Kind::Ack) return true;
         if (frame->kind == Frame::Kind::Nak) return false;
-        Take(std::move(*frame));
+        const bool expected = std::exchange(stopExpected_, false);
+        Take(std::move(*frame), wait);
+        stopExpected_ = expected;
         packet_.reset();
     }
 }
@@ -118,41 +124,36 @@ void Connection::Interrupt() {
     if (trace_) trace_("->", "interrupt");
     ++sentCount_;
     damageSeen_ = false;
+    stopExpected_ = false;  // from here on a stop is an event, even a late answer to "?"
     Write(std::string_view(&kInterrupt, 1));
+}
+
+bool Connection::Step(Wait& wait) {
+    if (IsLost()) throw ProtocolError(lost_);
+    auto frame = NextFrame(wait.deadline);
+    if (!frame) return false;
+    Take(std::move(*frame), wait);
+    return true;
 }
 
 void Connection::TakeArrived() {
     if (IsLost()) throw ProtocolError(lost_);
-    FeedBefore({});
-}
-
-std::optional<std::string> Connection::Receive(milliseconds timeout) {
-    Deadline deadline = After(timeout);
-    return Receive(deadline);
-}
-
-std::optional<std::string> Connection::Receive(Deadline& deadline) {
-    if (IsLost()) throw ProtocolError(lost_);
-    while (!packet_) {
-        auto frame = NextFrame(deadline);
-        if (!frame) return std::nullopt;
-        Take(std::move(*frame));
+    // More than this only a server sends that never stops talking.
+    constexpr int kPiecesMax = 64;
+    for (int i = 0; i < kPiecesMax && FeedBefore({}); ++i) {
     }
-    return std::exchange(packet_, std::nullopt);
+    Wait past{};
+    while (!packet_ && Step(past)) {
+    }
 }
 
-std::optional<std::string> Connection::ReceiveNotification(const std::string& name,
-                                                           Deadline& deadline) {
-    if (IsLost()) throw ProtocolError(lost_);
-    for (;;) {
-        while (!notification_) {
-            auto frame = NextFrame(deadline);
-            if (!frame) return std::nullopt;
-            Take(std::move(*frame));
-        }
-        const std::string text = *std::exchange(notification_, std::nullopt);
-        if (text.starts_with(name + ":")) return text.substr(name.size() + 1);
-    }
+Wait Connection::Patience(milliseconds time) const {
+    return {After(time), After(kOutputLimit * time)};
+}
+
+std::string Connection::WithinTimeout() const {
+    return fmt::format("within {} s; --gdb-option timeout=TIME allows it more",
+                       std::chrono::duration<double>(timeout_).count());
 }
 
 void Connection::Lose(const std::string& why) {
@@ -181,8 +182,8 @@ bool Connection::FeedBefore(Deadline deadline) {
     }
 }
 
-// Acknowledges what asks for it, and keeps what somebody will ask for.
-void Connection::Take(Frame frame) {
+// Acknowledges what asks for it, and sorts it.
+void Connection::Take(Frame frame, Wait& wait) {
     const bool packet = frame.kind == Frame::Kind::Packet;
     if (trace_ && (packet || frame.kind == Frame::Kind::Notification))
         trace_("<-", (packet ? "" : "%") + Shown(frame.payload));
@@ -192,10 +193,30 @@ void Connection::Take(Frame frame) {
         Write("-");
     } else if (packet) {
         if (acknowledged_) Write("+");
-        packet_ = std::move(frame.payload);
-    } else if (frame.kind == Frame::Kind::Notification) {
-        notification_ = std::move(frame.payload);
+        TakePayload(std::move(frame.payload), wait);
+    } else if (frame.kind == Frame::Kind::Notification && frame.payload.starts_with("Stop:")) {
+        const auto stop = ParseStopReply(std::string_view(frame.payload).substr(5));
+        if (stop && stopSink_) stopSink_(*stop);
     }
+}
+
+void Connection::TakePayload(std::string payload, Wait& wait) {
+    const auto event = ParseStopReply(payload);
+    if (event && event->kind == StopReply::Kind::Output) {
+        if (output_.size() < kOutputMax) output_ += event->text;
+        return Extend(wait);
+    }
+    if (event && !std::exchange(stopExpected_, false)) {
+        if (stopSink_) stopSink_(*event);
+        return;
+    }
+    packet_ = std::move(payload);
+}
+
+/// Not once the user has interrupted the work: then a server that goes on talking keeps nobody.
+void Connection::Extend(Wait& wait) const {
+    const Deadline later = std::min(After(timeout_), wait.limit);
+    if (later > wait.deadline && socket_.Until(later) == later) wait.deadline = later;
 }
 
 void Connection::Write(std::string_view bytes) {

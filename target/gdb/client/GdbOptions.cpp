@@ -44,7 +44,44 @@ bool SetDetach(GdbOptions& options, string_view text) {
     return text == "yes" || text == "no";
 }
 
+bool SetServer(GdbOptions& options, string_view text) {
+    options.server = FindProfile(text);
+    return options.server != nullptr;
+}
+
+bool SetWrites(GdbOptions& options, string_view text) {
+    options.binaryWrites = text == "binary";
+    return text == "binary" || text == "hex";
+}
+
+bool SetReads(GdbOptions& options, string_view text) {
+    options.readsTrusted = text == "trusted";
+    return text == "trusted" || text == "checked";
+}
+
+bool SetLive(GdbOptions& options, string_view text) {
+    using Live = GdbOptions::Live;
+    options.live = text == "no" ? Live::No : text == "auto" ? Live::Auto : Live::Yes;
+    options.liveServer.reset();
+    if (text == "auto" || text == "no" || text == "yes") return true;
+    try {
+        options.liveServer = Address::Parse(std::string(text));
+        return true;
+    } catch (const std::invalid_argument&) {
+        return false;
+    }
+}
+
+/// A command, or one of the packets that reset a target.
+bool SetReset(GdbOptions& options, string_view text) {
+    options.reset = text;
+    return !text.empty() &&
+           (!text.starts_with("packet:") || text == "packet:R" || text == "packet:vRun");
+}
+
 const GdbOptionRow kOptionRows[] = {
+    {"server", "generic, openocd, jlink, pyocd, blackmagic, qemu or corvane",
+     "which server it is, where it doesn't tell by itself; sets what fits it", false, SetServer},
     {"init", "a command", "monitor command to send after connecting; may be repeated", true,
      [](GdbOptions& o, string_view t) {
          o.init.emplace_back(t);
@@ -52,12 +89,21 @@ const GdbOptionRow kOptionRows[] = {
      }},
     {"attach", "a number", "target to attach to after that (vAttach)", false,
      SetNumber<&GdbOptions::attach>},
-    {"reset", "a command",
-     "monitor command that resets the target and leaves it halted; default: reset halt", true,
-     [](GdbOptions& o, string_view t) {
-         o.reset = t;
-         return !t.empty();
-     }},
+    {"reset", "a command, packet:vRun or packet:R",
+     "monitor command or packet that resets the target and leaves it halted; default: as the "
+     "server's profile says, or reset halt",
+     true, SetReset},
+    {"writes", "binary or hex",
+     "how memory is written: X is shorter, M is told of failures by every server; default: as the "
+     "server's profile says, or hex",
+     false, SetWrites},
+    {"reads", "trusted or checked",
+     "whether a server is used that answers reads that fail as if they were done; default: checked",
+     false, SetReads},
+    {"live", "auto, yes, no or HOST:PORT",
+     "whether the running target is asked without stopping it, perhaps through a second server; "
+     "default: auto, which finds out",
+     false, SetLive},
     {"pc", "a number", "number of the program counter, where the server doesn't tell", false,
      SetNumber<&GdbOptions::pc>},
     {"sp", "a number", "number of the stack pointer, where the server doesn't tell", false,

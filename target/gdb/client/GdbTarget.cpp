@@ -8,8 +8,11 @@
 #include <cstring>
 #include <limits>
 #include <thread>
+#include <utility>
 
 #include "base/ByteOrder.h"
+#include "base/Hex.h"
+#include "target/gdb/client/Texts.h"
 
 namespace target::gdb {
 
@@ -20,12 +23,7 @@ using std::chrono::milliseconds;
 // What a program needs before it takes its first order, on a slow clock and through a slow probe.
 constexpr milliseconds kStartUp(20);
 
-bool HoldsWord(std::string_view bytes, std::uint32_t word) {
-    const std::string wanted = base::WordBytes(word);
-    for (std::size_t i = 0; i + 4 <= bytes.size(); i += 4)
-        if (bytes.substr(i, 4) == wanted) return true;
-    return false;
-}
+constexpr char kPacket[] = "packet:";
 
 std::size_t CheckedSize(std::size_t count, std::uint32_t address, std::size_t width) {
     if (width != 1 && width != 2 && width != 4)
@@ -39,16 +37,16 @@ std::size_t CheckedSize(std::size_t count, std::uint32_t address, std::size_t wi
     return count * width;
 }
 
-Connection Connect(const Address& address, const GdbOptions& options,
-                   const InterruptCheck& interrupted, const PacketTrace& trace) try {
-    return {Socket::Connect(address, After(options.timeout), interrupted), options.timeout, trace};
+}  // namespace
+
+Connection GdbTarget::Connect(const Address& address) const try {
+    return {Socket::Connect(address, After(options_.timeout), interrupted_), options_.timeout,
+            trace_};
 } catch (const SocketError& error) {
     throw TargetError(fmt::format(
         "can't connect to the GDB server at {}: {}; is it running, and is that its port?",
         address.Text(), error.what()));
 }
-
-}  // namespace
 
 GdbTarget::GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
                      InterruptCheck interrupted, const PacketTrace& trace)
@@ -56,41 +54,39 @@ GdbTarget::GdbTarget(const Address& address, const GdbOptions& options, const Ma
       options_(options),
       mailbox_(mailbox),
       interrupted_(std::move(interrupted)),
+      trace_(trace),
       ramEnd_(options.ramEnd),
-      connection_(Connect(address, options, interrupted_, trace)),
+      connection_(Connect(address)),
       memory_(connection_),
       core_(connection_) {
     Perform([] { return std::string("Connecting to the target"); }, [&] { Attach(); });
 }
 
 void GdbTarget::Perform(const Text& describe, const std::function<void()>& action) {
+    const auto sentence = [&](const char* what) {
+        return fmt::format("{}: the GDB server at {} {}", describe(), name_, what);
+    };
     try {
         action();
+    } catch (const StoppedByItself& error) {
+        started_ = false;
+        look_.reset();
+        crash_ = error.what() + WhereStopped();
+        throw TargetError(sentence(crash_.c_str()));
     } catch (const ProtocolError& error) {
-        if (dynamic_cast<const StoppedByItself*>(&error) != nullptr) started_ = false;
-        throw TargetError(
-            fmt::format("{}: the GDB server at {} {}", describe(), name_, error.what()));
+        throw TargetError(sentence(error.what()));
     }
 }
 
-void GdbTarget::Attach() {
-    features_ = ParseFeatures(connection_.Ask("qSupported:vContSupported+"));
-    if (features_.packetSize < MemoryPort::kPacketSizeMin)
-        throw ProtocolError(fmt::format("takes packets of {} bytes only, too few for any access",
-                                        features_.packetSize));
-    memory_.SetPacketSize(features_.packetSize);
-    if (features_.noAckMode && connection_.Agrees("QStartNoAckMode"))
-        connection_.StopAcknowledging();
-    for (const std::string& command : options_.init)
-        Monitor(command);
-    if (options_.attach) {
-        const std::string reply = connection_.Ask(fmt::format("vAttach;{:x}", *options_.attach));
-        const auto stop = ParseStopReply(reply);
-        if (!stop || stop->kind != StopReply::Kind::Stopped)
-            throw ProtocolError(
-                fmt::format("answered \"{}\" to the request to attach", Shown(reply)));
-    }
-    core_.Attach();
+/// Where a program that has stopped by itself stands, as far as the server tells.
+std::string GdbTarget::WhereStopped() try {
+    const std::string reply =
+        connection_.Ask(fmt::format("p{:x}", RegisterNumber("pc", options_.pc)));
+    const auto bytes = base::FromHex(reply);
+    if (!bytes || bytes->size() < 4) return "";
+    return fmt::format(" at pc 0x{:08X}", base::WordOf(*bytes));
+} catch (const ProtocolError&) {
+    return "";
 }
 
 void GdbTarget::Read(void* buffer, std::size_t count, std::uint32_t address, int /*page*/,
@@ -101,13 +97,14 @@ void GdbTarget::Read(void* buffer, std::size_t count, std::uint32_t address, int
     Perform(describe, [&] {
         const std::size_t size = CheckedSize(count, address, width);
         if (size == 0) return;
+        if (!crash_.empty() && InMailbox(address, size)) throw ProtocolError(crash_);
         const bool look = started_ && InMailbox(address, size);
         StopForAccess();
-        const std::string bytes = look ? ReadMailbox(address, size) : memory_.Read(address, size);
+        const std::string bytes = look ? ReadMailbox(address, size) : Memory().Read(address, size);
         std::memcpy(buffer, bytes.data(), size);
         // Whoever has looked at something else, or has found the program busy, waits now.
-        const bool waits = !look || HoldsWord(bytes, mailbox_.busyWord);
-        if (started_ && waits && !core_.IsRunning()) Resume();
+        const bool waits = !look || bytes == base::WordBytes(mailbox_.busyWord);
+        if (started_ && waits && core_.IsStopped()) GoOn();
     });
 }
 
@@ -121,7 +118,7 @@ void GdbTarget::Write(const void* buffer, std::size_t count, std::uint32_t addre
         if (size == 0) return;
         StopForAccess();
         const std::string_view bytes(static_cast<const char*>(buffer), size);
-        memory_.Write(address, bytes);
+        Memory().Write(address, bytes);
         if (look_ && InMailbox(address, size))
             look_->replace(address - mailbox_.address, size, bytes);
         else if (OverlapsMailbox(address, size))
@@ -131,15 +128,18 @@ void GdbTarget::Write(const void* buffer, std::size_t count, std::uint32_t addre
 
 /// The core is stopped, or can be asked as it runs.
 void GdbTarget::StopForAccess() {
-    if (!core_.IsRunning()) return;
-    if (core_.IsLive())
+    if (core_.RunsLive())
         core_.RequireRunning();
     else
         core_.Stop();
 }
 
+MemoryPort& GdbTarget::Memory() {
+    return liveMemory_ && !core_.IsStopped() ? *liveMemory_ : memory_;
+}
+
 std::string GdbTarget::ReadMailbox(std::uint32_t address, std::size_t size) {
-    if (core_.IsRunning()) return memory_.Read(address, size);
+    if (!core_.IsStopped()) return Memory().Read(address, size);
     if (!look_) look_ = memory_.Read(mailbox_.address, mailbox_.sizeBytes);
     return look_->substr(address - mailbox_.address, size);
 }
@@ -155,7 +155,7 @@ bool GdbTarget::OverlapsMailbox(std::uint32_t address, std::size_t size) const {
            address < std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
 }
 
-void GdbTarget::Resume() {
+void GdbTarget::GoOn() {
     look_.reset();
     core_.Resume();
 }
@@ -165,9 +165,12 @@ void GdbTarget::Run() {
             [&] {
                 if (started_) throw ProtocolError("isn't asked: the target is running already");
                 look_.reset();
-                if (features_.nonStop && !liveTried_) core_.TryLive(mailbox_.address);
-                liveTried_ = true;
-                if (!core_.IsRunning()) core_.Resume();
+                const bool tries = options_.live == GdbOptions::Live::Auto &&
+                                   (profile_->triesLive || features_.nonStop);
+                if (std::exchange(liveTried_, true) || !tries || core_.RunsLive())
+                    core_.Resume();
+                else
+                    core_.TryLive(mailbox_.address, features_.nonStop);
                 started_ = true;
                 std::this_thread::sleep_for(kStartUp);
             });
@@ -176,31 +179,55 @@ void GdbTarget::Run() {
 void GdbTarget::Halt() {
     Perform([] { return std::string("Halting the target"); },
             [&] {
+                crash_.clear();
                 core_.Stop();
                 started_ = false;
             });
 }
 
-// How a server resets is its monitor command's business.
+// How a server resets is its own business; a reset ends a crash as well.
 void GdbTarget::Reset(bool /*flag*/) {
-    const auto describe = [&] {
-        return fmt::format("Resetting the target (monitor {})", options_.reset);
-    };
+    const std::string how = ResetText();
+    const auto describe = [&] { return fmt::format("Resetting the target ({})", how); };
     Perform(describe, [&] {
-        core_.Stop();
+        try {
+            core_.Stop();
+        } catch (const StoppedByItself&) {
+            // Whatever it did, it doesn't do it any more.
+        }
         started_ = false;
+        crash_.clear();
         look_.reset();
-        Monitor(options_.reset);
+        std::string output;
+        if (how.starts_with(kPacket))
+            ResetByPacket(how.substr(std::size(kPacket) - 1));
+        else
+            output = Monitor(how);
+        core_.ForgetStops();
+        RequireHalted(fmt::format("after \"{}\"{}", how, LastLines(output)));
     });
 }
 
+/// "vRun" is answered by a stop; "R" by nothing, so that the next answer shows whether it was
+/// taken.
+void GdbTarget::ResetByPacket(const std::string& packet) {
+    const bool answered = packet == "vRun";
+    if (!answered) connection_.Send("R00");
+    const std::string request = answered ? "vRun;" : "?";
+    const std::string reply = connection_.Ask(request);
+    const auto stop = ParseStopReply(reply);
+    if (!stop) connection_.Reject(request, reply);
+    if (stop->kind == StopReply::Kind::Exited)
+        throw ProtocolError("has no target any more after that");
+}
+
 void GdbTarget::Pause(std::uint32_t pauseMs) {
+    const Deadline end = After(milliseconds(pauseMs));
     Perform([] { return std::string("Letting the target run"); },
             [&] {
-                if (started_ && !core_.IsRunning()) Resume();
+                if (started_ && core_.IsStopped()) GoOn();
             });
     constexpr milliseconds kSlice(50);
-    const Deadline end = After(milliseconds(pauseMs));
     while (std::chrono::steady_clock::now() < end && !(interrupted_ && interrupted_()))
         std::this_thread::sleep_until(std::min(end, After(kSlice)));
 }
@@ -209,14 +236,16 @@ void GdbTarget::Release(bool start) {
     if (connection_.IsLost()) return;
     Perform([] { return std::string("Leaving the target"); },
             [&] {
-                if (start && !options_.detach) {
-                    if (!core_.IsRunning()) core_.Resume();
+                // What "D" doesn't let run goes on as the connection is closed.
+                const bool detaches = options_.detach && (!start || profile_->detachResumes);
+                if (start && !detaches) {
+                    if (core_.IsStopped()) core_.Resume();
                 } else {
                     core_.Stop();
                     started_ = false;
                 }
                 try {
-                    if (options_.detach) connection_.Ask("D");
+                    if (detaches) connection_.Ask("D");
                 } catch (const ProtocolError&) {
                     // Some servers close the connection in place of a reply.
                 }

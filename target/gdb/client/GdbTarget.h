@@ -1,9 +1,18 @@
-// GdbTarget: a board behind a GDB server, driven as any other target. It knows the protocol and
-// nothing of any one core, probe or flash.
+// GdbTarget: a board behind a GDB server, driven as any other target. It knows the protocol, and of
+// the core, the probe and the flash only what the options say.
 //
-// A server in all-stop mode lets nobody ask a running target. An access to one then stops the core
-// for a moment; it stays stopped until somebody waits for it again (a Pause, or a read that finds
-// it busy), so that a chunk's writes and the looks around them cost one stop.
+// Run begins what Halt, Reset or a crash ends; `started_` says that it is so. After a crash every
+// look at the mailbox fails with what was said of it, until Halt or Reset: nobody waits for a
+// program that is known to have stopped. Before it, the core itself may be stopped for a look. Then
+//
+// - where the running core can be asked (live), it is never stopped;
+// - everywhere else an access stops it, and it stays stopped, so that a chunk's writes and the
+// looks
+//   around them cost one stop, until somebody waits: in a pause, or by a read of one word that
+//   finds the program busy, or of memory beside the mailbox.
+//
+// Before the constructor returns, the server has shown that the target is halted and that it tells
+// of reads that fail, or was trusted.
 
 #pragma once
 
@@ -16,6 +25,7 @@
 #include "target/gdb/client/Connection.h"
 #include "target/gdb/client/Core.h"
 #include "target/gdb/client/GdbOptions.h"
+#include "target/gdb/client/LoaderFile.h"
 #include "target/gdb/client/MemoryPort.h"
 #include "target/gdb/client/RegisterNumbers.h"
 #include "target/gdb/wire/Replies.h"
@@ -53,10 +63,24 @@ class GdbTarget final : public Target {
     void Halt() override;
     void Reset(bool flag) override;
     void Pause(std::uint32_t milliseconds) override;
-    bool LooksStopIt() const override { return !core_.IsLive(); }
+    bool LooksStopIt() const override { return !core_.RunsLive(); }
 
     /// Where the stack of a loaded program begins, unless the options say otherwise.
     void SetRamEnd(std::uint32_t address) { ramEnd_ = address; }
+
+    /// What the server's description says of its target: "architecture armv7e-m"; may be empty.
+    std::string Description();
+
+    bool IsConnected() const { return !connection_.IsLost(); }
+
+    /// The profile that is used.
+    const Profile& Server() const { return *profile_; }
+
+    std::size_t PacketSize() const { return features_.packetSize; }
+    bool WritesBinary() const { return options_.binaryWrites.value_or(profile_->trueX); }
+
+    /// The command or packet that resets.
+    std::string ResetText() const { return options_.reset.value_or(profile_->reset); }
 
     /// Lets the server go; the target is left halted, or started where it stands. Nothing can be
     /// done with this object then.
@@ -68,14 +92,24 @@ class GdbTarget final : public Target {
     using Text = std::function<std::string()>;
 
     void Perform(const Text& describe, const std::function<void()>& action);
+    Connection Connect(const Address& address) const;
     void Attach();
+    void Introduce();
+    void ChooseProfile();
+    void OpenLiveServer();
+    void RequireReportedReads();
+    void RequireHalted(const std::string& after);
     std::string Monitor(const std::string& command);
+    void ResetByPacket(const std::string& packet);
+    void RequireFits(const LoaderFile& loader, const std::string& path) const;
+    std::string WhereStopped();
+    MemoryPort& Memory();
     std::string ReadDocument(const std::string& name);
     unsigned RegisterNumber(const std::string& name, const std::optional<std::uint32_t>& given);
     void WriteRegister(unsigned number, std::uint32_t value);
     void LoadSegments(const std::string& path);
     void StopForAccess();
-    void Resume();
+    void GoOn();
     std::string ReadMailbox(std::uint32_t address, std::size_t size);
     bool InMailbox(std::uint32_t address, std::size_t size) const;
     bool OverlapsMailbox(std::uint32_t address, std::size_t size) const;
@@ -84,13 +118,18 @@ class GdbTarget final : public Target {
     const GdbOptions options_;
     const Mailbox mailbox_;
     const InterruptCheck interrupted_;
+    const PacketTrace trace_;
     std::optional<std::uint32_t> ramEnd_;
     Connection connection_;
+    std::optional<Connection> liveConnection_;
     Features features_;
+    const Profile* profile_ = Profiles().data();
     MemoryPort memory_;
+    std::optional<MemoryPort> liveMemory_;
     Core core_;
     std::optional<RegisterNumbers> registers_;
     std::optional<std::string> look_;  ///< the mailbox, while nothing has gone on since
+    std::string crash_;                ///< that ended what Run began; nobody need wait for it
     bool started_ = false;             ///< by Run, and neither halted nor reset since
     bool liveTried_ = false;
 };

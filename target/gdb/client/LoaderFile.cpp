@@ -22,12 +22,9 @@ namespace {
 constexpr std::uint64_t kFileBytesMax = std::uint64_t{64} << 20;
 constexpr std::uint64_t kMemoryBytesMax = std::uint64_t{16} << 20;
 
-[[noreturn]] void Refuse(const std::string& path, const std::string& why) {
-    throw TargetError(fmt::format("the loader {} {}; --loader FILE names another one", path, why));
-}
-
 [[noreturn]] void RefuseForError(const std::string& path, const char* what) {
-    Refuse(path, fmt::format("can't be {}: {}", what, std::generic_category().message(errno)));
+    RefuseLoader(path,
+                 fmt::format("can't be {}: {}", what, std::generic_category().message(errno)));
 }
 
 /// Doesn't wait for the writer of a pipe, which is no loader anyway.
@@ -41,9 +38,10 @@ std::string ReadContents(const std::string& path) {
     const base::Descriptor file = OpenFile(path);
     struct stat status {};
     if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode))
-        Refuse(path, "is no regular file");
+        RefuseLoader(path, "is no regular file");
     const auto size = static_cast<std::uint64_t>(status.st_size);
-    if (size > kFileBytesMax) Refuse(path, "is too large for a program in a microcontroller's RAM");
+    if (size > kFileBytesMax)
+        RefuseLoader(path, "is too large for a program in a microcontroller's RAM");
     std::string contents(size, '\0');
     for (std::size_t done = 0; done < contents.size();) {
         const ssize_t got = read(file.Get(), contents.data() + done, contents.size() - done);
@@ -56,6 +54,10 @@ std::string ReadContents(const std::string& path) {
 
 }  // namespace
 
+void RefuseLoader(const std::string& path, const std::string& why) {
+    throw TargetError(fmt::format("the loader {} {}; --loader FILE names another one", path, why));
+}
+
 LoaderFile ReadLoaderFile(const std::string& path) try {
     const std::string contents = ReadContents(path);
     const base::ElfProgram program = base::ReadElf(contents);
@@ -64,14 +66,14 @@ LoaderFile ReadLoaderFile(const std::string& path) try {
     for (const base::ElfSegment& segment : program.segments) {
         memoryBytes += segment.memoryBytes;
         if (memoryBytes > kMemoryBytesMax)
-            Refuse(path, "is too large for a program in a microcontroller's RAM");
+            RefuseLoader(path, "is too large for a program in a microcontroller's RAM");
         loader.segments.push_back({segment.address, std::string(segment.bytes)});
         loader.segments.back().bytes.resize(segment.memoryBytes, '\0');
     }
-    if (loader.segments.empty()) Refuse(path, "holds nothing to load");
+    if (loader.segments.empty()) RefuseLoader(path, "holds nothing to load");
     return loader;
 } catch (const base::ElfError& error) {
-    Refuse(path, fmt::format("can't be loaded: {}", error.what()));
+    RefuseLoader(path, fmt::format("can't be loaded: {}", error.what()));
 }
 
 }  // namespace target::gdb

@@ -18,8 +18,11 @@ struct LoaderFile {
     std::uint32_t entry = 0;
 };
 
-/// Reads a 32-bit, little-endian executable of at most a few MiB. TargetError names the file and
-/// what is wrong with it.
+/// Throws the TargetError that names the file and why it can't be used.
+[[noreturn]] void RefuseLoader(const std::string& path, const std::string& why);
+
+/// Reads a 32-bit, little-endian ARM executable of at most a few MiB. TargetError names the file
+/// and what is wrong with it.
 LoaderFile ReadLoaderFile(const std::string& path);
 
 }  // namespace target::gdb

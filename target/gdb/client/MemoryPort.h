@@ -21,8 +21,13 @@ class MemoryPort {
     /// The longest packet that the server takes, frame included.
     void SetPacketSize(std::size_t size) { packetSize_ = size; }
 
+    /// Lets "X" be used, where the server takes it and answers when it is done. Without that, "M"
+    /// is used: it carries half as much.
+    void AllowBinary(bool allowed) { binary_ = allowed ? Binary::Unknown : Binary::Refused; }
+
     /// `count` bytes in as few packets as possible, cut at multiples of 4. Four aligned bytes are
-    /// always one access. Throws ProtocolError.
+    /// always one access. A server may answer with less than was asked for; the rest is asked for
+    /// then. Throws ProtocolError.
     std::string Read(std::uint32_t address, std::size_t count);
     void Write(std::uint32_t address, std::string_view bytes);
 
@@ -35,7 +40,7 @@ class MemoryPort {
 
     Connection& connection_;
     std::size_t packetSize_ = kPacketSizeMin;
-    Binary binary_ = Binary::Unknown;
+    Binary binary_ = Binary::Refused;
 };
 
 }  // namespace target::gdb

@@ -9,13 +9,13 @@
 #include "base/Hex.h"
 #include "target/gdb/client/GdbTarget.h"
 #include "target/gdb/client/LoaderFile.h"
+#include "target/gdb/client/Texts.h"
 
 namespace target::gdb {
 
 namespace {
 
 constexpr std::size_t kDocumentSizeMax = std::size_t{1} << 20;
-constexpr std::size_t kMonitorOutputMax = std::size_t{64} << 10;
 
 // The directory text was written for another system.
 std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
@@ -38,11 +38,37 @@ void GdbTarget::LoadProgram(const std::string& fileName, const std::string& dire
 }
 
 void GdbTarget::RequireProgram(const std::string& fileName, const std::string& directory) {
-    ReadLoaderFile(LoaderPath(options_, fileName, directory));
+    const std::string path = LoaderPath(options_, fileName, directory);
+    RequireFits(ReadLoaderFile(path), path);
+}
+
+/// The program lies in RAM, and its code and variables not where it is spoken to. The memory for
+/// that may be segments of its own, without contents.
+void GdbTarget::RequireFits(const LoaderFile& loader, const std::string& path) const {
+    const std::uint64_t ramStart = options_.device.ramStart.value_or(0);
+    const std::uint64_t ramEnd = ramEnd_ ? *ramEnd_ : std::uint64_t{1} << 32;
+    const std::uint64_t first = options_.device.ramStart.value_or(mailbox_.address);
+    const std::uint64_t end = std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
+    for (const LoaderFile::Segment& segment : loader.segments) {
+        const std::uint64_t segmentEnd = std::uint64_t{segment.address} + segment.bytes.size();
+        const std::string range = fmt::format("0x{:08X}-0x{:08X}", segment.address, segmentEnd - 1);
+        if (segment.address < ramStart || segmentEnd > ramEnd)
+            RefuseLoader(
+                path, fmt::format("has a segment at {}, outside the RAM (0x{:08X}-0x{:08X})", range,
+                                  ramStart, ramEnd - 1));
+        const bool outside = segmentEnd <= first || segment.address >= end;
+        const bool reserved = segment.address >= first && segmentEnd <= end &&
+                              segment.bytes.find_first_not_of('\0') == std::string::npos;
+        if (!outside && !reserved)
+            RefuseLoader(path, fmt::format("has a segment at {}, where its buffers and parameter "
+                                           "blocks are (0x{:08X}-0x{:08X})",
+                                           range, first, end - 1));
+    }
 }
 
 void GdbTarget::LoadSegments(const std::string& path) {
     const LoaderFile loader = ReadLoaderFile(path);
+    RequireFits(loader, path);
     if (!ramEnd_)
         throw ProtocolError(
             "isn't asked: where the RAM ends isn't known; "
@@ -105,26 +131,32 @@ std::string GdbTarget::ReadDocument(const std::string& name) {
     }
 }
 
+std::string GdbTarget::Description() try {
+    constexpr std::string_view kStart = "<architecture>";
+    if (!features_.description || connection_.IsLost()) return "";
+    const std::string document = ReadDocument("target.xml");
+    const std::size_t start = document.find(kStart);
+    const std::size_t end = document.find('<', start + 1);
+    if (start == std::string::npos || end == std::string::npos) return "";
+    return "architecture " +
+           Shown(std::string_view(document).substr(0, end).substr(start + kStart.size()));
+} catch (const ProtocolError&) {
+    return "";
+}
+
+/// What the command puts out; in output packets, or as its reply.
 std::string GdbTarget::Monitor(const std::string& command) {
     const std::string asked = fmt::format("the monitor command \"{}\"", Shown(command));
-    std::string output;
-    std::string reply = connection_.Ask("qRcmd," + base::ToHex(command));
-    Deadline deadline = After(connection_.Timeout());
-    for (;;) {
-        const auto line = ParseStopReply(reply);
-        const auto last = base::FromHex(reply);
-        if (reply == "OK") return output;
-        if (reply.empty()) throw ProtocolError("takes no monitor commands");
-        if (IsError(reply))
-            throw ProtocolError(fmt::format("answered \"{}\" to {}{}{}", Shown(reply), asked,
-                                            output.empty() ? "" : ": ", Shown(output)));
-        if (last) return output + *last;
-        if (!line) throw ProtocolError(fmt::format("answered \"{}\" to {}", Shown(reply), asked));
-        if (output.size() < kMonitorOutputMax) output += line->text;
-        auto next = connection_.Receive(deadline);
-        if (!next) connection_.Lose(fmt::format("didn't end {} in time", asked));
-        reply = std::move(*next);
-    }
+    const std::string reply = connection_.Ask("qRcmd," + base::ToHex(command));
+    const std::string& output = connection_.Output();
+    if (reply == "OK") return output;
+    if (reply.empty()) throw ProtocolError("takes no monitor commands");
+    if (IsError(reply))
+        throw ProtocolError(
+            fmt::format("answered \"{}\" to {}{}", ErrorText(reply), asked, LastLines(output)));
+    const auto last = base::FromHex(reply);
+    if (!last) connection_.Reject("qRcmd, " + command, reply);
+    return output + *last;
 }
 
 }  // namespace target::gdb

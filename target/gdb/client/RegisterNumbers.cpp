@@ -4,6 +4,7 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <pugixml.hpp>
 #include <string_view>
 
@@ -47,7 +48,11 @@ class Reader {
 
     void Add(const pugi::xml_node& node) {
         next_ = node.attribute("regnum").as_uint(next_);
-        numbers.emplace(node.attribute("name").as_string(), next_++);
+        std::string name = node.attribute("name").as_string();
+        std::ranges::transform(name, name.begin(), [](char letter) {
+            return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
+        });
+        numbers.emplace(std::move(name), next_++);
     }
 
     const FetchDocument& fetch_;

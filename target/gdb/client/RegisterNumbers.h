@@ -11,7 +11,7 @@
 
 namespace target::gdb {
 
-/// Register numbers by name.
+/// Register numbers by name, in lower case: servers write "xpsr" and "xPSR".
 using RegisterNumbers = std::map<std::string, unsigned>;
 
 /// Fetches the document of a name, or throws.

@@ -25,6 +25,14 @@ bool IsError(std::string_view reply) {
            base::ParseHexDigits(reply.substr(1)).has_value();
 }
 
+std::string ErrorText(std::string_view reply) {
+    constexpr std::size_t kTextMax = 200;
+    std::string text(reply.starts_with("E.") ? reply.substr(2, kTextMax) : reply);
+    std::ranges::replace_if(
+        text, [](char byte) { return byte < ' ' || byte > '~'; }, ' ');
+    return text;
+}
+
 bool IsRefusal(std::string_view reply) {
     return reply.empty() || IsError(reply);
 }
@@ -34,6 +42,7 @@ bool IsRefusal(std::string_view reply) {
 std::optional<StopReply> ParseStopReply(std::string_view reply) {
     if (reply.empty()) return std::nullopt;
     const auto number = base::ParseHexDigits(reply.substr(1, 2));
+    // The rest of these is no concern of ours: threads, registers, processes.
     switch (reply[0]) {
         case 'S':
         case 'T':
@@ -45,7 +54,7 @@ std::optional<StopReply> ParseStopReply(std::string_view reply) {
             return StopReply{StopReply::Kind::Exited, static_cast<unsigned>(*number)};
         case 'O': {
             auto text = base::FromHex(reply.substr(1));
-            if (!text || reply.size() < 3) return std::nullopt;
+            if (!text) return std::nullopt;
             return StopReply{StopReply::Kind::Output, 0, std::move(*text)};
         }
         default:
@@ -56,6 +65,8 @@ std::optional<StopReply> ParseStopReply(std::string_view reply) {
 std::string SignalName(unsigned signal) {
     // The protocol's own numbers, which aren't those of any one system.
     switch (signal) {
+        case 2:
+            return "SIGINT";
         case 4:
             return "SIGILL";
         case 5:

@@ -13,6 +13,9 @@ namespace target::gdb {
 /// "E01" or "E.text".
 bool IsError(std::string_view reply);
 
+/// What an error says: the text behind "E.", or all of it.
+std::string ErrorText(std::string_view reply);
+
 /// An error, or the empty reply to a request that the server doesn't know.
 bool IsRefusal(std::string_view reply);
 
@@ -21,7 +24,8 @@ struct StopReply {
     enum class Kind {
         Stopped,  ///< by `signal`
         Exited,   ///< there is no program, or none any more
-        Output,   ///< not stopped at all: `text` is output of the program or a command
+        Output,   ///< not stopped at all: `text` is output of the program or a command; empty to
+                  ///< show that the server is at work
     };
 
     Kind kind;
