@@ -238,7 +238,7 @@ void Core::FailHard() {
     Status() = ((handler & 1) != 0 ? kThumb : 0) | kHardFault;
     state_ = State::Running;
     if (Debugged() && (catches_ & kCatchHardFault) != 0) return Halt(kByVectorCatch);
-    if ((handler & 1) != 0 && IsCode(Pc())) return device_.Start();
+    if ((handler & 1) != 0 && IsCode(Pc())) return;  // where the loader isn't
     Pc() = kLockupAddress;
     state_ = State::LockedUp;
 }

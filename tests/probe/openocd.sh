@@ -85,4 +85,30 @@ through cable-off=20000000:2 1 "$any" 'the flash is incomplete: 15 KiB erased, [
 held half.bin
 cmp -n 2048 image.bin half.bin
 through '' 0 halted 'Done: the flash holds the image' $load
+
+# The core resets slowly, begins in the wrong state where the vectors are zero, can't be halted, and
+# crashes: into lockup while the vectors are erased, into the image's endless handler, or into a catch.
+through '' 0 running '' reset --run
+through reset-time=700 0 halted 'Done' $load --rewrite
+as_it_was never-halts '[14]' running halt program large.bin --base 8000
+as_it_was never-halts '[14]' running halt mac program 02-1B-C3-04-05-07 --commit
+through crash-after=20 1 halted 'timed out' program large.bin --base 8000 --set FlashTimeoutValue=1
+through crash-after=0 1 halted 'stopped by itself.*0x[0-9a-fA-F]' program large.bin --base 8000 --rewrite \
+    --gdb-option 'init=cortex_m vector_catch hard_err'
+for crash in 0 20; do
+    through crash-after=$crash 1 halted 'stopped by itself.*0x[fF]\{7\}[eE]' $load --rewrite
+done
+head -c 2048 /dev/zero >zeros.bin
+through '' 0 halted 'Done' program zeros.bin --base 0
+through '' 0 halted 'Done' $load
+
+# Failed reads are hidden: nobody works like that unless the user says so, and then nothing that wasn't
+# read is told.
+failed_reads=disable
+as_it_was '' 4 halted 'gdb_report_data_abort enable' verify image.bin --base 0
+trusted='--gdb-option reads=trusted'
+through '' 0 halted 'Done' $load --rewrite $trusted
+as_it_was cable-off=4000:1 '[14]' "$any" corvane-flash read out.bin --range 0-7fff $trusted
+[ ! -e out.bin ]
+as_it_was cable-off=800:1 '[14]' "$any" corvane-flash verify image.bin --base 0 $trusted
 }
