@@ -33,8 +33,8 @@ struct Differences {
 
     std::uint64_t byteCount = 0;  ///< that differ
     std::uint64_t rangeCount = 0;
-    std::vector<DifferentRange> ranges;  ///< the first of them
-    std::uint32_t lastAddress = 0;       ///< of the last byte that differs
+    std::vector<DifferentRange> ranges = {};  ///< the first of them
+    std::uint32_t lastAddress = 0;            ///< of the last byte that differs
 
     /// The first byte of which a bit that should be 1 is 0: only an erase can mend that.
     std::optional<std::uint32_t> notErased = {};
