@@ -64,6 +64,7 @@ class Option {
 template <typename Values>
 std::vector<OptionRow> RowsOf(const std::vector<Option<Values>>& options) {
     std::vector<OptionRow> rows;
+    rows.reserve(options.size());
     for (const Option<Values>& option : options)
         rows.push_back(option.Row());
     return rows;
