@@ -43,7 +43,7 @@ bool IsPlausible(CheckedHost& host, std::uint32_t (*order)(std::uint32_t)) try {
         flashField = read(Register::FlashSize) & 0xFFFF;
         ramField = read(Register::SramSize);
     }
-    constexpr std::uint64_t most = 16 * 1024 * 1024;
+    constexpr std::uint64_t most = std::uint64_t{16} << 20;
     const std::uint64_t ram = (ramField + 1) * 256;
     return ram > LoaderMemory::ParameterBlocks - LoaderMemory::Buffers && ram < most &&
            (flashField + 1) * 2048 <= most;

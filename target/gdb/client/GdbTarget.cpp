@@ -49,12 +49,12 @@ Connection GdbTarget::Connect(const Address& address) const try {
 }
 
 GdbTarget::GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
-                     InterruptCheck interrupted, const PacketTrace& trace)
+                     InterruptCheck interrupted, PacketTrace trace)
     : name_(address.Text()),
       options_(options),
       mailbox_(mailbox),
       interrupted_(std::move(interrupted)),
-      trace_(trace),
+      trace_(std::move(trace)),
       ramEnd_(options.ramEnd),
       connection_(Connect(address)),
       memory_(connection_),

@@ -46,7 +46,7 @@ class GdbTarget final : public Target {
     /// Connects and stops the target. TargetError, also for every operation below; after an error
     /// that leaves it open what the server would answer next, all operations fail.
     GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
-              InterruptCheck interrupted, const PacketTrace& trace);
+              InterruptCheck interrupted, PacketTrace trace);
 
     void Read(void* buffer, std::size_t count, std::uint32_t address, int page,
               std::size_t width) override;

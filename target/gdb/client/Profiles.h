@@ -18,8 +18,8 @@ struct Profile {
     bool trueX;            ///< "X" is answered when it is done, not before
     bool triesLive;        ///< whether a read of the running target is worth a try
     bool detachResumes;    ///< "D" lets the target run, as the protocol has it
-    const char* reads;     ///< what makes it report reads that failed; null: it does so
     bool trusted = false;  ///< what it says of reads and halts needn't be tried; it is ours
+    const char* reads;     ///< what makes it report reads that failed; null: it does so
 
     // For docs/boards.md.
     const char* title;
