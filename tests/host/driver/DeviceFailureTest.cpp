@@ -49,7 +49,7 @@ TEST(DeviceFailure, TellsWhatWasDoneWhyItFailedAndWhatTheDeviceHolds) {
         KnownState state;
         ExitStatus status;
         std::string text;
-        std::string remark = "";  ///< the text, when empty
+        std::string remark = {};  ///< the text, when empty
     } cases[] = {
         {{"erasing", "no answer."}, {}, ExitStatus::DeviceFailed, "erasing: no answer" + asItWas},
         {{"erasing", "", "Erase failed.."},
