@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 
 #include <algorithm>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <new>
@@ -23,7 +24,7 @@ char givenBack[80];
 }  // namespace
 
 const char* Dangling(const std::string& text) {
-    std::strcpy(givenBack, text.c_str());
+    std::snprintf(givenBack, sizeof givenBack, "%s", text.c_str());
     return givenBack;
 }
 
