@@ -15,6 +15,7 @@
 #include <sstream>
 #include <utility>
 
+#include "tests/support/Cases.h"
 #include "tests/support/RecordingHost.h"
 
 namespace {
@@ -263,181 +264,53 @@ struct Task {
     bool (*work)(PluginRun&, Plugin&);
     Settings settings;
 };
-const Task kPages = {LoadsPages, {{"FlashProgramCRCOption", "1"}}};
-const Task kPagesKept = {LoadsPages, {{"FlashProgramCRCOption", "1"}, {"FlashResetSetting", "0"}}};
-const Task kWithoutStop = {LoadsWithoutStop, {}};
-const Task kOnBlank = {LoadsOnBlank,
-                       {{"FlashProgramCRCOption", "1"},
-                        {"FlashProgramOption", "Do Not Erase Flash Memory"},
-                        {"FlashResetSetting", "0"}}};
+const Settings kCrc = {{"FlashProgramCRCOption", "1"}};
 const Settings kWhole = {{"FlashProgramOption", "Use the Erase Options Specified Below"},
                          {"FlashEraseType", "Entire Flash"}};
-const Settings kWholeKept = {{"FlashProgramOption", "Use the Erase Options Specified Below"},
-                             {"FlashEraseType", "Entire Flash"},
-                             {"FlashResetSetting", "0"}};
-const Task kWholeLoads = {LoadsWhole, kWhole};
-const Task kWholeLoadsKept = {LoadsWhole, kWholeKept};
-const Task kErase = {ErasesAndChecks, kWhole};
-const Task kCommit = {Commits, {}};
-const Task kCommitAndErase = {CommitsAndErases, kWholeKept};
-const Task kAfterTimeOut = {LoadsAfterATimeOut, kWhole};
 
-const char kRavik[] = "ravik,flash=64K";
-const char kTolva[] = "tolva,flash=64K";
-const char kOrrin[] = "orrin,flash=64K";
-const char kQuen[] = "quen,flash=64K";
-const char kDorna[] = "dorna,flash=64K,sector=1K";
+Settings Kept(Settings settings) {
+    settings["FlashResetSetting"] = "0";
+    return settings;
+}
+
+const std::map<std::string, Task> kTasks = {
+    {"pages", {LoadsPages, kCrc}},
+    {"pages-kept", {LoadsPages, Kept(kCrc)}},
+    {"without-stop", {LoadsWithoutStop, {}}},
+    {"on-blank",
+     {LoadsOnBlank,
+      Kept({{"FlashProgramCRCOption", "1"}, {"FlashProgramOption", "Do Not Erase Flash Memory"}})}},
+    {"whole-loads", {LoadsWhole, kWhole}},
+    {"whole-loads-kept", {LoadsWhole, Kept(kWhole)}},
+    {"erase", {ErasesAndChecks, kWhole}},
+    {"commit", {Commits, {}}},
+    {"commit-and-erase", {CommitsAndErases, Kept(kWhole)}},
+    {"after-time-out", {LoadsAfterATimeOut, kWhole}},
+};
 
 /// A statement of the plug-in, the work that goes wrong without it, and the rule that sees to that.
 struct Row {
     std::string step;
-    const char* device;
-    const Task& task;
-    const char* rule;  ///< null: the work can't be right without it, on any device
-    Steps also = {};   ///< the same statement, after something else
+    std::string device;
+    std::string task;
+    std::string rule;  ///< "" or "-": the work can't be right without it, on any device
+    Steps steps;       ///< the same statement, after something else as well
 };
 
-const Row kRows[] = {
-    // Identification
-    {"Constructor: read 400FE000 after -", kDorna, kPages, "mapped-address"},
-    {"Constructor: halt after read 400FE000", kTolva, kPagesKept, "halted-for-timing"},
-    {"Constructor: read 400FE000 after read 400FE060", kDorna, kPages, "mapped-address"},
-    {"Constructor: read 400FE008 after read 400FE000", kTolva, kPages, nullptr},
-    {"Constructor: read 400FDFC0 after read 400FE000", kDorna, kPages, nullptr},
-    {"Constructor: read 400FDFC4 after read 400FDFC0", kDorna, kPages, nullptr},
-    // Reset
-    {"SystemResetAndHalt: halt after -", kDorna, kWithoutStop, "halted-for-reset"},
-    {"SystemResetAndHalt: reset after halt", "tolva,flash=64K,mass-erase-time=6s", kAfterTimeOut,
-     "one-command"},
-    {"SystemResetAndHalt: sleep 5 after reset", kTolva, kPages, "reset-recovery"},
-    {"SystemResetAndHalt: write 400FE040 after sleep 5", kTolva, kPages, "peripheral-reset"},
-    {"SystemResetAndHalt: write 400FE044 after write 400FE040", kTolva, kPages, "peripheral-reset"},
-    {"SystemResetAndHalt: write 400FE048 after write 400FE044", kTolva, kPages, "peripheral-reset"},
-    {"SystemResetAndHalt: sleep 5 after write 400FE048", kTolva, kPages, "peripheral-reset"},
-    {"SystemResetAndHalt: write 400FE040 after sleep 5, 2.", kTolva, kPages, "peripheral-reset"},
-    {"SystemResetAndHalt: write 400FE044 after write 400FE040, 2.", kTolva, kPages,
-     "peripheral-reset"},
-    {"SystemResetAndHalt: write 400FE048 after write 400FE044, 2.", kTolva, kPages,
-     "peripheral-reset"},
-    {"ROMAliasClear: read 400FE000 after -", kTolva, kPages, "rom-alias"},
-    {"ROMAliasClear: read 400FE0F0 after read 400FE000", kTolva, kPages, "rom-alias"},
-    {"ROMAliasClear: write 400FE0F0 after read 400FE0F0", kTolva, kPages, "rom-alias"},
-    {"ROMAliasClear: sleep 10 after write 400FE0F0", "tolva,flash=64K,bandwidth=0", kPages,
-     nullptr},
-    // Set-up of the three oldest classes
-    {"InitializeDevice: write 400FE140 after SystemResetAndHalt", kRavik, kPages, "flash-timing"},
-    {"InitializeDevice: write 400FE140 after -", kTolva, kPagesKept, "flash-timing"},
-    {"InitializeDevice: halt after write 400FE140", kTolva, kPages, "halted-for-clock"},
-    {"InitializeDevice: read 400FE060 after halt", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: sleep 20 after read 400FE060", kTolva, kPages, "timing-set-up"},
-    {"InitializeDevice: write 400FE060 after sleep 20", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: write 400FE058 after write 400FE060", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: write 400FE060 after write 400FE058", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: write 400FE060 after write 400FE060", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: write 400FE060 after write 400FE060, 2.", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: write 400FE060 after write 400FE060, 3.", kTolva, kPages, "clock-set-up"},
-    {"InitializeDevice: sleep 20 after write 400FE060", kTolva, kPages, "clock-settling"},
-    // Fix-ups of the first Orrin and of Quen
-    {"InitializeDevice: read 400FE000 after -", kOrrin, kPages, "fix-up"},
-    {"InitializeDevice: read 400FE070 after read 400FE000", kOrrin, kPages, "fix-up"},
-    {"InitializeDevice: write 400FE070 after read 400FE070", kOrrin, kPages, "fix-up"},
-    {"InitializeDevice: write 400FE060 after write 400FE070", kOrrin, kPages, "fix-up"},
-    {"InitializeDevice: sleep 20 after write 400FE060", kOrrin, kPages, "clock-settling"},
-    {"InitializeDevice: write 400FD0FC after -", kQuen, kPages, "fix-up"},
-    {"InitializeDevice: write 400AE2C0 after write 400FD0FC", kQuen, kPages, "fix-up"},
-    {"InitializeDevice: write 400FD0FC after write 400AE2C0", kQuen, kPages, "fix-up"},
-    // Erase of the whole flash
-    {"Erase: write 400FD000 after -", kTolva, kCommitAndErase, "bank"},
-    {"Erase: write 400FD000 after write 400FD000", "tolva,flash=192K", kErase, nullptr},
-    {"MassErase: halt after -", kDorna, kWholeLoadsKept, "halted-for-erase"},
-    {"MassErase: write 400FE40C after halt", "mesk,flash=32K", kErase, "flash-blocks"},
-    {"MassErase: sleep 10 after write 400FE40C", "mesk,flash=32K", kErase, "block-write"},
-    {"MassErase: write 400FE408 after sleep 10", "mesk,flash=32K", kErase, "flash-blocks"},
-    {"MassErase: sleep 10 after write 400FE408", "mesk,flash=32K", kErase, "block-write"},
-    {"MassErase: write 400FE404 after sleep 10", "mesk,flash=32K", kErase, "flash-blocks"},
-    {"MassErase: sleep 10 after write 400FE404", "mesk,flash=32K", kErase, "block-write"},
-    {"MassErase: read 400FE400 after sleep 10", "mesk,flash=32K", kErase, nullptr},
-    {"MassErase: write 400FE400 after read 400FE400", "mesk,flash=32K", kErase, "flash-blocks"},
-    {"MassErase: write 400FE404 after read 400FE400", "mesk,flash=96K", kErase, "flash-blocks"},
-    {"MassErase: sleep 10 after write 400FE400", "mesk,flash=32K", kErase, "block-write"},
-    {"MassErase: read 400FE1D0 after halt",
-     kDorna,
-     kErase,
-     "write-key",
-     {"MassErase: read 400FE1D0 after sleep 10"}},
-    {"MassErase: write 400FD008 after read 400FE1D0", kTolva, kErase, nullptr},
-    {"MassErase: sleep 10 after write 400FD008", kTolva, kErase, "status-delay"},
-    {"MassErase: read 400FD008 after sleep 10", kTolva, kErase, nullptr},
-    {"MassErase: sleep 10 after read 400FD008 busy", "tolva,flash=64K,mass-erase-time=4500ms",
-     kErase, nullptr},
-    {"MassErase: reset after read 400FD008", kTolva, kWholeLoads, "reset-after-erase"},
-    // Erase of sectors
-    {"PageErase: halt after -", kDorna, kWithoutStop, "halted-for-erase"},
-    {"PageErase: read 400FE1D0 after halt", kDorna, kPages, "write-key"},
-    {"PageErase: sleep 5 after read 400FD008",
-     "tolva,flash=64K,erase-time=9900us",
-     kPages,
-     "erase-recovery",
-     {"PageErase: sleep 5 after read 400FE1D0"}},
-    {"PageErase: write 400FD000 after sleep 5", kTolva, kPages, nullptr},
-    {"PageErase: sleep 5 after write 400FD000", kTolva, kPages, "address-set-up"},
-    {"PageErase: write 400FD008 after sleep 5", kTolva, kPages, nullptr},
-    {"PageErase: sleep 5 after write 400FD008", kTolva, kPages, "status-delay"},
-    {"PageErase: read 400FD008 after sleep 5", kTolva, kPages, "erase-recovery"},
-    {"PageErase: sleep 5 after read 400FD008 busy", "tolva,flash=64K,erase-time=900ms", kPages,
-     nullptr},
-    {"PageErase: reset after read 400FD008",
-     kTolva,
-     kPages,
-     "reset-after-erase",
-     {"PageErase: reset after read 400FE1D0"}},
-    // Programming
-    {"WriteDataToFlash: sleep 50 after PageErase",
-     kRavik,
-     kPages,
-     "erase-settling",
-     {"WriteDataToFlash: sleep 50 after Erase",
-      "WriteDataToFlash: sleep 50 after InitializeDevice"}},
-    {"Program: read flash after -", kTolva, kPages, nullptr},
-    {"Program: read flash after read flash", kTolva, kPages, nullptr},
-    {"Program: halt after read flash", kDorna, kOnBlank, "halted-for-load"},
-    {"Program: load after halt", kTolva, kPages, "loaded-for-run"},
-    {"Program: run after load", kTolva, kPages, nullptr},
-    {"Program: write buffer after run",
-     kTolva,
-     kPages,
-     nullptr,
-     {"Program: write buffer after read status"}},
-    {"Program: write parameters after write buffer", kTolva, kPages, nullptr},
-    {"Program: read status after write parameters",
-     "dorna,flash=64K,sector=1K,chunk-time=40ms",
-     kPages,
-     "buffer-in-use",
-     {"Program: read status after read status"}},
-    {"WriteDataToFlash: sleep 50 after Program", "dorna,flash=64K,sector=1K,chunk-time=40ms",
-     kPages, nullptr},
-    // Commit of user registers
-    {"UserRegisterOperation: write 400FE1E0 after ParseMACAddressString", kDorna, kCommit, nullptr},
-    {"UserRegisterOperation: write 400FE1E4 after write 400FE1E0", kDorna, kCommit, nullptr},
-    {"UserRegisterOperation: write 400FD000 after write 400FE1E4",
-     kDorna,
-     kCommit,
-     "commit-address",
-     {"UserRegisterOperation: write 400FD000 after read 400FD008"}},
-    {"UserRegisterOperation: read 400FE1D0 after write 400FD000", kDorna, kCommit, "write-key"},
-    {"UserRegisterOperation: write 400FD008 after read 400FE1D0", kDorna, kCommit, nullptr},
-    {"UserRegisterOperation: read 400FD008 after write 400FD008",
-     "dorna,flash=64K,commit-time=20ms",
-     kCommit,
-     "one-command",
-     {"UserRegisterOperation: read 400FD008 after read 400FD008 busy"}},
-    // What reads the flash for its own sake
-    {"CalculateChecksumByAddress: read flash after InitCRC32LUT",
-     kTolva,
-     kPages,
-     nullptr,
-     {"CalculateChecksumByAddress: read flash after read flash"}},
-};
+std::vector<Row> Rows() {
+    std::vector<Row> rows;
+    for (const auto& column : test::ReadTable("target/steps.txt", 5)) {
+        const bool sized = column[1].find("flash=") != std::string::npos;
+        rows.push_back({column[0],
+                        column[1] + (sized ? "" : ",flash=64K"),
+                        column[2],
+                        column[3] == "-" ? "" : column[3],
+                        {column[0]}});
+        for (const std::string& step : test::Split(column[4], "; "))
+            rows.back().steps.insert(step);
+    }
+    return rows;
+}
 
 // Two readings whose values the plug-in doesn't use but for a line of its trace. No device can tell
 // whether it is looked at.
@@ -451,7 +324,9 @@ struct Outcome {
     Steps seen;
 };
 
-Outcome Try(const char* device, const Task& task, const Steps& leftOut, How how = How::Whole) {
+Outcome Try(const std::string& device, const std::string& name, const Steps& leftOut,
+            How how = How::Whole) {
+    const Task& task = kTasks.at(name);
     PluginRun run(device, task.settings, leftOut, how);
     bool right = false;
     try {
@@ -465,18 +340,16 @@ Outcome Try(const char* device, const Task& task, const Steps& leftOut, How how 
 }
 
 TEST(LeftOutStep, MakesSomeWorkOnSomeDeviceWrong) {
-    for (const Row& row : kRows) {
-        Steps steps = row.also;
-        steps.insert(row.step);
+    for (const Row& row : Rows()) {
         const bool pause = row.step.find(": sleep ") != std::string::npos;
         for (const How how : {How::Whole, How::Half}) {
             if (how == How::Half && !pause) continue;
             SCOPED_TRACE(
                 fmt::format("{}{} on {}", row.step, how == How::Half ? ", half" : "", row.device));
-            const Outcome outcome = Try(row.device, row.task, steps, how);
+            const Outcome outcome = Try(row.device, row.task, row.steps, how);
             EXPECT_TRUE(outcome.seen.contains(row.step)) << "not a step of this work";
             EXPECT_FALSE(outcome.right);
-            if (row.rule == nullptr) continue;
+            if (row.rule.empty()) continue;
             EXPECT_NE(outcome.violations.find(fmt::format("[{}]", row.rule)), std::string::npos)
                 << outcome.violations;
         }
@@ -486,8 +359,8 @@ TEST(LeftOutStep, MakesSomeWorkOnSomeDeviceWrong) {
 TEST(LeftOutStep, BreaksARuleThatIsDocumented) {
     std::ostringstream document;
     document << std::ifstream(DEVICE_DOCUMENT).rdbuf();
-    for (const Row& row : kRows) {
-        const std::string rule = row.rule == nullptr ? "" : fmt::format("`{}`", row.rule);
+    for (const Row& row : Rows()) {
+        const std::string rule = row.rule.empty() ? "" : fmt::format("`{}`", row.rule);
         EXPECT_NE(document.str().find(rule), std::string::npos) << rule;
     }
 }
@@ -495,16 +368,15 @@ TEST(LeftOutStep, BreaksARuleThatIsDocumented) {
 // Nothing is wrong as long as nothing is left out, and no step is missing in the table.
 TEST(LeftOutStep, IsInTheTableWhicheverItIs) {
     Steps known = kWithoutEffect;
-    std::set<std::pair<std::string, const Task*>> works = {
-        {"mesk,flash=64K", &kErase}, {"mesk,flash=128K", &kErase}, {"pell,flash=64K", &kPages}};
-    for (const Row& row : kRows) {
-        known.insert(row.step);
-        known.insert(row.also.begin(), row.also.end());
-        works.emplace(row.device, &row.task);
+    std::set<std::pair<std::string, std::string>> works = {
+        {"mesk,flash=64K", "erase"}, {"mesk,flash=128K", "erase"}, {"pell,flash=64K", "pages"}};
+    for (const Row& row : Rows()) {
+        known.insert(row.steps.begin(), row.steps.end());
+        works.emplace(row.device, row.task);
     }
     for (const auto& [device, task] : works) {
         SCOPED_TRACE(device);
-        const Outcome outcome = Try(device.c_str(), *task, {});
+        const Outcome outcome = Try(device, task, {});
         EXPECT_TRUE(outcome.right);
         EXPECT_EQ(outcome.violations, "");
         for (const std::string& step : outcome.seen)

@@ -4,12 +4,17 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <functional>
+#include <map>
 #include <memory>
 #include <numeric>
+#include <optional>
+#include <sstream>
 
 #include "target/simulated/Contents.h"
 #include "target/simulated/options/DeviceClass.h"
+#include "tests/support/Cases.h"
 
 namespace {
 
@@ -93,6 +98,23 @@ struct DebuggedDevice {
         return bytes;
     }
 
+    void EraseBlocks(const std::vector<std::uint64_t>& blocks) {
+        for (std::uint32_t i = 0; i < blocks.size(); ++i) {
+            SetWord(0x400FE400 + 4 * i, static_cast<std::uint32_t>(blocks[i]));
+            device.Pause(8);
+        }
+        Command(0, 0xA4420004);
+        device.Pause(8);
+    }
+
+    // That this rule was broken, and no other.
+    void ExpectBroken(const std::string& rule) {
+        const auto broken = device.TakeViolations();
+        EXPECT_FALSE(broken.empty()) << rule;
+        for (const std::string& text : broken)
+            EXPECT_TRUE(text.ends_with("[" + rule + "]")) << text;
+    }
+
     // What is there, whatever reads there.
     Bytes Cells(std::uint32_t address, std::size_t size) const {
         Bytes bytes(size);
@@ -119,90 +141,99 @@ std::string ErrorOf(const std::function<void()>& action) {
     return "no error";
 }
 
+/// What stands behind a step's name, and behind its "=".
+struct Arguments {
+    std::string text;
+    std::vector<std::uint64_t> numbers = {};
+    std::optional<std::uint32_t> expected = {};
+
+    std::uint32_t operator[](std::size_t index) const {
+        return static_cast<std::uint32_t>(numbers.at(index));
+    }
+    int Int(std::size_t index) const { return static_cast<int>(numbers.at(index)); }
+};
+
+/// The byte that all of them are.
+std::uint32_t Same(const Bytes& bytes) {
+    return std::ranges::count(bytes, bytes[0]) == std::ssize(bytes) ? bytes[0] : 0x100;
+}
+
+/// A step's name and what it does. It gives what it has found.
+using Step = std::uint32_t (*)(DebuggedDevice& d, const Arguments& a);
+
+const std::map<std::string, Step> kSteps = {
+    {"read",
+     [](auto& d, auto& a) {
+         return d.device.Read(nullptr, a.numbers.at(1), a[0], a.Int(2), a[3]), 0U;
+     }},
+    {"write",
+     [](auto& d, auto& a) { return d.device.Write(nullptr, a[1], a[0], a.Int(2), a[3]), 0U; }},
+    {"word", [](auto& d, auto& a) { return d.Word(a[0]); }},
+    {"set", [](auto& d, auto& a) { return d.SetWord(a[0], a[1]), 0U; }},
+    {"command", [](auto& d, auto& a) { return d.Command(a[0], a[1]), 0U; }},
+    {"pause", [](auto& d, auto& a) { return d.device.Pause(a[0]), 0U; }},
+    {"clock", [](auto& d, auto& a) { return d.clock.Advance(a[0] * 1us), 0U; }},
+    {"preset",
+     [](auto& d, auto& a) {
+         return d.device.Flash().Preset(a[0], Bytes(a[1], static_cast<std::uint8_t>(a[2]))), 0U;
+     }},
+    {"flash", [](auto& d, auto& a) { return Same(d.Flash(a[0], a[1])); }},
+    {"cells", [](auto& d, auto& a) { return Same(d.Cells(a[0], a[1])); }},
+    {"load", [](auto& d, auto& a) { return d.device.LoadProgram(a.text, "d/"), 0U; }},
+    {"run", [](auto& d, auto&) { return d.device.Run(), 0U; }},
+    {"halt", [](auto& d, auto&) { return d.device.Halt(), 0U; }},
+    {"reset", [](auto& d, auto& a) { return d.device.Reset(a[0] != 0), 0U; }},
+    {"power-cycle", [](auto& d, auto&) { return d.device.PowerCycle(), 0U; }},
+    {"start", [](auto& d, auto&) { return d.StartLoader(), 0U; }},
+    {"chunk", [](auto& d, auto& a) { return d.HandOver(a.Int(0), a[1], Bytes(a[2], 0x3C)), 0U; }},
+    {"program", [](auto& d, auto& a) { return d.Program(a[0]), 0U; }},
+    {"hold", [](auto& d, auto& a) { return d.HoldPeripherals(a[0]), 0U; }},
+    {"blocks", [](auto& d, auto& a) { return d.EraseBlocks(a.numbers), 0U; }},
+    {"broken", [](auto& d, auto& a) { return d.ExpectBroken(a.text), 0U; }},
+};
+
+Arguments ArgumentsOf(const std::string& name, const std::string& text) {
+    Arguments arguments{text};
+    const int base = name == "pause" || name == "clock" ? 10 : 16;
+    if (name == "load" || name == "broken") return arguments;
+    std::istringstream words(text);
+    for (std::string word; words >> word;) {
+        if (word == "=")
+            arguments.expected = 0;
+        else if (const auto number = std::stoull(word, nullptr, base); arguments.expected)
+            arguments.expected = static_cast<std::uint32_t>(number);
+        else
+            arguments.numbers.push_back(number);
+    }
+    return arguments;
+}
+
+void Take(DebuggedDevice& debugged, const std::string& steps) {
+    for (const std::string& step : test::Split(steps, "; ")) {
+        const std::string name = step.substr(0, step.find(' '));
+        const std::string text = step.substr(std::min(name.size() + 1, step.size()));
+        const Arguments arguments = ArgumentsOf(name, text);
+        const std::uint32_t found = kSteps.at(name)(debugged, arguments);
+        EXPECT_EQ(found, arguments.expected.value_or(found)) << step;
+    }
+}
+
 TEST(Rules, RefusedAccessNamesTheRule) {
-    const struct {
-        const char* text;
-        std::function<void(DebuggedDevice&)> access;
-    } cases[] = {
-        {"0x400FD000 on page 2: the device has the pages 0 (flash) and 1 (everything) [page]",
-         [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FD000, 2, 4); }},
-        {"[page]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE000, 0, 4); }},
-        {"[access-width]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE000, 1, 2); }},
-        {"[access-width]", [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x20000000, 1, 0); }},
-        {"[aligned-access]",
-         [](DebuggedDevice& r) { r.device.Read(nullptr, 1, 0x400FE002, 1, 4); }},
-        {"[aligned-access]",
-         [](DebuggedDevice& r) { r.device.Write(nullptr, 1, 0x20000001, 1, 2); }},
-        {"[mapped-address]", [](DebuggedDevice& r) { r.Flash(0x3FFFF, 2); }},
-        {"[mapped-address]",
-         [](DebuggedDevice& r) { r.device.Read(nullptr, SIZE_MAX, 0x100, 0, 4); }},
-        {"class tolva has no memory and no register at 0x400FE070 [mapped-address]",
-         [](DebuggedDevice& r) { r.Word(0x400FE070); }},
-        {"[read-only-register]", [](DebuggedDevice& r) { r.SetWord(0x400FE1D0, 0); }},
-        {"[flash-read-only]", [](DebuggedDevice& r) { r.device.Write("x", 1, 0, 1, 1); }},
-        {"[known-command]", [](DebuggedDevice& r) { r.SetWord(kFlashCommand, 0xA4420006); }},
-        {"[one-command]",
-         [](DebuggedDevice& r) {
-             r.Command(0, 0xA4420002);
-             r.SetWord(kFlashCommand, 0xA4420002);
-         }},
-        {"[flash-busy]",
-         [](DebuggedDevice& r) {
-             r.Command(0, 0xA4420002);
-             r.Flash(0x8000, 1);
-         }},
-        {"[flash-busy]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.HandOver(0, 0, Pattern(128));
-             r.Flash(0x8000, 1);
-         }},
-        {"[flash-busy]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.HandOver(0, 0, Pattern(128));
-             r.SetWord(kFlashAddress, 0);
-         }},
-        {"[halted-for-erase]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.Command(0, 0xA4420004);
-         }},
-        {"the flash address register holds 0x00000200, which is not the start of a 0x400-byte "
-         "sector of the 0x40000-byte flash [sector-address]",
-         [](DebuggedDevice& r) { r.Command(0x200, 0xA4420002); }},
-        {"[sector-address]", [](DebuggedDevice& r) { r.Command(0x40000, 0xA4420002); }},
-        {"[commit-address]", [](DebuggedDevice& r) { r.Command(0x80000002, 0xA4420008); }},
-        {"[loaded-for-run]", [](DebuggedDevice& r) { r.device.Run(); }},
-        {"[loaded-for-run]",
-         [](DebuggedDevice& r) {
-             r.device.LoadProgram(kLoader, "");
-             r.device.Reset(true);
-             r.device.Run();
-         }},
-        {"[known-program]", [](DebuggedDevice& r) { r.device.LoadProgram("other.out", "d/"); }},
-        {"[halted-for-load]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.StartLoader();
-         }},
-        {"[halted-for-run]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.device.Run();
-         }},
-        {"[buffer-in-use]",
-         [](DebuggedDevice& r) {
-             r.StartLoader();
-             r.HandOver(0, 0, Pattern(128));
-             r.HandOver(0, 0x80, Pattern(128));
-         }},
-    };
-    for (const auto& [text, access] : cases) {
+    for (const auto& row : test::ReadTable("target/refused.txt", 2)) {
         DebuggedDevice debugged;
-        const std::string error = ErrorOf([&, &run = access] { run(debugged); });
-        EXPECT_TRUE(error.ends_with(text)) << error << " instead of " << text;
+        const std::string error = ErrorOf([&] { Take(debugged, row[1]); });
+        EXPECT_TRUE(error.ends_with(row[0])) << error << " instead of " << row[0];
         EXPECT_EQ(debugged.device.Violations(), std::vector{error});
+    }
+}
+
+TEST(Device, BehavesAsTold) {
+    for (const test::Scenario& scenario : test::ReadScenarios("target/behaviour.txt")) {
+        SCOPED_TRACE(scenario.name);
+        DebuggedDevice debugged(scenario.device);
+        for (const std::string& step : scenario.steps)
+            Take(debugged, step);
+        EXPECT_EQ(debugged.device.Violations(), std::vector<std::string>());
     }
 }
 
@@ -243,65 +274,15 @@ TEST(WriteKey, WrongOneDoesNothing) {
 
 // Each wait as long as it has to be is kept, and a millisecond less breaks its rule and no other.
 TEST(Rules, WaitsAreExact) {
-    const struct {
-        const char* rule;
-        const char* device;
-        std::uint32_t waitMs;
-        std::function<void(DebuggedDevice&)> before, after;
-    } cases[] = {
-        {"timing-set-up", "tolva", 16, [](DebuggedDevice& r) { r.SetWord(0x400FE140, 7); },
-         [](DebuggedDevice& r) { r.SetWord(kClock, 0x07803F82); }},
-        {"clock-settling", "pell", 16, [](DebuggedDevice& r) { r.SetWord(kClock, 0); },
-         [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); }},
-        {"address-set-up", "pell", 4, [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); },
-         [](DebuggedDevice& r) { r.SetWord(kFlashCommand, 0xA4420002); }},
-        {"status-delay", "pell", 4, [](DebuggedDevice& r) { r.Command(0, 0xA4420002); },
-         [](DebuggedDevice& r) { r.Word(kFlashCommand); }},
-        {"status-delay", "pell", 8, [](DebuggedDevice& r) { r.Command(0, 0xA4420004); },
-         [](DebuggedDevice& r) { r.Word(kFlashCommand); }},
-        {"erase-recovery", "pell,erase-time=7ms", 7 + 4,
-         [](DebuggedDevice& r) { r.Command(0, 0xA4420002); },
-         [](DebuggedDevice& r) { r.SetWord(kFlashAddress, 0); }},
-        {"block-write", "mesk", 8, [](DebuggedDevice& r) { r.SetWord(0x400FE40C, 0); },
-         [](DebuggedDevice& r) { r.SetWord(0x400FE408, 0); }},
-        {"reset-recovery", "pell", 4, [](DebuggedDevice& r) { r.device.Reset(true); },
-         [](DebuggedDevice& r) { r.SetWord(0x400FE048, kBusy); }},
-        {"peripheral-reset", "pell", 4,
-         [](DebuggedDevice& r) {
-             r.device.Reset(true);
-             r.device.Pause(4);
-             r.HoldPeripherals(kBusy);
-         },
-         [](DebuggedDevice& r) {
-             r.HoldPeripherals(0);
-             r.Command(0, 0xA4420002);
-         }},
-        {"rom-alias", "pell", 8,
-         [](DebuggedDevice& r) {
-             r.device.Reset(false);
-             r.SetWord(0x400FE0F0, 1);
-         },
-         [](DebuggedDevice& r) { r.Program(0x7F80); }},
-        {"erase-settling", "ravik,erase-time=7ms", 40,
-         [](DebuggedDevice& r) {
-             r.device.Flash().Preset(0x400, Bytes(0x400, 0xAA));
-             r.Command(0x400, 0xA4420002);
-             r.device.Pause(7);
-             r.device.Reset(false);
-         },
-         [](DebuggedDevice& r) { r.Program(0x780); }},
-    };
-    for (const auto& [rule, device, waitMs, before, after] : cases) {
+    for (const auto& row : test::ReadTable("target/waits.txt", 5)) {
         for (const bool enough : {false, true}) {
-            SCOPED_TRACE(testing::Message() << rule << " " << waitMs << " " << enough);
-            DebuggedDevice debugged(device + std::string(",latency=0,bandwidth=0"));
-            before(debugged);
-            debugged.device.Pause(enough ? waitMs : waitMs - 1);
-            after(debugged);
-            const auto broken = debugged.device.TakeViolations();
-            EXPECT_EQ(broken.empty(), enough);
-            for (const std::string& text : broken)
-                EXPECT_TRUE(text.ends_with(std::string("[") + rule + "]")) << text;
+            SCOPED_TRACE(row[0] + row[2] + (enough ? " enough" : " too short"));
+            DebuggedDevice debugged(row[1] + ",latency=0,bandwidth=0");
+            Take(debugged, row[3]);
+            debugged.device.Pause(static_cast<std::uint32_t>(std::stoul(row[2])) - !enough);
+            Take(debugged, row[4]);
+            if (!enough) debugged.ExpectBroken(row[0]);
+            EXPECT_EQ(debugged.device.Violations(), std::vector<std::string>());
         }
     }
 }
@@ -324,35 +305,6 @@ TEST(Rules, ClockTakesExactWords) {
     }
 }
 
-TEST(Rules, WatchdogsAreResetAtAnyTime) {
-    DebuggedDevice debugged("pell");
-    debugged.device.Reset(true);
-    debugged.SetWord(0x400FE040, 0x10000008);
-    debugged.device.Pause(4);
-    debugged.HoldPeripherals(kBusy);
-    debugged.device.Pause(4);
-    debugged.HoldPeripherals(0);
-    debugged.SetWord(0x400FE040, 0x10000008);
-    debugged.Command(0, 0xA4420002);
-    EXPECT_EQ(debugged.device.Violations(), std::vector<std::string>());
-}
-
-// Of what was erased too short a time before, only the pages that are programmed come back.
-TEST(Erase, IsUndoneForThePagesInUse) {
-    for (const std::uint32_t address : {0x780U, 0x800U}) {
-        DebuggedDevice debugged("ravik");
-        debugged.device.Flash().Preset(0x400, Bytes(0x800, 0xAA));
-        for (const std::uint32_t sector : {0x400U, 0x800U}) {
-            debugged.Command(sector, 0xA4420002);
-            debugged.device.Pause(12);
-        }
-        debugged.device.Reset(false);
-        debugged.Program(address);
-        EXPECT_EQ(debugged.Cells(0x700, 1)[0], address == 0x780 ? 0xAA : 0xFF);
-        EXPECT_EQ(debugged.Cells(0x900, 1)[0], address == 0x780 ? 0xFF : 0xAA);
-    }
-}
-
 TEST(Registers, AreTransferredInARow) {
     DebuggedDevice debugged("mesk");
     const std::uint32_t words[] = {0x11, 0x22};
@@ -360,53 +312,6 @@ TEST(Registers, AreTransferredInARow) {
     std::uint32_t read[2] = {};
     debugged.device.Read(read, 2, kUser0, 1, 4);
     EXPECT_TRUE(std::equal(std::begin(words), std::end(words), read));
-}
-
-TEST(Erase, TakesPollsAndKeepsToItsSector) {
-    DebuggedDevice debugged("velk,sector=2K");
-    debugged.device.Flash().Preset(0, Bytes(0x3000, 0));
-    const auto polls = [&debugged](std::uint32_t address, std::uint32_t command,
-                                   std::uint32_t pauseMs) {
-        debugged.Command(address, command);
-        int busy = 0;
-        for (debugged.device.Pause(pauseMs); debugged.Word(kFlashCommand) != 0; ++busy) {
-            debugged.device.Pause(pauseMs);
-        }
-        return busy;
-    };
-    EXPECT_EQ(polls(0x800, 0x71D50002, 5), 1);
-    Bytes expected(0x3000, 0);
-    std::fill_n(expected.begin() + 0x800, 0x800, std::uint8_t{0xFF});
-    EXPECT_EQ(debugged.Flash(0, 0x3000), expected);
-    EXPECT_EQ(polls(0x20000, 0x71D50004, 10), 5);
-    EXPECT_EQ(debugged.device.FlashContents(), Bytes(0x80000, 0xFF));
-}
-
-TEST(Erase, MeskNeedsItsBlocksBeyondTheFlashCleared) {
-    const struct {
-        const char* flash;
-        std::uint32_t blocks[4];
-        bool erases;
-    } cases[] = {{"32K", {0xFFFF, 0, 0, 0}, true},
-                 {"32K", {0x1FFFF, 0, 0, 0}, false},
-                 {"64K", {kBusy, 0, 0, 0}, true},
-                 {"64K", {kBusy, 1, 0, 0}, false},
-                 {"96K", {kBusy, 0xFFFF, 0, 0}, true},
-                 {"96K", {kBusy, kBusy, 0, 0}, false},
-                 {"128K", {kBusy, kBusy, 0, 0}, true},
-                 {"128K", {0, 0, 0, 0x80000000}, false},
-                 {"256K", {kBusy, kBusy, kBusy, kBusy}, true}};
-    for (const auto& c : cases) {
-        DebuggedDevice debugged(std::string("mesk,flash=") + c.flash);
-        for (std::uint32_t i = 0; i < 4; ++i) {
-            debugged.SetWord(0x400FE400 + 4 * i, c.blocks[i]);
-            debugged.device.Pause(8);
-        }
-        debugged.Command(0, 0xA4420004);
-        debugged.device.Pause(8);
-        EXPECT_EQ(debugged.Word(kFlashCommand) == 4, c.erases) << c.flash;
-        EXPECT_EQ(debugged.device.Violations().empty(), c.erases);
-    }
 }
 
 TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
@@ -428,80 +333,6 @@ TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
     EXPECT_TRUE(debugged.device.Violations().empty());
 }
 
-TEST(Loader, ServesTheBlocksInTurnOnTheInjectedClock) {
-    DebuggedDevice debugged("tolva,chunk-time=10ms,latency=0,bandwidth=0");
-    debugged.StartLoader();
-    debugged.HandOver(1, 0x800, Pattern(128));  // must wait for block 0
-    debugged.clock.Advance(1s);
-    debugged.HandOver(0, 0, Pattern(128));
-    std::vector<std::array<std::uint32_t, 2>> seen;
-    for (const auto step : {0us, 9999us, 2us, 9999us}) {
-        debugged.clock.Advance(step);
-        seen.push_back({debugged.Word(kStatus[0]), debugged.Word(kStatus[1])});
-    }
-    EXPECT_EQ(seen, (decltype(seen){{kBusy, kBusy}, {kBusy, kBusy}, {0, kBusy}, {0, 0}}));
-}
-
-TEST(Loader, HaltAndResetLoseTheChunkAtWork) {
-    for (const bool reset : {false, true}) {
-        DebuggedDevice debugged;
-        debugged.StartLoader();
-        debugged.HandOver(0, 0, Bytes(256, 0));
-        if (reset) {
-            debugged.device.Reset(false);
-        } else {
-            debugged.device.Halt();
-        }
-        debugged.device.Pause(1000);
-        Bytes expected(256, 0xFF);
-        std::fill_n(expected.begin(), 128, std::uint8_t{0});
-        EXPECT_EQ(debugged.Cells(0, 256), expected);
-        EXPECT_EQ(debugged.Word(kStatus[0]), kBusy);
-    }
-}
-
-TEST(Loader, SaysWhatItCannotTellTheDebugger) {
-    const struct {
-        std::uint32_t address, size;
-        const char* rule;
-    } cases[] = {{0x40, 128, "[loader-parameters]"},
-                 {0, 64, "[loader-parameters]"},
-                 {0, 0, "[loader-parameters]"},
-                 {0x3FF80, 256, "[loader-parameters]"},
-                 {kBusy - 127, 128, "[loader-parameters]"},
-                 {0x400, 128, "[erased-cells]"}};
-    for (const auto& [address, size, rule] : cases) {
-        DebuggedDevice debugged;
-        debugged.device.Flash().Preset(0x410, Bytes{0xF0});
-        debugged.StartLoader();
-        debugged.HandOver(0, address, Bytes(size, 0x3C));
-        debugged.device.Pause(1);
-        EXPECT_NE(debugged.Word(kStatus[0]), kBusy);
-        ASSERT_EQ(debugged.device.Violations().size(), 1U);
-        EXPECT_TRUE(debugged.device.Violations()[0].ends_with(rule))
-            << debugged.device.Violations()[0];
-        EXPECT_EQ(debugged.Flash(0x410, 1)[0], address == 0x400 ? 0x30 : 0xF0);
-    }
-}
-
-TEST(UserRegisters, AreVolatileUntilCommitted) {
-    DebuggedDevice debugged;
-    const auto values = [&debugged] {
-        return std::array{debugged.Word(kUser0), debugged.Word(kUser0 + 4)};
-    };
-    debugged.SetWord(kUser0, 0x11);
-    debugged.SetWord(kUser0 + 4, 0x22);
-    debugged.Command(0x80000001, 0xA4420008);
-    debugged.device.Pause(1);
-    EXPECT_EQ(values(), (std::array{0x11U, 0x22U}));
-    debugged.device.Reset(true);
-    EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
-    debugged.Command(0x80000000, 0xA4420008);
-    debugged.SetWord(kUser0 + 4, 0x33);
-    debugged.device.PowerCycle();
-    EXPECT_EQ(values(), (std::array{kBusy, 0x22U}));
-}
-
 TEST(Faults, ComeAsAsked) {
     DebuggedDevice once("tolva,fail-access=3", false);  // the device's halt is the first
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
@@ -513,35 +344,6 @@ TEST(Faults, ComeAsAsked) {
     DebuggedDevice fromThen("tolva,fail-from=2", false);
     for (int i = 0; i < 3; ++i)
         EXPECT_TRUE(ErrorOf([&] { fromThen.device.Run(); }).ends_with("[fail-from]"));
-
-    DebuggedDevice never("tolva,erase=never,commit=never");
-    for (const auto& [address, command] : {std::pair{0U, 2U}, {0U, 4U}, {0x80000000U, 8U}}) {
-        never.Command(address, 0xA4420000 | command);
-        never.device.Pause(0xFFFFFFFF);
-        EXPECT_EQ(never.Word(kFlashCommand), command);
-        never.device.Reset(false);
-    }
-
-    DebuggedDevice stuck("tolva,stuck-cell=0x1003:0x5A");
-    EXPECT_EQ(stuck.Flash(0x1002, 3), (Bytes{0xFF, 0x5A, 0xFF}));
-
-    DebuggedDevice ones("tolva,registers=ones"), zeros("tolva,registers=zeros");
-    EXPECT_EQ(ones.Word(kFlashCommand), kBusy);
-    EXPECT_EQ(zeros.Word(0x400FDFC0), 0U);
-    ones.device.Flash().Preset(0, Bytes{0});
-    ones.SetWord(kFlashCommand, 0xA4420004);
-    ones.device.Pause(1000);
-    EXPECT_EQ(ones.Flash(0, 1), Bytes{0}) << "a write came through";
-
-    for (const auto& [options, idle] :
-         {std::pair{"tolva,loader=hangs", 0U}, {"tolva,loader=dead", kBusy}}) {
-        DebuggedDevice debugged(options);
-        debugged.StartLoader();
-        EXPECT_EQ(debugged.Word(kStatus[1]), idle);
-        debugged.HandOver(0, 0, Pattern(128));
-        debugged.device.Pause(60'000);
-        EXPECT_EQ(debugged.Word(kStatus[0]), kBusy);
-    }
 }
 
 TEST(Time, CannotBeWaitedIntoAnOverflow) {
@@ -554,36 +356,10 @@ TEST(Time, CannotBeWaitedIntoAnOverflow) {
 }
 
 TEST(Options, BadOnesAreNamed) {
-    const struct {
-        const char* text;
-        const char* error;
-    } cases[] = {
-        {"", "Device class \"\" of the simulated device: use one of ravik, tolva"},
-        {"Tolva", "Device class \"Tolva\""},
-        {"tolva,color=red", "Option \"color=red\" of the simulated device: the form is NAME=VALUE"},
-        {"tolva,flash", "Option \"flash\""},
-        {"tolva,flash=3K", "Option \"flash=3K\" of the simulated device: accepted is a multiple"},
-        {"tolva,flash=129M", "Option \"flash=129M\""},
-        {"tolva,flash=99999999999999999M", "Option \"flash="},
-        {"tolva,flash=4K,flash=4K", "Option \"flash=4K\" of the simulated device: the option is"},
-        {"tolva,sector=2K", "Option \"sector=2K\" of the simulated device: a tolva has sectors"},
-        {"dorna,sector=3K", "Option \"sector=3K\""},
-        {"velk,revision=256", "Option \"revision=256\""},
-        {"velk,id=1,revision=A", "Option \"id=0x00000001\""},
-        {"quen,keyconfig=100000000", "Option \"keyconfig=100000000\""},
-        {"quen,erase-time=5", "Option \"erase-time=5\""},
-        {"quen,erase-time=2h", "Option \"erase-time=2h\""},
-        {"quen,erase-time=18446744074s", "Option \"erase-time=18446744074s\""},    // wraps to 0.3 s
-        {"quen,flash=18014398509482048K", "Option \"flash=18014398509482048K\""},  // to 64K
-        {"quen,fail-access=0", "Option \"fail-access=0\""},
-        {"quen,erase=maybe", "Option \"erase=maybe\""},
-        {"quen,stuck-cell=512K", "Option \"stuck-cell=512K\""},
-        {"quen,stuck-cell=80000", "the flash ends at 0x80000."},
-    };
-    for (const auto& [text, expected] : cases) {
+    for (const auto& row : test::ReadTable("target/options.txt", 2)) {
         const std::string error =
-            ErrorOf([&, &t = text] { target::SimulatedDevice(target::ParseDeviceOptions(t)); });
-        EXPECT_NE(error.find(expected), std::string::npos) << error;
+            ErrorOf([&] { target::SimulatedDevice(target::ParseDeviceOptions(row[0])); });
+        EXPECT_NE(error.find(row[1]), std::string::npos) << error;
     }
 }
 

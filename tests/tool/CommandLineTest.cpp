@@ -1,6 +1,11 @@
 // corvane-flash as its users meet it: the built tool, run with the built plug-in on simulated
-// devices. Every row is one command line or a few; what counts is the exit status and what stands
-// on which stream. The same rows are run once more for their JSON lines.
+// devices. The cases stand in tests/tool/lines, a few lines of text each:
+//   $ COMMAND    one command line, which is run once more for its JSON lines; or
+//   % COMMANDS   several, of which the last one's status counts; either goes on in lines behind
+//   = STATUS     0 where it is left out
+//   > TEXT       what stands on standard output, and
+//   ! TEXT       on standard error: nothing where it is left out
+// A text is a part of its stream: whole lines, but for one that ends in "..." there.
 
 #include <gtest/gtest.h>
 #include <stdlib.h>
@@ -14,12 +19,54 @@
 #include <string>
 #include <vector>
 
-#include "tests/tool/CommandLineRow.h"
+#include "tests/support/TemporaryDirectory.h"
 
 namespace {
 
-namespace fs = std::filesystem;
 using nlohmann::json;
+
+struct Case {
+    std::string name;
+    bool isStory = false;
+    std::string commands;
+    int status = 0;
+    std::string out;
+    std::string err;
+};
+
+void PrintTo(const Case& row, std::ostream* stream) {
+    *stream << row.commands;
+}
+
+void AddCases(const std::filesystem::path& file, std::vector<Case>& cases) {
+    std::ifstream lines(file);
+    int number = 0;
+    for (std::string line; std::getline(lines, line);) {
+        ++number;
+        if (line.empty() || line[0] == '#') continue;
+        const std::string text = line.size() < 2 ? "" : line.substr(2);
+        if (line[0] == '$' || line[0] == '%') {
+            const std::string name = file.stem().string() + "_" + std::to_string(number);
+            cases.push_back({name, line[0] == '%', text, 0, "", ""});
+        } else if (line[0] == ' ') {
+            cases.back().commands += "\n" + text;
+        } else if (line[0] == '=') {
+            cases.back().status = std::stoi(text);
+        } else if (line[0] == '>' || line[0] == '!') {
+            (line[0] == '>' ? cases.back().out : cases.back().err) += text + "\n";
+        } else {
+            throw std::runtime_error("no line of a case: " + line);
+        }
+    }
+}
+
+std::vector<Case> Cases(bool stories) {
+    std::vector<Case> cases;
+    for (const auto& entry : std::filesystem::directory_iterator(TESTS_DIRECTORY "/tool/lines"))
+        AddCases(entry.path(), cases);
+    std::erase_if(cases, [=](const Case& row) { return row.isStory != stories; });
+    return cases;
+}
 
 struct Result {
     int status = -1;
@@ -27,90 +74,68 @@ struct Result {
     std::string err;
 };
 
-std::string Contents(const fs::path& path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
+/// Runs shell commands in which `tool` is the tool and $ELF, $HEX and $BIN a real firmware, in a
+/// directory that is empty but for a few images, with settings of its own.
+Result RunShell(const std::string& commands) {
+    const test::TemporaryDirectory directory;
+    directory.Write("small.hex", ":0400100001020304E2\n:00000001FF\n");  // 01 02 03 04 at 0x10
+    directory.Write("other.srec", "S1070010010203FFE3\nS9030000FC\n");   // contradicts small.hex
+    directory.Write("far.srec", "S30900040000AABB00008D\nS70500000000FA\n");  // at 0x40000
+    directory.Write("bad.hex", ":0400100001020304E3\n:00000001FF\n");
+    directory.Write("data.bin", std::string(300, '\x42'));
+    directory.Write("wrong.toml", "FlashTimeoutValue = \"soon\"\n");
+    directory.Write("mine.toml", "");
+    const std::string script =
+        "cd '" + directory.Path().string() +
+        "' && exec >.out 2>.err </dev/null\n"
+        "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
+        "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_PLUGIN\n"
+        "export TOOL='" CORVANE_FLASH_TOOL "' TOOLS='" CORVANE_FLASH_DIRECTORY
+        "'\n"
+        "f='" FIRMWARE_DIRECTORY
+        "/firmware'; ELF=$f.elf HEX=$f.ihex BIN=$f.bin\n"
+        "tool() { \"$TOOL\" \"$@\"; }\n" +
+        commands + "\n";
+    const int status = std::system(script.c_str());
+    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, test::Contents(directory.File(".out")),
+            test::Contents(directory.File(".err"))};
 }
 
-/// The place where a test's commands run: empty but for a few images, with settings of its own.
-class Workplace {
-  public:
-    Workplace() {
-        std::string name = fs::temp_directory_path() / "command-line-test-XXXXXX";
-        path_ = mkdtemp(name.data());
-        Write("small.hex", ":0400100001020304E2\n:00000001FF\n");  // 01 02 03 04 at 0x10
-        Write("other.srec", "S1070010010203FFE3\nS9030000FC\n");   // contradicts small.hex
-        Write("far.srec",
-              "S30900040000AABB0000"
-              "8D\nS70500000000FA\n");  // at 0x40000
-        Write("bad.hex", ":0400100001020304E3\n:00000001FF\n");
-        Write("data.bin", std::string(300, '\x42'));
-        Write("wrong.toml", "FlashTimeoutValue = \"soon\"\n");
-        Write("mine.toml", "");
-        Write("broken.so", "no library");
-    }
-    ~Workplace() { fs::remove_all(path_); }
-    Workplace(const Workplace&) = delete;
-    Workplace& operator=(const Workplace&) = delete;
-
-    fs::path File(const std::string& name) const { return path_ / name; }
-    void Write(const std::string& name, const std::string& contents) const {
-        std::ofstream(path_ / name, std::ios::binary) << contents;
-    }
-
-    /// Runs shell commands in which `tool` is the tool and $ELF, $HEX and $BIN a real firmware.
-    Result Run(const std::string& commands) const {
-        const std::string script =
-            "cd '" + path_.string() +
-            "' && exec >.out 2>.err </dev/null\n"
-            "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
-            "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_PLUGIN\n"
-            "ELF='" FIRMWARE_DIRECTORY "/firmware.elf' HEX='" FIRMWARE_DIRECTORY
-            "/firmware.ihex'\n"
-            "BIN='" FIRMWARE_DIRECTORY
-            "/firmware.bin'\n"
-            "tool() { \"" CORVANE_FLASH_TOOL "\" \"$@\"; }\n" +
-            commands + "\n";
-        const int status = std::system(script.c_str());
-        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, Contents(File(".out")),
-                Contents(File(".err"))};
-    }
-
-  private:
-    fs::path path_;
-};
-
-/// That a stream holds a part; that it is empty for ""; nothing for null.
-void ExpectPart(const std::string& stream, const char* part) {
-    if (part == nullptr) return;
-    const bool held = *part == '\0' ? stream.empty() : stream.find(part) != std::string::npos;
+void ExpectPart(const std::string& stream, std::string part) {
+    const bool open = part.ends_with("...\n");
+    if (open) part.resize(part.size() - 4);
+    const bool held =
+        part.empty() && !open ? stream.empty() : stream.find(part) != std::string::npos;
     EXPECT_TRUE(held) << "not as expected:\n" << stream << "but:\n" << part;
 }
 
-TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
-    const Row& row = GetParam();
-    const Result result = Workplace().Run(row.commands);
+Result ExpectAnswer(const Case& row) {
+    Result result = RunShell(row.commands);
     EXPECT_EQ(result.status, row.status) << result.err;
     ExpectPart(result.out, row.out);
     ExpectPart(result.err, row.err);
+    return result;
+}
+
+class CommandLine : public testing::TestWithParam<Case> {};
+
+TEST_P(CommandLine, AnswersWithItsStatusOnItsStreams) {
+    const Result result = ExpectAnswer(GetParam());
     const bool explained = ("\n" + result.err).find("\ncorvane-flash: ") != std::string::npos;
-    EXPECT_EQ(explained, row.status != 0) << result.err;
+    EXPECT_EQ(explained, GetParam().status != 0) << result.err;
 }
 
 /// The first "tool" of the commands, or the tool's path, with --json behind it.
 std::string WithJson(std::string commands) {
-    const std::string name =
-        commands.find("timeout -") != std::string::npos ? CORVANE_FLASH_TOOL : "tool";
+    const std::string name = commands.find("timeout -") != std::string::npos ? "$TOOL" : "tool";
     return commands.insert(commands.find(name) + name.size(), " --json");
 }
 
 TEST_P(CommandLine, TellsTheSameInJsonLines) {
-    const Row& row = GetParam();
-    const std::string commands = row.commands;
+    const Case& row = GetParam();
     for (const char* other : {"|", "&", "--help", "--man", "--version"})
-        if (commands.find(other) != std::string::npos) return;  // it's not all JSON
-    const Result result = Workplace().Run(WithJson(commands));
+        if (row.commands.find(other) != std::string::npos) return;  // it's not all JSON
+    const Result result = RunShell(WithJson(row.commands));
     EXPECT_EQ(result.status, row.status);
     std::vector<json> lines;
     std::map<std::string, std::uint64_t> done;
@@ -134,12 +159,14 @@ TEST_P(CommandLine, TellsTheSameInJsonLines) {
     EXPECT_EQ(end["error"].is_null(), row.status == 0);
 }
 
+class CommandLineStory : public testing::TestWithParam<Case> {};
+
 TEST_P(CommandLineStory, EndsAsItShould) {
-    const Row& row = GetParam();
-    const Result result = Workplace().Run(row.commands);
-    EXPECT_EQ(result.status, row.status);
-    ExpectPart(result.out, row.out);
-    ExpectPart(result.err, row.err);
+    ExpectAnswer(GetParam());
 }
+
+const auto kName = [](const auto& row) { return row.param.name; };
+INSTANTIATE_TEST_SUITE_P(, CommandLine, testing::ValuesIn(Cases(false)), kName);
+INSTANTIATE_TEST_SUITE_P(, CommandLineStory, testing::ValuesIn(Cases(true)), kName);
 
 }  // namespace
