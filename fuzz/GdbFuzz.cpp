@@ -65,7 +65,7 @@ void AnswerClient(std::string_view bytes) {
         const std::string_view payload = bytes.substr(0, end);
         const auto replies = payload == "\x03" ? session.Interrupt() : session.Answer(payload);
         for (const std::string& reply : replies)
-            Require(reply.size() + kFrameSize <= Session::kPacketSize, "a reply fits a packet");
+            Require(reply.size() <= Session::kPacketSize, "a reply fits a packet");
         bytes.remove_prefix(std::min(end + 1, bytes.size()));
     }
 }

@@ -32,10 +32,13 @@ CommandRow Serve() {
     return Command<ServeOptions>(
         {.name = "serve",
          .help = "Serve the simulated device as a GDB server, until Ctrl-C",
-         .details = "For GDB (target remote :PORT, then load), and for hosts to be tested. One "
-                    "client at a time; the contents are kept in --sim-file whenever one has gone. "
-                    "What the device refuses is shown on standard error. Without HOST only this "
-                    "machine can connect; port 0 takes a free one.",
+         .details =
+             "For GDB (target remote :PORT, then load), and for hosts to be tested. One "
+             "client at a time: others are told so. Code in its flash doesn't run, so a step "
+             "ends at once and a breakpoint is never hit. The contents are kept in --sim-file "
+             "whenever one has gone. "
+             "What the device refuses is shown on standard error. Without HOST only this "
+             "machine can connect; port 0 takes a free one.",
          .example = "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
                     "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
          .readsSettings = false,

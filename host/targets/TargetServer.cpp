@@ -47,13 +47,22 @@ TargetServer::TargetServer(const TargetOptions& options, const std::string& addr
       served_(target_.Device(), complain,
               [this, complain] {
                   try {
+                      kept_ = false;
                       target_.Keep(true);
+                      kept_ = true;
                   } catch (const Failure& failure) {
                       complain(failure.what());
                   }
               }),
       server_(Listen(served_, address_, complain)) {
     address_.port = std::to_string(server_.Port());
+}
+
+void TargetServer::Run() try {
+    server_.Run();
+    if (!kept_) target_.Keep(true);
+} catch (const Failure& failure) {
+    throw Failure(ExitStatus::BadFile, failure.what());
 }
 
 }  // namespace host

@@ -25,14 +25,15 @@ class TargetServer {
     const target::gdb::Address& Where() const { return address_; }
     std::uint16_t Port() const { return server_.Port(); }
 
-    /// Serves until Ctrl-C.
-    void Run() { server_.Run(); }
+    /// Serves until Ctrl-C. Failure (BadFile) when the contents couldn't be kept at the end.
+    void Run();
 
   private:
     SimulatedTarget target_;
     target::gdb::Address address_;
     target::ServedSimulation served_;
     target::gdb::Server server_;
+    bool kept_ = true;  ///< what the device held when the last client went
 };
 
 }  // namespace host

@@ -12,7 +12,7 @@ namespace {
 // any other value: the debugger's. Nobody but the loader takes back what was handed over, so a
 // loader that is gone leaves it so for ever.
 
-constexpr std::uint32_t kBufferSizeBytes = 2048;
+constexpr std::uint32_t kBufferSizeBytes = Loader::kChunkMax;
 constexpr std::uint32_t kParameterSizeBytes = 16;
 constexpr std::uint32_t kBlockSizeBytes = 128;
 

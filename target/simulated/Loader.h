@@ -20,6 +20,7 @@ class Loader {
     using Time = std::chrono::nanoseconds;
 
     static constexpr char kFileName[] = "FlashLoaderMerrow.out";
+    static constexpr std::uint32_t kChunkMax = 2048;  ///< bytes
 
     Loader(const DeviceOptions& options, Ram& ram, FlashArray& flash, FlashController& controller,
            RuleLog& rules);

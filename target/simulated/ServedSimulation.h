@@ -33,7 +33,6 @@ class ServedSimulation final : public gdb::ServedDevice {
 
   private:
     void Do(const std::function<void()>& action);
-    void RequireFlash(std::uint32_t address, std::size_t sizeBytes) const;
     bool WasWritten(std::uint32_t address) const;
     void ResetRegisters();
 

@@ -5,6 +5,7 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <type_traits>
 
 // What every access may rely on, and leaves behind, also when it fails:
@@ -118,8 +119,54 @@ void SimulatedDevice::Reset(bool flag) {
 }
 
 void SimulatedDevice::Pause(std::uint32_t milliseconds) {
-    time_.AddPause(milliseconds);
+    time_.AddPause(std::chrono::milliseconds(milliseconds));
     AdvanceToNow();
+}
+
+void SimulatedDevice::EraseByProbe(std::uint32_t address, std::uint32_t sizeBytes) {
+    const std::string describe = fmt::format("Erasing {} bytes at 0x{:08X}", sizeBytes, address);
+    Perform(0, describe, [&] {
+        const std::uint32_t size = RequireSectors(address, sizeBytes);
+        if (options_.faults.eraseNeverEnds) throw TargetError(describe + ": it doesn't end");
+        const std::uint32_t sector = options_.sectorSizeBytes;
+        time_.AddPause((size + sector - 1) / sector * options_.timings.sectorErase);
+        flash_.Erase(address, size);
+    });
+}
+
+void SimulatedDevice::ProgramByProbe(std::uint32_t address, std::string_view bytes) {
+    const std::string describe =
+        fmt::format("Programming {} bytes at 0x{:08X}", bytes.size(), address);
+    Perform(bytes.size(), describe, [&] {
+        RequireFlash(address, bytes.size());
+        const std::size_t chunks = (bytes.size() + Loader::kChunkMax - 1) / Loader::kChunkMax;
+        time_.AddPause(chunks * options_.timings.chunk);
+        const auto* first = reinterpret_cast<const std::uint8_t*>(bytes.data());
+        if (const auto at = flash_.Program(address, {first, bytes.size()}))
+            throw TargetError(fmt::format("{}: 0x{:08X} isn't erased", describe, *at));
+    });
+}
+
+/// The size without what lies beyond the flash, which may end inside its last sector: clients erase
+/// that whole.
+std::uint32_t SimulatedDevice::RequireSectors(std::uint32_t address,
+                                              std::uint32_t sizeBytes) const {
+    const std::uint32_t sector = options_.sectorSizeBytes;
+    if (address % sector != 0 || sizeBytes % sector != 0)
+        throw TargetError(
+            fmt::format("Erasing {} bytes at 0x{:08X}: the device erases whole sectors of {} bytes",
+                        sizeBytes, address, sector));
+    const std::uint64_t end = std::uint64_t{address} + sizeBytes;
+    const std::uint64_t beyond = end - std::min<std::uint64_t>(end, flash_.SizeBytes());
+    if (beyond < std::min(sector, sizeBytes)) sizeBytes -= static_cast<std::uint32_t>(beyond);
+    RequireFlash(address, sizeBytes);
+    return sizeBytes;
+}
+
+void SimulatedDevice::RequireFlash(std::uint32_t address, std::uint64_t sizeBytes) const {
+    if (flash_.Contains(address, sizeBytes)) return;
+    throw TargetError(fmt::format("{} bytes at 0x{:08X}: the device has {} bytes of flash",
+                                  sizeBytes, address, flash_.SizeBytes()));
 }
 
 template <typename Describe, typename Action>

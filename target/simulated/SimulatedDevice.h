@@ -14,6 +14,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "target/Target.h"
@@ -56,6 +57,12 @@ class SimulatedDevice final : public Target {
     /// Lets the halted core go on where it was. Other than after Run, the loader keeps what it had
     /// not finished; without one, the core runs on with nothing that shows outside.
     void Continue();
+
+    /// What a probe does in one order, by a flash algorithm of its own, which keeps every rule: an
+    /// erase sets whole sectors to ones, programming clears bits. The modelled times and faults
+    /// hold for it.
+    void EraseByProbe(std::uint32_t address, std::uint32_t sizeBytes);
+    void ProgramByProbe(std::uint32_t address, std::string_view bytes);
 
     // What follows is for tests and tools: it counts as no access, costs no simulated time and
     // breaks no rule.
@@ -100,6 +107,8 @@ class SimulatedDevice final : public Target {
     const char* RequestedFault() const;
     CoreState Core() const;
     void StopCore();
+    std::uint32_t RequireSectors(std::uint32_t address, std::uint32_t sizeBytes) const;
+    void RequireFlash(std::uint32_t address, std::uint64_t sizeBytes) const;
 
     const DeviceOptions options_;
     RuleLog rules_;

@@ -37,8 +37,8 @@ void SimulatedTime::AddAccess(std::uint64_t bytes) {
     Add(link_, latency_ + TransferTime(bytes, bytesPerSecond_));
 }
 
-void SimulatedTime::AddPause(std::uint32_t milliseconds) {
-    Add(pauses_, std::chrono::milliseconds(milliseconds));
+void SimulatedTime::AddPause(nanoseconds pause) {
+    Add(pauses_, pause);
 }
 
 TimeSpent SimulatedTime::Spent() const {

@@ -23,7 +23,7 @@ class SimulatedTime {
     SimulatedTime(const Timings& timings, Clock* clock);
 
     void AddAccess(std::uint64_t bytes);
-    void AddPause(std::uint32_t milliseconds);
+    void AddPause(std::chrono::nanoseconds pause);
 
     TimeSpent Spent() const;
     std::chrono::nanoseconds Now() const;

@@ -5,16 +5,19 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <fstream>
 #include <functional>
 #include <random>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "base/Hex.h"
 #include "target/gdb/client/GdbTarget.h"
+#include "target/gdb/server/Server.h"
 #include "target/gdb/wire/Frame.h"
 #include "tests/gdb/Peer.h"
 
@@ -462,22 +465,111 @@ TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
     }
 }
 
-// A flash of one sector and an eighth; what a real device would ignore is told without end.
-TEST(GdbServer, ErasesToTheEndAndTellsWhatIsIgnored) {
-    SimulatedDevice device(ParseDeviceOptions("dorna,flash=18K"));
+// What clients ask and how they go on, each line with a session of its own; a flash of one sector
+// and an eighth. An interrupt stands as "^C".
+TEST(GdbServer, AnswersByTheProtocol) {
+    const struct {
+        std::vector<std::string> requests;
+        const char* replies;
+        const char* device = "dorna,flash=18K";
+    } rows[] = {
+        {{"?", "vFlashErase:0,8000", "vFlashErase:4000,4000", "vFlashErase:0,4800"},
+         "T05thread:1; OK OK E01 "},
+        {{"vFlashErase:0,c000", "vFlashErase:8000,0", "vFlashErase:8000,4000"}, "E01 E01 E01 "},
+        {{"vFlashErase:0,4000"}, "E01 ", "dorna,erase=never"},
+        {{"vFlashWrite:0:abcd", "vFlashWrite:1:a", "vFlashDone"}, "OK E01 OK "},
+        // A step ends at once; an interrupt between two answers the next resume.
+        {{"s100", "pf", "^C", "c", "^C"}, "T02thread:1; 00010000 T02thread:1; "},
+        {{"s", "^C", "?", "c", "^C"}, "T02thread:1; T05thread:1; T02thread:1; "},
+        {{"^C", "c", "m0,4", "^C"}, "E01 T02thread:1; "},
+        {{"vCont;c:zz", "vCont;C0:1", "vCont;s:p1.-1;c:-1", "vCont;s:1;c:zz", "vCont;"},
+         "E01 E01 T02thread:1; E01 E01 "},
+        {{"Z0,100,2", "z1,100,4;cond", "Z5,100,2", "Z0,x"}, "OK OK E01 E01 "},
+        {{"m0,0", "m20000000,2", "M20000000,2:abcd", "m20000000,2"}, "E01 ffff OK abcd "},
+        {{"qRcmd,68616c74", "qRcmd,7265736574", "c", "^C", "qRcmd,726573756d65"},
+         "OK OK T02thread:1; OK "},
+        {{"qRcmd,726573657420696e6974", "qRcmd,726573657420"}, "OK E01 "},
+    };
+    for (const auto& row : rows) {
+        SimulatedDevice device(ParseDeviceOptions(row.device));
+        ServedSimulation served(
+            device, [](const std::string&) {}, [] {});
+        Session session(served, [](const std::string& text) {
+            EXPECT_EQ(text.find("page 1"), text.npos) << text;
+        });
+        std::string replies;
+        for (const std::string& request : row.requests)
+            for (const std::string& reply :
+                 request == "^C" ? session.Interrupt() : session.Answer(request))
+                if (!reply.starts_with('O') || reply == "OK") replies += reply + " ";
+        EXPECT_EQ(replies, row.replies) << row.requests[0];
+    }
+}
+
+// As much as GDB asks for at a PacketSize; erases and writes take their time; what a real device
+// would ignore is told without end.
+TEST(GdbServer, FillsAPacketTakesItsTimeAndTellsWhatIsIgnored) {
+    SimulatedDevice device(ParseDeviceOptions("quen,erase-time=1s,chunk-time=1s,latency=1s"));
     std::size_t told = 0;
     ServedSimulation served(
         device, [&](const std::string&) { ++told; }, [] {});
     Session session(served, [](const std::string&) {});
-    std::string replies;
-    for (const char* request :
-         {"?", "vFlashErase:0,8000", "vFlashErase:4000,4000", "vFlashErase:0,4800",
-          "vFlashErase:0,c000", "vFlashErase:8000,0", "vFlashErase:8000,4000", "s100", "pf"})
-        replies += session.Answer(request).at(0) + " ";
-    EXPECT_EQ(replies, "T05thread:1; OK OK E01 E01 E01 E01 T05thread:1; 00010000 ");
+    session.Answer("?");
+    EXPECT_EQ(session.Answer("m0,2000").at(0).size(), 0x4000U);
+    EXPECT_EQ(session.Answer("m0,9000").at(0).size(), 0x4000U);
+    const auto before = device.Now();
+    session.Answer("vFlashErase:0,800");
+    session.Answer("vFlashWrite:0:" + std::string(0x801, 'x'));
+    EXPECT_EQ(std::chrono::round<std::chrono::seconds>(device.Now() - before), 6s);
     for (int i = 0; i < 1500; ++i)
         session.Answer("M400fd008,4:02000000");
     EXPECT_EQ(told, 1500U);
+}
+
+/// A client that only speaks: what it is answered until it is let go, or nothing more comes.
+std::string Said(Socket& client, const std::string& bytes) {
+    std::string answer;
+    try {
+        client.Write(bytes, After(1s));
+        for (std::string more = "?"; !more.empty(); answer += more)
+            more = client.Read(After(300ms));
+    } catch (const SocketError&) {
+        answer += "(closed)";
+    }
+    return answer;
+}
+
+// One who only connects holds nobody up; a second one is told; who hung up, and who isn't a
+// debugger, is served nothing.
+TEST(GdbServer, ServesTheFirstWhoAsks) {
+    SimulatedDevice device(ParseDeviceOptions("quen"));
+    ServedSimulation served(
+        device, [](const std::string&) {}, [] {});
+    std::atomic<bool> done = false;
+    Server server(
+        served, Address::Parse("127.0.0.1:0"), [&] { return done.load(); },
+        [](const std::string&) {});
+    const Address where = Address::Parse("127.0.0.1:" + std::to_string(server.Port()));
+    const auto connect = [&] { return Socket::Connect(where, After(1s), {}); };
+    Socket silent = connect();
+    Socket gone = connect();
+    const std::string load = Framed("vFlashErase:0,400") + Framed("vFlashWrite:0:gone");
+    gone.Write(load, After(1s));
+    gone.Close();
+    std::thread thread([&] { server.Run(); });
+    Socket browser = connect();
+    EXPECT_EQ(Said(browser, "POST / HTTP/1.1\r\n\r\n" + load), "(closed)");
+    Socket first = connect();
+    EXPECT_EQ(Said(first, "+$?#3f"), "+" + Framed("T05thread:1;"));
+    Socket second = connect();
+    EXPECT_EQ(Said(second, "+$?#3f"), "+" + Framed("E.serves another client") + "(closed)");
+    EXPECT_NE(ResultOf([&] { return Work(where); }).find("serves another client"),
+              std::string::npos);
+    EXPECT_EQ(Said(first, "+$m0,4#fd"), "+$ffffffff#30");
+    first.Close();
+    EXPECT_EQ(Said(silent, "$?#3f"), "+" + Framed("T05thread:1;"));
+    done = true;
+    thread.join();
 }
 
 }  // namespace

@@ -18,9 +18,11 @@ as_inside "$sim" "$port" 70000 || { cat refused; exit 1; }
 [ ! -s refused ] || { cat refused; exit 1; }
 
 gdb-multiarch -nx -batch -ex 'set confirm off' -ex "target remote :$port" -ex load \
-    -ex compare-sections -ex 'x/1wx 0x400fe000' -ex 'stepi' -ex 'info registers pc' \
+    -ex compare-sections -ex 'x/1wx 0x400fe000' -ex 'dump memory dumped 0x8000 0x10000' \
+    -ex 'hbreak *0x100' -ex 'python print(len(gdb.selected_inferior().read_memory(0, 40000)))' \
+    -ex 'stepi' -ex 'step' -ex 'monitor halt' -ex 'info registers pc' \
     -ex 'monitor reset halt' -ex 'x/2wx 0' -ex detach "$elf" >gdb 2>&1 || { cat gdb; exit 1; }
-for expected in 'Transfer rate' 'matched' '0x400fe000:.*0x10050000' '^pc ' 'detached'; do
+for expected in 'Transfer rate' 'matched' '0x400fe000:.*0x10050000' '^pc ' '^40000' 'detached'; do
     grep -q "$expected" gdb || { echo "no '$expected'"; cat gdb refused; exit 1; }
 done
 if grep -i 'mis-matched\|error' gdb; then exit 1; fi
@@ -51,3 +53,14 @@ kill "$server"
 wait "$server" || { echo "the server ended with $?"; exit 1; }
 server=
 "$tool" --sim-file served.sim verify "$elf"
+
+# A client that has gone leaves contents that can't be kept.
+CORVANE_SIM=$sim timeout 300 "$tool" --sim-file gone/served.sim serve 0 >listening 2>refused &
+server=$!
+port=$(await listening 's/.*:\([0-9]*\);.*/\1/p')
+expect 0 '' --gdb ":$port" info
+kill "$server"
+status=0
+wait "$server" || status=$?
+server=
+[ "$status" = 3 ] || { echo "unkept contents -> $status"; cat refused; exit 1; }

@@ -34,7 +34,11 @@ void GdbTarget::Attach() {
 }
 
 void GdbTarget::Introduce() {
-    features_ = ParseFeatures(connection_.Ask("qSupported:vContSupported+;error-message+"));
+    const std::string request = "qSupported:vContSupported+;error-message+";
+    const std::string reply = connection_.Ask(request);
+    // Not just unknown: a server that says why has something against us.
+    if (reply.starts_with("E.")) connection_.Reject(request, reply);
+    features_ = ParseFeatures(reply);
     if (features_.packetSize < MemoryPort::kPacketSizeMin)
         throw ProtocolError(fmt::format("takes packets of {} bytes only, too few for any access",
                                         features_.packetSize));

@@ -27,6 +27,25 @@ bool StoreHex(string_view digits, std::string& member) {
     return bytes.has_value();
 }
 
+/// "c", "s", or one of them with a signal.
+bool IsAction(string_view action) {
+    if (action == "c" || action == "s") return true;
+    return (action.starts_with('C') || action.starts_with('S')) && action.size() == 3 &&
+           base::ParseHexDigits(action.substr(1));
+}
+
+/// One thread, all of them, or those of a process: "1", "-1", "p1.-1"; nothing means all.
+bool AreThreads(string_view threads) {
+    const auto isNumber = [](string_view text) {
+        return text == "-1" || base::ParseHexDigits(text).has_value();
+    };
+    if (threads.empty()) return true;
+    if (!threads.starts_with('p')) return isNumber(threads);
+    threads.remove_prefix(1);
+    const string_view process = TakeUntil(threads, '.');
+    return isNumber(process) && (threads.empty() || isNumber(threads));
+}
+
 }  // namespace
 
 bool Nothing(string_view rest, Arguments&) {
@@ -77,12 +96,21 @@ bool OptionalAddress(string_view rest, Arguments& arguments) {
     return rest.empty() || Store(rest, arguments.address);
 }
 
+bool Breakpoint(string_view rest, Arguments& arguments) {
+    const string_view kind = TakeUntil(rest, ',');
+    return kind.size() == 1 && kind[0] >= '0' && kind[0] <= '4' &&
+           Range(TakeUntil(rest, ';'), arguments);
+}
+
 // There is one thread, so the first action that is given is the one that counts.
 bool FirstAction(string_view rest, Arguments& arguments) {
-    const string_view action = TakeUntil(rest, ';');
-    const char what = action.empty() ? '\0' : action[0];
-    arguments.step = what == 's' || what == 'S';
-    return arguments.step || what == 'c' || what == 'C';
+    for (bool first = true; first || !rest.empty(); first = false) {
+        string_view threads = TakeUntil(rest, ';');
+        const string_view action = TakeUntil(threads, ':');
+        if (!IsAction(action) || !AreThreads(threads)) return false;
+        if (first) arguments.step = action[0] == 's' || action[0] == 'S';
+    }
+    return true;
 }
 
 // "OBJECT:read:ANNEX:OFFSET,LENGTH"

@@ -32,6 +32,7 @@ bool HexBytes(std::string_view rest, Arguments& arguments);         ///< address
 bool BinaryBytes(std::string_view rest, Arguments& arguments);      ///< address, length, data
 bool FlashBytes(std::string_view rest, Arguments& arguments);       ///< address, length, data
 bool OptionalAddress(std::string_view rest, Arguments& arguments);  ///< address, hasAddress
+bool Breakpoint(std::string_view rest, Arguments& arguments);       ///< address; length: its kind
 bool FirstAction(std::string_view rest, Arguments& arguments);      ///< step
 
 /// name: "features:target.xml", the object and its annex; address: the offset; length.

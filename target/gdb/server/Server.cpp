@@ -65,27 +65,29 @@ Server::Server(ServedDevice& device, const Address& address, InterruptCheck inte
     : device_(device),
       interrupted_(std::move(interrupted)),
       complain_(std::move(complain)),
-      listener_(Socket::Listen(address, interrupted_)) {}
+      reception_(address, interrupted_) {}
 
 void Server::Run() {
-    while (!interrupted_()) {
-        Socket client = listener_.Accept(After(kBetweenLooks));
-        if (client.IsOpen()) Serve(std::move(client));
-    }
+    while (!interrupted_())
+        if (auto client = reception_.Next(After(kBetweenLooks))) Serve(std::move(*client));
 }
 
-void Server::Serve(Socket socket) {
+void Server::Serve(Reception::Client served) {
     Session session(device_, complain_);
-    Client client(socket, session);
+    Client client(served.socket, session);
     FrameDecoder decoder(FrameDecoder::Sender::Client);
+    decoder.Feed(served.said);
     try {
         while (!session.HasEnded() && !interrupted_()) {
-            decoder.Feed(socket.Read(After(kBetweenLooks)));
             while (!session.HasEnded()) {
                 const auto frame = decoder.Next();
                 if (!frame) break;
                 client.Take(*frame);
             }
+            if (session.HasEnded()) break;
+            reception_.TurnAway();
+            reception_.Await({&served.socket}, After(kBetweenLooks));
+            decoder.Feed(served.socket.Read({}));
         }
     } catch (const SocketError&) {
         // The client is gone, in order or not.

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 
+#include "target/gdb/server/Reception.h"
 #include "target/gdb/server/ServedDevice.h"
 #include "target/gdb/server/Session.h"
 #include "target/gdb/wire/Socket.h"
@@ -16,18 +17,18 @@ class Server {
     Server(ServedDevice& device, const Address& address, InterruptCheck interrupted,
            ComplaintSink complain);
 
-    std::uint16_t Port() const { return listener_.Port(); }
+    std::uint16_t Port() const { return reception_.Port(); }
 
     /// Serves one client after the other until the interrupt check says so.
     void Run();
 
   private:
-    void Serve(Socket client);
+    void Serve(Reception::Client served);
 
     ServedDevice& device_;
     const InterruptCheck interrupted_;
     const ComplaintSink complain_;
-    Socket listener_;
+    Reception reception_;
 };
 
 }  // namespace target::gdb

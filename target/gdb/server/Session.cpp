@@ -5,6 +5,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <utility>
 
 #include "base/ByteOrder.h"
 #include "base/Hex.h"
@@ -23,13 +24,15 @@ constexpr char kStopped[] = "T05thread:1;";
 constexpr char kInterrupted[] = "T02thread:1;";
 
 constexpr char kMonitorHelp[] =
-    "reset        reset the device and let it run\n"
-    "reset halt   reset the device and leave it halted\n"
+    "halt         stop the device\n"
+    "resume       let the device go on\n"
+    "reset        reset the device and let it run; also reset run\n"
+    "reset halt   reset the device and leave it halted; also reset init\n"
     "version      who this server is\n"
     "help         this list\n";
 
 // What fits the reply's packet.
-constexpr std::uint32_t kReadMax = (Session::kPacketSize - kFrameSize) / 2;
+constexpr std::uint32_t kReadMax = Session::kPacketSize / 2;
 
 // Registers take nothing but whole words; a debugger asks for them as it does for any memory.
 std::size_t WidthOf(std::uint32_t address, std::size_t sizeBytes) {
@@ -92,6 +95,9 @@ const Session::RequestRow* Session::FindRow(std::string_view payload) {
         {"m", Range, &Session::ReadMemory},
         {"M", HexBytes, &Session::WriteMemory},
         {"X", BinaryBytes, &Session::WriteMemory},
+        // Code doesn't run, so nothing ever comes to a breakpoint.
+        {"Z", Breakpoint, &Session::Always<kOk>},
+        {"z", Breakpoint, &Session::Always<kOk>},
         {"c", OptionalAddress, &Session::Continue},
         {"s", OptionalAddress, &Session::Step},
         {"H", Anything, &Session::Always<kOk>},
@@ -135,6 +141,7 @@ Session::Replies Session::StartNoAckMode(const Arguments&) {
 // A debugger asks this first, and takes the target for stopped from then on.
 Session::Replies Session::WhyStopped(const Arguments&) {
     device_.Stop();
+    interruptKept_ = false;
     return {kStopped};
 }
 
@@ -148,14 +155,20 @@ Session::Replies Session::ReadRegisters(const Arguments&) {
 // Answered by the stop, which only an interrupt brings about: the core executes nothing.
 Session::Replies Session::Continue(const Arguments& arguments) {
     GoTo(arguments);
+    stepped_ = false;
+    if (std::exchange(interruptKept_, false)) return {kInterrupted};
     device_.Start();
     awaitsStop_ = true;
     return {};
 }
 
+// No step gets anywhere. A debugger that steps until it comes to another line would do so for ever;
+// told of an interrupt, it gives up.
 Session::Replies Session::Step(const Arguments& arguments) {
     GoTo(arguments);
-    return {kStopped};
+    stepped_ = true;
+    interruptKept_ = false;
+    return {kInterrupted};
 }
 
 Session::Replies Session::Resume(const Arguments& arguments) {
@@ -186,7 +199,11 @@ Session::Replies Session::Kill(const Arguments&) {
 }
 
 std::vector<std::string> Session::Interrupt() {
-    if (!awaitsStop_) return {};
+    // Between the steps of one command of the user's, it is meant for the next of them.
+    if (!awaitsStop_) {
+        interruptKept_ = stepped_;
+        return {};
+    }
     awaitsStop_ = false;
     try {
         device_.Stop();
@@ -201,10 +218,9 @@ void Session::GoTo(const Arguments& arguments) {
 }
 
 Session::Replies Session::ReadMemory(const Arguments& arguments) {
-    if (arguments.length > kReadMax)
-        return {Refuse("more memory was asked for than fits a packet")};
-    return {base::ToHex(device_.Read(arguments.address, arguments.length,
-                                     WidthOf(arguments.address, arguments.length)))};
+    if (arguments.length == 0) return {Refuse("a read of no bytes")};
+    const std::uint32_t size = std::min(arguments.length, kReadMax);
+    return {base::ToHex(device_.Read(arguments.address, size, WidthOf(arguments.address, size)))};
 }
 
 Session::Replies Session::WriteMemory(const Arguments& arguments) {
@@ -235,7 +251,7 @@ Session::Replies Session::ReadDocument(const Arguments& arguments) {
     else
         return {"E00"};
     const std::size_t offset = std::min<std::size_t>(arguments.address, document.size());
-    const std::size_t room = (kPacketSize - kFrameSize - 1) / 2;
+    const std::size_t room = (kPacketSize - 1) / 2;
     const std::size_t size = std::min<std::size_t>(arguments.length, room);
     const bool last = document.size() - offset <= size;
     return {(last ? "l" : "m") + Escaped(std::string_view(document).substr(offset, size))};
@@ -262,10 +278,8 @@ Session::Replies Session::WriteRegisters(const Arguments& arguments) {
 
 Session::Replies Session::Monitor(const Arguments& arguments) {
     const std::string& command = arguments.data;
-    if (command == "reset halt" || command == "reset") {
-        device_.Reset();
-        if (command == "reset") device_.Start();
-        return {kOk};
+    if (command.starts_with("reset") || command == "halt" || command == "resume") {
+        if (const auto reply = Control(command)) return {*reply};
     }
     if (command == "version") return {"O" + base::ToHex(kVersion), kOk};
     const bool help = command == "help";
@@ -273,6 +287,19 @@ Session::Replies Session::Monitor(const Arguments& arguments) {
         help ? kMonitorHelp
              : fmt::format("no monitor command '{}'; there are:\n{}", command, kMonitorHelp);
     return {"O" + base::ToHex(text), help ? kOk : kRefused};
+}
+
+/// The commands that start and stop the device; nothing for one that isn't among them.
+std::optional<std::string> Session::Control(const std::string& command) {
+    const bool resets = command == "reset" || command == "reset run";
+    if (resets || command == "reset halt" || command == "reset init")
+        device_.Reset();
+    else if (command == "halt")
+        device_.Stop();
+    else if (command != "resume")
+        return std::nullopt;
+    if (resets || command == "resume") device_.Start();
+    return kOk;
 }
 
 std::string Session::Refuse(const std::string& why) {

@@ -3,7 +3,8 @@
 //
 // The protocol is all-stop: between a request to go on and the stop that answers it, a client may
 // send nothing but an interrupt or the end of the session. Everything else is refused then, and
-// changes nothing. A request that fails leaves the session as it was; the device says why to
+// changes nothing. The core executes nothing: a step is answered by an interrupt, and a breakpoint
+// is never hit. A request that fails leaves the session as it was; the device says why to
 // whoever runs the server, because an error reply has no room for a text.
 
 #pragma once
@@ -25,7 +26,7 @@ using ComplaintSink = std::function<void(const std::string& text)>;
 
 class Session {
   public:
-    /// The longest packet that is taken, frame included, as told to clients.
+    /// The longest payload, as told to clients.
     static constexpr std::size_t kPacketSize = 0x4000;
 
     Session(ServedDevice& device, ComplaintSink complain)
@@ -69,13 +70,16 @@ class Session {
     template <const char* Reply>
     Replies Always(const Arguments& arguments);
 
+    std::optional<std::string> Control(const std::string& command);
     void GoTo(const Arguments& arguments);
     std::string Refuse(const std::string& why);
 
     ServedDevice& device_;
     const ComplaintSink complain_;
     bool acknowledges_ = true;
-    bool awaitsStop_ = false;  ///< the client has let the target run, and waits for its stop
+    bool awaitsStop_ = false;     ///< the client has let the target run, and waits for its stop
+    bool stepped_ = false;        ///< the last resume was a step
+    bool interruptKept_ = false;  ///< it came between two steps, and answers the next resume
     bool ended_ = false;
 };
 

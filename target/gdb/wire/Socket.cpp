@@ -20,6 +20,7 @@
 #include <system_error>
 #include <thread>
 #include <utility>
+#include <vector>
 
 namespace target::gdb {
 
@@ -234,14 +235,25 @@ Deadline Socket::Until(Deadline deadline) const {
     return interrupted_ && interrupted_() ? std::min(deadline, After(kAfterInterrupt)) : deadline;
 }
 
-// In slices, for a signal may come between the check and the wait.
 bool Socket::Await(short events, Deadline deadline) const {
+    const Socket* const self = this;
+    return Poll({&self, 1}, events, deadline);
+}
+
+void Socket::AwaitAny(std::span<const Socket* const> sockets, Deadline deadline) {
+    Poll(sockets, POLLIN, deadline);
+}
+
+// In slices, for a signal may come between the check and the wait.
+bool Socket::Poll(std::span<const Socket* const> sockets, short events, Deadline deadline) {
+    std::vector<pollfd> waiting;
+    for (const Socket* const each : sockets)
+        waiting.push_back({each->descriptor_, events, 0});
     for (;;) {
-        deadline = Until(deadline);
+        deadline = sockets.front()->Until(deadline);
         const auto left = std::chrono::ceil<milliseconds>(deadline - Clock::now());
         const auto slice = std::clamp(left, milliseconds(0), kBetweenInterruptChecks);
-        pollfd waiting{descriptor_, events, 0};
-        const int ready = poll(&waiting, 1, static_cast<int>(slice.count()));
+        const int ready = poll(waiting.data(), waiting.size(), static_cast<int>(slice.count()));
         if (ready > 0) return true;
         if (ready < 0 && errno != EINTR) throw SocketError(SystemText(errno));
         if (left <= milliseconds(0)) return false;

@@ -6,6 +6,7 @@
 #include <chrono>
 #include <cstdint>
 #include <functional>
+#include <span>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -58,6 +59,9 @@ class Socket {
     /// The next client; an unconnected socket when none came before the deadline.
     Socket Accept(Deadline deadline);
 
+    /// Waits until one of them has something to be read or accepted; all listen to one interrupt.
+    static void AwaitAny(std::span<const Socket* const> sockets, Deadline deadline);
+
     /// When to end a wait that is made of several: the deadline, or soon if the user has
     /// interrupted the work.
     Deadline Until(Deadline deadline) const;
@@ -74,6 +78,7 @@ class Socket {
 
   private:
     bool Await(short events, Deadline deadline) const;
+    static bool Poll(std::span<const Socket* const> sockets, short events, Deadline deadline);
 
     int descriptor_ = -1;
     InterruptCheck interrupted_;
