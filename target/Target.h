@@ -53,6 +53,9 @@ class Target {
     /// it is looked at: whoever waits for it looks first when it should be done, reads all that it
     /// wants to know at once, and waits by Pause, which lets it go on.
     virtual bool LooksStopIt() const { return false; }
+
+    /// Whether a read that has failed may look like one that was answered.
+    virtual bool HidesFailedReads() const { return false; }
 };
 
 }  // namespace target

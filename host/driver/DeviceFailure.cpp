@@ -4,6 +4,8 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+
 #include "host/base/Text.h"
 #include "host/output/Summary.h"
 
@@ -27,6 +29,8 @@ std::string FlashText(const KnownState& state) {
     const FlashWork& flash = state.flash;
     const PhaseProgress& program = state.phases[Phase::Program];
     if (flash.attempted.Empty()) return "the flash is as it was";
+    if (!state.doubt.empty())
+        return "what the flash holds isn't known; run the command again before the device is used";
     if (IsComplete(state))
         return program.totalBytes != 0
                    ? "the image is programmed, but not compared"
@@ -81,9 +85,32 @@ DeviceFailure NotBlankFailure(const FailedCall& call, const KnownState& state, J
             std::move(members)};
 }
 
-}  // namespace
+/// What was read since the device was there for certain shows neither a commit done nor contents.
+KnownState WithoutReads(KnownState state) {
+    state.notBlank.reset();
+    state.registerValues = {};
+    for (UserRegister& one : state.registers.registers)
+        if (one.commit == Commit::Done) one.commit = Commit::Begun;
+    return state;
+}
 
-DeviceFailure MakeDeviceFailure(const FailedCall& call, const KnownState& state, Json members) {
+/// The plug-in's own texts may tell what was read; why the device is in doubt is said in their
+/// place.
+DeviceFailure LostFailure(const FailedCall& call, const KnownState& state, Json members) {
+    const bool touched = !state.flash.attempted.Empty() ||
+                         std::ranges::any_of(state.registers.registers, [](const auto& one) {
+                             return one.written.has_value();
+                         });
+    const std::string& why = call.cause.empty() ? call.error : call.cause;
+    const bool told = state.doubt.find(why) != std::string::npos;
+    const std::string text =
+        fmt::format("{}: {}{}; what was read of it can't be believed; {}", call.doing, state.doubt,
+                    told ? "" : "; it began with: " + why, StateText(state));
+    return {touched ? ExitStatus::DeviceFailed : ExitStatus::Unreachable, text, text,
+            std::move(members)};
+}
+
+DeviceFailure Judge(const FailedCall& call, const KnownState& state, Json members) {
     members.update(
         {{"flashChanged", !state.flash.attempted.Empty()}, {"phases", PhasesJson(state.phases)}});
     if (state.registers.accessed)
@@ -92,9 +119,10 @@ DeviceFailure MakeDeviceFailure(const FailedCall& call, const KnownState& state,
         const std::string text = "interrupted; " + StateText(state);
         return {ExitStatus::Interrupted, text, text, std::move(members)};
     }
+    if (!state.doubt.empty()) return LostFailure(call, state, std::move(members));
     if (!state.identified) {
         const std::string text =
-            fmt::format("can't reach the target: {}; {}", FailureText(call), kCheckConnection);
+            fmt::format("can't reach the target: {}; {}", FailureText(call), state.advice);
         return {ExitStatus::Unreachable, text, text, std::move(members)};
     }
     // A blank check that follows on a failed access finds what that has left.
@@ -106,6 +134,12 @@ DeviceFailure MakeDeviceFailure(const FailedCall& call, const KnownState& state,
                                  : "run it with --trace FILE to see every access");
     return {ExitStatus::DeviceFailed, FailureText(call) + rest, RestText(call) + rest,
             std::move(members)};
+}
+
+}  // namespace
+
+DeviceFailure MakeDeviceFailure(const FailedCall& call, const KnownState& state, Json members) {
+    return Judge(call, state.doubt.empty() ? state : WithoutReads(state), std::move(members));
 }
 
 }  // namespace host

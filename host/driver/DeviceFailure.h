@@ -46,6 +46,8 @@ struct KnownState {
     UserRegisterWork registers = {};
     RegisterValues registerValues = {};  ///< read after the failure
     bool identified = true;              ///< the device was reached and its properties are known
+    std::string advice = {};             ///< where it wasn't
+    std::string doubt = {};              ///< why what was read doesn't count; `phases` do
     bool interrupted = false;
     bool haltFailed = false;
     bool traced = false;
@@ -53,9 +55,4 @@ struct KnownState {
 
 /// The failure to throw. `members` is what the command adds to the JSON lines.
 DeviceFailure MakeDeviceFailure(const FailedCall& call, const KnownState& state, Json members);
-
-/// What to check when no target answers.
-inline constexpr char kCheckConnection[] =
-    "check the connection (of a simulated device: the options of --sim)";
-
 }  // namespace host

@@ -57,6 +57,7 @@ FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, R
         tracingHost_.emplace(host_, *trace_);
         pluginTrace_.emplace(*trace_, library_.Handle());
     }
+    host_.SetConfirm([this] { return Confirm(); });
     Create();
     Initialize();
     identified_ = true;
@@ -75,9 +76,10 @@ void FlashDevice::Create() {
                                   library_.Path()));
     info_.identification = host_.Registers().Identification().value_or(0);
     if (IsNoIdentification(info_.identification))
-        throw Failure(ExitStatus::Unreachable,
-                      fmt::format("nothing answers: the identification register reads {:#010x}; {}",
-                                  info_.identification, kCheckConnection));
+        throw Failure(
+            ExitStatus::Unreachable,
+            fmt::format("no device answers: the identification register reads {:#010x}; {}",
+                        info_.identification, target_->Advice()));
 }
 
 void FlashDevice::Initialize() {
@@ -100,8 +102,14 @@ bool FlashDevice::Contains(std::uint32_t address) {
     return within;
 }
 
-void FlashDevice::RequireFlash() const {
+void FlashDevice::RequireFlash() {
     if (info_.hasFlash) return;
+    if (info_.family.empty())
+        throw Failure(
+            ExitStatus::Unreachable,
+            fmt::format("the identification register reads {:#010x}, which names no class "
+                        "of this family; {}",
+                        info_.identification, target_->Advice()));
     throw Failure(
         ExitStatus::DeviceFailed,
         fmt::format("the device ({}) has no flash that the plug-in can work on", info_.family));
@@ -135,10 +143,10 @@ void FlashDevice::WriteSection(const image::Section& section) {
         // The plug-in doesn't look whether the loader has finished the last chunk.
         unfinished = AwaitLoader();
         meter_.End();
-        return error == nullptr && !unfinished.empty() ? unfinished.c_str() : error;
+        if (error != nullptr) return error;
+        // The plug-in leaves the loader running, which would be in the way of the next section.
+        return unfinished.empty() ? Host().HaltTarget() : unfinished.c_str();
     });
-    // The plug-in leaves the loader running, which would be in the way of the next section.
-    Halt();
 }
 
 /// What kept the loader from finishing; empty when nothing did.
@@ -167,15 +175,19 @@ std::string FlashDevice::Published(const std::string& key) const {
 
 std::vector<std::uint8_t> FlashDevice::ReadFlash(const base::AddressRange& range) {
     std::vector<std::uint8_t> bytes(range.Size());
-    for (std::size_t done = 0; done < bytes.size();) {
-        const std::size_t count = std::min<std::size_t>(kReadBytes, bytes.size() - done);
-        const auto address = range.first + static_cast<std::uint32_t>(done);
-        Call("reading flash at " + base::HexText(address), "", [&] {
-            return Host().ReadMemory(bytes.data() + done, count, address, plugin::kFlashPage, 1);
-        });
-        meter_.Advance(count);
-        done += count;
-    }
+    std::string doing;
+    Call(doing, "", [&] {
+        const char* error = nullptr;
+        for (std::size_t done = 0; done < bytes.size() && error == nullptr;) {
+            const std::size_t count = std::min<std::size_t>(kReadBytes, bytes.size() - done);
+            const auto address = range.first + static_cast<std::uint32_t>(done);
+            doing = "reading flash at " + base::HexText(address);
+            error = Host().ReadMemory(bytes.data() + done, count, address, plugin::kFlashPage, 1);
+            if (error == nullptr) meter_.Advance(count);
+            done += count;
+        }
+        return error;
+    });
     return bytes;
 }
 
@@ -221,6 +233,36 @@ void FlashDevice::Call(const std::string& doing, const std::string& traced, Acti
     if (trace_ && error != nullptr) trace_->Line("call", fmt::format("failed: {}", error));
     if (Interrupted() || !host_.Errors().empty() || error != nullptr)
         Fail(doing, error == nullptr ? "" : error);
+    if (!Confirm()) Fail(doing, doubt_);
+}
+
+/// Whether the device is still there, if anything was read since that was known.
+bool FlashDevice::Confirm() {
+    if (Interrupted() && !closing_) return false;
+    if (doubt_.empty() && info_.identification != 0 && host_.HasUnconfirmedReads())
+        doubt_ = Doubt();
+    return doubt_.empty();
+}
+
+/// Why what was read can't be believed; empty when it can.
+std::string FlashDevice::Doubt() try {
+    std::uint32_t now = 0;
+    // Not by the slot: this is no part of the plug-in's work, and no step of a phase.
+    loader_.Read(&now, 1, plugin::kIdentificationRegister, plugin::kRamPage, sizeof now);
+    if (trace_) trace_->Line("confirm", "identification register: " + base::HexText(now));
+    if (now != info_.identification)
+        return fmt::format(
+            "the device is gone: its identification register reads {:#010x}, not {:#010x} as "
+            "before",
+            now, info_.identification);
+    host_.ReadsConfirmed();
+    confirmed_ = meter_.Phases();
+    return "";
+} catch (const target::TargetError& error) {
+    if (trace_) trace_->Line("confirm", fmt::format("failed: {}", error.what()));
+    // After a failure that was told, what was answered before it is true.
+    const bool told = closing_ && !loader_.HidesFailedReads();
+    return told ? "" : fmt::format("the device doesn't answer any more: {}", error.what());
 }
 
 void FlashDevice::LeaveHalted() {
@@ -251,12 +293,15 @@ void FlashDevice::Fail(const std::string& doing, const std::string& error) {
 KnownState FlashDevice::StateAfterFailure() {
     RegisterValues values;
     if (UserRegisters().accessed) values = TryUserRegisters();
+    const bool believed = Confirm();
     return {.flash = watch_.Work(),
-            .phases = meter_.Phases(),
+            .phases = believed ? meter_.Phases() : confirmed_,
             .notBlank = watch_.FirstNotBlank(),
             .registers = UserRegisters(),
             .registerValues = values,
             .identified = identified_,
+            .advice = identified_ || !believed ? "" : target_->Advice(),
+            .doubt = doubt_,
             .interrupted = Interrupted(),
             .haltFailed = haltFailed_,
             .traced = trace_ != nullptr};

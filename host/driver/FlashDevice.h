@@ -1,6 +1,11 @@
 // A device that is ready to be worked on: the target, the loaded plug-in and the device object that
 // it made. Every call into the plug-in goes through here, so that a failure of any kind (an error
 // text, an error that was only shown, Ctrl-C) ends a command in the same way.
+//
+// A probe's server may make zeros of reads that fail. So nothing that was read is told before the
+// identification register was read once more, and has answered as it did at first: at the end of
+// each call that has read anything, and before a message of the plug-in is shown. Once it doesn't,
+// the run fails, and nothing that was read since the last time counts.
 
 #pragma once
 
@@ -59,7 +64,7 @@ class FlashDevice final : public FlashReader {
     base::AddressRange RangeInFlash(const std::optional<std::string>& text);
 
     /// Failure (DeviceFailed) for a device whose flash the plug-in can't work on.
-    void RequireFlash() const;
+    void RequireFlash();
 
     void ResetSettings(plugin::ResetMode mode);
 
@@ -109,6 +114,8 @@ class FlashDevice final : public FlashReader {
     void Call(const std::string& doing, const std::string& traced, Action&& action);
     [[noreturn]] void Fail(const std::string& doing, const std::string& error);
     KnownState StateAfterFailure();
+    bool Confirm();
+    std::string Doubt();
     RegisterValues TryUserRegisters();
     std::string AwaitLoader();
 
@@ -126,6 +133,8 @@ class FlashDevice final : public FlashReader {
     std::unique_ptr<IFlashDevice2, Destroyer> device_;
     DeviceInfo info_;
     Json failureMembers_ = Json::object();
+    PhaseRecord confirmed_;    ///< the phases as they were when what was read was confirmed last
+    std::string doubt_;        ///< why it can't be confirmed any more
     bool identified_ = false;  ///< the device was reached, and its properties are known
     bool closing_ = false;     ///< after a failure
     bool haltFailed_ = false;

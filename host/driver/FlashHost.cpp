@@ -107,6 +107,7 @@ const char* FlashHost::ReadMemory(void* buffer, size_t count, uint64_t address, 
     return Slot(AfterInterrupt::Refuse, [&] {
         const std::uint32_t where = TargetAddress(address);
         registers_.Accessing(where);
+        unconfirmedReads_ = true;
         target_.Read(buffer, count, where, page, width);
         registers_.Read(where, Word(buffer, count * width));
         watch_.Read(where, count * width, static_cast<const std::uint8_t*>(buffer));
@@ -155,6 +156,7 @@ const char* FlashHost::ShowError(const char* text) {
     return Slot(AfterInterrupt::GoOn, [&] {
         const bool echo = !errors_.empty() && std::string_view(text).ends_with(plugin::kStepFailed);
         errors_.emplace_back(text);
+        if (watch_.FirstNotBlank() && !MayTell()) return;
         if (Interrupted())
             reporter_.PluginMessage(Verbosity::Verbose, text);
         else
@@ -166,6 +168,7 @@ const char* FlashHost::ShowError(const char* text) {
 // The plug-in shows a MAC address without leading zeros, which nobody writes so.
 const char* FlashHost::ShowMessage(const char* text) {
     return Slot(AfterInterrupt::GoOn, [&] {
+        if (!MayTell()) return;
         std::string message = text;
         if (!publishedMac_.empty() && message.ends_with(" " + publishedMac_))
             message.replace(message.size() - publishedMac_.size(), publishedMac_.size(),

@@ -3,7 +3,9 @@
 
 #pragma once
 
+#include <functional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "host/driver/FlashWatch.h"
@@ -28,6 +30,13 @@ class FlashHost final : public IFlashHost {
 
     /// The level at which the plug-in's messages are shown; errors are always shown.
     void SetMessageLevel(Verbosity level) { messageLevel_ = level; }
+
+    /// Asked before anything is shown that the plug-in may have read; false keeps it back.
+    void SetConfirm(std::function<bool()> confirm) { confirm_ = std::move(confirm); }
+
+    /// Whether anything was read that ReadsConfirmed hasn't been called for.
+    bool HasUnconfirmedReads() const { return unconfirmedReads_; }
+    void ReadsConfirmed() { unconfirmedReads_ = false; }
 
     /// To be called around each call into the plug-in: what an earlier one left doesn't count for
     /// it, and no display may be open when it returns.
@@ -77,6 +86,7 @@ class FlashHost final : public IFlashHost {
     template <typename Action>
     const char* Slot(AfterInterrupt after, Action&& action) noexcept;
     void BreachOfProtocol(const std::string& what);
+    bool MayTell() const { return !confirm_ || confirm_(); }
 
     target::Target& target_;
     SettingStore& settings_;
@@ -89,6 +99,8 @@ class FlashHost final : public IFlashHost {
     std::string publishedMac_;
     std::vector<std::string> errors_;
     RegisterWatch registers_;
+    std::function<bool()> confirm_;
+    bool unconfirmedReads_ = false;
     Verbosity messageLevel_ = Verbosity::Normal;
     bool closing_ = false;
     bool displayOpen_ = false;

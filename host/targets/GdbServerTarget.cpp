@@ -60,6 +60,14 @@ GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& 
     }
 }
 
+std::string GdbServerTarget::Advice() {
+    if (!target_->IsConnected()) return "is the server still running, and its probe connected?";
+    const std::string description = target_->Description();
+    return fmt::format(
+        "the server answers, but its target{} isn't a device of this family, or has no power",
+        description.empty() ? "" : " (" + description + ")");
+}
+
 void GdbServerTarget::RequireLoader(const std::string& directory) try {
     target_->RequireProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
 } catch (const target::TargetError& error) {

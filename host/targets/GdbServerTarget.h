@@ -16,6 +16,7 @@ class GdbServerTarget final : public OpenTarget {
     GdbServerTarget(const TargetOptions& options, const TraceLine& trace);
 
     target::Target& Get() override { return *target_; }
+    std::string Advice() override;
     void RamEndsAt(std::uint32_t address) override { target_->SetRamEnd(address); }
     void RequireLoader(const std::string& directory) override;
     void Release(bool run) override { target_->Release(run); }

@@ -68,6 +68,7 @@ class LoaderWait final : public target::Target {
     void Pause(std::uint32_t milliseconds) override { next_.Pause(milliseconds); }
     bool LooksStopIt() const override { return next_.LooksStopIt(); }
     bool SimulatesTime() const override { return next_.SimulatesTime(); }
+    bool HidesFailedReads() const override { return next_.HidesFailedReads(); }
 
   private:
     struct Chunk {

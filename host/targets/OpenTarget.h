@@ -33,6 +33,10 @@ class OpenTarget {
 
     virtual target::Target& Get() = 0;
 
+    /// What there is in place of a device of the family, so far as it tells, or what to check: to
+    /// be said when none was found.
+    virtual std::string Advice() = 0;
+
     /// What the plug-in has found out: the address behind the device's RAM.
     virtual void RamEndsAt(std::uint32_t /*address*/) {}
 

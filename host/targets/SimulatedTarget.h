@@ -20,6 +20,7 @@ class SimulatedTarget final : public OpenTarget {
     SimulatedTarget(const TargetOptions& options, const WaitNotice& say);
 
     target::Target& Get() override { return *device_; }
+    std::string Advice() override { return "check the options of --sim"; }
     target::SimulatedDevice& Device() { return *device_; }
 
     /// Keeps the contents, if a file was named for them; a file that is there already is left alone

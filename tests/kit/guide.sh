@@ -23,7 +23,7 @@ settings() {
 traced() {
     "$tool" --sim quen,flash=64K --sim-file board --trace trace "$@" >log 2>&1 || { cat log; exit 1; }
     sed -E "s/^ *[0-9.]+  //; s/\\(0x[0-9a-f]{9,}/(DATA/; s|$(dirname "$tool")/|/opt/host/|g" trace |
-        sed -E '/^#/d; /host .*ReadMemory 0x400fd008.*= 0x00000008$/d
+        sed -E '/^#/d; /^confirm /d; /host .*ReadMemory 0x400fd008.*= 0x00000008$/d
                 /host .*ReadMemory 0x400fd008.*= 0x0000000[24]$/,/Sleep/d'
 }
 

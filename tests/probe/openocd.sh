@@ -107,4 +107,8 @@ failed_reads=disable
 as_it_was '' 4 halted 'gdb_report_data_abort enable' verify image.bin --base 0
 trusted='--gdb-option reads=trusted'
 through '' 0 halted 'Done' $load --rewrite $trusted
+gone='identification register reads 0x00000000, not'
+as_it_was cable-off=4000:1 4 "$any" "$gone" read out.bin --range 0-7fff $trusted
+[ ! -e out.bin ]
+as_it_was cable-off=800:1 4 "$any" "$gone" verify image.bin --base 0 $trusted
 }

@@ -185,6 +185,7 @@ std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
     claim(said.status == 0, now.committed == work.committed, "done: committed");
     claim(said.status >= 2 && said.status <= 4, flashSame, "not begun");
     claim(says("the flash is as it was"), flashSame, "the flash is as it was");
+    const bool flashUnknown = says("what the flash holds isn't known");
     claim(!result.value("flashChanged", true), flashSame, "flashChanged");
     claim(said.status == 5, work.programs ? !HoldsImage(now) : work.first == work.end || !erased,
           "differs");
@@ -197,7 +198,7 @@ std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
           HoldsImage(now, Bytes(result, "program")), "bytes written");
     claim(said.status == 1 && !flashSame,
           says("the flash is incomplete") || says("the image is programmed") ||
-              says("are erased, but"),
+              says("are erased, but") || flashUnknown,
           "the state of the flash is told");
 
     for (const std::size_t index : {0U, 1U}) {
@@ -219,9 +220,10 @@ std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
           "the same status");
     if (said.status == 0) return lies;
     const std::string error = said.end["error"];
-    for (const char* part : {"the flash is as it was", "registers are as they were", "incomplete",
-                             "the image is programmed", "are erased, but", "couldn't be halted",
-                             "(committed)", "(perhaps committed)", "(not committed)"})
+    for (const char* part :
+         {"the flash is as it was", "isn't known", "registers are as they were", "incomplete",
+          "the image is programmed", "are erased, but", "couldn't be halted", "(committed)",
+          "(perhaps committed)", "(not committed)"})
         claim(true, says(part) == (error.find(part) != std::string::npos), part);
     return lies;
 }
@@ -435,6 +437,77 @@ TEST(Truth, HoldsBehindServersThatLie) {
             Said said;
             CheckBehind(bench, work, lie.name, peer, said);
         }
+}
+
+/// A server that loses the target at a packet, and hides it as well as it can.
+struct LosesTarget {
+    std::size_t packetsLeft;
+
+    std::optional<std::string> operator()(const std::string& payload) {
+        if (packetsLeft == 0) return AsIfDone(payload);
+        --packetsLeft;
+        return std::nullopt;
+    }
+};
+
+constexpr char kTrusted[] = "reads=trusted,live=no,timeout=10s";
+
+TEST(Truth, HoldsWhereTheCableComesOffAndTheServerHidesIt) {
+    const Bench bench;
+    for (const Work& work : {kWorks[0], kWorks[2], kWorks[3], kWorks[7], kWorks[9]}) {
+        Said said;
+        std::size_t packets = 9;
+        for (std::size_t lost = 8; lost < packets + 3 && !HasFailure(); lost += 3) {
+            test::Peer peer(LosesTarget{lost}, {}, bench.Device());
+            packets = CheckBehind(bench, work, fmt::format("the cable off at {}", lost), peer, said,
+                                  kTrusted);
+        }
+        EXPECT_EQ(said.status, 0) << said.text;
+    }
+}
+
+// What a command has read is told, or that the device is lost; never what was made of a lost one.
+TEST(Truth, HoldsOfWhatIsReadAsTheCableComesOff) {
+    const Bench bench;
+    Bench::Run({"program", "new.bin", "--base", "400"}, "");
+    const std::string contents = test::Contents("device");
+    const Words commands[] = {
+        {"read", "out.bin", "--range", "400-17ff"},
+        {"verify", "new.bin", "--base", "400"},
+        {"blank-check", "--range", "400-1fff"},
+        {"checksum"},
+        {"mac", "read"},
+        {"register", "read", "0"},
+        {"operation", "ReadMACAddress"},
+        {"operation", "CalculateChecksum"},
+        {"map"},
+        {"program", "new.bin", "--base", "400"},
+    };
+    for (const Words& command : commands) {
+        json whole;
+        std::size_t packets = 1;
+        const auto behind = [&](std::size_t lost) {
+            fs::remove("out.bin");
+            test::Peer peer(LosesTarget{lost}, {},
+                            target::DecodeContents(contents, target::ParseDeviceOptions(kDevice)));
+            Said said = Bench::Run(command, {"--gdb", peer.Where().Text(), "--gdb-option", kTrusted,
+                                             "--loader", test::LoaderFile()});
+            packets = peer.Log().size();
+            said.end.erase("seconds");
+            said.end["result"].erase("phases");
+            return said;
+        };
+        whole = behind(100'000).end;
+        EXPECT_EQ(whole["status"], command[0] == "blank-check" ? 5 : 0);
+        for (std::size_t lost = 8; lost < packets && !HasFailure(); lost += 3) {
+            const Said said = behind(lost);
+            if (said.end == whole) continue;
+            EXPECT_EQ(said.status, 4) << lost << ' ' << said.text << said.end;
+            EXPECT_FALSE(fs::exists("out.bin")) << lost;
+            for (const char* told : {" value: ", "holds 0x", "differ"})
+                EXPECT_EQ(said.text.find(told), std::string::npos) << lost << ' ' << said.text;
+        }
+    }
 }
 
 }  // namespace

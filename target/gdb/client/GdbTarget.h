@@ -64,6 +64,7 @@ class GdbTarget final : public Target {
     void Reset(bool flag) override;
     void Pause(std::uint32_t milliseconds) override;
     bool LooksStopIt() const override { return !core_.RunsLive(); }
+    bool HidesFailedReads() const override { return options_.readsTrusted; }
 
     /// Where the stack of a loaded program begins, unless the options say otherwise.
     void SetRamEnd(std::uint32_t address) { ramEnd_ = address; }

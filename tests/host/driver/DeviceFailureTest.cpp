@@ -74,9 +74,12 @@ TEST(DeviceFailure, TellsWhatWasDoneWhyItFailedAndWhatTheDeviceHolds) {
          ExitStatus::DeviceFailed,
          "erasing: lost: the cable" + asItWas},
         {{"identifying", "no answer"},
-         With([](KnownState& state) { state.identified = false; }),
+         With([](KnownState& state) {
+             state.identified = false;
+             state.advice = "look";
+         }),
          ExitStatus::Unreachable,
-         std::string("can't reach the target: identifying: no answer; ") + kCheckConnection},
+         "can't reach the target: identifying: no answer; look"},
         {{"erasing", "E"},
          With([](KnownState& state) { state.interrupted = state.haltFailed = true; }),
          ExitStatus::Interrupted,
@@ -130,6 +133,26 @@ TEST(DeviceFailure, TellsWhatWasDoneWhyItFailedAndWhatTheDeviceHolds) {
          }),
          ExitStatus::DeviceFailed,
          "checking: E; it began with: lost" + asItWas},
+        // What was read of a device that is gone is no contents, and shows nothing done.
+        {{"checking", "", "not blank"},
+         With([](KnownState& state) {
+             state.notBlank = {0x20, 0};
+             state.doubt = "gone";
+         }),
+         ExitStatus::Unreachable,
+         "checking: gone; what was read of it can't be believed; the flash is as it was"},
+        {{"D", "E", {}, "the cable"},
+         With(Touched({64, 64}, {64, 64}),
+              [](KnownState& state) {
+                  state.registers = {true, {{{0x12, Commit::Done}, {}}}};
+                  state.registerValues = {0x12, 0x34};
+                  state.doubt = "gone";
+              }),
+         ExitStatus::DeviceFailed,
+         "D: gone; it began with: the cable; what was read of it can't be believed; user register "
+         "0 may have changed and can't be read (perhaps committed), user register 1 is as it was; "
+         "what the flash holds isn't known" +
+             std::string(kAgain)},
         {{"D", "E"},
          With([](KnownState& state) { state.registers.accessed = true; }),
          ExitStatus::DeviceFailed,
