@@ -215,10 +215,15 @@ std::string CheckedHost::Faults(const Calls& calls) {
 
 }  // namespace test
 
-// The library that is loaded takes its memory here, too.
-[[gnu::noinline]] void* operator new(std::size_t size) {
+// The library that is loaded takes its memory here, too. All forms of new whose memory the delete
+// below may get: those of the sanitizers give memory that free() doesn't take back.
+[[gnu::noinline]] void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
     std::memset(test::givenBack, '#', sizeof test::givenBack - 1);
-    void* memory = std::malloc(size);
+    return std::malloc(size);
+}
+
+[[gnu::noinline]] void* operator new(std::size_t size) {
+    void* memory = operator new(size, std::nothrow);
     if (memory == nullptr) throw std::bad_alloc();
     return memory;
 }
