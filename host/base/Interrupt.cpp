@@ -4,6 +4,7 @@
 
 #include <chrono>
 #include <csignal>
+#include <utility>
 
 #include "host/base/Errors.h"
 
@@ -14,6 +15,8 @@ namespace {
 constexpr int kSignals[] = {SIGINT, SIGTERM, SIGHUP};
 
 volatile std::sig_atomic_t interrupted = 0;
+
+InterruptSource* otherSource = nullptr;
 
 // `timeout`, for one, signals the process and then its whole group: that is one wish, not two.
 constexpr std::chrono::milliseconds kOneWish{200};
@@ -55,7 +58,23 @@ void CatchSignals() {
 }
 
 bool Interrupted() {
-    return interrupted != 0;
+    return interrupted != 0 || (otherSource != nullptr && otherSource->HasInterrupted());
+}
+
+InterruptSource::InterruptSource(std::function<bool()> asked) : asked_(std::move(asked)) {
+    otherSource = this;
+}
+
+InterruptSource::~InterruptSource() {
+    otherSource = nullptr;
+}
+
+bool InterruptSource::HasInterrupted() {
+    // Whoever is asked may wait for something itself, and so ask whether to go on.
+    if (std::exchange(asking_, true)) return interrupted_;
+    interrupted_ = interrupted_ || asked_();
+    asking_ = false;
+    return interrupted_;
 }
 
 void ThrowIfInterrupted() {

@@ -5,6 +5,8 @@
 
 #include <signal.h>
 
+#include <functional>
+
 namespace host {
 
 /// From now on SIGINT, SIGTERM and, unless it is ignored already (nohup), SIGHUP set the flag; a
@@ -12,7 +14,26 @@ namespace host {
 /// write alone.
 void CatchSignals();
 
+/// Also while an InterruptSource has said so.
 bool Interrupted();
+
+/// Lets somebody else than the user at the keyboard interrupt the work for as long as it lives.
+/// There is one at a time.
+class InterruptSource {
+  public:
+    /// `asked` is called by Interrupted, again and again, until it is true once.
+    explicit InterruptSource(std::function<bool()> asked);
+    ~InterruptSource();
+    InterruptSource(const InterruptSource&) = delete;
+    InterruptSource& operator=(const InterruptSource&) = delete;
+
+    bool HasInterrupted();
+
+  private:
+    const std::function<bool()> asked_;
+    bool interrupted_ = false;
+    bool asking_ = false;
+};
 
 /// Throws a Failure (Interrupted) after Ctrl-C.
 void ThrowIfInterrupted();

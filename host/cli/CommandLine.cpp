@@ -97,7 +97,7 @@ std::string Answer(const CommandRows& commands, const FollowedLine& line) {
 /// A variable counts unless its option is typed, or one that contradicts it.
 bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
     if (*row.environment == '\0' || line.Has(row.LongName())) return false;
-    if (line.command->isForSimulated && row.LongName() == "--gdb") return false;
+    if (line.command->ignoresGdbVariable && row.LongName() == "--gdb") return false;
     return std::none_of(row.contraries.begin(), row.contraries.end(),
                         [&](const std::string& name) { return line.Has(name); });
 }

@@ -24,7 +24,7 @@ struct CommandRow {
     std::vector<OptionRow> options = {};
     std::function<Outcome(Context&, const GivenOptions&)> run = {};
     bool readsSettings = true;
-    bool isForSimulated = false;  ///< devices only: a GDB server in the environment isn't meant
+    bool ignoresGdbVariable = false;  ///< a GDB server is meant only where it was typed
 };
 
 /// All commands, in the order in which the help lists them.

@@ -1,9 +1,10 @@
-// corvane-flash serve: the simulated device as a GDB server.
+// corvane-flash serve: a probe with flash added, or the simulated device, as a GDB server.
 
 #include <fmt/format.h>
 
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/flashing/ProbeServing.h"
 #include "host/targets/TargetServer.h"
 
 namespace host::commands {
@@ -14,16 +15,26 @@ struct ServeOptions {
     std::string address;
 };
 
-Outcome RunServe(Context& context, const ServeOptions& options) {
-    Reporter& reporter = context.reporter;
-    TargetServer server(
-        TargetOf(context.options), options.address,
-        [&](const std::string& text) { reporter.Error(text); },
-        [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); });
+template <typename Server>
+Outcome ServeThere(Reporter& reporter, Server&& server) {
     const Json where{{"host", server.Where().host}, {"port", server.Port()}};
     reporter.Listening(server.Where().Text(), where);
     server.Run();
     return {.result = where};
+}
+
+Outcome RunServe(Context& context, const ServeOptions& options) {
+    Reporter& reporter = context.reporter;
+    const TargetOptions& target = TargetOf(context.options);
+    RequireOneKind(target);
+    if (target.gdb)
+        return ServeThere(reporter, ProbeServing({target, context.options.plugin}, options.address,
+                                                 context.settings, reporter));
+    return ServeThere(
+        reporter,
+        TargetServer(
+            target, options.address, [&](const std::string& text) { reporter.Error(text); },
+            [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); }));
 }
 
 }  // namespace
@@ -31,18 +42,18 @@ Outcome RunServe(Context& context, const ServeOptions& options) {
 CommandRow Serve() {
     return Command<ServeOptions>(
         {.name = "serve",
-         .help = "Serve the simulated device as a GDB server, until Ctrl-C",
-         .details =
-             "For GDB (target remote :PORT, then load), and for hosts to be tested. One "
-             "client at a time: others are told so. Code in its flash doesn't run, so a step "
-             "ends at once and a breakpoint is never hit. The contents are kept in --sim-file "
-             "whenever one has gone. "
-             "What the device refuses is shown on standard error. Without HOST only this "
-             "machine can connect; port 0 takes a free one.",
-         .example = "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
+         .help = "Serve a probe with flash added, or the simulated device, to debuggers",
+         .details = "Until Ctrl-C, to one client at a time: others are told so. With --gdb, a "
+                    "debugger finds the probe's GDB server here, and flash that it can load into; "
+                    "what it can't be told is shown on standard error, and by 'monitor corvane'. "
+                    "Without it, the simulated device is served: its code doesn't run, so a step "
+                    "ends at once and a breakpoint is never hit; its contents are kept in "
+                    "--sim-file whenever a client has gone; what it refuses is shown on standard "
+                    "error. Without HOST only this machine can connect; port 0 takes a free one.",
+         .example = "  corvane-flash serve 3333 --gdb :3334 --loader FlashLoaderMerrow.out\n"
+                    "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
                     "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
-         .readsSettings = false,
-         .isForSimulated = true},
+         .ignoresGdbVariable = true},
         {{&ServeOptions::address,
           {.names = "[HOST:]PORT", .help = "Where to listen", .isRequired = true}}},
         RunServe);

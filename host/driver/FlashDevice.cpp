@@ -41,10 +41,15 @@ TraceLine LinesTo(Trace* trace) {
 }  // namespace
 
 FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter)
+    : FlashDevice(Open(options.target, LinesTo(options.trace),
+                       [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); }),
+                  options, settings, reporter) {}
+
+FlashDevice::FlashDevice(std::unique_ptr<OpenTarget> target, const DeviceOptions& options,
+                         SettingStore& settings, Reporter& reporter)
     : settings_(settings),
       reporter_(reporter),
-      target_(Open(options.target, LinesTo(options.trace),
-                   [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); })),
+      target_(std::move(target)),
       meter_(reporter),
       watch_(meter_),
       loader_(target_->Get(), watch_),

@@ -48,6 +48,10 @@ class FlashDevice final : public FlashReader {
     /// Failure (Unreachable) when plug-in or target can't be had.
     FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter);
 
+    /// The same on a target that is open already; what `options` say of one doesn't count.
+    FlashDevice(std::unique_ptr<OpenTarget> target, const DeviceOptions& options,
+                SettingStore& settings, Reporter& reporter);
+
     const DeviceInfo& Info() const { return info_; }
     std::string LibraryPath() const { return library_.Path(); }
     SettingStore& Settings() { return settings_; }

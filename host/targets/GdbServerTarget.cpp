@@ -22,7 +22,7 @@ constexpr gdb::Mailbox kMailbox{
     plugin::kStatusPending,
 };
 
-gdb::GdbOptions ParseOptions(const TargetOptions& options) {
+gdb::GdbOptions ParseOptions(const TargetOptions& options) try {
     gdb::GdbOptions parsed;
     for (const std::string& text : options.gdbOptions)
         gdb::ParseGdbOption(text, parsed);
@@ -33,6 +33,8 @@ gdb::GdbOptions ParseOptions(const TargetOptions& options) {
         {{plugin::kDebugStatusRegister, plugin::kDebuggedBit, plugin::kHaltedBit}},
     };
     return parsed;
+} catch (const gdb::GdbOptionError& error) {
+    throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb-option: {}", error.what()));
 }
 
 gdb::PacketTrace PacketsTo(const TraceLine& trace) {
@@ -42,34 +44,56 @@ gdb::PacketTrace PacketsTo(const TraceLine& trace) {
     };
 }
 
+gdb::Address ParseServer(const TargetOptions& options) try {
+    return gdb::Address::Parse(*options.gdb);
+} catch (const std::invalid_argument& error) {
+    throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb: {}", error.what()));
+}
+
+std::unique_ptr<gdb::GdbTarget> Connect(const TargetOptions& options, const TraceLine& trace) try {
+    const gdb::GdbOptions parsed = ParseOptions(options);
+    return std::make_unique<gdb::GdbTarget>(ParseServer(options), parsed, kMailbox, Interrupted,
+                                            PacketsTo(trace));
+} catch (const target::TargetError& error) {
+    if (Interrupted()) throw Failure(ExitStatus::Interrupted, "interrupted");
+    throw Failure(ExitStatus::Unreachable, error.what());
+}
+
 }  // namespace
 
-GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& trace) {
+GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& trace)
+    : own_(host::Connect(options, trace)), target_(*own_) {}
+
+ProbeConnector::ProbeConnector(const TargetOptions& options)
+    : address_(ParseServer(options)), options_(ParseOptions(options)) {
+    if (options_.loader.empty()) return;
     try {
-        const gdb::GdbOptions parsed = ParseOptions(options);
-        const gdb::Address address = gdb::Address::Parse(*options.gdb);
-        target_ = std::make_unique<gdb::GdbTarget>(address, parsed, kMailbox, Interrupted,
-                                                   PacketsTo(trace));
-    } catch (const gdb::GdbOptionError& error) {
-        throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb-option: {}", error.what()));
-    } catch (const std::invalid_argument& error) {
-        throw Failure(ExitStatus::WrongUsage, fmt::format("--gdb: {}", error.what()));
+        gdb::ReadLoaderFile(options_.loader);
     } catch (const target::TargetError& error) {
-        if (Interrupted()) throw Failure(ExitStatus::Interrupted, "interrupted");
-        throw Failure(ExitStatus::Unreachable, error.what());
+        throw Failure(ExitStatus::BadFile, error.what());
     }
 }
 
+std::unique_ptr<gdb::GdbTarget> ProbeConnector::Connect() const {
+    return std::make_unique<gdb::GdbTarget>(address_, options_, kMailbox, Interrupted,
+                                            gdb::PacketTrace(), gdb::GdbTarget::Lent());
+}
+
+std::vector<base::AddressRange> LoaderMemory(const gdb::GdbTarget& probe,
+                                             const std::string& directory) {
+    return probe.MemoryOfProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
+}
+
 std::string GdbServerTarget::Advice() {
-    if (!target_->IsConnected()) return "is the server still running, and its probe connected?";
-    const std::string description = target_->Description();
+    if (!target_.IsConnected()) return "is the server still running, and its probe connected?";
+    const std::string description = target_.Description();
     return fmt::format(
         "the server answers, but its target{} isn't a device of this family, or has no power",
         description.empty() ? "" : " (" + description + ")");
 }
 
 void GdbServerTarget::RequireLoader(const std::string& directory) try {
-    target_->RequireProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
+    target_.RequireProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
 } catch (const target::TargetError& error) {
     throw Failure(ExitStatus::BadFile, error.what());
 }

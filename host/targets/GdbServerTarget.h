@@ -3,7 +3,10 @@
 #pragma once
 
 #include <memory>
+#include <string>
+#include <vector>
 
+#include "base/AddressRange.h"
 #include "host/targets/OpenTarget.h"
 #include "target/gdb/client/GdbTarget.h"
 
@@ -15,14 +18,37 @@ class GdbServerTarget final : public OpenTarget {
     /// target that can't be had.
     GdbServerTarget(const TargetOptions& options, const TraceLine& trace);
 
-    target::Target& Get() override { return *target_; }
+    /// For a connection that a debugger uses, too; it must outlive this. Release leaves it alone.
+    explicit GdbServerTarget(target::gdb::GdbTarget& lent) : target_(lent) {}
+
+    target::Target& Get() override { return target_; }
     std::string Advice() override;
-    void RamEndsAt(std::uint32_t address) override { target_->SetRamEnd(address); }
+    void RamEndsAt(std::uint32_t address) override { target_.SetRamEnd(address); }
     void RequireLoader(const std::string& directory) override;
-    void Release(bool run) override { target_->Release(run); }
+    void Release(bool run) override {
+        if (own_) own_->Release(run);
+    }
 
   private:
-    std::unique_ptr<target::gdb::GdbTarget> target_;
+    std::unique_ptr<target::gdb::GdbTarget> own_;
+    target::gdb::GdbTarget& target_;
 };
+
+/// Connects to the server behind which a debugger will find a probe. TargetError; Failure
+/// (WrongUsage) for options that can't be read, Failure (BadFile) for the loader's file.
+class ProbeConnector {
+  public:
+    explicit ProbeConnector(const TargetOptions& options);
+
+    std::unique_ptr<target::gdb::GdbTarget> Connect() const;
+
+  private:
+    target::gdb::Address address_;
+    target::gdb::GdbOptions options_;
+};
+
+/// What a load changes of the target's memory beside flash. TargetError.
+std::vector<base::AddressRange> LoaderMemory(const target::gdb::GdbTarget& probe,
+                                             const std::string& directory);
 
 }  // namespace host

@@ -30,6 +30,8 @@ constexpr Kind kKinds[] = {
      }},
 };
 
+}  // namespace
+
 void RequireOneKind(const TargetOptions& options) {
     if (options.gdb && (options.sim || options.simFile))
         throw Failure(ExitStatus::WrongUsage,
@@ -39,8 +41,6 @@ void RequireOneKind(const TargetOptions& options) {
         throw Failure(ExitStatus::WrongUsage,
                       "--gdb-option and --loader are for a target behind --gdb HOST:PORT");
 }
-
-}  // namespace
 
 std::unique_ptr<OpenTarget> Open(const TargetOptions& options, const TraceLine& trace,
                                  const WaitNotice& say) {

@@ -53,6 +53,9 @@ class OpenTarget {
     virtual void Release(bool run) = 0;
 };
 
+/// Failure (WrongUsage) for options of several kinds of target.
+void RequireOneKind(const TargetOptions& options);
+
 /// Failure (WrongUsage) for options that name no target, Failure (Unreachable) for a target that
 /// can't be had. `trace` may be empty; what there is to wait for is told to
 /// `say`.

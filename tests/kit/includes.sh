@@ -17,6 +17,7 @@ target:
 target/gdb/wire: base
 target/gdb/client: target/gdb/wire target base
 target/gdb/server: target/gdb/wire target base
+target/gdb/probe: target/gdb/client target/gdb/server target/gdb/wire target base
 target/simulated/options: base
 target/simulated: target/simulated/options target/gdb/server target base
 host/base: base
@@ -26,9 +27,9 @@ host/image: host/image/records host/files host/base base
 host/image/records: host/image host/files host/base base
 host/settings: host/facts host/files host/base base
 host/output: host/files host/base base
-host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/simulated target/simulated/options base
+host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/gdb/probe target/simulated target/simulated/options base
 host/driver: host/output host/settings host/targets host/image host/facts host/files host/base plugin target base
-host/flashing: host/driver host/image host/output host/settings host/facts host/files host/base base
+host/flashing: host/driver host/targets host/image host/output host/settings host/facts host/files host/base target/gdb/probe base
 host/cli: host/settings host/targets host/facts host/files host/base target/gdb/client target/simulated/options
 host/commands: host/cli host/flashing host/driver host/targets host/image host/output host/settings host/facts host/files host/base base
 host: host/commands host/cli host/output host/settings host/facts host/files host/base"

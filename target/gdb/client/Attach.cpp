@@ -12,6 +12,10 @@ namespace target::gdb {
 
 void GdbTarget::Attach() {
     Introduce();
+    FindOut(false);
+}
+
+void GdbTarget::FindOut(bool stopped) {
     ChooseProfile();
     memory_.AllowBinary(WritesBinary());
     std::string output;
@@ -26,7 +30,7 @@ void GdbTarget::Attach() {
             throw ProtocolError(fmt::format("answered \"{}\" to the request to attach{}",
                                             Shown(reply), LastLines(output)));
     }
-    core_.Attach();
+    if (!stopped) core_.Attach();
     core_.ForgetStops();
     RequireHalted("as the server was told to halt it" + LastLines(output));
     RequireReportedReads();
@@ -38,13 +42,17 @@ void GdbTarget::Introduce() {
     const std::string reply = connection_.Ask(request);
     // Not just unknown: a server that says why has something against us.
     if (reply.starts_with("E.")) connection_.Reject(request, reply);
-    features_ = ParseFeatures(reply);
+    SetFeatures(ParseFeatures(reply));
+    if (features_.noAckMode && connection_.Agrees("QStartNoAckMode"))
+        connection_.StopAcknowledging();
+}
+
+void GdbTarget::SetFeatures(const Features& features) {
+    features_ = features;
     if (features_.packetSize < MemoryPort::kPacketSizeMin)
         throw ProtocolError(fmt::format("takes packets of {} bytes only, too few for any access",
                                         features_.packetSize));
     memory_.SetPacketSize(features_.packetSize);
-    if (features_.noAckMode && connection_.Agrees("QStartNoAckMode"))
-        connection_.StopAcknowledging();
 }
 
 /// Every server has a monitor command, or refuses it; what it says to this one names many of them.

@@ -84,6 +84,17 @@ void Connection::Send(const std::string& request) {
     output_.clear();
     damageSeen_ = false;
     stopExpected_ = AnsweredByStopReply(request);
+    Deliver(request);
+}
+
+void Connection::Relay(const std::string& request) {
+    if (IsLost()) throw ProtocolError(lost_);
+    if (trace_) trace_("->", Shown(request));
+    damageSeen_ = false;
+    Deliver(request);
+}
+
+void Connection::Deliver(const std::string& request) {
     const std::string frame = Framed(request);
     Wait wait = Patience();
     ++sentCount_;
@@ -193,7 +204,10 @@ void Connection::Take(Frame frame, Wait& wait) {
         Write("-");
     } else if (packet) {
         if (acknowledged_) Write("+");
+        if (relay_) return relay_(frame);
         TakePayload(std::move(frame.payload), wait);
+    } else if (relay_ && frame.kind == Frame::Kind::Notification) {
+        relay_(frame);
     } else if (frame.kind == Frame::Kind::Notification && frame.payload.starts_with("Stop:")) {
         const auto stop = ParseStopReply(std::string_view(frame.payload).substr(5));
         if (stop && stopSink_) stopSink_(*stop);

@@ -48,11 +48,24 @@ struct Wait {
     Deadline limit;
 };
 
+/// Receives what the server says, packets and notifications, to pass it on.
+using RelaySink = std::function<void(const Frame& frame)>;
+
 class Connection {
   public:
     Connection(Socket socket, std::chrono::milliseconds timeout, PacketTrace trace);
 
     void SetStopSink(StopSink sink) { stopSink_ = std::move(sink); }
+
+    /// As long as there is a sink, everything that the server says goes there, and Relay is the
+    /// only way to send a request. It must not use the connection. An empty one ends that.
+    void SetRelay(RelaySink sink) { relay_ = std::move(sink); }
+
+    /// Sends a request whose reply goes to the relay sink.
+    void Relay(const std::string& request);
+
+    /// For a wait that includes others.
+    const Socket& Wire() const { return socket_; }
 
     /// Sends a request and returns its reply.
     std::string Ask(const std::string& request);
@@ -119,6 +132,7 @@ class Connection {
     void RefuseUnasked();
     void Take(Frame frame, Wait& wait);
     void TakePayload(std::string payload, Wait& wait);
+    void Deliver(const std::string& request);
     void Extend(Wait& wait) const;
     void Write(std::string_view bytes);
 
@@ -126,6 +140,7 @@ class Connection {
     const std::chrono::milliseconds timeout_;
     const PacketTrace trace_;
     StopSink stopSink_;
+    RelaySink relay_;
     FrameDecoder decoder_{FrameDecoder::Sender::Server};
     std::optional<std::string> packet_;  ///< a reply that was taken in and not asked for yet
     std::string lastReply_;              ///< which a server that missed its "+" sends again

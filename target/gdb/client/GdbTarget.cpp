@@ -62,6 +62,26 @@ GdbTarget::GdbTarget(const Address& address, const GdbOptions& options, const Ma
     Perform([] { return std::string("Connecting to the target"); }, [&] { Attach(); });
 }
 
+GdbTarget::GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
+                     InterruptCheck interrupted, PacketTrace trace, Lent /*connected only*/)
+    : name_(address.Text()),
+      options_(options),
+      mailbox_(mailbox),
+      interrupted_(std::move(interrupted)),
+      trace_(std::move(trace)),
+      ramEnd_(options.ramEnd),
+      connection_(Connect(address)),
+      memory_(connection_),
+      core_(connection_) {}
+
+void GdbTarget::Join(const Features& features, bool stopped) {
+    Perform([] { return std::string("Connecting to the target"); },
+            [&] {
+                SetFeatures(features);
+                FindOut(stopped);
+            });
+}
+
 void GdbTarget::Perform(const Text& describe, const std::function<void()>& action) {
     const auto sentence = [&](const char* what) {
         return fmt::format("{}: the GDB server at {} {}", describe(), name_, what);

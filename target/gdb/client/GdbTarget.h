@@ -20,7 +20,9 @@
 #include <functional>
 #include <optional>
 #include <string>
+#include <vector>
 
+#include "base/AddressRange.h"
 #include "target/Target.h"
 #include "target/gdb/client/Connection.h"
 #include "target/gdb/client/Core.h"
@@ -43,10 +45,23 @@ struct Mailbox {
 
 class GdbTarget final : public Target {
   public:
+    struct Lent {};
+
     /// Connects and stops the target. TargetError, also for every operation below; after an error
     /// that leaves it open what the server would answer next, all operations fail.
     GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
               InterruptCheck interrupted, PacketTrace trace);
+
+    /// The same behind a debugger that uses the connection, too, and introduces itself first:
+    /// connects, and sends nothing before Join.
+    GdbTarget(const Address& address, const GdbOptions& options, const Mailbox& mailbox,
+              InterruptCheck interrupted, PacketTrace trace, Lent);
+
+    /// The debugger has found out what the server can do; whether it knows the core to be stopped.
+    void Join(const Features& features, bool stopped);
+
+    /// For the debugger's packets, and for requests that are no target's business.
+    Connection& Wire() { return connection_; }
 
     void Read(void* buffer, std::size_t count, std::uint32_t address, int page,
               std::size_t width) override;
@@ -58,6 +73,14 @@ class GdbTarget final : public Target {
 
     /// Whether LoadProgram would find a program that it can load; touches nothing.
     void RequireProgram(const std::string& fileName, const std::string& directory);
+
+    /// What loading and running that program changes: its segments, what lies from the start of
+    /// the RAM to the end of the mailbox, and the stack, as far as such a program needs one.
+    std::vector<base::AddressRange> MemoryOfProgram(const std::string& fileName,
+                                                    const std::string& directory) const;
+
+    /// The numbers of the core's registers by name; none when the server doesn't tell them.
+    const RegisterNumbers& Registers();
 
     void Run() override;
     void Halt() override;
@@ -96,6 +119,8 @@ class GdbTarget final : public Target {
     Connection Connect(const Address& address) const;
     void Attach();
     void Introduce();
+    void SetFeatures(const Features& features);
+    void FindOut(bool stopped);
     void ChooseProfile();
     void OpenLiveServer();
     void RequireReportedReads();

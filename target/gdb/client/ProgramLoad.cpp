@@ -17,6 +17,9 @@ namespace {
 
 constexpr std::size_t kDocumentSizeMax = std::size_t{1} << 20;
 
+// More than programs of this kind use.
+constexpr std::uint32_t kStackBytes = 1024;
+
 // The directory text was written for another system.
 std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
                        std::string directory) {
@@ -94,21 +97,41 @@ void GdbTarget::LoadSegments(const std::string& path) {
     WriteRegister(RegisterNumber("pc", options_.pc), loader.entry & ~std::uint32_t{1});
 }
 
+std::vector<base::AddressRange> GdbTarget::MemoryOfProgram(const std::string& fileName,
+                                                           const std::string& directory) const {
+    const std::string path = LoaderPath(options_, fileName, directory);
+    const LoaderFile loader = ReadLoaderFile(path);
+    RequireFits(loader, path);
+    std::vector<base::AddressRange> ranges{{options_.device.ramStart.value_or(mailbox_.address),
+                                            mailbox_.address + mailbox_.sizeBytes - 1}};
+    for (const LoaderFile::Segment& segment : loader.segments)
+        if (!segment.bytes.empty())
+            ranges.push_back({segment.address, segment.address + static_cast<std::uint32_t>(
+                                                                     segment.bytes.size() - 1)});
+    if (ramEnd_) ranges.push_back({*ramEnd_ - kStackBytes, *ramEnd_ - 1});
+    return ranges;
+}
+
+const RegisterNumbers& GdbTarget::Registers() {
+    if (registers_) return *registers_;
+    if (!features_.description) return registers_.emplace();
+    try {
+        registers_ = ReadRegisterNumbers(
+            [this](const std::string& document) { return ReadDocument(document); });
+    } catch (const DescriptionError& error) {
+        throw ProtocolError(fmt::format("can't be understood: {}", error.what()));
+    }
+    return *registers_;
+}
+
 unsigned GdbTarget::RegisterNumber(const std::string& name,
                                    const std::optional<std::uint32_t>& given) {
     if (given) return *given;
-    if (!registers_ && features_.description) {
-        try {
-            registers_ = ReadRegisterNumbers(
-                [this](const std::string& document) { return ReadDocument(document); });
-        } catch (const DescriptionError& error) {
-            throw ProtocolError(fmt::format("can't be understood: {}", error.what()));
-        }
-    }
-    if (!registers_ || !registers_->contains(name))
+    const RegisterNumbers& numbers = Registers();
+    if (!numbers.contains(name))
         throw ProtocolError(fmt::format(
             "doesn't tell the number of the register {0}; --gdb-option {0}=NUMBER does", name));
-    return registers_->at(name);
+    return numbers.at(name);
 }
 
 void GdbTarget::WriteRegister(unsigned number, std::uint32_t value) {

@@ -4,6 +4,10 @@
 
 #include <fmt/format.h>
 
+#include <algorithm>
+
+#include "target/gdb/wire/Frame.h"
+
 namespace target::gdb {
 
 // GDB knows the microcontroller profile by the feature's name, and by the registers in this order.
@@ -35,6 +39,14 @@ std::string MemoryDocument(const std::vector<MemoryRegion>& regions) {
                       : "/>\n";
     }
     return text + "</memory-map>\n";
+}
+
+std::string DocumentReply(const std::string& document, const Arguments& piece,
+                          std::size_t packetSize) {
+    const std::size_t offset = std::min<std::size_t>(piece.address, document.size());
+    const std::size_t size = std::min<std::size_t>(piece.length, (packetSize - 1) / 2);
+    const bool last = document.size() - offset <= size;
+    return (last ? "l" : "m") + Escaped(std::string_view(document).substr(offset, size));
 }
 
 }  // namespace target::gdb

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <utility>
 
+#include "target/gdb/server/ClientPort.h"
 #include "target/gdb/wire/Frame.h"
 
 namespace target::gdb {
@@ -14,49 +15,14 @@ namespace {
 using std::chrono::milliseconds;
 
 // A client's silence is no fault; it is only looked up now and then whether to go on.
-constexpr milliseconds kBetweenLooks(200);
-constexpr milliseconds kToTakeAReply(10000);
+constexpr std::chrono::milliseconds kBetweenLooks(200);
 
-/// One client's bytes, from frames to replies. The last replies are kept, because a client may say
-/// that they arrived damaged; they are sent again then, and the request is not carried out twice.
-class Client {
-  public:
-    Client(Socket& socket, Session& session) : socket_(socket), session_(session) {}
-
-    void Take(const Frame& frame) {
-        // Asked before the request is answered: the one that ends acknowledgements is the last to
-        // get one.
-        const bool acknowledges = session_.AcknowledgesPackets();
-        switch (frame.kind) {
-            case Frame::Kind::Packet:
-                if (acknowledges) Send("+");
-                return SendAll(session_.Answer(frame.payload));
-            case Frame::Kind::Damaged:
-                if (acknowledges) Send("-");
-                return;
-            case Frame::Kind::Nak:
-                return Send(last_);
-            case Frame::Kind::Interrupt:
-                return SendAll(session_.Interrupt());
-            case Frame::Kind::Ack:
-            case Frame::Kind::Notification:
-                return;
-        }
-    }
-
-  private:
-    void SendAll(const std::vector<std::string>& payloads) {
-        last_.clear();
-        for (const std::string& payload : payloads)
-            last_ += Framed(payload);
-        Send(last_);
-    }
-    void Send(const std::string& bytes) { socket_.Write(bytes, After(kToTakeAReply)); }
-
-    Socket& socket_;
-    Session& session_;
-    std::string last_;
-};
+void Answer(ClientPort& client, Session& session, const Frame& frame) {
+    const bool interrupt = frame.kind == Frame::Kind::Interrupt;
+    for (const std::string& reply : interrupt ? session.Interrupt() : session.Answer(frame.payload))
+        client.Send(reply);
+    if (!session.AcknowledgesPackets()) client.StopAcknowledging();
+}
 
 }  // namespace
 
@@ -72,22 +38,17 @@ void Server::Run() {
         if (auto client = reception_.Next(After(kBetweenLooks))) Serve(std::move(*client));
 }
 
-void Server::Serve(Reception::Client served) {
+void Server::Serve(Reception::Client arrived) {
     Session session(device_, complain_);
-    Client client(served.socket, session);
-    FrameDecoder decoder(FrameDecoder::Sender::Client);
-    decoder.Feed(served.said);
+    ClientPort client(std::move(arrived));
     try {
-        while (!session.HasEnded() && !interrupted_()) {
-            while (!session.HasEnded()) {
-                const auto frame = decoder.Next();
-                if (!frame) break;
-                client.Take(*frame);
-            }
+        while (!interrupted_()) {
+            for (auto frame = client.Next(); frame && !session.HasEnded(); frame = client.Next())
+                Answer(client, session, *frame);
             if (session.HasEnded()) break;
             reception_.TurnAway();
-            reception_.Await({&served.socket}, After(kBetweenLooks));
-            decoder.Feed(served.socket.Read({}));
+            reception_.Await({&client.Wire()}, After(kBetweenLooks));
+            client.Read();
         }
     } catch (const SocketError&) {
         // The client is gone, in order or not.

@@ -23,7 +23,7 @@ class Server {
     void Run();
 
   private:
-    void Serve(Reception::Client served);
+    void Serve(Reception::Client arrived);
 
     ServedDevice& device_;
     const InterruptCheck interrupted_;

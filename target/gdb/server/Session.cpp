@@ -10,6 +10,7 @@
 #include "base/ByteOrder.h"
 #include "base/Hex.h"
 #include "target/gdb/server/Documents.h"
+#include "target/gdb/server/SectionChecksum.h"
 #include "target/gdb/wire/Frame.h"
 
 namespace target::gdb {
@@ -37,16 +38,6 @@ constexpr std::uint32_t kReadMax = Session::kPacketSize / 2;
 // Registers take nothing but whole words; a debugger asks for them as it does for any memory.
 std::size_t WidthOf(std::uint32_t address, std::size_t sizeBytes) {
     return address % 4 == 0 && sizeBytes % 4 == 0 ? 4 : 1;
-}
-
-/// The checksum of "compare-sections": CRC-32 from the top bit down, without any inversion.
-std::uint32_t AddToChecksum(std::uint32_t crc, std::string_view bytes) {
-    for (const char byte : bytes) {
-        crc ^= std::uint32_t{static_cast<unsigned char>(byte)} << 24;
-        for (int bit = 0; bit < 8; ++bit)
-            crc = crc << 1 ^ ((crc & 0x80000000) != 0 ? 0x04C11DB7 : 0);
-    }
-    return crc;
 }
 
 constexpr char kResumeKinds[] = "vCont;c;C;s;S";
@@ -231,15 +222,10 @@ Session::Replies Session::WriteMemory(const Arguments& arguments) {
 }
 
 Session::Replies Session::Checksum(const Arguments& arguments) {
-    constexpr std::uint32_t kPieceSize = 4096;
-    std::uint32_t crc = 0xFFFFFFFF;
-    for (std::uint32_t done = 0; done < arguments.length;) {
-        const std::uint32_t size = std::min(kPieceSize, arguments.length - done);
-        crc = AddToChecksum(crc, device_.Read(arguments.address + done, size,
-                                              WidthOf(arguments.address + done, size)));
-        done += size;
-    }
-    return {fmt::format("C{:x}", crc)};
+    return {SectionChecksum(arguments.address, arguments.length,
+                            [this](std::uint32_t address, std::uint32_t size) {
+                                return device_.Read(address, size, WidthOf(address, size));
+                            })};
 }
 
 Session::Replies Session::ReadDocument(const Arguments& arguments) {
@@ -250,11 +236,7 @@ Session::Replies Session::ReadDocument(const Arguments& arguments) {
         document = MemoryDocument(device_.Regions());
     else
         return {"E00"};
-    const std::size_t offset = std::min<std::size_t>(arguments.address, document.size());
-    const std::size_t room = (kPacketSize - 1) / 2;
-    const std::size_t size = std::min<std::size_t>(arguments.length, room);
-    const bool last = document.size() - offset <= size;
-    return {(last ? "l" : "m") + Escaped(std::string_view(document).substr(offset, size))};
+    return {DocumentReply(document, arguments, kPacketSize)};
 }
 
 Session::Replies Session::ReadRegister(const Arguments& arguments) {

@@ -1,0 +1,125 @@
+// Taking and putting back, each through requests that every server has.
+
+#include "target/gdb/probe/SavedTarget.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "base/AddressSet.h"
+#include "base/Hex.h"
+
+namespace target::gdb {
+
+namespace {
+
+/// Calls `step` with each part of the range that a block has: where it begins in the range and in
+/// the block, and its size.
+template <typename Blocks, typename Step>
+void ForEachShared(Blocks& blocks, std::uint32_t address, std::size_t size, Step step) {
+    for (auto& block : blocks) {
+        const std::uint64_t first = std::max(address, block.address);
+        const std::uint64_t end = std::min(std::uint64_t{address} + size,
+                                           std::uint64_t{block.address} + block.bytes.size());
+        if (first < end) step(block, first - address, first - block.address, end - first);
+    }
+}
+
+}  // namespace
+
+SavedTarget::SavedTarget(GdbTarget& probe, const std::vector<base::AddressRange>& memory,
+                         DebuggerRequests requests)
+    : probe_(probe), requests_(std::move(requests)) {
+    try {
+        Take(memory);
+    } catch (const ProtocolError& error) {
+        throw TargetError(fmt::format(
+            "Saving what the debugger has on the target: the GDB server {}", error.what()));
+    }
+}
+
+void SavedTarget::Take(const std::vector<base::AddressRange>& memory) {
+    // Other threads than the core's own have registers in memory.
+    if (!requests_.threads.empty()) probe_.Wire().Agrees("Hg0");
+    for (const auto& [key, request] : requests_.breakpoints)
+        probe_.Wire().Ask("z" + key);
+    registers_ = ReadRegisters();
+    base::AddressSet ranges;
+    for (const base::AddressRange& range : memory)
+        ranges.Add(range);
+    for (const base::AddressRange& range : ranges.Ranges()) {
+        std::string bytes(range.Size(), '\0');
+        probe_.Read(bytes.data(), bytes.size(), range.first, 0, 1);
+        memory_.push_back({range.first, std::move(bytes)});
+    }
+}
+
+/// Without those that the server doesn't tell, which nobody can have set either.
+std::map<unsigned, std::string> SavedTarget::ReadRegisters() {
+    std::map<unsigned, std::string> values;
+    for (const auto& [name, number] : probe_.Registers()) {
+        const std::string reply = probe_.Wire().Ask(fmt::format("p{:x}", number));
+        if (!IsError(reply) && base::FromHex(reply)) values[number] = reply;
+    }
+    if (values.empty())
+        throw ProtocolError("doesn't tell the core's registers, which could not be put back");
+    return values;
+}
+
+/// Whether all were as they should be already. Some are others under a second name.
+bool SavedTarget::WriteRegisters() {
+    bool same = true;
+    const auto now = ReadRegisters();
+    for (const auto& [number, value] : registers_) {
+        const auto found = now.find(number);
+        if (found != now.end() && found->second == value) continue;
+        same = false;
+        probe_.Wire().Agrees(fmt::format("P{:x}={}", number, value));
+    }
+    return same;
+}
+
+void SavedTarget::PutBack() try {
+    for (const Block& block : memory_)
+        probe_.Write(block.bytes.data(), block.bytes.size(), block.address, 0, 1);
+    if (!WriteRegisters() && !WriteRegisters() && !WriteRegisters())
+        throw ProtocolError("doesn't take all of the registers");
+    for (const auto& [key, request] : requests_.breakpoints)
+        probe_.Wire().RequireOk(request);
+    for (const auto& [what, request] : requests_.threads)
+        probe_.Wire().RequireOk(request);
+} catch (const ProtocolError& error) {
+    throw TargetError(fmt::format(
+        "Putting back what the debugger had on the target: the GDB server {}", error.what()));
+}
+
+bool SavedTarget::Touches(const base::AddressRange& range) const {
+    return std::ranges::any_of(memory_, [&](const Block& block) {
+        return range.first < block.address + std::uint64_t{block.bytes.size()} &&
+               range.last >= block.address;
+    });
+}
+
+bool SavedTarget::Holds(const base::AddressRange& range) const {
+    std::uint64_t held = 0;
+    ForEachShared(memory_, range.first, range.Size(),
+                  [&](const Block&, std::size_t, std::size_t, std::size_t size) { held += size; });
+    return held == range.Size();
+}
+
+void SavedTarget::Overlay(std::uint32_t address, std::string& bytes) const {
+    ForEachShared(memory_, address, bytes.size(),
+                  [&](const Block& block, std::size_t to, std::size_t from, std::size_t size) {
+                      bytes.replace(to, size, block.bytes, from, size);
+                  });
+}
+
+void SavedTarget::Write(std::uint32_t address, std::string_view bytes) {
+    ForEachShared(memory_, address, bytes.size(),
+                  [&](Block& block, std::size_t from, std::size_t to, std::size_t size) {
+                      block.bytes.replace(to, size, bytes.substr(from, size));
+                  });
+}
+
+}  // namespace target::gdb
