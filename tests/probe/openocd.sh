@@ -87,6 +87,28 @@ held half.bin
 cmp -n 2048 image.bin half.bin
 through '' 0 halted 'Done: the flash holds the image' $load
 
+# Stock GDB loads through OpenOCD with flash added, and finds the core as it was but for pc.
+attach
+"$tool" serve 0 --gdb ":$port" --loader loader.out >listening 2>refused &
+adder=$!
+state=$(printf '%s\n' 'echo <' 'info registers' 'x/3wx 0x20000ffc' 'echo >')
+cat >load.gdb <<END
+target remote :$(await listening 's/.*:\([0-9]*\);.*/\1/p')
+set {int}0x20001000=7
+set \$r5=0x5555
+$state
+load
+$state
+compare-sections
+detach
+END
+timeout 90 gdb-multiarch -nx -batch -x load.gdb "$elf" >gdb 2>&1
+kill $adder
+wait $adder
+leave halted running
+[ "$(grep -c 'matched' gdb)/$(grep -c '^r5 *0x5555' gdb)" = 2/2 ] &&
+    [ -z "$(sed -n '/^</,/>$/ { /^pc /d; s/^<//; p; }' gdb | sort | uniq -u)" ] || { cat gdb refused; exit 1; }
+
 # The core resets slowly, begins in the wrong state where the vectors are zero, can't be halted, and
 # crashes: into lockup while the vectors are erased, into the image's endless handler, or into a catch.
 through '' 0 running '' reset --run
