@@ -48,7 +48,7 @@ Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
     SettingStore settings;
     const CommonOptions& options = line.common;
     if (line.command->readsSettings)
-        settings = LoadSettings(options.settingsFile.value_or(""), options.set);
+        settings = LoadSettings(options.settingsFile.value_or(""), options.set, line.project);
     if (options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
     Context context{options, reporter, settings};
     Outcome outcome;

@@ -34,6 +34,20 @@ std::vector<std::string> KnownWords(const CommandRows& commands, const FollowedL
     return known;
 }
 
+/// What other programmers' tools call something else.
+constexpr struct {
+    const char* word;
+    const char* advice;
+} kElsewhere[] = {
+    {"flash", "here it is 'program'"},
+    {"write", "here it is 'program'"},
+    {"load", "here it is 'program'"},
+    {"dump", "here it is 'read'"},
+    {"version", "here it is --version"},
+    {"--verify", "'program' compares by itself, and 'verify' is a command of its own"},
+    {"--reset", "'reset' is a command of its own, and 'program --run' resets the device"},
+};
+
 /// What to do about a stray word, as far as it is known.
 std::string StrayAdvice(const CommandRows& commands, const FollowedLine& line) {
     const StrayWord& first = line.strays.front();
@@ -41,6 +55,9 @@ std::string StrayAdvice(const CommandRows& commands, const FollowedLine& line) {
     const std::string name = first.text.substr(0, first.text.find('='));
     if (line.command != nullptr && line.FindOption(name) != nullptr)
         return fmt::format("; write it behind '{}'", line.name);
+    for (const auto& [word, advice] : kElsewhere)
+        if (name == word && (IsOption(name) || line.command == nullptr))
+            return fmt::format("; {}", advice);
     return Suggestion(name, KnownWords(commands, line, name));
 }
 
@@ -94,22 +111,79 @@ std::string Answer(const CommandRows& commands, const FollowedLine& line) {
     return "";
 }
 
-/// A variable counts unless its option is typed, or one that contradicts it.
-bool HeedsEnvironment(const OptionRow& row, const FollowedLine& line) {
-    if (*row.environment == '\0' || line.Has(row.LongName())) return false;
-    if (line.command->ignoresGdbVariable && row.LongName() == "--gdb") return false;
-    return std::none_of(row.contraries.begin(), row.contraries.end(),
-                        [&](const std::string& name) { return line.Has(name); });
+bool Has(const GivenOptions& given, const std::string& name) {
+    return std::any_of(given.begin(), given.end(),
+                       [&](const GivenOption& one) { return one.row->LongName() == name; });
 }
 
-std::vector<GivenOption> WithEnvironment(const FollowedLine& line,
-                                         const ReadVariable& environment) {
-    std::vector<GivenOption> given = line.given;
+/// Whether an option is heard that something weaker gives than all that is `given`.
+bool IsHeard(const OptionRow& row, const GivenOptions& given) {
+    if (!row.isRepeated && Has(given, row.LongName())) return false;
+    return std::none_of(row.contraries.begin(), row.contraries.end(),
+                        [&](const std::string& name) { return Has(given, name); });
+}
+
+void PutBelow(GivenOptions& given, GivenOptions weaker) {
+    std::erase_if(weaker, [&](const GivenOption& one) { return !IsHeard(*one.row, given); });
+    given.insert(given.begin(), weaker.begin(), weaker.end());
+}
+
+void DropWhatMeansNothing(GivenOptions& given) {
+    std::erase_if(given, [&](const GivenOption& one) {
+        return one.by != GivenBy::Line && *one.row->needs != '\0' && !Has(given, one.row->needs);
+    });
+}
+
+GivenOptions OfEnvironment(const CommandRow& command, const ReadVariable& environment) {
+    GivenOptions given;
     for (const OptionRow& row : CommonRows())
-        if (HeedsEnvironment(row, line))
+        if (*row.environment != '\0' && !(command.ignoresGdbVariable && row.LongName() == "--gdb"))
             if (const std::string text = environment(row.environment); !text.empty())
-                given.push_back({&row, text, true});
+                given.push_back({&row, text, GivenBy::Environment});
     return given;
+}
+
+GivenOptions OfBoard(const Board& board) {
+    GivenOptions given;
+    for (const auto& [name, text] : board.options)
+        for (const OptionRow& row : CommonRows())
+            if (row.LongName() == name) given.push_back({&row, text, GivenBy::Board});
+    return given;
+}
+
+bool NamesTarget(const GivenOptions& given) {
+    return Has(given, "--gdb") || Has(given, "--sim") || Has(given, "--sim-file");
+}
+
+/// What the environment and a board add to what was typed.
+GivenOptions WithWhatIsAround(const FollowedLine& line, const ReadVariable& environment,
+                              const ProjectFile& project, SettingTexts& settings) {
+    GivenOptions given = line.given;
+    const std::string typed = ValuesOf(CommonOptionTable(), given).board.value_or("");
+    settings = project.settings;
+    const auto putBoard = [&](const std::string& name) {
+        const Board& board = project.RequireBoard(name);
+        settings = board.settings;
+        PutBelow(given, OfBoard(board));
+    };
+    if (!typed.empty()) putBoard(typed);
+    PutBelow(given, OfEnvironment(*line.command, environment));
+    const bool mayHaveDefault = typed.empty() && !line.command->ignoresGdbVariable;
+    if (mayHaveDefault && !project.defaultBoard.empty() && !NamesTarget(given))
+        putBoard(project.defaultBoard);
+    DropWhatMeansNothing(given);
+    return given;
+}
+
+/// Says where those options come from that weren't typed.
+void Place(CommonOptions& common, const GivenOptions& given, const std::string& project) {
+    for (const auto& [row, text, by] : given) {
+        if (by == GivenBy::Environment && !row->contraries.empty())
+            common.targetVariables.emplace_back(row->environment);
+        if (by == GivenBy::Environment)
+            common.placed.push_back({row->LongName(), text, "environment"});
+        if (by == GivenBy::Board) common.placed.push_back({row->LongName(), text, project});
+    }
 }
 
 }  // namespace
@@ -120,17 +194,18 @@ std::string ProcessEnvironment(const char* name) {
 }
 
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
-                            const ReadVariable& environment) {
+                            const ReadVariable& environment, const ReadProject& project) {
     ParsedLine parsed;
     parsed.answer = Answer(commands, line);
     if (!parsed.answer.empty()) return parsed;
     RefuseNonsense(commands, line);
     parsed.command = line.command;
-    parsed.given = WithEnvironment(line, environment);
+    const ProjectFile found =
+        (line.command->readsSettings || line.command->ignoresGdbVariable) ? project() : ProjectFile();
+    parsed.project.path = found.path;
+    parsed.given = WithWhatIsAround(line, environment, found, parsed.project.texts);
     parsed.common = ValuesOf(CommonOptionTable(), parsed.given);
-    for (const GivenOption& given : parsed.given)
-        if (given.isFromEnvironment && !given.row->contraries.empty())
-            parsed.common.targetVariables.emplace_back(given.row->environment);
+    Place(parsed.common, parsed.given, found.path);
     return parsed;
 }
 

@@ -7,13 +7,16 @@
 
 #include "host/cli/CommonOptions.h"
 #include "host/cli/FollowedLine.h"
+#include "host/settings/ProjectFile.h"
+#include "host/settings/SettingStore.h"
 
 namespace host {
 
 struct ParsedLine {
     const CommandRow* command = nullptr;  ///< null: `answer` is all that was asked for
-    GivenOptions given;                   ///< the line's, then what the environment adds
+    GivenOptions given;                   ///< the weakest first: the last one of a name counts
     CommonOptions common;                 ///< the values of those that every command takes
+    ProjectSettings project;              ///< what the project file sets for this run
     std::string answer;                   ///< help, version or man page
 };
 
@@ -21,8 +24,12 @@ struct ParsedLine {
 using ReadVariable = std::function<std::string(const char* name)>;
 std::string ProcessEnvironment(const char* name);
 
-/// Failure (WrongUsage) for a line that makes no sense.
+using ReadProject = std::function<ProjectFile()>;
+
+/// Failure (WrongUsage) for a line that makes no sense, and what `project` throws. Commands that
+/// work on no target don't ask for the project.
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
-                            const ReadVariable& environment = ProcessEnvironment);
+                            const ReadVariable& environment = ProcessEnvironment,
+                            const ReadProject& project = ReadNearestProject);
 
 }  // namespace host

@@ -111,7 +111,7 @@ class Follower {
     }
 
     void Give(const OptionRow& row, const std::string& value) {
-        line_.given.push_back({&row, value, false});
+        line_.given.push_back({&row, value});
         Complain(Objection(row, value));
     }
 

@@ -50,13 +50,10 @@ std::string ToolHelp(const CommandRows& commands) {
     std::string text = "Usage: corvane-flash [OPTION]... COMMAND [ARGUMENT]...\n\n";
     for (const std::string& word : FirstWords(commands))
         text += Entry(word, FirstWordHelp(commands, word), kCommandColumns);
-    std::string options = "Options:";
-    for (const OptionRow& row : CommonRows())
-        options += " " + row.Names().front();
     std::string topics;
     for (const Topic& topic : Topics())
         topics += fmt::format("{}{}", topics.empty() ? "" : ", ", topic.name);
-    return text + "\n" + Wrap(options + " --help --version", 0, 2) +
+    return text + "\n" + Wrap("The options that every command takes: 'help options'; --version") +
            Wrap(fmt::format("'help COMMAND' tells more, 'help TOPIC' too: {}", topics)) +
            Wrap("Example: corvane-flash program firmware.elf");
 }

@@ -4,6 +4,8 @@
 
 #include <algorithm>
 
+#include "host/base/Errors.h"
+#include "host/settings/ProjectFile.h"
 #include "host/settings/SettingCatalogue.h"
 #include "target/gdb/client/GdbOptions.h"
 #include "target/simulated/options/DeviceOptions.h"
@@ -37,14 +39,26 @@ Words Settings(const std::string& typed, bool assignment) {
     return words;
 }
 
-Words Devices(const std::string& typed) {
+Words Classes() {
     Words words;
+    for (const std::string& name : target::DeviceClassNames())
+        words.push_back({name, ""});
+    return words;
+}
+
+Words Boards() try {
+    Words words;
+    for (const auto& [name, board] : ReadNearestProject().boards)
+        words.push_back({name, ""});
+    return words;
+} catch (const Failure&) {
+    return {};  // a command that needs the file will say what is wrong with it
+}
+
+Words Devices(const std::string& typed) {
     const auto comma = typed.rfind(',');
-    if (comma == std::string::npos) {
-        for (const std::string& name : target::DeviceClassNames())
-            words.push_back({name, ""});
-        return words;
-    }
+    if (comma == std::string::npos) return Classes();
+    Words words;
     const std::string before = typed.substr(0, comma + 1);
     const auto equals = typed.find('=', comma);
     for (const target::OptionRow& row : target::OptionTable()) {
@@ -72,6 +86,10 @@ Words Values(const OptionRow& row, const std::string& typed) {
     switch (row.offers) {
         case Offers::Devices:
             return Devices(typed);
+        case Offers::Boards:
+            return Boards();
+        case Offers::Classes:
+            return Classes();
         case Offers::GdbOptions:
             return GdbOptions(typed);
         case Offers::Settings:

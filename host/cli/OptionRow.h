@@ -14,6 +14,8 @@ enum class Offers {
     SomeChoices,
     Files,
     Devices,
+    Classes,
+    Boards,
     GdbOptions,
     Settings,
     SettingAssignments,
@@ -27,10 +29,12 @@ struct OptionRow {
     Offers offers = Offers::Nothing;
     std::vector<std::string> choices = {};
     bool isRequired = false;
-    const char* environment = "";              ///< the variable that stands in for it
-    std::vector<std::string> contraries = {};  ///< options that, when typed, silence the variable
-    bool isSwitch = true;                      ///< it takes no value
-    bool isRepeated = false;                   ///< it may be there again, and adds to what was
+    const char* environment = "";  ///< the variable that stands in for it
+    std::vector<std::string> contraries =
+        {};                   ///< options that, given by a stronger one, silence it
+    const char* needs = "";   ///< without this one it means nothing, unless typed
+    bool isSwitch = true;     ///< it takes no value
+    bool isRepeated = false;  ///< it may be there again, and adds to what was
 
     bool IsArgument() const { return names[0] != '-'; }
 
@@ -41,11 +45,15 @@ struct OptionRow {
     std::string LongName() const { return Names().back(); }
 };
 
-/// An option or argument that stands in a command line.
+/// Who has given an option, the strongest first. A board stands where it is named: above the
+/// environment in the command line, below it in the project file.
+enum class GivenBy { Line, Environment, Board };
+
+/// An option or argument that is given.
 struct GivenOption {
     const OptionRow* row;
     std::string value;  ///< of an argument, the word itself; of a switch, empty
-    bool isFromEnvironment = false;
+    GivenBy by = GivenBy::Line;
 };
 using GivenOptions = std::vector<GivenOption>;
 

@@ -53,6 +53,29 @@ std::string GdbHelp() {
     return text;
 }
 
+std::string ProjectHelp() {
+    return "A project's boards have names in its file, corvane-flash.toml, which is found in the\n"
+           "working folder or the nearest one above it:\n\n"
+           "  default = \"bench\"            # for whoever names no target\n\n"
+           "  [settings]                   # for all boards; KEY = \"TEXT\"\n"
+           "  FlashTimeoutValue = \"5\"\n\n"
+           "  [board.bench]                # --board bench\n"
+           "  gdb = \":3333\"\n"
+           "  server = \"openocd\"\n"
+           "  loader = \"FlashLoaderMerrow.out\"\n"
+           "  expect = \"quen,flash=512K\"\n\n"
+           "  [board.bench.settings]       # above those for all\n"
+           "  FlashCrystalFreq = \"10\"\n\n" +
+           Wrap("A board may have gdb or sim, loader (from the file's own folder), expect, wait, and "
+                "of the options for a GDB server: server, attach, writes, reads, live, pc, sp, "
+                "ram-end, timeout, detach. What would be run on this machine, or written, can't "
+                "stand there.") +
+           "\n" +
+           Wrap("What is typed comes first, a board that is typed among it; then the environment, "
+                "the project's default board and its settings, and your own settings. 'settings' "
+                "shows where each value comes from.");
+}
+
 std::string OptionsHelp() {
     std::string text = "Every command takes these options, before or behind its own:\n";
     for (const OptionRow& row : CommonRows())
@@ -75,6 +98,7 @@ std::string StatusHelp() {
 const Topic kTopics[] = {
     {"sim", "Simulated devices: classes, options, faults", DevicesHelp},
     {"gdb", "Boards behind a GDB server", GdbHelp},
+    {"project", "The project file and its boards", ProjectHelp},
     {"options", "The options that every command takes", OptionsHelp},
     {"status", "Exit statuses", StatusHelp},
 };

@@ -1,10 +1,6 @@
 // corvane-flash checksum: the CRC-32 of flash by the plug-in, or of an image by the host.
 
 #include <fmt/format.h>
-#include <zlib.h>
-
-#include <algorithm>
-#include <vector>
 
 #include "base/Hex.h"
 #include "host/commands/Command.h"
@@ -12,6 +8,7 @@
 #include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
+#include "host/flashing/ImageChecksum.h"
 #include "host/flashing/ImageSet.h"
 #include "host/flashing/RangeOperation.h"
 
@@ -22,31 +19,6 @@ namespace {
 struct ChecksumOptions : RangeChoice, ImageForm {
     std::optional<std::string> imageFile;
 };
-
-/// The CRC-32 of the range as flash would hold the image, erased where the image says nothing.
-std::uint32_t ImageChecksum(const image::Image& image, const base::AddressRange& range) {
-    uLong crc = crc32(0, nullptr, 0);
-    std::uint64_t next = range.first;
-    const std::vector<std::uint8_t> erased(0x10000, 0xFF);
-    const auto fill = [&](std::uint64_t end) {
-        while (next < end) {
-            const std::uint64_t count = std::min<std::uint64_t>(erased.size(), end - next);
-            crc = crc32(crc, erased.data(), static_cast<uInt>(count));
-            next += count;
-        }
-    };
-    for (const image::Section& section : image.Sections()) {
-        const std::uint64_t first = std::max(section.address, range.first);
-        const std::uint64_t end = std::uint64_t{std::min(section.Last(), range.last)} + 1;
-        if (first >= end) continue;
-        fill(first);
-        crc = crc32(crc, section.bytes.data() + (first - section.address),
-                    static_cast<uInt>(end - first));
-        next = end;
-    }
-    fill(std::uint64_t{range.last} + 1);
-    return static_cast<std::uint32_t>(crc);
-}
 
 Outcome Answer(Context& context, const base::AddressRange& range, const std::string& checksum) {
     context.reporter.Result(checksum);

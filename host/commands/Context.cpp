@@ -5,7 +5,13 @@
 #include <fmt/format.h>
 #include <fmt/ranges.h>
 
+#include <chrono>
+#include <thread>
 #include <utility>
+
+#include "base/Duration.h"
+#include "host/base/Interrupt.h"
+#include "host/targets/ExpectedDevice.h"
 
 namespace host {
 
@@ -22,12 +28,49 @@ const TargetOptions& TargetOf(const CommonOptions& options) {
 
 namespace {
 
-Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(FlashDevice&)>& work) {
+/// How often a board is tried that doesn't answer yet.
+constexpr std::chrono::milliseconds kTryAgain{250};
+
+std::chrono::nanoseconds WaitTime(const TargetOptions& options) {
+    if (!options.wait) return std::chrono::nanoseconds(0);
+    if (const auto time = base::ParseDuration(*options.wait)) return *time;
+    throw Failure(ExitStatus::WrongUsage,
+                  fmt::format("--wait takes a time of up to an hour as in 500ms or 30s, not '{}'",
+                              *options.wait));
+}
+
+/// Opens the device that the options name, which may be a board that isn't there yet.
+void OpenDevice(Context& context, Trace* trace, std::optional<FlashDevice>& device) {
     const CommonOptions& options = context.options;
     const DeviceOptions named{TargetOf(options), options.plugin, trace};
-    FlashDevice device(named, context.settings, context.reporter);
+    const auto end = std::chrono::steady_clock::now() + WaitTime(options);
+    if (options.wait) PluginLibrary(options.plugin.value_or(""));  // no wait brings a missing one
+    for (std::string told;;) {
+        try {
+            device.emplace(named, context.settings, context.reporter);
+            return;
+        } catch (const Failure& failure) {
+            const bool isOver = std::chrono::steady_clock::now() >= end;
+            if (failure.Status() != ExitStatus::Unreachable || isOver) throw;
+            if (told != failure.what())
+                context.reporter.Say(Verbosity::Normal,
+                                     fmt::format("Waiting for the board: {}", failure.what()));
+            told = failure.what();
+        }
+        std::this_thread::sleep_for(kTryAgain);
+        ThrowIfInterrupted();
+    }
+}
+
+Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(FlashDevice&)>& work) {
+    std::optional<ExpectedDevice> expected;
+    if (context.options.expect) expected = ParseExpectedDevice(*context.options.expect);
+    std::optional<FlashDevice> opened;
+    OpenDevice(context, trace, opened);
+    FlashDevice& device = *opened;
     Outcome outcome;
     try {
+        if (expected) RequireExpected(*expected, device.Info().family, device.Info().flashBytes);
         outcome = work(device);
     } catch (...) {
         device.LeaveHalted();

@@ -4,6 +4,7 @@
 
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
+#include "host/commands/FileInfo.h"
 #include "host/driver/FlashDevice.h"
 
 namespace host::commands {
@@ -33,18 +34,25 @@ Outcome ShowInfo(Context& context, FlashDevice& device) {
                        {"plugin", device.LibraryPath()}}};
 }
 
-Outcome RunInfo(Context& context, const NoOptions& /*options*/) {
+Outcome RunInfo(Context& context, const ImageFiles& options) {
+    if (!options.files.empty()) return ShowFiles(context, options);
+    if (options.format || options.base)
+        throw Failure(ExitStatus::WrongUsage,
+                      "--format and --base say how a FILE is read; name one, or leave them out");
     return WithDevice(context, [&](FlashDevice& device) { return ShowInfo(context, device); });
 }
 
 }  // namespace
 
 CommandRow Info() {
-    return Command<NoOptions>(
+    return Command<ImageFiles>(
         {.name = "info",
          .help = "Show the device: family, id, flash, sectors, RAM, operations",
-         .example = "  corvane-flash --sim quen,flash=512K info"},
-        {}, RunInfo);
+         .details = "With a FILE, no device is asked: what the file holds is shown, and which "
+                    "classes of device have enough flash for it.",
+         .example = "  corvane-flash --sim quen,flash=512K info\n"
+                    "  corvane-flash info firmware.elf"},
+        {ImagesArgument(false), FormatOption(), BaseOption()}, RunInfo);
 }
 
 }  // namespace host::commands

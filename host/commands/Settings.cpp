@@ -31,6 +31,18 @@ void ShowOne(Context& context, const SettingInfo& info) {
     context.reporter.Result(fmt::format("    {}; takes {}", info.meaning, AcceptedTexts(info)));
 }
 
+/// The options that weren't typed.
+Json ListOptions(Context& context) {
+    Json all = Json::array();
+    for (const auto& [option, text, place] : context.options.placed) {
+        context.reporter.Result(context.reporter.Hears(Verbosity::Normal)
+                                    ? fmt::format("{} \"{}\"  ({})", option, text, place)
+                                    : fmt::format("{} \"{}\"", option, text));
+        all.push_back({{"option", option}, {"value", text}, {"origin", place}});
+    }
+    return all;
+}
+
 Outcome List(Context& context) {
     Json all = Json::array();
     for (const SettingInfo& info : SettingCatalogue()) {
@@ -42,9 +54,11 @@ Outcome List(Context& context) {
         all.push_back(ToJson(context, info));
     }
     const SettingPaths& paths = context.settings.Paths();
-    context.reporter.Say(Verbosity::Verbose,
-                         fmt::format("Your file: {}\nKept values: {}", paths.user, paths.kept));
-    return {.result = {{"settings", all}}};
+    context.reporter.Say(
+        Verbosity::Verbose,
+        fmt::format("Project file: {}\nYour file: {}\nKept values: {}",
+                    paths.project.empty() ? "none" : paths.project, paths.user, paths.kept));
+    return {.result = {{"settings", all}, {"options", ListOptions(context)}}};
 }
 
 /// Keeping is what the command is for, so that it fails when nothing can be kept.
@@ -100,10 +114,12 @@ CommandRow Settings() {
     return Command<SettingsOptions>(
         {.name = "settings",
          .help = "List the settings, or show, keep or drop one",
-         .details = "Each is shown with its origin, its meaning and the texts that it takes. A "
-                    "value comes from the first of: command line, environment variable "
-                    "CORVANE_SET_KEY, your settings file, kept value (KEY=TEXT here, and what the "
-                    "plug-in publishes), default. With -q, only the values are shown.",
+         .details =
+             "Each is shown with its origin, its meaning and the texts that it takes. A "
+             "value comes from the first of: command line, environment variable "
+             "CORVANE_SET_KEY, project file (corvane-flash.toml, in this folder or above it), "
+             "your settings file, kept value (KEY=TEXT here, and what the "
+             "plug-in publishes), default. With -q, only the values are shown.",
          .example = "  corvane-flash settings FlashTimeoutValue\n"
                     "  corvane-flash settings FlashCrystalFreq=10"},
         {{&SettingsOptions::setting,

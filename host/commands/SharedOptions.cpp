@@ -29,13 +29,17 @@ Option<ImageFiles> ImagesArgument(bool isRequired) {
              .isRequired = isRequired}};
 }
 
-LoadedImages ReadNamed(Context& context, const std::vector<std::string>& files,
-                       const ImageForm& form) {
+image::ReadOptions ReadOptionsOf(const ImageForm& form) {
     image::ReadOptions read;
     if (form.format) read.format = image::FormatFromName(*form.format);
     if (form.base) read.base = ParseHexArgument(*form.base, "--base");
+    return read;
+}
+
+LoadedImages ReadNamed(Context& context, const std::vector<std::string>& files,
+                       const ImageForm& form) {
     context.imageFiles = files;
-    return ReadImages(files, read);
+    return ReadImages(files, ReadOptionsOf(form));
 }
 
 Option<DryRun> DryRunOption() {

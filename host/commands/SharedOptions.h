@@ -28,6 +28,9 @@ struct ImageFiles : ImageForm {
 };
 Option<ImageFiles> ImagesArgument(bool isRequired);
 
+/// Failure (WrongUsage).
+image::ReadOptions ReadOptionsOf(const ImageForm& form);
+
 /// The images that a command names, which from now on are files in use. Failure.
 LoadedImages ReadNamed(Context& context, const std::vector<std::string>& files,
                        const ImageForm& form);

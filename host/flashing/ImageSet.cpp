@@ -95,6 +95,18 @@ void RequireUseForBase(const RawBinaries& raw) {
 
 }  // namespace
 
+image::ImageFile ReadNamedFile(const std::string& text, const image::ReadOptions& options) {
+    const auto [path, address] = SplitAddress(text);
+    image::ImageFile file =
+        image::ReadImageFile(path, {options.format, address ? address : options.base});
+    if (address && file.format != image::Format::Binary)
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{}: the file is no raw binary ({}) and has addresses of its "
+                                  "own; leave the address out, or say --format bin",
+                                  text, image::FormatName(file.format)));
+    return file;
+}
+
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options) {
     if (paths.empty() && (options.base || options.format))
         throw Failure(ExitStatus::WrongUsage,
@@ -103,17 +115,11 @@ LoadedImages ReadImages(const std::vector<std::string>& paths, const image::Read
     RawBinaries raw;
     for (const std::string& text : paths) {
         const auto [path, address] = SplitAddress(text);
-        const auto [image, format] =
-            image::ReadImageFile(path, {options.format, address ? address : options.base});
-        const bool binary = format == image::Format::Binary;
-        if (address && !binary)
-            throw Failure(ExitStatus::WrongUsage,
-                          fmt::format("{}: the file is no raw binary ({}) and has addresses of its "
-                                      "own; leave the address out, or say --format bin",
-                                      text, image::FormatName(format)));
-        if (binary) (address ? raw.placed : raw.unplaced).push_back(path);
+        const image::ImageFile file = ReadNamedFile(text, options);
+        if (file.format == image::Format::Binary)
+            (address ? raw.placed : raw.unplaced).push_back(path);
         RequireNoSecond(raw);
-        images.Add(image, path);
+        images.Add(file.image, path);
     }
     if (options.base) RequireUseForBase(raw);
     return images;

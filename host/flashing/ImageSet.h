@@ -42,11 +42,15 @@ struct NamedFile {
 };
 NamedFile SplitAddress(const std::string& text);
 
+/// Reads a file that is named so. Failure (WrongUsage) for an address that isn't that of a raw
+/// binary.
+image::ImageFile ReadNamedFile(const std::string& text, const image::ReadOptions& options);
+
 /// What of the images lies in a range. Failure (WrongUsage) when it is nothing.
 LoadedImages Within(const LoadedImages& images, const base::AddressRange& range);
 
-/// Reads the files and joins them. Failure (WrongUsage) for an address that isn't that of one raw
-/// binary.
+/// Reads the files and joins them. Failure (WrongUsage) for a second raw binary without a
+/// place of its own.
 LoadedImages ReadImages(const std::vector<std::string>& paths, const image::ReadOptions& options);
 
 /// Asks about the first and the last byte of every section. Failure (BadFile) names the file and

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
 
 #include "host/image/Image.h"
@@ -15,6 +16,9 @@ Image ParseElf(const std::string& contents, const std::string& name);
 Image ParseIntelHex(const std::string& contents, const std::string& name);
 Image ParseSRecord(const std::string& contents, const std::string& name);
 Image ParseBinary(const std::string& contents, const std::string& name, std::uint32_t base);
+
+/// Where a program begins, as the contents of a valid file tell it; raw binary never does.
+std::optional<std::uint32_t> EntryOf(const std::string& contents, Format format);
 
 /// Each makes the contents of a file.
 std::string FormatIntelHex(const Image& image);

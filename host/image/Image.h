@@ -76,6 +76,7 @@ struct ReadOptions {
 struct ImageFile {
     Image image;
     Format format;
+    std::optional<std::uint32_t> entry;  ///< where the file says that its program begins
 };
 
 /// Reads an image file; "-" is standard input. The format is told from the contents; raw binary has

@@ -84,7 +84,8 @@ ImageFile ReadImageFile(const std::string& path, const ReadOptions& options) {
     // What isn't known to be text or ELF holds no more than the bytes themselves.
     const bool binary = format == Format::Binary;
     const std::string contents = file.Contents(binary ? kFlashBytesMax : kImageFile.maxBytes);
-    return {ParseImage(contents, name, {format, options.base}), format};
+    Image image = ParseImage(contents, name, {format, options.base});
+    return {std::move(image), format, EntryOf(contents, format)};
 }
 
 }  // namespace host::image

@@ -13,12 +13,14 @@ namespace host {
 inline constexpr FileKind kSettingsFile{"settings file", ExitStatus::BadFile,
                                         std::uint64_t{1} << 20};
 
+/// Keys, spelt as in the catalogue, and their texts.
 using SettingTexts = std::map<std::string, std::string>;
 
 struct SettingPaths {
     std::string user;  ///< empty: no place is known
     std::string kept;
     bool userMustExist = false;
+    std::string project = {};  ///< empty: there is none
 };
 
 /// `chosen` is the file that the command line names. Without one, the user's file lies in

@@ -89,7 +89,9 @@ void SettingStore::Save(const WaitNotice& say) {
 
 std::string OriginText(Origin origin, const SettingPaths& paths) {
     if (origin == Origin::UserFile) return paths.user;
-    constexpr const char* names[] = {"command line", "environment", "", "kept value", "default"};
+    if (origin == Origin::Project) return paths.project;
+    constexpr const char* names[] = {"command line", "environment", "", "",
+                                     "kept value",   "default"};
     return names[static_cast<std::size_t>(origin)];
 }
 
@@ -127,9 +129,13 @@ void Assign(SettingStore& store, Origin origin, const std::string& assignment,
 }  // namespace
 
 SettingStore LoadSettings(const std::string& settingsFile,
-                          const std::vector<std::string>& assignments) {
-    SettingStore store(FindSettingPaths(settingsFile));
-    const SettingPaths& paths = store.Paths();
+                          const std::vector<std::string>& assignments,
+                          const ProjectSettings& project) {
+    SettingPaths paths = FindSettingPaths(settingsFile);
+    paths.project = project.path;
+    SettingStore store(paths);
+    for (const auto& [key, text] : project.texts)
+        store.Set(Origin::Project, key, text);
     for (const auto& [key, text] : ReadSettingFile(paths.user, paths.userMustExist, false))
         store.Set(Origin::UserFile, key, text);
     for (const auto& [key, text] : ReadSettingFile(paths.kept, false, true))

@@ -15,7 +15,7 @@
 namespace host {
 
 /// The layers, the strongest first.
-enum class Origin { CommandLine, Environment, UserFile, Kept, Default };
+enum class Origin { CommandLine, Environment, Project, UserFile, Kept, Default };
 
 struct SettingValue {
     std::string text;
@@ -69,21 +69,29 @@ class SettingStore {
     SettingTexts& Layer(Origin origin) { return layers_[static_cast<std::size_t>(origin)]; }
 
     SettingPaths paths_;
-    std::array<SettingTexts, 4> layers_;
+    std::array<SettingTexts, 5> layers_;
     SettingTexts published_;
     std::map<std::string, bool> changed_;  ///< kept keys since loading; false: forgotten
 };
 
-/// "command line", "environment", the user's file, "kept value", "default".
+/// "command line", "environment", the project's file, the user's, "kept value", "default".
 std::string OriginText(Origin origin, const SettingPaths& paths);
 
 /// The environment variable that holds a setting's value: "CORVANE_SET_" and the key.
 std::string EnvironmentName(const std::string& key);
 
-/// The store of a run: both files, the environment, and the KEY=TEXT assignments of the command
-/// line. Failure (BadFile or WrongUsage) names the key and where it stands.
+/// What a project file says for a run.
+struct ProjectSettings {
+    std::string path;
+    SettingTexts texts;
+};
+
+/// The store of a run: both files, the project's texts, the environment, and the KEY=TEXT
+/// assignments of the command line. Failure (BadFile or WrongUsage) names the key and where it
+/// stands.
 SettingStore LoadSettings(const std::string& settingsFile,
-                          const std::vector<std::string>& assignments);
+                          const std::vector<std::string>& assignments,
+                          const ProjectSettings& project = {});
 
 /// The row of the catalogue; Failure (WrongUsage) for an unknown key, beginning with `where`.
 const SettingInfo& RequireSetting(std::string_view key, std::string_view where);

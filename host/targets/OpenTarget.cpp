@@ -37,9 +37,9 @@ void RequireOneKind(const TargetOptions& options) {
         throw Failure(ExitStatus::WrongUsage,
                       "--gdb names a real target, --sim and --sim-file a simulated one; give one "
                       "of them");
-    if (!options.gdb && (!options.gdbOptions.empty() || options.loader))
+    if (!options.gdb && (!options.gdbOptions.empty() || options.loader || options.wait))
         throw Failure(ExitStatus::WrongUsage,
-                      "--gdb-option and --loader are for a target behind --gdb HOST:PORT");
+                      "--gdb-option, --loader and --wait are for a target behind --gdb HOST:PORT");
 }
 
 std::unique_ptr<OpenTarget> Open(const TargetOptions& options, const TraceLine& trace,

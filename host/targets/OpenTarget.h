@@ -22,6 +22,8 @@ struct TargetOptions {
     std::optional<std::string> gdb;       ///< where a GDB server listens
     std::vector<std::string> gdbOptions;  ///< how to deal with it
     std::optional<std::string> loader;    ///< the loader's file, for a real target
+    std::optional<std::string> wait;      ///< for how long a real target is tried to be reached
+    std::optional<std::string> expect;    ///< what the device must be, whatever it is reached by
 };
 
 /// Takes lines for the trace; `source` is who speaks.

@@ -89,7 +89,7 @@ Result RunShell(const std::string& commands) {
         "cd '" + directory.Path().string() +
         "' && exec >.out 2>.err </dev/null\n"
         "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
-        "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_PLUGIN\n"
+        "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_LOADER CORVANE_PLUGIN\n"
         "export TOOL='" CORVANE_FLASH_TOOL "' TOOLS='" CORVANE_FLASH_DIRECTORY
         "'\n"
         "f='" FIRMWARE_DIRECTORY

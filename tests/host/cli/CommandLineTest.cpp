@@ -34,10 +34,18 @@ Words Split(const std::string& line) {
     return words;
 }
 
-/// The meaning as the rows tell it. Variables stand before the line's words.
+/// A project of two boards.
+ProjectFile TwoBoards(const std::string& standard) {
+    const Board bench{{{"--gdb", ":3"}, {"--gdb-option", "server=qemu"}, {"--loader", "l"}}, {}};
+    return {"p", standard, {}, {{"bench", bench}, {"velk", {{{"--sim", "velk"}}, {}}}}};
+}
+
+/// The meaning as the rows tell it. Variables stand before the line's words; DEFAULT_BOARD is that
+/// of a project.
 std::string Meaning(Words words) {
     std::map<std::string, std::string> variables;
-    while (!words.empty() && words.front().starts_with("CORVANE_")) {
+    while (!words.empty() &&
+           (words.front().starts_with("CORVANE_") || words.front().starts_with("DEFAULT_"))) {
         const auto equals = words.front().find('=');
         variables[words.front().substr(0, equals)] = words.front().substr(equals + 1);
         words.erase(words.begin());
@@ -45,12 +53,17 @@ std::string Meaning(Words words) {
     const FollowedLine line = FollowLine(AllCommands(), words);
     try {
         const ParsedLine parsed = ParseCommandLine(
-            AllCommands(), line, [&](const char* name) { return variables[name]; });
+            AllCommands(), line, [&](const char* name) { return variables[name]; },
+            [&] {
+                const auto board = variables.find("DEFAULT_BOARD");
+                return board == variables.end() ? ProjectFile() : TwoBoards(board->second);
+            });
+        static constexpr const char* kBy[] = {"", " (environment)", " (board)"};
         if (parsed.command == nullptr) return parsed.answer;
         std::string text = parsed.command->name;
         for (const GivenOption& given : parsed.given)
             text += fmt::format(" {}{}{}{}", given.row->LongName(), given.row->isSwitch ? "" : "=",
-                                given.value, given.isFromEnvironment ? " (environment)" : "");
+                                given.value, kBy[static_cast<int>(given.by)]);
         return text;
     } catch (const Failure& failure) {
         EXPECT_EQ(failure.Status(), ExitStatus::WrongUsage);
@@ -86,7 +99,7 @@ TEST(CommandTable, EveryCommandAndOptionIsInHelpAndManPage) {
             if (!row.IsArgument()) options.push_back(row.Names());
     };
     add(CommonRows());
-    std::string help = HelpText(AllCommands(), "");
+    std::string help = HelpText(AllCommands(), "options");
     std::string man = ManPage(AllCommands());
     man.erase(std::remove(man.begin(), man.end(), '\\'), man.end());
     for (const CommandRow& command : AllCommands()) {
@@ -101,7 +114,6 @@ TEST(CommandTable, EveryCommandAndOptionIsInHelpAndManPage) {
         }
     }
     for (const std::vector<std::string>& names : options) {
-        // The tool's own help has only the short name of an option that has one.
         EXPECT_NE(help.find(names.front()), std::string::npos) << names.front();
         EXPECT_NE(man.find(names.back()), std::string::npos) << names.back();
     }

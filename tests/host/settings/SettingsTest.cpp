@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "host/facts/SettingKeys.h"
+#include "host/settings/ProjectFile.h"
 #include "host/settings/SettingStore.h"
 #include "tests/support/FailureOf.h"
 #include "tests/support/TemporaryDirectory.h"
@@ -124,6 +125,48 @@ TEST(Settings, FilesThatAreWrongAreNamedWithTheLine) {
         EXPECT_EQ(failure.find("delete it"), std::string::npos) << "it is the user's own";
     }
     EXPECT_TRUE(FailureOf([&] { LoadSettings(directory.File("none.toml"), {}); }).starts_with("3"));
+}
+
+TEST(Settings, ProjectFilesNameBoardsAndNothingThatIsRunOrWritten) {
+    const test::TemporaryDirectory directory;
+    const std::string path = directory.Write(
+        "corvane-flash.toml",
+        "default = 'a'\n[board.a]\ngdb = ':3'\nserver = 'jlink'\nattach = 2\nloader = 'x/l.out'\n"
+        "[board.a.settings]\nFlashTimeoutValue = 3\n[board.b]\n"
+        "[settings]\nFlashTimeoutValue = 5\nFlashResetSetting = false\n");
+    const ProjectFile project = ReadProjectFile(path);
+    EXPECT_EQ(project.defaultBoard, "a");
+    using Options = decltype(Board::options);
+    EXPECT_EQ(project.RequireBoard("a").options, (Options{{"--gdb-option", "attach=2"},
+                                                          {"--gdb", ":3"},
+                                                          {"--loader", directory.File("x/l.out")},
+                                                          {"--gdb-option", "server=jlink"}}));
+    EXPECT_EQ(project.RequireBoard("a").settings.at(keys::kTimeout), "3");
+    EXPECT_EQ(project.RequireBoard("b").settings.at(keys::kTimeout), "5");
+    EXPECT_EQ(project.RequireBoard("b").settings.at(keys::kReset), "0");
+    SettingStore store = LoadSettings("/dev/null", {}, {path, project.settings});
+    EXPECT_EQ(store.Get(keys::kTimeout), (SettingValue{"5", Origin::Project}));
+
+    const std::pair<const char*, const char*> wrong[] = {
+        {"[board.a]\nplugin = 'x'", "line 2: plugin can't stand in a project file"},
+        {"[board.a]\ninit = 'x'", "line 2: init can't stand in a project file"},
+        {"[board.a]\nsim-file = 'x'", "line 2: sim-file can't stand in a project file"},
+        {"[board.a]\npc = '15,init=x'", "line 2: pc takes one value, without a comma"},
+        {"[board.a]\nlodaer = 'x'", "line 2: a board has no lodaer; did you mean 'loader'?"},
+        {"[board.a]\ngdb = ''", "line 2: gdb is empty"},
+        {"[board.a]\ngdb = [1]", "line 2: gdb must be a text between quotes"},
+        {"board = 'a'", "line 1: board.NAME is a table"},
+        {"default = 'a'", "line 1: there is no [board.a]"},
+        {"gdb = ':3'", "line 1: there is no gdb; a project file has default"},
+        {"[settings]\nFlashVerboseMode = 'x'", "line 2: FlashVerboseMode can't be 'x'"},
+        {"[board.a.settings]\nx = 1", "line 2: unknown setting 'x'"},
+        {"not toml", "line 1: "},
+    };
+    for (const auto& [text, expected] : wrong) {
+        directory.Write("corvane-flash.toml", text);
+        const std::string failure = FailureOf([&] { ReadProjectFile(path); });
+        EXPECT_TRUE(failure.starts_with("3: project file " + path + ": " + expected)) << failure;
+    }
 }
 
 }  // namespace
