@@ -17,6 +17,7 @@ namespace {
 
 using namespace target;
 using namespace target::gdb;
+using namespace std::chrono_literals;
 
 class Server {
   public:
@@ -85,7 +86,7 @@ void Drive(const Address& where) {
         Try([&] { target.Write(words, 64, 0x20000000, 1, 4); });
         Try([&] { target.Run(); });
         Try([&] { target.Read(words, 1, 0x2000100C, 1, 4); });
-        Try([&] { target.Pause(1); });
+        Try([&] { target.Pause(1ms); });
         Try([&] { target.Halt(); });
         Try([&] { target.Reset(true); });
         Try([&] { target.Release(true); });

@@ -43,19 +43,26 @@ class Target {
         return std::chrono::steady_clock::now().time_since_epoch();
     }
 
-    /// Lets `milliseconds` of the target's time pass.
-    virtual void Pause(std::uint32_t milliseconds) = 0;
+    /// Lets so much of the target's time pass.
+    virtual void Pause(std::chrono::nanoseconds time) = 0;
 
     /// Whether a pause lets simulated time pass, so that nobody has to wait for it.
     virtual bool SimulatesTime() const { return false; }
 
-    /// Whether an access to the running target stops it for a moment. Then it doesn't go on while
-    /// it is looked at: whoever waits for it looks first when it should be done, reads all that it
-    /// wants to know at once, and waits by Pause, which lets it go on.
+    /// Whether an access to the running target stops it. Whoever waits for it then looks seldom,
+    /// and when all that it waits for should be done.
     virtual bool LooksStopIt() const { return false; }
 
     /// Whether a read that has failed may look like one that was answered.
     virtual bool HidesFailedReads() const { return false; }
+
+    /// Whether the running target was stopped by an access and hasn't gone on yet. Until a pause,
+    /// or a look that finds its program busy, lets it go on, looks cost nothing more.
+    virtual bool StandsStill() const { return false; }
+
+    /// How long the target's program has run since some fixed moment: without the time during
+    /// which it was stopped for an access. It doesn't grow while the target stands still.
+    virtual std::chrono::nanoseconds RanFor() const { return Now(); }
 };
 
 }  // namespace target

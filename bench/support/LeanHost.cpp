@@ -95,7 +95,7 @@ const char* LeanHost::ShowError(const char* text) {
 
 const char* LeanHost::Sleep(uint32_t milliseconds) {
     counts.pausedMs += milliseconds;
-    target_.Pause(milliseconds);
+    target_.Pause(std::chrono::milliseconds(milliseconds));
     return Note({Pause, 22, nullptr, milliseconds});
 }
 

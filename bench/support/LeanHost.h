@@ -46,7 +46,7 @@ class NullTarget final : public target::Target {
     void Run() override {}
     void Halt() override {}
     void Reset(bool) override {}
-    void Pause(std::uint32_t) override {}
+    void Pause(std::chrono::nanoseconds) override {}
 };
 
 class LeanHost : public StrictHost {

@@ -15,11 +15,6 @@ namespace host {
 
 namespace {
 
-using namespace std::chrono_literals;
-
-/// Whoever looks more often keeps the probe busy and wins nothing.
-constexpr std::chrono::milliseconds kShortestPause = 1ms;
-
 constexpr std::uint32_t StatusWord(std::size_t block) {
     return plugin::kParameterBlocks[block] + plugin::kStatusOffset;
 }
@@ -44,6 +39,7 @@ void LoaderWait::AwaitIdle() {
         const base::AddressRange flash = chunks_[*block]->flash;
         Forget();
         if (stop_()) return;
+        pace_ = {};
         throw target::TargetError(fmt::format(
             "the loader hasn't finished the chunk for {} within {} s; allow it more "
             "time (FlashTimeoutValue), if the flash is that slow",
@@ -57,9 +53,7 @@ void LoaderWait::Read(void* buffer, std::size_t count, std::uint32_t address, in
     const auto look = [&] { next_.Read(buffer, count, address, page, width); };
     const auto block = BlockAtWork(address, count * width);
     if (!block) return look();
-    const Time until = Now() + plugin::kPollInterval;
-    if (LooksStopIt() && chunkTime_) PauseFor(*chunks_[*block], Now(), until);
-    Await(*block, until, [&] {
+    Await(*block, RanFor() + plugin::kPollInterval, [&] {
         look();
         std::uint32_t status = 0;
         std::memcpy(&status, buffer, sizeof status);
@@ -71,10 +65,14 @@ void LoaderWait::Write(const void* buffer, std::size_t count, std::uint32_t addr
                        std::size_t width) {
     Chunk* chunk = NoteHandOver(buffer, count * width, address);
     next_.Write(buffer, count, address, page, width);
-    if (chunk == nullptr) return;
-    chunk->arrived = true;
-    chunk->start = Now();
-    observer_.HandedOver(chunk->flash);
+    if (chunk != nullptr) HandedOver(*chunk);
+}
+
+void LoaderWait::HandedOver(Chunk& chunk) {
+    chunk.arrived = true;
+    chunk.start = RanFor();
+    if (chunk.number == 1) chunk.begun = chunk.start;
+    observer_.HandedOver(chunk.flash);
 }
 
 LoaderWait::Chunk* LoaderWait::NoteHandOver(const void* buffer, std::size_t bytes,
@@ -87,7 +85,12 @@ LoaderWait::Chunk* LoaderWait::NoteHandOver(const void* buffer, std::size_t byte
         const base::AddressRange flash{words.flashAddress,
                                        words.flashAddress + words.sizeBytes - 1};
         observer_.HandingOver(flash);
-        return &chunks_[block].emplace(Chunk{flash, Now()});
+        Chunk chunk{flash, RanFor(), RanFor()};
+        if (const auto& before = chunks_[block ^ 1]) {
+            chunk.begun = before->begun;
+            chunk.number = before->number + 1;
+        }
+        return &chunks_[block].emplace(chunk);
     }
     return nullptr;
 }
@@ -135,48 +138,60 @@ std::optional<std::size_t> LoaderWait::BlockAtWork(std::uint32_t address, std::s
 std::optional<std::size_t> LoaderWait::OlderBlock() const {
     if (!chunks_[0] && !chunks_[1]) return std::nullopt;
     if (!chunks_[0] || !chunks_[1]) return chunks_[0] ? 0 : 1;
-    return chunks_[0]->start <= chunks_[1]->start ? 0 : 1;
+    return chunks_[0]->number < chunks_[1]->number ? 0 : 1;
 }
 
 /// Looks until the chunk isn't pending any more or the time is up; whether it is done.
 bool LoaderWait::Await(std::size_t block, Time until, const std::function<bool()>& isPending) {
-    for (const Time from = Now(); isPending();) {
-        if (stop_() || Now() >= until) return false;
-        PauseFor(*chunks_[block], from, until);
+    for (;;) {
+        const Time pause = StandsStill() ? Time::zero() : Due(block, until) - RanFor();
+        if (pause > Time::zero() && !stop_()) Pause(pause);
+        if (!Look(block, isPending)) break;
+        if (stop_() || RanFor() >= until) return false;
     }
     Finish(block);
     return true;
 }
 
-/// Until the chunk should be done, going by the last ones. When it isn't then, as much longer as is
-/// short beside what it has taken.
-void LoaderWait::PauseFor(Chunk& chunk, Time from, Time until) {
-    const Time now = Now();
-    const Time usual = chunkTime_.value_or(Time::zero());
-    const Time due = chunkTime_ ? chunk.start + usual : from;
-    const Time step = std::max((now - due) / 8, usual / (LooksStopIt() ? 8 : 32));
-    const Time pause = due > now ? due - now : step;
-    // Rounded down: a look too early costs less than a loader that has run out of work.
-    const auto wait = std::chrono::floor<std::chrono::milliseconds>(std::min(pause, until - now));
-    ++chunk.pauses;
-    Pause(static_cast<std::uint32_t>(std::max(wait, kShortestPause).count()));
+/// When the next look should be sent off. A loader that has crashed is found out by a look.
+LoaderWait::Time LoaderWait::Due(std::size_t block, Time until) const {
+    until = std::min(until, RanFor() + plugin::kPollInterval);
+    const Chunk& chunk = *chunks_[block];
+    const Time due = chunk.begun + chunk.number * pace_.Guess();
+    if (!LooksStopIt()) return std::min(due, until) - pace_.LookTime();
+    const auto& other = chunks_[block ^ 1];
+    const Time both = due + pace_.Guess();
+    return other && other->number > chunk.number && both <= until ? both : std::min(due, until);
+}
+
+bool LoaderWait::Look(std::size_t block, const std::function<bool()>& isPending) {
+    const bool free = StandsStill();
+    const Time before = Now();
+    const bool pending = isPending();
+    if (!free) pace_.LookTook(Now() - before);
+    Chunk& chunk = *chunks_[block];
+    if (!pending || RanFor() <= chunk.begun) return pending;
+    chunk.atWork = RanFor();
+    pace_.Pending((chunk.atWork - chunk.begun) / chunk.number);
+    return true;
 }
 
 void LoaderWait::Finish(std::size_t block) {
     const Chunk chunk = *std::exchange(chunks_[block], std::nullopt);
-    const Time now = Now();
-    LearnFrom(chunk, now - chunk.start);
-    if (auto& next = chunks_[block ^ 1]) next->start = std::max(next->start, now);
+    const Time now = RanFor();
+    pace_.Done((now - chunk.begun) / chunk.number);
+    if (auto& next = chunks_[block ^ 1]) BeginAfter(chunk, now, *next);
     if (chunk.arrived) observer_.Programmed(chunk.flash);
 }
 
-/// A chunk that was found done at the first look, or at the first one after a pause, may have been
-/// done long before; the next one is looked at a little earlier.
-void LoaderWait::LearnFrom(const Chunk& chunk, Time took) {
-    if (chunk.pauses == 0)
-        chunkTime_ = std::min(chunkTime_.value_or(took), took);
-    else
-        chunkTime_ = chunk.pauses == 1 ? took - took / 16 : took;
+/// When the loader has begun the chunk after one that was seen to be done. Where looks stop it, the
+/// two are timed together, unless this one was handed over since the loader ran last.
+void LoaderWait::BeginAfter(const Chunk& chunk, Time seen, Chunk& next) const {
+    const Time handedOver = std::exchange(next.start, std::max(next.start, seen));
+    if (LooksStopIt() && handedOver < seen) return;
+    const Time done = chunk.begun + chunk.number * pace_.Guess();
+    next.begun = std::max(handedOver, std::clamp(done, std::min(chunk.atWork, seen), seen));
+    next.number = 1;
 }
 
 void LoaderWait::Forget() {

@@ -1,6 +1,11 @@
 // LoaderWait: a target as the plug-in sees it, in front of the real one. The plug-in looks at the
 // loader's status words once and then sleeps, and never looks after the last chunk; so the waiting
 // is done here, where it costs no more than the loader needs.
+//
+// All times are the loader's: how long the target has run. Where a look stops the target, the
+// plug-in fills both buffers while it stands still, and the next look comes when both chunks should
+// be done; elsewhere it comes for each chunk, in time for the next one to be handed over before the
+// loader runs out of work.
 
 #pragma once
 
@@ -12,6 +17,7 @@
 
 #include "host/base/Interrupt.h"
 #include "host/base/Text.h"
+#include "host/targets/LoaderPace.h"
 #include "target/Target.h"
 
 namespace host {
@@ -34,7 +40,7 @@ class LoaderObserver {
 
 class LoaderWait final : public target::Target {
   public:
-    using Time = std::chrono::nanoseconds;
+    using Time = LoaderPace::Time;
 
     /// Drives `next`; both must outlive it. A wait ends early when `stop` is true.
     LoaderWait(target::Target& next, LoaderObserver& observer,
@@ -65,26 +71,32 @@ class LoaderWait final : public target::Target {
 
     void Run() override;
     Time Now() const override { return next_.Now(); }
-    void Pause(std::uint32_t milliseconds) override { next_.Pause(milliseconds); }
+    void Pause(Time time) override { next_.Pause(time); }
     bool LooksStopIt() const override { return next_.LooksStopIt(); }
+    bool StandsStill() const override { return next_.StandsStill(); }
+    Time RanFor() const override { return next_.RanFor(); }
     bool SimulatesTime() const override { return next_.SimulatesTime(); }
     bool HidesFailedReads() const override { return next_.HidesFailedReads(); }
 
   private:
     struct Chunk {
         base::AddressRange flash;
-        Time start;            ///< when the loader could begin it
+        Time start;            ///< when the loader could begin it, for all that is known
+        Time begun;            ///< it, or the chunks before it that were at work then
+        unsigned number = 1;   ///< among these
+        Time atWork{0};        ///< when it was last seen to be
         bool arrived = false;  ///< the write that hands it over was answered
-        unsigned pauses = 0;   ///< made to wait for it
     };
 
     Chunk* NoteHandOver(const void* buffer, std::size_t bytes, std::uint32_t address);
+    void HandedOver(Chunk& chunk);
     std::optional<std::size_t> BlockAtWork(std::uint32_t address, std::size_t bytes) const;
     std::optional<std::size_t> OlderBlock() const;
     bool Await(std::size_t block, Time until, const std::function<bool()>& isPending);
-    void PauseFor(Chunk& chunk, Time from, Time until);
+    Time Due(std::size_t block, Time until) const;
+    bool Look(std::size_t block, const std::function<bool()>& isPending);
     void Finish(std::size_t block);
-    void LearnFrom(const Chunk& chunk, Time took);
+    void BeginAfter(const Chunk& chunk, Time seen, Chunk& next) const;
     void Forget();
 
     target::Target& next_;
@@ -94,7 +106,7 @@ class LoaderWait final : public target::Target {
     bool programLoaded_ = false;
     bool loaderRuns_ = false;
     std::array<std::optional<Chunk>, 2> chunks_;  ///< at work, by their blocks
-    std::optional<Time> chunkTime_;               ///< what the last ones took
+    LoaderPace pace_;
 };
 
 }  // namespace host

@@ -118,8 +118,8 @@ void SimulatedDevice::Reset(bool flag) {
     });
 }
 
-void SimulatedDevice::Pause(std::uint32_t milliseconds) {
-    time_.AddPause(std::chrono::milliseconds(milliseconds));
+void SimulatedDevice::Pause(std::chrono::nanoseconds time) {
+    time_.AddPause(time);
     AdvanceToNow();
 }
 

@@ -51,7 +51,7 @@ class SimulatedDevice final : public Target {
     void Halt() override;
     void Reset(bool flag) override;
     std::chrono::nanoseconds Now() const override { return time_.Now(); }
-    void Pause(std::uint32_t milliseconds) override;
+    void Pause(std::chrono::nanoseconds time) override;
     bool SimulatesTime() const override { return true; }
 
     /// Lets the halted core go on where it was. Other than after Run, the loader keeps what it had

@@ -111,7 +111,7 @@ class BoardHost final : public test::StrictHost {
     const char* ShowMessage(const char*) override { return nullptr; }
     const char* GetDirectory() override { return ""; }
     const char* Sleep(uint32_t milliseconds) override {
-        return Answer([&] { board_.Pause(milliseconds); });
+        return Answer([&] { board_.Pause(std::chrono::milliseconds(milliseconds)); });
     }
 
   private:

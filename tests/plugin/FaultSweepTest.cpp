@@ -23,6 +23,7 @@ namespace {
 using test::Plugin;
 using test::RecordingHost;
 using test::TextOf;
+using namespace std::chrono_literals;
 using Bytes = std::vector<std::uint8_t>;
 
 // Two sections, the first of three chunks. They share a sector, and neither begins or ends with a
@@ -238,7 +239,7 @@ class FaultSweep : public testing::TestWithParam<Work> {
         const bool succeeded = error.empty() && host.errors.empty();
         EXPECT_TRUE(!succeeded || std::ranges::all_of(host.failedCalls, IsOvercome))
             << "a failure was lost";
-        host.Device().Pause(50);
+        host.Device().Pause(50ms);
         Bytes flash = FlashOf(host);
         const Registers registers = RegistersOf(host.Device());
         if (succeeded) {

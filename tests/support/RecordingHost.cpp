@@ -218,7 +218,8 @@ const char* RecordingHost::GetDirectory() {
 }
 
 const char* RecordingHost::Sleep(uint32_t milliseconds) {
-    return Answer(fmt::format("sleep {}", milliseconds), [&] { target_->Pause(milliseconds); });
+    return Answer(fmt::format("sleep {}", milliseconds),
+                  [&] { target_->Pause(std::chrono::milliseconds(milliseconds)); });
 }
 
 CreateFlashDevice2Function Factory() {

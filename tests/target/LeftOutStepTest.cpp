@@ -23,6 +23,7 @@ namespace {
 using test::Plugin;
 using test::RecordingHost;
 using test::Settings;
+using namespace std::chrono_literals;
 using Bytes = std::vector<std::uint8_t>;
 
 /// What an access is to whoever reads the plug-in: which register, or what in RAM and flash.
@@ -70,11 +71,11 @@ class LeavingOut final : public target::Target {
     void Reset(bool flag) override {
         if (Begin("reset")) host_.Device().Reset(flag);
     }
-    void Pause(std::uint32_t milliseconds) override {
-        if (Begin(fmt::format("sleep {}", milliseconds)))
-            host_.Device().Pause(milliseconds);
+    void Pause(std::chrono::nanoseconds time) override {
+        if (Begin(fmt::format("sleep {}", time / 1ms)))
+            host_.Device().Pause(time);
         else if (how_ == How::Half)
-            host_.Device().Pause(milliseconds / 2);
+            host_.Device().Pause(std::chrono::milliseconds(time / 1ms / 2));
     }
 
   private:
@@ -242,7 +243,7 @@ bool ErasesAndChecks(PluginRun& run, Plugin& plugin) {
 
 bool Commits(PluginRun& run, Plugin& plugin) {
     plugin->PerformOperation("ProgramMACAddress");
-    run.host.Device().Pause(100);
+    run.host.Device().Pause(100ms);
     return run.host.Device().CommittedUserRegisters() == std::array{0x00C31B02U, 0x00060504U};
 }
 

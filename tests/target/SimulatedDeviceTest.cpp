@@ -41,9 +41,9 @@ struct DebuggedDevice {
     void SetUp() {
         if (target::NeedsFlashSetUp(device.Options())) {
             SetWord(0x400FE140, 7);
-            device.Pause(16);
+            device.Pause(16ms);
             SetClock({0x01803FF3, 0x01803F80, 0x07803F82});
-            device.Pause(16);
+            device.Pause(16ms);
         } else if (device.Options().className == "quen") {
             SetWord(0x400FD0FC, 3);
             SetWord(0x400AE2C0, 0);
@@ -69,7 +69,7 @@ struct DebuggedDevice {
     }
     void Command(std::uint32_t address, std::uint32_t command) {
         SetWord(kFlashAddress, address);
-        device.Pause(4);
+        device.Pause(4ms);
         SetWord(kFlashCommand, command);
     }
     void StartLoader() {
@@ -86,7 +86,7 @@ struct DebuggedDevice {
     void Program(std::uint32_t address) {
         if (!device.IsRunning()) StartLoader();
         HandOver(0, address, Bytes(128, 0));
-        device.Pause(1);
+        device.Pause(1ms);
     }
     void HoldPeripherals(std::uint32_t value) {
         for (const std::uint32_t address : {0x400FE040U, 0x400FE044U, 0x400FE048U})
@@ -101,10 +101,10 @@ struct DebuggedDevice {
     void EraseBlocks(const std::vector<std::uint64_t>& blocks) {
         for (std::uint32_t i = 0; i < blocks.size(); ++i) {
             SetWord(0x400FE400 + 4 * i, static_cast<std::uint32_t>(blocks[i]));
-            device.Pause(8);
+            device.Pause(8ms);
         }
         Command(0, 0xA4420004);
-        device.Pause(8);
+        device.Pause(8ms);
     }
 
     // That this rule was broken, and no other.
@@ -171,7 +171,7 @@ const std::map<std::string, Step> kSteps = {
     {"word", [](auto& d, auto& a) { return d.Word(a[0]); }},
     {"set", [](auto& d, auto& a) { return d.SetWord(a[0], a[1]), 0U; }},
     {"command", [](auto& d, auto& a) { return d.Command(a[0], a[1]), 0U; }},
-    {"pause", [](auto& d, auto& a) { return d.device.Pause(a[0]), 0U; }},
+    {"pause", [](auto& d, auto& a) { return d.device.Pause(a[0] * 1ms), 0U; }},
     {"clock", [](auto& d, auto& a) { return d.clock.Advance(a[0] * 1us), 0U; }},
     {"preset",
      [](auto& d, auto& a) {
@@ -259,9 +259,9 @@ TEST(WriteKey, WrongOneDoesNothing) {
                                  : command == 4 ? 0
                                                 : 0x4000,
                                  key << 16 | command);
-                if (command != 8) debugged.device.Pause(2 * command);  // shows by then
+                if (command != 8) debugged.device.Pause(2 * command * 1ms);  // shows by then
                 EXPECT_EQ(debugged.Word(kFlashCommand), key == right ? command : 0) << options;
-                debugged.device.Pause(100);
+                debugged.device.Pause(100ms);
                 EXPECT_EQ(debugged.Word(kFlashCommand), 0U) << options;
             }
             EXPECT_EQ(debugged.Flash(0x4000, 1)[0], key == right ? 0xFF : 0) << options;
@@ -279,7 +279,7 @@ TEST(Rules, WaitsAreExact) {
             SCOPED_TRACE(row[0] + row[2] + (enough ? " enough" : " too short"));
             DebuggedDevice debugged(row[1] + ",latency=0,bandwidth=0");
             Take(debugged, row[3]);
-            debugged.device.Pause(static_cast<std::uint32_t>(std::stoul(row[2])) - !enough);
+            debugged.device.Pause((std::stoul(row[2]) - !enough) * 1ms);
             Take(debugged, row[4]);
             if (!enough) debugged.ExpectBroken(row[0]);
             EXPECT_EQ(debugged.device.Violations(), std::vector<std::string>());
@@ -293,11 +293,11 @@ TEST(Rules, ClockTakesExactWords) {
         for (int bit = 0; bit < 32; ++bit) {
             DebuggedDevice debugged("ravik", false);
             debugged.SetWord(0x400FE140, 7);
-            debugged.device.Pause(16);
+            debugged.device.Pause(16ms);
             std::array<std::uint32_t, 3> words = {0x01803FF3, 0x01803F80, 0x07803F82};
             words[word] ^= 1U << bit;
             debugged.SetClock(words);
-            debugged.device.Pause(16);
+            debugged.device.Pause(16ms);
             debugged.Command(0, 0xA4420002);
             const bool free = word == 1 && (0x079E0000 >> bit & 1) != 0;
             EXPECT_EQ(debugged.device.Violations().empty(), free) << word << " " << bit;
@@ -327,7 +327,7 @@ TEST(Loader, ProgramsOneChunkWhileTheNextIsTransferred) {
         EXPECT_EQ(debugged.Word(kStatus[block]), kBusy);
         EXPECT_EQ(debugged.Word(kStatus[block ^ 1]), 0U) << "a poll found a default loader busy";
     }
-    debugged.device.Pause(1);
+    debugged.device.Pause(1ms);
     EXPECT_EQ(debugged.Flash(0x1000, image.size()), image);
     EXPECT_EQ(debugged.device.LoaderBusyTime(), 6 * 200us);
     EXPECT_TRUE(debugged.device.Violations().empty());
@@ -349,7 +349,7 @@ TEST(Faults, ComeAsAsked) {
 TEST(Time, CannotBeWaitedIntoAnOverflow) {
     DebuggedDevice debugged;
     for (int i = 0; i < 5000; ++i)
-        debugged.device.Pause(0xFFFFFFFF);
+        debugged.device.Pause(0xFFFFFFFFms);
     debugged.Command(0, 0xA4420002);
     debugged.clock.Advance(1s);
     EXPECT_EQ(debugged.Word(kFlashCommand), 0U);
@@ -389,9 +389,9 @@ TEST(Contents, KeepTheDevice) {
     for (std::uint32_t address = 0; address < 0x8000000; address += 0x400) {
         const std::uint32_t command = 0x71D50002;
         device->Write(&address, 1, kFlashAddress, 1, 4);
-        device->Pause(4);
+        device->Pause(4ms);
         device->Write(&command, 1, kFlashCommand, 1, 4);
-        device->Pause(12);
+        device->Pause(12ms);
     }
     EXPECT_TRUE(device->FlashContents() == Bytes(0x8000000, 0xFF));
 }

@@ -241,12 +241,12 @@ void GdbTarget::ResetByPacket(const std::string& packet) {
         throw ProtocolError("has no target any more after that");
 }
 
-void GdbTarget::Pause(std::uint32_t pauseMs) {
-    const Deadline end = After(milliseconds(pauseMs));
+void GdbTarget::Pause(std::chrono::nanoseconds time) {
     Perform([] { return std::string("Letting the target run"); },
             [&] {
                 if (started_ && core_.IsStopped()) GoOn();
             });
+    const auto end = std::chrono::steady_clock::now() + time;
     constexpr milliseconds kSlice(50);
     while (std::chrono::steady_clock::now() < end && !(interrupted_ && interrupted_()))
         std::this_thread::sleep_until(std::min(end, After(kSlice)));

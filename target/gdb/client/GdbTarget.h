@@ -85,9 +85,11 @@ class GdbTarget final : public Target {
     void Run() override;
     void Halt() override;
     void Reset(bool flag) override;
-    void Pause(std::uint32_t milliseconds) override;
+    void Pause(std::chrono::nanoseconds time) override;
     bool LooksStopIt() const override { return !core_.RunsLive(); }
     bool HidesFailedReads() const override { return options_.readsTrusted; }
+    bool StandsStill() const override { return started_ && core_.IsStopped(); }
+    std::chrono::nanoseconds RanFor() const override { return core_.RanFor(); }
 
     /// Where the stack of a loaded program begins, unless the options say otherwise.
     void SetRamEnd(std::uint32_t address) { ramEnd_ = address; }
