@@ -166,12 +166,15 @@ LoaderWait::Time LoaderWait::Due(std::size_t block, Time until) const {
 
 bool LoaderWait::Look(std::size_t block, const std::function<bool()>& isPending) {
     const bool free = StandsStill();
+    const Time stoppedAt = RanFor();
     const Time before = Now();
     const bool pending = isPending();
     if (!free) pace_.LookTook(Now() - before);
     Chunk& chunk = *chunks_[block];
-    if (!pending || RanFor() <= chunk.begun) return pending;
-    chunk.atWork = RanFor();
+    // A look that finds it pending has let it go on.
+    const Time looked = free ? stoppedAt : RanFor();
+    if (!pending || looked <= chunk.begun) return pending;
+    chunk.atWork = looked;
     pace_.Pending((chunk.atWork - chunk.begun) / chunk.number);
     return true;
 }

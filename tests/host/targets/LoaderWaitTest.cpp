@@ -94,6 +94,7 @@ class Board final : public target::Target, public LoaderObserver {
         Exchange();
         still_ = false;
         stood_ += now - stoppedAt_;
+        now += 10us;  // until the next line of the program
     }
     void Note(const char* what) {
         log +=
