@@ -185,7 +185,7 @@ TEST(LoaderWait, FollowsTheFlash) {
         rig.board.looksStopIt = looksStopIt;
         rig.streams = true;
         rig.Start();
-        int chunk = 0;
+        std::uint32_t chunk = 0;
         const auto stream = [&](std::chrono::microseconds chunkTime) {
             rig.board.chunkTime = [=] { return chunkTime; };
             const nanoseconds before = rig.board.now;
