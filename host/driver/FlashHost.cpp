@@ -184,7 +184,8 @@ const char* FlashHost::GetDirectory() {
 }
 
 const char* FlashHost::Sleep(uint32_t milliseconds) {
-    return Slot(AfterInterrupt::Refuse, [&] { target_.Pause(std::chrono::milliseconds(milliseconds)); });
+    return Slot(AfterInterrupt::Refuse,
+                [&] { target_.Pause(std::chrono::milliseconds(milliseconds)); });
 }
 
 void FlashHost::CallBegins() {
