@@ -23,6 +23,9 @@ struct Transfer {
     uint64_t address;
     size_t width;
     int16_t page = 1;
+
+    bool Reads() const { return to != nullptr; }
+    bool Writes() const { return to == nullptr; }
 };
 
 /// RAM, flash, registers, and a core that runs nothing but the loader.
@@ -92,15 +95,6 @@ class CheckedHost final : public StrictHost {
                             size_t width) override {
         return move({nullptr, buffer, count, address, width, page});
     }
-
-    /// Lets each access be changed before it is made.
-    template <typename Change>
-    void Bend(Change change) {
-        move = [next = move, change](Transfer t) mutable {
-            change(t);
-            return next(t);
-        };
-    }
     const char* BeginProgress(const char*) override { return begin(); }
     const char* UpdateProgress(uint32_t, const char*) override { return update(); }
     const char* EndProgress() override { return end(); }
@@ -121,10 +115,13 @@ class CheckedHost final : public StrictHost {
     bool Told(const std::string& text) const;
 };
 
+/// What makes another host of a good one.
+using Spoil = std::function<void(CheckedHost& host)>;
+
 /// A fault of a host, and the line that tells it, which is the first one of a failure.
 struct FaultyHost {
     const char* found;
-    void (*spoil)(CheckedHost& host);
+    Spoil spoil;
 };
 
 std::span<const FaultyHost> FaultySettings();
@@ -136,6 +133,37 @@ std::span<const FaultyHost> FaultyDisplays();
 template <typename Slot>
 void Fail(Slot& slot, const char* text) {
     slot = [text](auto&&...) { return text; };
+}
+template <typename Slot>
+Spoil Failing(Slot CheckedHost::*slot, const char* text) {
+    return [=](CheckedHost& host) { Fail(host.*slot, text); };
+}
+
+/// A slot that does something else: it gets the host, the slot as it was, and the arguments.
+template <typename... Arguments, typename Work>
+Spoil On(std::function<const char*(Arguments...)> CheckedHost::*slot, Work work) {
+    return [=](CheckedHost& host) {
+        host.*slot = [&host, was = host.*slot, work](Arguments... arguments) mutable {
+            return static_cast<const char*>(work(host, was, arguments...));
+        };
+    };
+}
+
+/// Each access is changed before it is made.
+template <typename Change>
+Spoil Bent(Change change) {
+    return On(&CheckedHost::move, [change](auto& host, auto& move, Transfer t) mutable {
+        change(t, host);
+        return move(t);
+    });
+}
+
+/// Such accesses fail.
+template <typename Such>
+Spoil Refused(const char* text, Such such) {
+    return On(&CheckedHost::move, [=](auto&, auto& move, const Transfer& t) mutable {
+        return such(t) ? text : move(t);
+    });
 }
 
 /// A text in memory that the host has given back: the next allocation overwrites it.

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <stdexcept>
 #include <thread>
 #include <utility>
 
@@ -12,263 +11,196 @@ namespace test {
 
 namespace {
 
-using std::string;
+using H = CheckedHost;
 
-void SleepInstead(CheckedHost& host, uint32_t (*milliseconds)(uint32_t asked)) {
-    host.sleep = [milliseconds, sleep = host.sleep](uint32_t asked) {
-        return sleep(milliseconds(asked));
-    };
+Spoil SleepsInstead(uint32_t (*milliseconds)(uint32_t asked)) {
+    return On(&H::sleep,
+              [=](auto&, auto& sleep, uint32_t asked) { return sleep(milliseconds(asked)); });
 }
 
 /// Does that after the loader was started.
-template <typename Action>
-void AfterRun(CheckedHost& host, Action action) {
-    host.run = [&host, action, run = host.run] {
+Spoil AfterRun(void (*action)(H& host)) {
+    return On(&H::run, [=](H& h, auto& run) {
         const char* const error = run();
-        action(host);
+        action(h);
         return error;
-    };
+    });
 }
 
 /// Fails the accesses to a status word that come between LoadProgram and RunTarget.
-void FailStatus(CheckedHost& host, bool read) {
-    host.load = [&host, read] {
+Spoil FailingStatus(bool read) {
+    return On(&H::load, [read](H& h, auto&) {
         for (const unsigned block : {0U, 1U})
-            host.target.SetStatus(block, 0xFFFFFFFF);
-        host.move = [read, move = host.move](const Transfer& t) {
-            return t.address == 0x2000101C && (t.to != nullptr) == read ? "no status" : move(t);
-        };
+            h.target.SetStatus(block, 0xFFFFFFFF);
+        Refused("no status",
+                [=](const Transfer& t) { return t.address == 0x2000101C && t.Reads() == read; })(h);
         return nullptr;
-    };
+    });
 }
 
 /// Fails the halt after that line, once.
-void FailHalt(CheckedHost& host, const char* line) {
-    host.halt = [&host, line, halt = host.halt, failed = false]() mutable {
-        return host.Told(line) && !std::exchange(failed, true) ? "no" : halt();
+Spoil FailingHalt(const char* line) {
+    return On(&H::halt, [line, failed = false](H& h, auto& halt) mutable {
+        return h.Told(line) && !std::exchange(failed, true) ? "no" : halt();
+    });
+}
+
+/// Halts like that, and really before the next loader is loaded.
+Spoil HaltingLate(const char* (*halt)(H& host, const H::Slot& was)) {
+    return [halt](H& host) {
+        On(&H::halt, halt)(host);
+        On(&H::load, [](H& h, auto& load) { return h.target.Halt(), load(); })(host);
     };
 }
 
 const FaultyHost kFaultyCores[] = {
-    {"HaltTarget: expected null; came the error text \"no\"",
-     [](CheckedHost& h) { Fail(h.halt, "no"); }},
+    {"HaltTarget: expected null; came the error text \"no\"", Failing(&H::halt, "no")},
     {"HaltTarget: expected null for a target that is halted already; came the error text \"halted",
-     [](CheckedHost& h) {
-         h.halt = [halted = false]() mutable {
-             return std::exchange(halted, true) ? "halted already" : nullptr;
-         };
-     }},
+     On(&H::halt, [n = 0](auto&...) mutable { return n++ > 0 ? "halted" : nullptr; })},
     {"ResetTarget: expected null for either flag; came the error text \"100 % no\"",
-     [](CheckedHost& h) {
-         h.reset = [reset = h.reset](bool flag) {
-             reset(flag);
-             return "100 % no";
-         };
-     }},
+     On(&H::reset, [](auto&, auto& reset, bool flag) { return reset(flag), "100 % no"; })},
     {"ResetTarget: expected null for either flag; came the error text \"no flag\"",
-     [](CheckedHost& h) {
-         h.reset = [reset = h.reset](bool flag) { return flag ? reset(flag) : "no flag"; };
-     }},
+     On(&H::reset, [](auto&, auto& reset, bool flag) { return flag ? reset(flag) : "no flag"; })},
     {"ResetTarget: expected registers that are reset; came 0x00004000, as it was written before, "
      "when the flag is true",
-     [](CheckedHost& h) { Fail(h.reset, nullptr); }},
+     Failing(&H::reset, nullptr)},
     {"ResetTarget: expected registers that are reset; came 0x00004000, as it was written before, "
      "when the flag is false",
-     [](CheckedHost& h) {
-         h.reset = [&h, reset = h.reset](bool flag) { return flag ? reset(flag) : h.halt(); };
-     }},
+     On(&H::reset, [](H& h, auto& reset, bool flag) { return flag ? reset(flag) : h.halt(); })},
+    // Lets run what was there, and the program in flash: in silence, or so that nothing is loaded.
     {"ResetTarget: expected a loader that is stopped, with either flag; came a loader that took a",
-     [](CheckedHost& h) {  // lets run what was there
-         h.reset = [&h, reset = h.reset](bool flag) {
-             const char* const error = reset(flag);
-             h.target.Run();
-             return error;
-         };
-     }},
+     On(&H::reset,
+        [](H& h, auto& reset, bool flag) {
+            const char* const error = reset(flag);
+            return h.target.Run(), error;
+        })},
     {"ResetTarget: expected a target that is left halted, so that RAM stays; came 00 00 00 00",
-     [](CheckedHost& h) {  // lets the program in flash run
-         h.reset = [&h, reset = h.reset](bool flag) {
-             h.sleep = [&h, sleep = h.sleep](uint32_t milliseconds) {
-                 for (size_t i = 0x1100; i < 0x1200; ++i)
-                     h.target.ram[i] = 0;
-                 return sleep(milliseconds);
-             };
-             return reset(flag);
-         };
-     }},
+     On(&H::reset,
+        [](H& h, auto& reset, bool flag) {
+            On(&H::sleep, [](H& host, auto& sleep, uint32_t milliseconds) {
+                std::fill_n(host.target.ram.begin() + 0x1100, 0x100, 0);
+                return sleep(milliseconds);
+            })(h);
+            return reset(flag);
+        })},
     {"ResetTarget: expected a target that is left halted, ready for LoadProgram; came the error "
      "text \"the target runs\"",
-     [](CheckedHost& h) {
-         // The program in flash runs.
+     [](H& host) {
          static bool runs = false;
-         h.reset = [reset = h.reset](bool flag) {
+         On(&H::reset, [](auto&, auto& reset, bool flag) {
              const char* const error = reset(flag);
-             runs = true;
-             return error;
-         };
-         h.halt = [halt = h.halt] {
-             runs = false;
-             return halt();
-         };
-         h.load = [load = h.load] { return runs ? "the target runs" : load(); };
+             return runs = true, error;
+         })(host);
+         On(&H::halt, [](auto&, auto& halt) { return runs = false, halt(); })(host);
+         On(&H::load, [](auto&, auto& load) { return runs ? "the target runs" : load(); })(host);
      }},
     {"Sleep: expected pauses that last as long as was asked; came 1.00 ms for 5",
-     [](CheckedHost& h) { Fail(h.sleep, nullptr); }},
+     Failing(&H::sleep, nullptr)},
     {"Sleep: expected pauses that last as long as was asked; came 4.00 ms for 5",
-     [](CheckedHost& h) { SleepInstead(h, [](uint32_t ms) { return ms - 2; }); }},
+     SleepsInstead([](uint32_t ms) { return ms - 2; })},
     {"Sleep: expected pauses that last as long as was asked; came 1.00 ms for 5",
-     [](CheckedHost& h) { SleepInstead(h, [](uint32_t ms) { return ms / 10 * 10; }); }},
+     SleepsInstead([](uint32_t ms) { return ms / 10 * 10; })},
     {"Sleep: expected pauses that last as long as was asked; came 41.00 ms for 50",
-     [](CheckedHost& h) { SleepInstead(h, [](uint32_t ms) { return std::min(ms, 40U); }); }},
+     SleepsInstead([](uint32_t ms) { return std::min(ms, 40U); })},
     {"Sleep: expected pauses that don't last many times as long; came 201.00 ms for 20",
-     [](CheckedHost& h) { SleepInstead(h, [](uint32_t ms) { return ms * 10; }); }},
+     SleepsInstead([](uint32_t ms) { return ms * 10; })},
     {"Sleep: expected pauses that don't last many times as long; came 2001.00 ms for 20",
-     [](CheckedHost& h) { SleepInstead(h, [](uint32_t ms) { return ms * 100; }); }},
+     SleepsInstead([](uint32_t ms) { return ms * 100; })},
     {"Sleep: expected pauses that last as long as was asked; came the error text \"no time\"",
-     [](CheckedHost& h) { Fail(h.sleep, "no time"); }},
+     Failing(&H::sleep, "no time")},
     {"HaltTarget: expected null after a reset; came the error text \"no\"",
-     [](CheckedHost& h) { FailHalt(h, "a target that is left halted, so that RAM stays"); }},
+     FailingHalt("a target that is left halted, so that RAM stays")},
     {"HaltTarget: expected null before the loader is loaded; came the error text \"no\"",
-     [](CheckedHost& h) { FailHalt(h, "flash on the page given to WriteDataToFlash"); }},
+     FailingHalt("flash on the page given to WriteDataToFlash")},
     {"HaltTarget: expected null for a target that runs; came the error text \"no\"",
-     [](CheckedHost& h) { FailHalt(h, "2048 bytes of RAM while the program runs"); }},
+     FailingHalt("2048 bytes of RAM while the program runs")},
     {"GetDirectory: expected a text that ends in a path separator; came \"/opt\"",
-     [](CheckedHost& h) { Fail(h.directory, "/opt"); }},
+     Failing(&H::directory, "/opt")},
     {"GetDirectory: expected a text that ends in a path separator; came null",
-     [](CheckedHost& h) { Fail(h.directory, nullptr); }},
+     Failing(&H::directory, nullptr)},
     {"GetDirectory: expected a text that ends in a path separator; came a text that changed",
-     [](CheckedHost& h) { h.directory = [] { return Dangling("/opt/"); }; }},
+     On(&H::directory, [](auto&...) { return Dangling("/opt/"); })},
     {"LoadProgram: expected null for the loader; came the error text \"no file\"",
-     [](CheckedHost& h) { Fail(h.load, "no file"); }},
+     Failing(&H::load, "no file")},
     {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
      "0xFFFFFFFF and 0xFFFFFFFF\n",
-     [](CheckedHost& h) { Fail(h.load, nullptr); }},
+     Failing(&H::load, nullptr)},
     {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
      "0x00000000 and 0xFFFFFFFF\n",
-     [](CheckedHost& h) {
-         h.load = [&h] {
-             h.target.SetStatus(0, 0);
-             return nullptr;
-         };
-     }},
+     On(&H::load, [](H& h, auto&) { return h.target.SetStatus(0, 0), nullptr; })},
     {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came the error"
      " text \"no status\"",
-     [](CheckedHost& h) { FailStatus(h, true); }},
+     FailingStatus(true)},
     {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came the error"
      " text \"no status\"",
-     [](CheckedHost& h) { FailStatus(h, false); }},
+     FailingStatus(false)},
     {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
      "0xFFFFFFFF, which a write doesn't change",
-     [](CheckedHost& h) {
-         Fail(h.load, nullptr);
-         h.Bend([loads = 0](Transfer& t) mutable {
-             if (t.address == 0x2000100C && t.to == nullptr && ++loads > 1) t.count = 0;
-         });
+     [](H& host) {
+         Fail(host.load, nullptr);
+         Bent([n = 0](Transfer& t, auto&) mutable {
+             if (t.address == 0x2000100C && t.Writes() && ++n > 1) t.count = 0;
+         })(host);
      }},
     {"RunTarget: expected null for the loader, at once; came the error text \"no start\"",
-     [](CheckedHost& h) { Fail(h.run, "no start"); }},
+     Failing(&H::run, "no start")},
     {"RunTarget: expected null for the loader, at once; came null after 3.0",
-     [](CheckedHost& h) {
-         AfterRun(h, [](CheckedHost&) { std::this_thread::sleep_for(std::chrono::seconds(3)); });
-     }},
+     AfterRun([](auto&) { std::this_thread::sleep_for(std::chrono::seconds(3)); })},
     {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 "
      "after "
      "1 s: the loader hangs",
-     [](CheckedHost& h) { Fail(h.run, nullptr); }},
+     Failing(&H::run, nullptr)},
+    // One step.
     {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 "
      "after",
-     [](CheckedHost& h) {  // one step
-         AfterRun(h, [](CheckedHost& host) { host.target.Halt(); });
-     }},
+     AfterRun([](H& h) { h.target.Halt(); })},
     {"RunTarget: expected a loader that takes the chunk in block 0; came other bytes at 0x20001004",
-     [](CheckedHost& h) {
-         h.Bend([](Transfer& t) {
-             if (t.to == nullptr && t.address == 0x20001004) t.count = 4;
-         });
-     }},
+     Bent([](Transfer& t, auto&) {
+         if (t.Writes() && t.address == 0x20001004) t.count = 4;
+     })},
+    // The loader starts anew after each chunk.
     {"RunTarget: expected a loader that takes the one in block 1 next; came \"to do\" in block 1",
-     [](CheckedHost& h) {
-         h.Bend([&h](Transfer& t) {  // the loader starts anew after each chunk
-             if (t.to == nullptr && t.address == 0x20001014 && t.count == 12) h.target.Run();
-         });
-     }},
+     Bent([](Transfer& t, H& h) {
+         if (t.Writes() && t.address == 0x20001014 && t.count == 12) h.target.Run();
+     })},
     {"RunTarget: expected a loader that takes two chunks handed over at once; came \"to do\" in "
      "blo",
-     [](CheckedHost& h) {
-         h.Bend([&h, chunks = 0](Transfer& t) mutable {
-             if (t.to == nullptr && t.count == 12 && ++chunks == 4) h.target.Halt();
-         });
-     }},
+     Bent([n = 0](Transfer& t, H& h) mutable {
+         if (t.Writes() && t.count == 12 && ++n == 4) h.target.Halt();
+     })},
     {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 af",
-     [](CheckedHost& h) {
-         h.sleep = [&h, sleep = h.sleep](uint32_t milliseconds) {
-             h.target.Halt();
-             return sleep(milliseconds);
-         };
-     }},
+     On(&H::sleep, [](H& h, auto& sleep, auto ms) { return h.target.Halt(), sleep(ms); })},
     {"ReadMemory: expected a status of block 1 other than 0xFFFFFFFF while the loader runs; came",
-     [](CheckedHost& h) {
-         AfterRun(h, [](CheckedHost& host) { host.target.SetStatus(1, 0xFFFFFFFF); });
-     }},
+     AfterRun([](H& h) { h.target.SetStatus(1, 0xFFFFFFFF); })},
     {"HaltTarget: expected a loader that is stopped; came a loader that took a chunk",
-     [](CheckedHost& h) {
-         h.halt = [&h] {
-             const char* const error = h.AwaitLoader();
-             h.loaderRuns = false;
-             return error;
-         };
-         h.load = [load = h.load, &h] {
-             h.target.Halt();
-             return load();
-         };
-     }},
+     HaltingLate([](H& h, auto&) {
+         const char* const error = h.AwaitLoader();
+         return h.loaderRuns = false, error;
+     })},
+    // Goes on after a halt.
     {"HaltTarget: expected a loader that is stopped; came a loader that took a chunk",
-     [](CheckedHost& h) {  // goes on after a halt
-         h.halt = [&h, halt = h.halt] {
-             const bool ran = h.loaderRuns;
-             const char* const error = halt();
-             h.target.running = ran;
-             return error;
-         };
-         h.load = [load = h.load, &h] {
-             h.target.Halt();
-             return load();
-         };
-     }},
+     HaltingLate([](H& h, auto& halt) {
+         const bool ran = h.loaderRuns;
+         const char* const error = halt();
+         return h.target.running = ran, error;
+     })},
     {"HaltTarget: expected no halt before the loader has done its last chunk; came \"to do\", so",
-     [](CheckedHost& h) {
-         h.halt = [&h] {
-             h.target.Halt();
-             h.loaderRuns = false;
-             return nullptr;
-         };
-     }},
+     On(&H::halt, [](H& h, auto&) { return h.target.Halt(), h.loaderRuns = false, nullptr; })},
     {"HaltTarget: expected no halt before the loader has done its last chunk; came the error text",
-     [](CheckedHost& h) { h.target.chunkTime = std::chrono::milliseconds(700); }},
+     [](H& h) { h.target.chunkTime = std::chrono::milliseconds(700); }},
     {"ResetTarget: expected no reset before the loader has done its last chunk; came \"to do\", so",
-     [](CheckedHost& h) {
-         h.reset = [&h](bool) {
-             h.target.Reset();
-             h.loaderRuns = false;
-             return nullptr;
-         };
-     }},
+     On(&H::reset,
+        [](H& h, auto&, bool) { return h.target.Reset(), h.loaderRuns = false, nullptr; })},
     {"ReadMemory: expected no read of flash before the loader has done its last chunk; came \"to "
      "do",
-     [](CheckedHost& h) { h.move = [&h](const Transfer& t) { return h.target.Move(t); }; }},
+     On(&H::move, [](H& h, auto&, auto& t) { return h.target.Move(t); })},
     {"ReadMemory: expected the flash as it was; came",
-     [](CheckedHost& h) {
-         AfterRun(h, [](CheckedHost& host) { host.target.flash[2047] ^= 1; });
-         h.Bend([](Transfer&) {});
-     }},
+     AfterRun([](H& h) { h.target.flash[2047] ^= 1; })},
     {"WriteMemory: expected RAM on the page given to WriteDataToFlash; came the error text \"no "
      "mem",
-     [](CheckedHost& h) {
-         h.Bend([&h](Transfer& t) {
-             if (h.Told("null after a reset") && t.to == nullptr && t.count == 4)
-                 t.address = 0x10000000;
-         });
-     }},
+     Bent([](Transfer& t, H& h) {
+         if (h.Told("null after a reset") && t.Writes() && t.count == 4) t.address = 0x10000000;
+     })},
 };
 
 }  // namespace

@@ -8,47 +8,29 @@ namespace test {
 
 namespace {
 
+using H = CheckedHost;
+
 const FaultyHost kFaultyDisplays[] = {
     {"ShowMessage: expected null for a text with percent signs and UTF-8; came the error text \"no",
-     [](CheckedHost& h) {
-         h.message = [](const char* text) { return strchr(text, '%') ? "no format" : nullptr; };
-     }},
+     On(&H::message, [](auto&, auto&, auto* text) { return strchr(text, '%') ? "no" : nullptr; })},
     {"ShowMessage: expected null for a text of 300 characters; came the error text \"too long\"",
-     [](CheckedHost& h) {
-         h.message = [](const char* text) { return strlen(text) > 299 ? "too long" : nullptr; };
-     }},
+     On(&H::message,
+        [](auto&, auto&, auto* text) { return strlen(text) > 299 ? "too long" : nullptr; })},
     {"ShowMessage: expected null for \"ReadMemory: ok: the identification",
-     [](CheckedHost& h) {
-         h.message = [](const char* text) -> const char* {
-             if (strstr(text, "ok") != nullptr) throw 1;
-             return nullptr;
-         };
-     }},
+     On(&H::message,
+        [](auto&, auto&, auto* text) { return strstr(text, "ok") ? throw 1 : nullptr; })},
     {R"(BeginProgress: expected null; came the error text "\xb5\x0a")",
-     [](CheckedHost& h) { Fail(h.begin, "\xB5\n"); }},
+     Failing(&H::begin, "\xB5\n")},
     {"UpdateProgress: expected null for 0 to 100 percent; came an exception",
-     [](CheckedHost& h) { h.update = []() -> const char* { throw 1; }; }},
+     On(&H::update, [](auto&...) -> const char* { throw 1; })},
     {"UpdateProgress: expected null for 0 to 100 percent; came the error text \"full\"",
-     [](CheckedHost& h) {
-         h.update = [count = 0]() mutable { return ++count > 100 ? "full" : nullptr; };
-     }},
+     On(&H::update, [n = 0](auto&...) mutable { return ++n > 100 ? "full" : nullptr; })},
     {"UpdateProgress: expected null for fewer percent than before; came the error text \"back\"",
-     [](CheckedHost& h) {
-         h.update = [count = 0]() mutable { return ++count == 103 ? "back" : nullptr; };
-     }},
+     On(&H::update, [n = 0](auto&...) mutable { return ++n == 103 ? "back" : nullptr; })},
     {"EndProgress: expected null; came the error text \"no\"",
-     [](CheckedHost& h) {
-         h.end = [&h] {
-             --h.displaysOpen;
-             return "no";
-         };
-     }},
+     On(&H::end, [](H& h, auto&) { return --h.displaysOpen, "no"; })},
     {"BeginProgress: expected further displays after the first; came the error text \"once\"",
-     [](CheckedHost& h) {
-         h.begin = [begin = h.begin, count = 0]() mutable {
-             return ++count > 5 ? "once" : begin();
-         };
-     }},
+     On(&H::begin, [n = 0](auto&, auto& begin) mutable { return ++n > 5 ? "once" : begin(); })},
 };
 
 }  // namespace
