@@ -104,6 +104,7 @@ void RefuseNonsense(const CommandRows& commands, const FollowedLine& line) {
 std::string Answer(const CommandRows& commands, const FollowedLine& line) {
     for (const GivenOption& given : line.given) {
         const std::string name = given.row->LongName();
+        if (!given.value.empty()) continue;  // "--help=x" is a mistake
         if (name == "--help") return HelpText(commands, line.name);
         if (name == "--version") return "corvane-flash " CORVANE_FLASH_VERSION "\n";
         if (name == "--man") return ManPage(commands);

@@ -76,10 +76,15 @@ class Follower {
         else if (equals == std::string::npos)
             line_.awaited = row;
         else if (row->isSwitch)
-            Complain(fmt::format("{} takes no value; leave out '{}'", word.substr(0, equals),
-                                 word.substr(equals)));
+            RefuseValue(*row, word, equals);
         else
             Give(*row, word.substr(equals + 1));
+    }
+
+    void RefuseValue(const OptionRow& row, const std::string& word, std::size_t equals) {
+        line_.given.push_back({&row, word.substr(equals)});
+        Complain(fmt::format("{} takes no value; leave out '{}'", word.substr(0, equals),
+                             word.substr(equals)));
     }
 
     /// "-qv" is "-q -v".

@@ -52,7 +52,9 @@ enum class GivenBy { Line, Environment, Board };
 /// An option or argument that is given.
 struct GivenOption {
     const OptionRow* row;
-    std::string value;  ///< of an argument, the word itself; of a switch, empty
+    /// Of an argument, the word itself. Of a switch, empty, or "=TEXT" where it was given a value,
+    /// which is a mistake in the line.
+    std::string value;
     GivenBy by = GivenBy::Line;
 };
 using GivenOptions = std::vector<GivenOption>;
