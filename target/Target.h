@@ -51,7 +51,7 @@ class Target {
 
     /// Whether an access to the running target stops it. Whoever waits for it then looks seldom,
     /// and when all that it waits for should be done.
-    virtual bool LooksStopIt() const { return false; }
+    virtual bool StopsForReads() const { return false; }
 
     /// Whether a read that has failed may look like one that was answered.
     virtual bool HidesFailedReads() const { return false; }

@@ -201,8 +201,9 @@ ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& lin
     if (!parsed.answer.empty()) return parsed;
     RefuseNonsense(commands, line);
     parsed.command = line.command;
-    const ProjectFile found =
-        (line.command->readsSettings || line.command->ignoresGdbVariable) ? project() : ProjectFile();
+    const ProjectFile found = (line.command->readsSettings || line.command->ignoresGdbVariable)
+                                  ? project()
+                                  : ProjectFile();
     parsed.project.path = found.path;
     parsed.given = WithWhatIsAround(line, environment, found, parsed.project.texts);
     parsed.common = ValuesOf(CommonOptionTable(), parsed.given);

@@ -11,7 +11,7 @@
 
 namespace host {
 
-/// Is told, for the user, what there is to wait for.
+/// Tells the user, in one sentence, which run is waited for and for how long.
 using WaitNotice = std::function<void(const std::string&)>;
 
 /// The file is locked by another run, and stayed so for as long as we wait.

@@ -158,7 +158,7 @@ LoaderWait::Time LoaderWait::Due(std::size_t block, Time until) const {
     until = std::min(until, RanFor() + plugin::kPollInterval);
     const Chunk& chunk = *chunks_[block];
     const Time due = chunk.begun + chunk.number * pace_.Guess();
-    if (!LooksStopIt()) return std::min(due, until) - pace_.LookTime();
+    if (!StopsForReads()) return std::min(due, until) - pace_.LookTime();
     const auto& other = chunks_[block ^ 1];
     const Time both = due + pace_.Guess();
     return other && other->number > chunk.number && both <= until ? both : std::min(due, until);
@@ -191,7 +191,7 @@ void LoaderWait::Finish(std::size_t block) {
 /// two are timed together, unless this one was handed over since the loader ran last.
 void LoaderWait::BeginAfter(const Chunk& chunk, Time seen, Chunk& next) const {
     const Time handedOver = std::exchange(next.start, std::max(next.start, seen));
-    if (LooksStopIt() && handedOver < seen) return;
+    if (StopsForReads() && handedOver < seen) return;
     const Time done = chunk.begun + chunk.number * pace_.Guess();
     next.begun = std::max(handedOver, std::clamp(done, std::min(chunk.atWork, seen), seen));
     next.number = 1;

@@ -72,7 +72,7 @@ class LoaderWait final : public target::Target {
     void Run() override;
     Time Now() const override { return next_.Now(); }
     void Pause(Time time) override { next_.Pause(time); }
-    bool LooksStopIt() const override { return next_.LooksStopIt(); }
+    bool StopsForReads() const override { return next_.StopsForReads(); }
     bool StandsStill() const override { return next_.StandsStill(); }
     Time RanFor() const override { return next_.RanFor(); }
     bool SimulatesTime() const override { return next_.SimulatesTime(); }

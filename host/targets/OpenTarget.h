@@ -59,8 +59,7 @@ class OpenTarget {
 void RequireOneKind(const TargetOptions& options);
 
 /// Failure (WrongUsage) for options that name no target, Failure (Unreachable) for a target that
-/// can't be had. `trace` may be empty; what there is to wait for is told to
-/// `say`.
+/// can't be had. `trace` may be empty. When another run has to be waited for, `say` is told which.
 std::unique_ptr<OpenTarget> Open(const TargetOptions& options, const TraceLine& trace,
                                  const WaitNotice& say);
 

@@ -14,9 +14,10 @@ namespace host {
 
 class SimulatedTarget final : public OpenTarget {
   public:
-    /// Keeps the contents file locked for as long as it lives; what there is to wait for is told to
-    /// `say`. Failure (WrongUsage) for options that name no device, or another one than the file
-    /// holds; Failure (Unreachable) for a contents file that can't be used.
+    /// Keeps the contents file locked for as long as it lives. When another run has it, `say` is
+    /// told so, and that run is waited for. Failure (WrongUsage) for options that name no device,
+    /// or another one than the file holds; Failure (Unreachable) for a contents file that can't be
+    /// used.
     SimulatedTarget(const TargetOptions& options, const WaitNotice& say);
 
     target::Target& Get() override { return *device_; }

@@ -76,9 +76,9 @@ struct Said {
     std::array<std::uint32_t, 2> written;  ///< what the user registers hold until power goes
 };
 
-class Bench {
+class ToolRuns {
   public:
-    Bench() {
+    ToolRuns() {
         fs::current_path(directory_.Path());
         setenv("XDG_CONFIG_HOME", directory_.Path().c_str(), 1);
         for (std::uint32_t i = 0; i < kImageBytes; ++i)
@@ -90,7 +90,7 @@ class Bench {
         Run({"register", "program", "1", "def", "--commit"}, "");
         device_ = test::Contents("device");
     }
-    ~Bench() { fs::current_path("/"); }
+    ~ToolRuns() { fs::current_path("/"); }
 
     void PutBack() const { std::ofstream("device", std::ios::binary) << device_; }
 
@@ -121,7 +121,7 @@ class Bench {
     }
 
     /// The device as it is without the tool; a cell that is stuck stays so.
-    static Contents Look(const std::string& fault) {
+    static Contents ReadDevice(const std::string& fault) {
         TargetOptions options;
         options.sim = kDevice + (fault.starts_with(",stuck") ? fault : "");
         options.simFile = "device";
@@ -147,7 +147,8 @@ class Bench {
                           now.flash.begin() + kImageAddress);
     }
 
-    std::vector<std::string> Lies(const Work& work, const Said& said, const Contents& now) const;
+    std::vector<std::string> FalseClaims(const Work& work, const Said& said,
+                                         const Contents& now) const;
 
   private:
     test::TemporaryDirectory directory_;
@@ -160,11 +161,11 @@ std::uint64_t Bytes(const json& result, const char* phase) {
 }
 
 /// Every sentence, status and member that isn't true.
-std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
-                                     const Contents& now) const {
-    std::vector<std::string> lies;
+std::vector<std::string> ToolRuns::FalseClaims(const Work& work, const Said& said,
+                                               const Contents& now) const {
+    std::vector<std::string> untrue;
     const auto claim = [&](bool made, bool isTrue, const char* what) {
-        if (made && !isTrue) lies.emplace_back(what);
+        if (made && !isTrue) untrue.emplace_back(what);
     };
     const auto says = [&](const char* part) { return said.text.find(part) != std::string::npos; };
     const json& result = said.end["result"];
@@ -218,34 +219,36 @@ std::vector<std::string> Bench::Lies(const Work& work, const Said& said,
 
     claim(true, said.end["status"] == said.status && said.end["ok"] == (said.status == 0),
           "the same status");
-    if (said.status == 0) return lies;
+    if (said.status == 0) return untrue;
     const std::string error = said.end["error"];
     for (const char* part :
          {"the flash is as it was", "isn't known", "registers are as they were", "incomplete",
           "the image is programmed", "are erased, but", "couldn't be halted", "(committed)",
           "(perhaps committed)", "(not committed)"})
         claim(true, says(part) == (error.find(part) != std::string::npos), part);
-    return lies;
+    return untrue;
 }
 
-void Check(const Bench& bench, const Work& work, const std::string& fault, Said& said) {
-    bench.PutBack();
-    said = bench.Run(work.words, fault);
-    for (const std::string& lie : bench.Lies(work, said, Bench::Look(fault)))
-        ADD_FAILURE() << "not true: " << lie << "\n--sim " << kDevice << fault << ' '
+void Check(const ToolRuns& runs, const Work& work, const std::string& fault, Said& said) {
+    runs.PutBack();
+    said = runs.Run(work.words, fault);
+    for (const std::string& text : runs.FalseClaims(work, said, ToolRuns::ReadDevice(fault)))
+        ADD_FAILURE() << "not true: " << text
+                      << "
+            --sim " << kDevice << fault << ' '
                       << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
                       << said.text << said.end;
 }
 
 TEST(Truth, HoldsWhateverAccessFails) {
-    const Bench bench;
+    const ToolRuns runs;
     for (const Work& work : kWorks)
         for (const char* fault : {"fail-access", "fail-from"}) {
             // A fault that is swallowed doesn't end the sweep; one that comes too late does.
             int done = 0;
             for (int access = 1; done < 3 && !testing::Test::HasFailure(); ++access) {
                 Said said;
-                Check(bench, work, fmt::format(",{}={}", fault, access), said);
+                Check(runs, work, fmt::format(",{}={}", fault, access), said);
                 done = said.status == 0 ? done + 1 : 0;
                 EXPECT_TRUE(said.status == 0 || access > 6 || said.status == 4);
             }
@@ -253,7 +256,7 @@ TEST(Truth, HoldsWhateverAccessFails) {
 }
 
 TEST(Truth, HoldsOfFaultyDevices) {
-    const Bench bench;
+    const ToolRuns runs;
     for (const Work& work : kWorks)
         for (const char* fault : {"", ",stuck-cell=0x500", ",erase=never", ",loader=hangs",
                                   ",loader=dead", ",commit=never"}) {
@@ -261,7 +264,7 @@ TEST(Truth, HoldsOfFaultyDevices) {
             const bool compares = work.words.back() != "--no-verify";
             if (!compares && std::string(fault).starts_with(",stuck")) continue;
             Said said;
-            Check(bench, work, fault, said);
+            Check(runs, work, fault, said);
         }
 }
 
@@ -284,31 +287,30 @@ const ReplyFault kReplyFaults[] = {
 };
 
 /// One run with the device behind this server. Gives the number of packets that the server saw.
-std::size_t CheckBehind(const Bench& bench, const Work& work, const std::string& lie,
+std::size_t CheckBehind(const ToolRuns& runs, const Work& work, const std::string& fault,
                         test::Peer& peer, Said& said, const char* options = "timeout=1s") {
     const auto start = std::chrono::system_clock::now();
-    said = Bench::Run(work.words, Words{"--gdb", peer.Where().Text(), "--loader",
-                                        test::LoaderFile(), "--gdb-option", options});
+    said = ToolRuns::Run(work.words, Words{"--gdb", peer.Where().Text(), "--loader",
+                                           test::LoaderFile(), "--gdb-option", options});
     const std::size_t packets = peer.Log().size();
-    EXPECT_LT(std::chrono::system_clock::now() - start, std::chrono::seconds(20)) << lie;
+    EXPECT_LT(std::chrono::system_clock::now() - start, std::chrono::seconds(20)) << fault;
     const target::SimulatedDevice& device = peer.Device();
     for (const std::uint32_t index : {0U, 1U})
         said.written.at(index) = device.PeekRegister(0x400FE1E0 + 4 * index);
     const Contents now{device.FlashContents(), device.CommittedUserRegisters()};
-    for (const std::string& text : bench.Lies(work, said, now))
-        ADD_FAILURE() << "not true: " << text << "\nbehind a server with " << lie << ": "
+    for (const std::string& text : runs.FalseClaims(work, said, now))
+        ADD_FAILURE() << "not true: " << text << "\nbehind a server with " << fault << ": "
                       << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
                       << said.text << said.end;
     return packets;
 }
 
 TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
-    const Bench bench;
+    const ToolRuns runs;
     for (const Work& work : {kWorks[0], kWorks[3], kWorks[7]}) {
         Said said;
-        test::Peer sound([](const std::string&) { return std::nullopt; }, {}, bench.Device());
-        const std::size_t packets =
-            CheckBehind(bench, work, "no fault", sound, said, "timeout=60s");
+        test::Peer sound([](const std::string&) { return std::nullopt; }, {}, runs.Device());
+        const std::size_t packets = CheckBehind(runs, work, "no fault", sound, said, "timeout=60s");
         EXPECT_EQ(said.status, 0) << said.text;
         for (const ReplyFault& fault : kReplyFaults)
             for (std::size_t failing = 0; failing < packets; ++failing) {
@@ -322,8 +324,8 @@ TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
                                     bent = payload;
                                     fault.bend(wire, late);
                                 },
-                                bench.Device());
-                CheckBehind(bench, work, fmt::format("reply {} {}", failing, fault.name), peer,
+                                runs.Device());
+                CheckBehind(runs, work, fmt::format("reply {} {}", failing, fault.name), peer,
                             said);
                 if (HasFailure()) FAIL() << bent;
             }
@@ -335,15 +337,15 @@ TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
                         if (index++ != failing) return std::nullopt;
                         return refusal;
                     },
-                    {}, bench.Device());
-                CheckBehind(bench, work, fmt::format("request {} not done: '{}'", failing, refusal),
+                    {}, runs.Device());
+                CheckBehind(runs, work, fmt::format("request {} not done: '{}'", failing, refusal),
                             peer, said);
             }
     }
 }
 
 /// A server that goes wrong in a way of its own.
-struct Lie {
+struct LyingServer {
     const char* name;
     test::Peer::Hook instead;
     test::Peer::Bend bend;
@@ -377,7 +379,7 @@ void HideFailedRead(const std::string& payload, std::string& wire) {
     if (RangeOf(payload, "m") && wire.find("$E") != std::string::npos) wire = *AsIfDone(payload);
 }
 
-std::vector<Lie> Lies() {
+std::vector<LyingServer> LyingServers() {
     const auto none = [](const std::string&) { return std::nullopt; };
     const auto dropWrites = [](std::uint32_t first, std::uint32_t end) {
         return [=](const std::string& payload) {
@@ -427,15 +429,15 @@ std::vector<Lie> Lies() {
 }
 
 TEST(Truth, HoldsBehindServersThatLie) {
-    const Bench bench;
+    const ToolRuns runs;
     for (const Work& work : {kWorks[0], kWorks[3], kWorks[7]})
-        for (const Lie& lie : Lies()) {
+        for (const LyingServer& server : LyingServers()) {
             // What is committed can't be read back until the next power cycle.
-            if (work.words[0] == "mac" && std::string(lie.name).starts_with("OK for flash"))
+            if (work.words[0] == "mac" && std::string(server.name).starts_with("OK for flash"))
                 continue;
-            test::Peer peer(lie.instead, lie.bend, bench.Device());
+            test::Peer peer(server.instead, server.bend, runs.Device());
             Said said;
-            CheckBehind(bench, work, lie.name, peer, said);
+            CheckBehind(runs, work, server.name, peer, said);
         }
 }
 
@@ -453,13 +455,13 @@ struct LosesTarget {
 constexpr char kTrusted[] = "reads=trusted,live=no,timeout=10s";
 
 TEST(Truth, HoldsWhereTheCableComesOffAndTheServerHidesIt) {
-    const Bench bench;
+    const ToolRuns runs;
     for (const Work& work : {kWorks[0], kWorks[2], kWorks[3], kWorks[7], kWorks[9]}) {
         Said said;
         std::size_t packets = 9;
         for (std::size_t lost = 8; lost < packets + 3 && !HasFailure(); lost += 3) {
-            test::Peer peer(LosesTarget{lost}, {}, bench.Device());
-            packets = CheckBehind(bench, work, fmt::format("the cable off at {}", lost), peer, said,
+            test::Peer peer(LosesTarget{lost}, {}, runs.Device());
+            packets = CheckBehind(runs, work, fmt::format("the cable off at {}", lost), peer, said,
                                   kTrusted);
         }
         EXPECT_EQ(said.status, 0) << said.text;
@@ -468,8 +470,8 @@ TEST(Truth, HoldsWhereTheCableComesOffAndTheServerHidesIt) {
 
 // What a command has read is told, or that the device is lost; never what was made of a lost one.
 TEST(Truth, HoldsOfWhatIsReadAsTheCableComesOff) {
-    const Bench bench;
-    Bench::Run({"program", "new.bin", "--base", "400"}, "");
+    const ToolRuns runs;
+    ToolRuns::Run({"program", "new.bin", "--base", "400"}, "");
     const std::string contents = test::Contents("device");
     const Words commands[] = {
         {"read", "out.bin", "--range", "400-17ff"},
@@ -490,8 +492,8 @@ TEST(Truth, HoldsOfWhatIsReadAsTheCableComesOff) {
             fs::remove("out.bin");
             test::Peer peer(LosesTarget{lost}, {},
                             target::DecodeContents(contents, target::ParseDeviceOptions(kDevice)));
-            Said said = Bench::Run(command, {"--gdb", peer.Where().Text(), "--gdb-option", kTrusted,
-                                             "--loader", test::LoaderFile()});
+            Said said = ToolRuns::Run(command, {"--gdb", peer.Where().Text(), "--gdb-option",
+                                                kTrusted, "--loader", test::LoaderFile()});
             packets = peer.Log().size();
             said.end.erase("seconds");
             said.end["result"].erase("phases");

@@ -10,6 +10,8 @@
 
 namespace target::gdb {
 
+// The order counts: each step builds on what those before it have found out, and the first that
+// fails ends the connection. Nothing is written to the target's memory before all have passed.
 void GdbTarget::Attach() {
     Introduce();
     FindOut(false);

@@ -182,7 +182,7 @@ void Core::Interrupt() {
     connection_.Send(kHalt);
     Wait wait = connection_.Patience();
     std::string reply = connection_.AwaitReply(kHalt, wait);
-    if (std::exchange(lookOut_, false) && reply != "OK")
+    if (std::exchange(readOut_, false) && reply != "OK")
         reply = connection_.AwaitReply(kHalt, wait);
     // Whatever was answered, the target isn't known to have stopped.
     if (reply != "OK")
@@ -194,7 +194,7 @@ bool Core::AwaitStopped(Wait& wait) {
     while (state_ != State::Stopped) {
         if (!connection_.Step(wait)) return false;
         const auto packet = connection_.TakePacket();
-        if (packet && !std::exchange(lookOut_, false))
+        if (packet && !std::exchange(readOut_, false))
             connection_.Lose(fmt::format("answered \"{}\" to an interrupt", Shown(*packet)));
     }
     return true;
@@ -253,13 +253,13 @@ void Core::TryAllStop(std::uint32_t address) {
     trying_ = false;
     ThrowCrash();
     if (reads) return;
-    if (lookOut_) {
+    if (readOut_) {
         Stop();
-        // The look is answered before this, or never.
+        // The read is answered before this, or never.
         connection_.Send("?");
         Wait wait = connection_.Patience();
         std::string reply = connection_.AwaitReply("?", wait);
-        if (std::exchange(lookOut_, false) && !ParseStopReply(reply))
+        if (std::exchange(readOut_, false) && !ParseStopReply(reply))
             reply = connection_.AwaitReply("?", wait);
         if (!ParseStopReply(reply)) connection_.Reject("?", reply);
     }
@@ -273,7 +273,7 @@ bool Core::ReadsAsItRuns(std::uint32_t address) {
     std::optional<std::string> reply;
     while (!reply && state_ != State::Stopped && connection_.Step(wait))
         reply = connection_.TakePacket();
-    lookOut_ = !reply;
+    readOut_ = !reply;
     if (!reply || IsRefusal(*reply)) return false;
     const auto bytes = base::FromHex(*reply);
     if (!bytes || bytes->size() != 4) connection_.Reject(request, *reply);

@@ -113,7 +113,7 @@ class Core {
 
     bool interruptOut_ = false;  ///< and no stop told since
     bool trying_ = false;   ///< a server of which nobody knows what it does as the program runs
-    bool lookOut_ = false;  ///< its answer may still come
+    bool readOut_ = false;  ///< the read of a trial, whose answer may still come
 
     std::optional<unsigned> usual_;      ///< the signal that answered an interrupt last
     std::optional<unsigned> last_;       ///< the signal of the last stop that counted

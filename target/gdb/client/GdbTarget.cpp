@@ -20,6 +20,16 @@ namespace {
 
 using std::chrono::milliseconds;
 
+// What is known of the program, true between any two calls:
+// - started_: it was let go, and neither Halt, Reset nor a crash has come since. It runs, or we
+//   have stopped it for a moment.
+// - crash_: how it stopped by itself. It stays until Halt or Reset, so that every read of the
+//   mailbox says it again; started_ is false then.
+// - mailboxBytes_: the mailbox as it is in this stop. Our writes go into it. It is dropped before
+//   the program goes on, and when others may have written there.
+// After an error either the server has refused the request, and all is as before it, or the
+// connection is lost, and every later call fails with the same reason.
+
 // What a program needs before it takes its first order, on a slow clock and through a slow probe.
 constexpr milliseconds kStartUp(20);
 
@@ -90,7 +100,7 @@ void GdbTarget::Perform(const Text& describe, const std::function<void()>& actio
         action();
     } catch (const StoppedByItself& error) {
         started_ = false;
-        look_.reset();
+        mailboxBytes_.reset();
         crash_ = error.what() + WhereStopped();
         throw TargetError(sentence(crash_.c_str()));
     } catch (const ProtocolError& error) {
@@ -139,10 +149,10 @@ void GdbTarget::Write(const void* buffer, std::size_t count, std::uint32_t addre
         StopForAccess();
         const std::string_view bytes(static_cast<const char*>(buffer), size);
         Memory().Write(address, bytes);
-        if (look_ && InMailbox(address, size))
-            look_->replace(address - mailbox_.address, size, bytes);
+        if (mailboxBytes_ && InMailbox(address, size))
+            mailboxBytes_->replace(address - mailbox_.address, size, bytes);
         else if (OverlapsMailbox(address, size))
-            look_.reset();
+            mailboxBytes_.reset();
     });
 }
 
@@ -160,8 +170,8 @@ MemoryPort& GdbTarget::Memory() {
 
 std::string GdbTarget::ReadMailbox(std::uint32_t address, std::size_t size) {
     if (!core_.IsStopped()) return Memory().Read(address, size);
-    if (!look_) look_ = memory_.Read(mailbox_.address, mailbox_.sizeBytes);
-    return look_->substr(address - mailbox_.address, size);
+    if (!mailboxBytes_) mailboxBytes_ = memory_.Read(mailbox_.address, mailbox_.sizeBytes);
+    return mailboxBytes_->substr(address - mailbox_.address, size);
 }
 
 bool GdbTarget::InMailbox(std::uint32_t address, std::size_t size) const {
@@ -176,7 +186,7 @@ bool GdbTarget::OverlapsMailbox(std::uint32_t address, std::size_t size) const {
 }
 
 void GdbTarget::GoOn() {
-    look_.reset();
+    mailboxBytes_.reset();
     core_.Resume();
 }
 
@@ -184,7 +194,7 @@ void GdbTarget::Run() {
     Perform([] { return std::string("Running the target"); },
             [&] {
                 if (started_) throw ProtocolError("isn't asked: the target is running already");
-                look_.reset();
+                mailboxBytes_.reset();
                 const bool tries = options_.live == GdbOptions::Live::Auto &&
                                    (profile_->triesLive || features_.nonStop);
                 if (std::exchange(liveTried_, true) || !tries || core_.RunsLive())
@@ -217,7 +227,7 @@ void GdbTarget::Reset(bool /*flag*/) {
         }
         started_ = false;
         crash_.clear();
-        look_.reset();
+        mailboxBytes_.reset();
         std::string output;
         if (how.starts_with(kPacket))
             ResetByPacket(how.substr(std::size(kPacket) - 1));

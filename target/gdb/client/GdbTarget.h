@@ -86,7 +86,7 @@ class GdbTarget final : public Target {
     void Halt() override;
     void Reset(bool flag) override;
     void Pause(std::chrono::nanoseconds time) override;
-    bool LooksStopIt() const override { return !core_.RunsLive(); }
+    bool StopsForReads() const override { return !core_.RunsLive(); }
     bool HidesFailedReads() const override { return options_.readsTrusted; }
     bool StandsStill() const override { return started_ && core_.IsStopped(); }
     std::chrono::nanoseconds RanFor() const override { return core_.RanFor(); }
@@ -156,9 +156,10 @@ class GdbTarget final : public Target {
     std::optional<MemoryPort> liveMemory_;
     Core core_;
     std::optional<RegisterNumbers> registers_;
-    std::optional<std::string> look_;  ///< the mailbox, while nothing has gone on since
-    std::string crash_;                ///< that ended what Run began; nobody need wait for it
-    bool started_ = false;             ///< by Run, and neither halted nor reset since
+    std::optional<std::string>
+        mailboxBytes_;      ///< as read last, until something may have changed them
+    std::string crash_;     ///< that ended what Run began; nobody need wait for it
+    bool started_ = false;  ///< by Run, and neither halted nor reset since
     bool liveTried_ = false;
 };
 

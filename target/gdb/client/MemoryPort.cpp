@@ -12,6 +12,11 @@ namespace target::gdb {
 
 namespace {
 
+// A transfer goes out in blocks, one after the other. When one fails, those before it have been
+// made and those behind it haven't. Blocks end at multiples of a word, so that none is moved in
+// two halves. Nothing is told of how far a transfer came, so whoever gets an error takes all of
+// it for unknown.
+
 constexpr std::size_t kWord = 4;
 
 // How many of the next bytes make a block that ends at a multiple of 4, if there are at most

@@ -15,6 +15,11 @@ namespace target::gdb {
 
 namespace {
 
+// A load has a fixed order: the file is read and found to fit before anything is written; then
+// the mailbox as zeros (both blocks done), the segments, the comparison, and last the registers.
+// After an error in between, RAM holds a part of a program and the registers don't lead there.
+// The target is halted all the time, and a further load begins anew.
+
 constexpr std::size_t kDocumentSizeMax = std::size_t{1} << 20;
 
 // More than programs of this kind use.
@@ -76,7 +81,7 @@ void GdbTarget::LoadSegments(const std::string& path) {
         throw ProtocolError(
             "isn't asked: where the RAM ends isn't known; "
             "--gdb-option ram-end=ADDRESS tells it");
-    look_.reset();
+    mailboxBytes_.reset();
     memory_.Write(mailbox_.address, std::string(mailbox_.sizeBytes, '\0'));
     for (const LoaderFile::Segment& segment : loader.segments)
         memory_.Write(segment.address, segment.bytes);

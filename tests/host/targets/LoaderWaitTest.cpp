@@ -3,19 +3,16 @@
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
-#include <unistd.h>
 
-#include <filesystem>
-#include <fstream>
 #include <functional>
 #include <random>
-#include <sstream>
 
 #include "host/cli/CommandLine.h"
 #include "host/commands/Commands.h"
 #include "host/facts/LoaderMemory.h"
 #include "host/targets/LoaderWait.h"
 #include "target/simulated/Contents.h"
+#include "tests/support/TemporaryDirectory.h"
 #include "tests/support/VirtualTime.h"
 
 namespace host {
@@ -32,7 +29,7 @@ class Board final : public target::Target, public LoaderObserver {
     nanoseconds now{0};
     nanoseconds exchange{30us};
     std::function<nanoseconds()> chunkTime = [] { return 0ns; };
-    bool looksStopIt = false;
+    bool stopsForReads = false;
     bool loseAnswers = false;
     bool interrupted = false;
     std::string log;
@@ -68,7 +65,7 @@ class Board final : public target::Target, public LoaderObserver {
         GoOn();
         now += time;
     }
-    bool LooksStopIt() const override { return looksStopIt; }
+    bool StopsForReads() const override { return stopsForReads; }
     bool StandsStill() const override { return still_; }
     nanoseconds RanFor() const override { return (still_ ? stoppedAt_ : now) - stood_; }
 
@@ -82,7 +79,7 @@ class Board final : public target::Target, public LoaderObserver {
         ++packets;
     }
     void Stop() {
-        if (!looksStopIt || still_) return;
+        if (!stopsForReads || still_) return;
         still_ = true;
         looked_ = false;
         stoppedAt_ = now;
@@ -108,7 +105,7 @@ class Board final : public target::Target, public LoaderObserver {
     bool looked_ = false;
 };
 
-struct Rig {
+struct Fixture {
     Board board;
     LoaderWait wait{board, board, [this] { return board.interrupted; }};
     bool streams = false;
@@ -135,67 +132,67 @@ struct Rig {
 /// Hands chunks over as the plug-in does. What that takes is little beside what it must take: with
 /// stops, 7 exchanges for two chunks and their flash's time; without, 3 for each or its flash's
 /// time.
-void Stream(Rig& rig, std::chrono::microseconds chunkTime, int variationPercent) {
+void Stream(Fixture& fixture, std::chrono::microseconds chunkTime, int variationPercent) {
     constexpr std::uint32_t kChunks = 512;
     std::mt19937 random(1);
     nanoseconds flash{0};
-    rig.streams = true;
-    rig.board.chunkTime = [&] {
+    fixture.streams = true;
+    fixture.board.chunkTime = [&] {
         const int share = static_cast<int>(random() % 1000) - 500;
         const nanoseconds time = chunkTime + chunkTime * variationPercent * share / 50000;
         flash += time;
         return time;
     };
-    rig.Start();
+    fixture.Start();
     for (std::uint32_t chunk = 0; chunk < kChunks; ++chunk) {
-        rig.HandOver(chunk);
+        fixture.HandOver(chunk);
         if (chunk > 0) {
-            EXPECT_FALSE(rig.IsPending(chunk - 1));
+            EXPECT_FALSE(fixture.IsPending(chunk - 1));
         }
     }
-    rig.wait.AwaitIdle();
-    const nanoseconds exchanges = kChunks * rig.board.exchange;
+    fixture.wait.AwaitIdle();
+    const nanoseconds exchanges = kChunks * fixture.board.exchange;
     const nanoseconds limit =
-        rig.board.looksStopIt ? exchanges * 7 / 2 + flash : std::max(exchanges * 3, flash);
-    const auto all =
-        fmt::format("{} us an exchange, {} us a chunk +-{} %: {} of {} ns, {} stops, {} packets",
-                    rig.board.exchange / 1us, chunkTime.count(), variationPercent,
-                    rig.board.now.count(), limit.count(), rig.board.stops, rig.board.packets);
-    EXPECT_LE(rig.board.now, limit + limit / 8) << all;
-    EXPECT_LE(rig.board.stops, rig.board.looksStopIt ? kChunks * 55 / 100 : 0) << all;
-    EXPECT_LE(rig.board.packets, kChunks * 365 / 100) << all;
+        fixture.board.stopsForReads ? exchanges * 7 / 2 + flash : std::max(exchanges * 3, flash);
+    const auto all = fmt::format(
+        "{} us an exchange, {} us a chunk +-{} %: {} of {} ns, {} stops, {} packets",
+        fixture.board.exchange / 1us, chunkTime.count(), variationPercent,
+        fixture.board.now.count(), limit.count(), fixture.board.stops, fixture.board.packets);
+    EXPECT_LE(fixture.board.now, limit + limit / 8) << all;
+    EXPECT_LE(fixture.board.stops, fixture.board.stopsForReads ? kChunks * 55 / 100 : 0) << all;
+    EXPECT_LE(fixture.board.packets, kChunks * 365 / 100) << all;
 }
 
 TEST(LoaderWait, LosesLittleAndStopsSeldom) {
-    for (const bool looksStopIt : {false, true})
+    for (const bool stopsForReads : {false, true})
         for (const auto exchange : {50us, 1000us, 3000us, 10000us})
             for (const auto chunkTime : {200us, 5000us, 20000us})
                 for (const int variationPercent : {0, 10}) {
-                    Rig rig;
-                    rig.board.exchange = exchange;
-                    rig.board.looksStopIt = looksStopIt;
-                    Stream(rig, chunkTime, variationPercent);
+                    Fixture fixture;
+                    fixture.board.exchange = exchange;
+                    fixture.board.stopsForReads = stopsForReads;
+                    Stream(fixture, chunkTime, variationPercent);
                 }
 }
 
 // What was learned from one that hung for a while is forgotten soon.
 TEST(LoaderWait, FollowsTheFlash) {
-    for (const bool looksStopIt : {false, true}) {
-        Rig rig;
-        rig.board.looksStopIt = looksStopIt;
-        rig.streams = true;
-        rig.Start();
+    for (const bool stopsForReads : {false, true}) {
+        Fixture fixture;
+        fixture.board.stopsForReads = stopsForReads;
+        fixture.streams = true;
+        fixture.Start();
         std::uint32_t chunk = 0;
         const auto stream = [&](std::chrono::microseconds chunkTime) {
-            rig.board.chunkTime = [=] { return chunkTime; };
-            const nanoseconds before = rig.board.now;
+            fixture.board.chunkTime = [=] { return chunkTime; };
+            const nanoseconds before = fixture.board.now;
             for (int i = 0; i < 100; ++i, ++chunk) {
-                rig.HandOver(chunk);
+                fixture.HandOver(chunk);
                 if (chunk > 0) {
-                    EXPECT_FALSE(rig.IsPending(chunk - 1));
+                    EXPECT_FALSE(fixture.IsPending(chunk - 1));
                 }
             }
-            return rig.board.now - before;
+            return fixture.board.now - before;
         };
         EXPECT_LE(stream(5ms), 550ms);
         EXPECT_LE(stream(40ms), 4400ms);
@@ -205,73 +202,53 @@ TEST(LoaderWait, FollowsTheFlash) {
 }
 
 TEST(LoaderWait, AwaitsTheLoaderBeforeItIsStopped) {
-    Rig rig;
-    rig.board.chunkTime = [] { return 1500ms; };
-    rig.wait.Halt();  // nothing was started: the status words are arbitrary
-    EXPECT_EQ(rig.board.looks, 0);
-    rig.Start();
-    rig.HandOver(0);
-    EXPECT_TRUE(rig.IsPending(0));  // after the plug-in's interval, and not before
-    EXPECT_GE(rig.board.now, 100ms);
-    rig.wait.Read(nullptr, 1, 0x40, 0, 1);
-    rig.HandOver(1);
-    rig.wait.Halt();
-    rig.Start();
-    rig.board.chunkTime = [] { return 31s; };
-    rig.HandOver(2);
-    EXPECT_THROW(rig.wait.Reset(false), target::TargetError);
-    rig.wait.Reset(false);
-    rig.Start();
-    rig.HandOver(3);
-    EXPECT_THROW(rig.wait.Halt(), target::TargetError);
-    rig.Start();
-    rig.board.loseAnswers = true;
-    rig.board.chunkTime = [] { return 1s; };
-    EXPECT_THROW(rig.HandOver(4), target::TargetError);
-    rig.wait.Halt();  // it was waited for, but nobody knows what the loader got
-    rig.board.loseAnswers = false;
-    rig.Start();
-    rig.HandOver(5);
-    rig.board.interrupted = true;
-    EXPECT_TRUE(rig.IsPending(5));
-    rig.wait.Halt();
-    EXPECT_EQ(rig.board.log,
+    Fixture fixture;
+    fixture.board.chunkTime = [] { return 1500ms; };
+    fixture.wait.Halt();  // nothing was started: the status words are arbitrary
+    EXPECT_EQ(fixture.board.looks, 0);
+    fixture.Start();
+    fixture.HandOver(0);
+    EXPECT_TRUE(fixture.IsPending(0));  // after the plug-in's interval, and not before
+    EXPECT_GE(fixture.board.now, 100ms);
+    fixture.wait.Read(nullptr, 1, 0x40, 0, 1);
+    fixture.HandOver(1);
+    fixture.wait.Halt();
+    fixture.Start();
+    fixture.board.chunkTime = [] { return 31s; };
+    fixture.HandOver(2);
+    EXPECT_THROW(fixture.wait.Reset(false), target::TargetError);
+    fixture.wait.Reset(false);
+    fixture.Start();
+    fixture.HandOver(3);
+    EXPECT_THROW(fixture.wait.Halt(), target::TargetError);
+    fixture.Start();
+    fixture.board.loseAnswers = true;
+    fixture.board.chunkTime = [] { return 1s; };
+    EXPECT_THROW(fixture.HandOver(4), target::TargetError);
+    fixture.wait.Halt();  // it was waited for, but nobody knows what the loader got
+    fixture.board.loseAnswers = false;
+    fixture.Start();
+    fixture.HandOver(5);
+    fixture.board.interrupted = true;
+    EXPECT_TRUE(fixture.IsPending(5));
+    fixture.wait.Halt();
+    EXPECT_EQ(fixture.board.log,
               "halt@0 load@0 run@0 handing handed 0x0-0x7ff@1533 read@1533 handing handed "
               "0x800-0xfff@3033 halt@3033 load@3033 run@3033 handing handed reset@33033 "
               "load@33033 run@33033 handing handed halt@63033 load@63033 run@63033 handing "
               "halt@66082 load@66082 run@66082 handing handed halt@66082 ");
 }
 
-std::string Contents(const std::string& path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
-}
-
-std::string TemporaryName(const char* what) {
-    return std::filesystem::temp_directory_path() /
-           fmt::format("loader-test-{}-{}", getpid(), what);
-}
-
 /// corvane-flash program, in this process, with files of its own.
 struct Tool {
-    Tool() {
-        std::filesystem::remove(image);
-        std::filesystem::remove(contents);
-    }
-    ~Tool() {
-        std::filesystem::remove(image);
-        std::filesystem::remove(contents);
-        std::filesystem::remove(trace);
-    }
-
     Outcome Program(const std::string& bytes, const std::string& base,
                     const std::vector<std::string>& more = {}) {
-        std::ofstream(image) << bytes;
+        directory.Write("image", bytes);
         Reporter reporter({Verbosity::Quiet, false, "none"});
         SettingStore settings;
-        std::vector<std::string> words{"program", image, "--base",   base,
-                                       "--sim",   sim,   "--plugin", FLASH_CORVANE_LIBRARY};
+        std::vector<std::string> words{
+            "program",  directory.File("image"), "--base", base, "--sim", sim,
+            "--plugin", FLASH_CORVANE_LIBRARY};
         words.insert(words.end(), more.begin(), more.end());
         const ParsedLine line = ParseCommandLine(AllCommands(), FollowLine(AllCommands(), words));
         Context context{line.common, reporter, settings};
@@ -280,12 +257,13 @@ struct Tool {
 
     /// The same on a device that stays. How many bytes were erased and written.
     std::pair<int, int> Update(const std::string& bytes, bool rewrite = false) {
-        std::vector<std::string> options{"--sim-file", contents, "--trace", trace};
+        std::vector<std::string> options{"--sim-file", directory.File("contents"), "--trace",
+                                         directory.File("trace")};
         if (rewrite) options.emplace_back("--rewrite");
         const Outcome outcome = Program(bytes, "0", options);
         EXPECT_EQ(outcome.status, ExitStatus::Done) << outcome.error;
-        const auto device =
-            target::DecodeContents(Contents(contents), target::ParseDeviceOptions(sim));
+        const auto device = target::DecodeContents(test::Contents(directory.File("contents")),
+                                                   target::ParseDeviceOptions(sim));
         const auto flash = device->FlashContents();
         EXPECT_TRUE(std::equal(bytes.begin(), bytes.end(), flash.begin(),
                                [](char a, std::uint8_t b) { return a == static_cast<char>(b); }));
@@ -304,9 +282,7 @@ struct Tool {
     std::string sim = "quen,flash=32K";
     std::string counts;  ///< how often each of the first pages was erased
     int looked = 0;
-    const std::string image = TemporaryName("image");
-    const std::string contents = TemporaryName("contents");
-    const std::string trace = TemporaryName("trace");
+    const test::TemporaryDirectory directory;
 };
 
 TEST(Program, LosesNoChunkHoweverSlowTheLoader) {
@@ -346,7 +322,7 @@ TEST(Program, LeavesAloneWhatIsThere) {
     EXPECT_EQ(tool.Update(image), Work(0, 0));
     EXPECT_EQ(tool.looked, 0x3000);
     EXPECT_EQ(tool.counts, "1111111111110000");
-    EXPECT_EQ(Contents(tool.trace).find("LoadProgram"), std::string::npos);
+    EXPECT_EQ(test::Contents(tool.directory.File("trace")).find("LoadProgram"), std::string::npos);
 
     image[0x7FF] = 'y';
     EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
@@ -358,7 +334,7 @@ TEST(Program, LeavesAloneWhatIsThere) {
 
     image.assign(0x8000, 'w');
     EXPECT_EQ(tool.Update(image), Work(0x8000, 0x8000));  // all at once
-    EXPECT_NE(Contents(tool.trace).find("0xa4420004"), std::string::npos);
+    EXPECT_NE(test::Contents(tool.directory.File("trace")).find("0xa4420004"), std::string::npos);
     image[0] = 'v';
     EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
 }
