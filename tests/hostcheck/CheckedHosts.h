@@ -118,7 +118,7 @@ class CheckedHost final : public StrictHost {
 /// What makes another host of a good one.
 using Spoil = std::function<void(CheckedHost& host)>;
 
-/// A fault of a host, and the line that tells it, which is the first one of a failure.
+/// A fault of a host, and a part of the line that tells it, which is the first one of a failure.
 struct FaultyHost {
     const char* found;
     Spoil spoil;

@@ -55,26 +55,24 @@ Spoil HaltingLate(const char* (*halt)(H& host, const H::Slot& was)) {
 
 const FaultyHost kFaultyCores[] = {
     {"HaltTarget: expected null; came the error text \"no\"", Failing(&H::halt, "no")},
-    {"HaltTarget: expected null for a target that is halted already; came the error text \"halted",
+    {"expected null for a target that is halted already; came the error text \"halted",
      On(&H::halt, [n = 0](auto&...) mutable { return n++ > 0 ? "halted" : nullptr; })},
     {"ResetTarget: expected null for either flag; came the error text \"100 % no\"",
      On(&H::reset, [](auto&, auto& reset, bool flag) { return reset(flag), "100 % no"; })},
     {"ResetTarget: expected null for either flag; came the error text \"no flag\"",
      On(&H::reset, [](auto&, auto& reset, bool flag) { return flag ? reset(flag) : "no flag"; })},
-    {"ResetTarget: expected registers that are reset; came 0x00004000, as it was written before, "
-     "when the flag is true",
+    {"that are reset; came 0x00004000, as it was written before, when the flag is true",
      Failing(&H::reset, nullptr)},
-    {"ResetTarget: expected registers that are reset; came 0x00004000, as it was written before, "
-     "when the flag is false",
+    {"that are reset; came 0x00004000, as it was written before, when the flag is false",
      On(&H::reset, [](H& h, auto& reset, bool flag) { return flag ? reset(flag) : h.halt(); })},
     // Lets run what was there, and the program in flash: in silence, or so that nothing is loaded.
-    {"ResetTarget: expected a loader that is stopped, with either flag; came a loader that took a",
+    {"expected a loader that is stopped, with either flag; came a loader that took a",
      On(&H::reset,
         [](H& h, auto& reset, bool flag) {
             const char* const error = reset(flag);
             return h.target.Run(), error;
         })},
-    {"ResetTarget: expected a target that is left halted, so that RAM stays; came 00 00 00 00",
+    {"expected a target that is left halted, so that RAM stays; came 00 00 00 00",
      On(&H::reset,
         [](H& h, auto& reset, bool flag) {
             On(&H::sleep, [](H& host, auto& sleep, uint32_t milliseconds) {
@@ -83,8 +81,7 @@ const FaultyHost kFaultyCores[] = {
             })(h);
             return reset(flag);
         })},
-    {"ResetTarget: expected a target that is left halted, ready for LoadProgram; came the error "
-     "text \"the target runs\"",
+    {"is left halted, ready for LoadProgram; came the error text \"the target runs\"",
      [](H& host) {
          static bool runs = false;
          On(&H::reset, [](auto&, auto& reset, bool flag) {
@@ -106,7 +103,7 @@ const FaultyHost kFaultyCores[] = {
      SleepsInstead([](uint32_t ms) { return ms * 10; })},
     {"Sleep: expected pauses that don't last many times as long; came 2001.00 ms for 20",
      SleepsInstead([](uint32_t ms) { return ms * 100; })},
-    {"Sleep: expected pauses that last as long as was asked; came the error text \"no time\"",
+    {"expected pauses that last as long as was asked; came the error text \"no time\"",
      Failing(&H::sleep, "no time")},
     {"HaltTarget: expected null after a reset; came the error text \"no\"",
      FailingHalt("a target that is left halted, so that RAM stays")},
@@ -118,24 +115,19 @@ const FaultyHost kFaultyCores[] = {
      Failing(&H::directory, "/opt")},
     {"GetDirectory: expected a text that ends in a path separator; came null",
      Failing(&H::directory, nullptr)},
-    {"GetDirectory: expected a text that ends in a path separator; came a text that changed",
+    {"expected a text that ends in a path separator; came a text that changed",
      On(&H::directory, [](auto&...) { return Dangling("/opt/"); })},
     {"LoadProgram: expected null for the loader; came the error text \"no file\"",
      Failing(&H::load, "no file")},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
-     "0xFFFFFFFF and 0xFFFFFFFF\n",
+    {"do\" in the two status words, whatever RAM held; came 0xFFFFFFFF and 0xFFFFFFFF\n",
      Failing(&H::load, nullptr)},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
-     "0x00000000 and 0xFFFFFFFF\n",
+    {"do\" in the two status words, whatever RAM held; came 0x00000000 and 0xFFFFFFFF\n",
      On(&H::load, [](H& h, auto&) { return h.target.SetStatus(0, 0), nullptr; })},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came the error"
-     " text \"no status\"",
+    {"do\" in the two status words, whatever RAM held; came the error text \"no status\"",
      FailingStatus(true)},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came the error"
-     " text \"no status\"",
+    {"do\" in the two status words, whatever RAM held; came the error text \"no status\"",
      FailingStatus(false)},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
-     "0xFFFFFFFF, which a write doesn't change",
+    {"two status words, whatever RAM held; came 0xFFFFFFFF, which a write doesn't change",
      [](H& host) {
          Fail(host.load, nullptr);
          Bent([n = 0](Transfer& t, auto&) mutable {
@@ -146,31 +138,27 @@ const FaultyHost kFaultyCores[] = {
      Failing(&H::run, "no start")},
     {"RunTarget: expected null for the loader, at once; came null after 3.0",
      AfterRun([](auto&) { std::this_thread::sleep_for(std::chrono::seconds(3)); })},
-    {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 "
-     "after "
-     "1 s: the loader hangs",
+    {"takes the chunk in block 0; came \"to do\" in block 0 after 1 s: the loader hangs",
      Failing(&H::run, nullptr)},
     // One step.
-    {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 "
-     "after",
+    {"expected a loader that takes the chunk in block 0; came \"to do\" in block 0 after",
      AfterRun([](H& h) { h.target.Halt(); })},
-    {"RunTarget: expected a loader that takes the chunk in block 0; came other bytes at 0x20001004",
+    {"expected a loader that takes the chunk in block 0; came other bytes at 0x20001004",
      Bent([](Transfer& t, auto&) {
          if (t.Writes() && t.address == 0x20001004) t.count = 4;
      })},
     // The loader starts anew after each chunk.
-    {"RunTarget: expected a loader that takes the one in block 1 next; came \"to do\" in block 1",
+    {"expected a loader that takes the one in block 1 next; came \"to do\" in block 1",
      Bent([](Transfer& t, H& h) {
          if (t.Writes() && t.address == 0x20001014 && t.count == 12) h.target.Run();
      })},
-    {"RunTarget: expected a loader that takes two chunks handed over at once; came \"to do\" in "
-     "blo",
+    {"expected a loader that takes two chunks handed over at once; came \"to do\" in blo",
      Bent([n = 0](Transfer& t, H& h) mutable {
          if (t.Writes() && t.count == 12 && ++n == 4) h.target.Halt();
      })},
-    {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 af",
+    {"expected a loader that takes the chunk in block 0; came \"to do\" in block 0 af",
      On(&H::sleep, [](H& h, auto& sleep, auto ms) { return h.target.Halt(), sleep(ms); })},
-    {"ReadMemory: expected a status of block 1 other than 0xFFFFFFFF while the loader runs; came",
+    {"expected a status of block 1 other than 0xFFFFFFFF while the loader runs; came",
      AfterRun([](H& h) { h.target.SetStatus(1, 0xFFFFFFFF); })},
     {"HaltTarget: expected a loader that is stopped; came a loader that took a chunk",
      HaltingLate([](H& h, auto&) {
@@ -184,20 +172,18 @@ const FaultyHost kFaultyCores[] = {
          const char* const error = halt();
          return h.target.running = ran, error;
      })},
-    {"HaltTarget: expected no halt before the loader has done its last chunk; came \"to do\", so",
+    {"expected no halt before the loader has done its last chunk; came \"to do\", so",
      On(&H::halt, [](H& h, auto&) { return h.target.Halt(), h.loaderRuns = false, nullptr; })},
-    {"HaltTarget: expected no halt before the loader has done its last chunk; came the error text",
+    {"expected no halt before the loader has done its last chunk; came the error text",
      [](H& h) { h.target.chunkTime = std::chrono::milliseconds(700); }},
-    {"ResetTarget: expected no reset before the loader has done its last chunk; came \"to do\", so",
+    {"expected no reset before the loader has done its last chunk; came \"to do\", so",
      On(&H::reset,
         [](H& h, auto&, bool) { return h.target.Reset(), h.loaderRuns = false, nullptr; })},
-    {"ReadMemory: expected no read of flash before the loader has done its last chunk; came \"to "
-     "do",
+    {"expected no read of flash before the loader has done its last chunk; came \"to do",
      On(&H::move, [](H& h, auto&, auto& t) { return h.target.Move(t); })},
     {"ReadMemory: expected the flash as it was; came",
      AfterRun([](H& h) { h.target.flash[2047] ^= 1; })},
-    {"WriteMemory: expected RAM on the page given to WriteDataToFlash; came the error text \"no "
-     "mem",
+    {"expected RAM on the page given to WriteDataToFlash; came the error text \"no mem",
      Bent([](Transfer& t, H& h) {
          if (h.Told("null after a reset") && t.Writes() && t.count == 4) t.address = 0x10000000;
      })},

@@ -66,46 +66,40 @@ void Overrun(const Transfer& t, ptrdiff_t offset) {
 }
 
 const FaultyHost kFaultyMemory[] = {
-    {"ReadMemory: expected the identification register at 0x400FE000; came 0xFFFFFFFF: nothing ans",
+    {"expected the identification register at 0x400FE000; came 0xFFFFFFFF: nothing ans",
      [](H& h) { h.target.registers[0x400FE000] = 0xFFFFFFFF; }},
-    {"ReadMemory: expected the identification register at 0x400FE000; came 0x00000000: nothing ans",
+    {"expected the identification register at 0x400FE000; came 0x00000000: nothing ans",
      [](H& h) { h.target.registers[0x400FE000] = 0; }},
-    {"ReadMemory: expected the identification register at 0x400FE000; came bytes behind the buffer,"
-     " which has room for 4\n",
+    {"register at 0x400FE000; came bytes behind the buffer, which has room for 4\n",
      Bent([](Transfer& t, auto&) { return t.Reads() ? Overrun(t, 4) : void(); })},
-    {"ReadMemory: expected the identification register at 0x400FE000; came the error text \"no mem",
+    {"expected the identification register at 0x400FE000; came the error text \"no mem",
      Refused("no memory", [n = 0](auto&) mutable { return n++ == 0; })},
-    {"ReadMemory: expected a word of RAM during CreateFlashDevice2; came bytes in front of the buf",
+    {"expected a word of RAM during CreateFlashDevice2; came bytes in front of the buf",
      Bent([](Transfer& t, auto&) {
          if (t.Reads() && t.address >= kRam && t.address < kRegisters) Overrun(t, -1);
      })},
-    {"ReadMemory: expected registers with the least significant byte first; came 0x00000A10 for "
-     "0x100A0000, with which",
+    {"with the least significant byte first; came 0x00000A10 for 0x100A0000, with which",
      TurnedRegisters(0x100A0000, 0)},
-    {"ReadMemory: expected registers with the least significant byte first; came 0x00000510 for "
-     "0x10050000, with which",
+    {"with the least significant byte first; came 0x00000510 for 0x10050000, with which",
      TurnedRegisters(0x10050000, 0x00FF007F)},
-    {"WriteMemory: expected the flash address register at 0x400FD000 as it was written; came "
-     "0x00800000 instead of 0x00008000\n",
+    {"register at 0x400FD000 as it was written; came 0x00800000 instead of 0x00008000\n",
      Turned(kRegisters, ~0ULL)},
     // Byte by byte, of which the register takes the last.
-    {"WriteMemory: expected the flash address register at 0x400FD000 as it was written; came "
-     "0x00000000 instead",
+    {"flash address register at 0x400FD000 as it was written; came 0x00000000 instead",
      Bent([](Transfer& t, auto&) {
          t.address += t.Writes() && t.address > kRegisters ? 0x1000 : 0;
      })},
-    {"WriteMemory: expected the flash address register at 0x400FD000 as it was written; came the "
-     "er",
+    {"expected the flash address register at 0x400FD000 as it was written; came the er",
      Bent(
          [](Transfer& t, auto&) { t.width = t.Writes() && t.address > kRegisters ? 1 : t.width; })},
-    {"HaltTarget: expected registers as they were; came 0x00000000 instead of 0x00004000 after the",
+    {"expected registers as they were; came 0x00000000 instead of 0x00004000 after the",
      On(&H::halt, [](H& h, auto& halt) { return h.target.Reset(), halt(); })},
-    {"WriteMemory: expected the same bytes in all widths, in the order of the buffer; came",
+    {"expected the same bytes in all widths, in the order of the buffer; came",
      Turned(0, kRegisters)},
     // Counts of bytes and of halfwords.
-    {"WriteMemory: expected the same bytes in all widths, in the order of the buffer; came",
+    {"expected the same bytes in all widths, in the order of the buffer; came",
      Bent([](Transfer& t, auto&) { t.width = t.count > 1 ? 1 : t.width; })},
-    {"WriteMemory: expected the same bytes in all widths, in the order of the buffer; came",
+    {"expected the same bytes in all widths, in the order of the buffer; came",
      Bent([](Transfer& t, auto&) { t.count = t.count > 1 ? t.count / 2 : 1; })},
     // A word for less; one byte too long; whole words; whole pieces, where there are several.
     {"WriteMemory: expected no change beside what is written; came", Bent([](Transfer& t, auto&) {
@@ -135,7 +129,7 @@ const FaultyHost kFaultyMemory[] = {
              h.target.Move({static_cast<char*>(t.to) + at, t.from, 2048, t.address + at, 1});
          t = {static_cast<char*>(t.to) + 2048, nullptr, 2048, t.address, 1};
      })},
-    {"ReadMemory: expected 2048 bytes of flash on page 0; came the error text \"no memory\"",
+    {"expected 2048 bytes of flash on page 0; came the error text \"no memory\"",
      Bent([](Transfer& t, auto&) { t.address = t.page ? t.address : kNowhere; })},
     {"ReadMemory: expected 32752 bytes of flash in one call; came a5 a5",
      Bent([](Transfer& t, auto&) { t.count = std::min<size_t>(t.count, 16384); })},
@@ -151,48 +145,43 @@ const FaultyHost kFaultyMemory[] = {
      Bent([](Transfer& t, auto&) {
          if (t.address == kNowhere) t = {t.to, t.from, 0, kRam, 1};
      })},
-    {"ReadMemory: expected an error text at 0x10000000, where nothing is; came a text that changed",
+    {"expected an error text at 0x10000000, where nothing is; came a text that changed",
      On(&H::move,
         [](auto&, auto& move, auto& t) {
             return t.address == kNowhere ? Dangling("not mapped") : move(t);
         })},
-    {"WriteMemory: expected an error text at 0x10000000, where nothing is; came an exception",
+    {"expected an error text at 0x10000000, where nothing is; came an exception",
      Bent([](Transfer& t, auto&) {
          return t.Writes() && t.address == kNowhere ? throw 1 : void();
      })},
-    {"ReadMemory: expected success after an access that failed; came the error text \"no memory\"",
+    {"expected success after an access that failed; came the error text \"no memory\"",
      Refused("no memory",
              [failed = 0](auto& t) mutable {
                  failed += t.address == kNowhere;
                  return failed == 2 && t.Reads();
              })},
-    {"ReadMemory: expected flash on the page given to WriteDataToFlash; came the error text \"no m",
+    {"expected flash on the page given to WriteDataToFlash; came the error text \"no m",
      Refused("no memory", [](auto& t) { return t.page == 1 && IsFlash(t.address); })},
     {"ReadMemory: expected flash on the page given to WriteDataToFlash; came",
      Bent([](Transfer& t, auto&) { t.address += t.page == 1 && IsFlash(t.address); })},
-    {"ReadMemory: expected flash as it is now, not as it was read before; came the bytes of the "
-     "ROM",
+    {"expected flash as it is now, not as it was read before; came the bytes of the ROM",
      On(&H::reset, [](H& h, auto& reset, bool flag) { return Cached(IsFlash)(h), reset(flag); })},
     {"WriteMemory: expected 2048 bytes of RAM while the program runs; came",
      Bent([](Transfer& t, H& h) { t.count = t.Writes() && h.target.running ? 0 : t.count; })},
-    {"WriteMemory: expected 2048 bytes of RAM while the program runs; came the error text \"no mem",
+    {"expected 2048 bytes of RAM while the program runs; came the error text \"no mem",
      Bent([](Transfer& t, H& h) {
          t.address = t.Writes() && h.target.running ? kNowhere : t.address;
      })},
-    {"ResetTarget: expected registers that are reset; came 0x00004000, as it was written before, "
-     "when the flag is true",
+    {"that are reset; came 0x00004000, as it was written before, when the flag is true",
      Cached([](uint64_t address) { return address > kRegisters; })},
-    {"RunTarget: expected a loader that takes the chunk in block 0; came \"to do\" in block 0 "
-     "after "
-     "1 s",
+    {"a loader that takes the chunk in block 0; came \"to do\" in block 0 after 1 s",
      On(&H::run,
         [](H& h, auto& run) {
             if (h.Told("Host check, WriteDataToFlash"))
                 Cached([](uint64_t address) { return address == 0x2000100C; })(h);
             return run();
         })},
-    {"LoadProgram: expected no \"to do\" in the two status words, whatever RAM held; came "
-     "0xFFFFFFFF and 0xFFFFFFFF",
+    {"do\" in the two status words, whatever RAM held; came 0xFFFFFFFF and 0xFFFFFFFF",
      Cached([](uint64_t address) { return address / 32 == 0x20001000 / 32; })},
 };
 

@@ -45,87 +45,76 @@ string Upper(const string& text) {
 }
 
 const FaultyHost kFaultySettings[] = {
-    {R"(GetProperty: expected null for a setting that the host hasn't; came "" for "FlashHostC)",
+    {"expected null for a setting that the host hasn't; came \"\" for \"FlashHostC",
      On(&H::get, [](auto&, auto& get, auto* name) { return get(name) ? get(name) : ""; })},
-    {R"(GetProperty: expected null for a setting that the host hasn't; came "64KB" for "")",
+    {"expected null for a setting that the host hasn't; came \"64KB\" for \"\"",
      On(&H::get, [](auto&, auto& get, auto* name) { return *name ? get(name) : "64KB"; })},
-    {"GetProperty: expected null for a setting that the host hasn't; came a pointer that leads to "
-     "no NUL-terminated text",
+    {"setting that the host hasn't; came a pointer that leads to no NUL-terminated text",
      Failing(&H::get, kNoText)},
-    {"GetProperty: expected null for a setting that the host hasn't; came an exception: \"no key\"",
+    {"expected null for a setting that the host hasn't; came an exception: \"no key\"",
      On(&H::get, [](auto&...) -> const char* { throw std::out_of_range("no key"); })},
-    {"GetProperty: expected keys compared whole, upper and lower case told apart; came \"0\" for "
-     "\"flashresetsetting\"",
+    {"whole, upper and lower case told apart; came \"0\" for \"flashresetsetting\"",
      [](H& h) { h.settings["flashresetsetting"] = "0"; }},
-    {R"(GetProperty: expected keys compared whole, upper and lower case told apart; came "0" for "F)",
+    {"expected keys compared whole, upper and lower case told apart; came \"0\" for \"F",
      Asked([](const string& key) { return key.substr(0, 16); })},
-    {R"(GetProperty: expected keys compared whole, upper and lower case told apart; came "0" for " )",
+    {"expected keys compared whole, upper and lower case told apart; came \"0\" for \" ",
      Asked([](const string& key) { return key.substr(key.starts_with(' ')); })},
-    {"GetProperty: expected a value for each setting that a load reads; came null for FlashTimeout",
+    {"expected a value for each setting that a load reads; came null for FlashTimeout",
      Without({"FlashTimeoutValue"})},
-    {"GetProperty: expected a value for each setting that a load reads; came null for "
-     "FlashProgramOption FlashProgramBlankCheckOption FlashProgramCRCOption\n",
+    {"null for FlashProgramOption FlashProgramBlankCheckOption FlashProgramCRCOption\n",
      Without({"FlashProgram"})},
-    {"GetProperty: expected a value for each setting that Erase reads; came null for "
-     "FlashEraseType FlashEraseEndAddr\n",
+    {"each setting that Erase reads; came null for FlashEraseType FlashEraseEndAddr\n",
      Without({"FlashEraseType", "FlashEraseEndAddr"})},
-    {"GetProperty: expected a value for each setting that BlankCheck reads; came null for "
-     "FlashBlankCheckSelection\n",
+    {"for each setting that BlankCheck reads; came null for FlashBlankCheckSelection\n",
      Without({"FlashBlankCheckSelection"})},
-    {"GetProperty: expected a value for each setting that CalculateChecksum reads; came null for "
-     "FlashChecksumStartAddr\n",
+    {"each setting that CalculateChecksum reads; came null for FlashChecksumStartAddr\n",
      Without({"FlashChecksumStartAddr"})},
-    {"GetProperty: expected a value for each setting that ProgramUserRegister0 reads; came null "
-     "for FlashUserRegister0Commit\n",
+    {"setting that ProgramUserRegister0 reads; came null for FlashUserRegister0Commit\n",
      Without({"FlashUserRegister0Commit"})},
-    {"GetProperty: expected a value for each setting that ProgramUserRegister1 reads; came null "
-     "for FlashUserRegister1Input\n",
+    {"setting that ProgramUserRegister1 reads; came null for FlashUserRegister1Input\n",
      Without({"FlashUserRegister1Input"})},
-    {"GetProperty: expected a value for each setting that ProgramMACAddress reads; came null for "
-     "FlashMACAddrCommit\n",
+    {"for each setting that ProgramMACAddress reads; came null for FlashMACAddrCommit\n",
      Without({"FlashMACAddrCommit"})},
-    {R"(GetProperty: expected values that the plug-in can read; came "yes" for FlashProgramCRCOption,)"
-     R"( which takes 0 or 1; "later" for FlashTimeoutValue, which takes a whole decimal number of )",
+    {"0 or 1; \"later\" for FlashTimeoutValue, which takes a whole decimal number of ",
      [](H& h) {
          h.settings["FlashProgramCRCOption"] = "yes";
          h.settings["FlashTimeoutValue"] = "later";
      }},
-    {R"(GetProperty: expected the same text when it is asked twice; came "3", then "4")",
+    {"GetProperty: expected the same text when it is asked twice; came \"3\", then \"4\"",
      On(&H::get,
         [n = 0](H& h, auto& get, auto* name) mutable {
             if (!strcmp(name, "FlashTimeoutValue")) h.settings[name] = std::to_string(++n);
             return get(name);
         })},
-    {R"(GetProperty: expected the same text when it is asked twice; came null, then "10")",
+    {"GetProperty: expected the same text when it is asked twice; came null, then \"10\"",
      On(&H::get,
         [n = 0](auto&, auto& get, auto* name) mutable {
             return !strcmp(name, "FlashCrystalFreq") && ++n < 4 ? nullptr : get(name);
         })},
-    {"GetProperty: expected a text that stays until the next call; came a text that changed",
+    {"expected a text that stays until the next call; came a text that changed",
      On(&H::get,
         [](auto&, auto& get, auto* name) { return get(name) ? Dangling(get(name)) : nullptr; })},
-    {"SetProperty: expected null for what the plug-in publishes; came the error text \"no setting",
+    {"expected null for what the plug-in publishes; came the error text \"no setting",
      On(&H::set,
         [](H& h, auto& set, const string& name, auto* value) {
             const bool known = h.settings.contains(name) || name == "FlashChecksumValue";
             return known ? set(name.c_str(), value) : "no setting";
         })},
-    {"SetProperty: expected null for what the plug-in publishes; came the error text \"empty\" for "
-     "DeviceInfoFamily as \"\"",
+    {"the plug-in publishes; came the error text \"empty\" for DeviceInfoFamily as \"\"",
      On(&H::set, [](auto&, auto& set, auto* name,
                     auto* value) { return *value ? set(name, value) : "empty"; })},
-    {R"(SetProperty: expected a copy of the value, which GetProperty returns; came "?" after "1")",
+    {"expected a copy of the value, which GetProperty returns; came \"?\" after \"1\"",
      On(&H::get, [](auto&, auto& get,
                     auto* name) { return strcmp(name, "FlashChecksumValue") ? get(name) : "?"; })},
-    {"SetProperty: expected a copy of the value, which GetProperty returns; came null after \"1\"",
+    {"expected a copy of the value, which GetProperty returns; came null after \"1\"",
      Failing(&H::set, nullptr)},
-    {R"(SetProperty: expected a copy of the value, which GetProperty returns; came "89ABCDEF" after)",
+    {"expected a copy of the value, which GetProperty returns; came \"89ABCDEF\" after",
      Stored(Upper)},
-    {R"(SetProperty: expected a copy of the value, which GetProperty returns; came "89" after)",
+    {"expected a copy of the value, which GetProperty returns; came \"89\" after",
      Stored([](const string& value) {
          return std::isdigit(value[0]) ? std::to_string(std::stoi(value)) : value;
      })},
-    {R"(SetProperty: expected a copy of the value, which GetProperty returns; came "Tolva" after)",
+    {"expected a copy of the value, which GetProperty returns; came \"Tolva\" after",
      Stored([](const string& value) { return value.substr(0, value.find(' ')); })},
     {"SetProperty: expected a copy of the value, which GetProperty returns; came \"?",
      On(&H::set,
@@ -140,7 +129,7 @@ const FaultyHost kFaultySettings[] = {
         })},
     {"SetProperty: expected a value of 40 characters kept whole; came \"7777",
      Stored([](const string& value) { return value.substr(0, 31); })},
-    {"SetProperty: expected no change of another setting; came another value for FlashChecksumSele",
+    {"expected no change of another setting; came another value for FlashChecksumSele",
      On(&H::set,
         [](auto&, auto& set, auto* name, const string& value) {
             if (value == "13579bdf") set("FlashChecksumSelection", "By Address Range");

@@ -5,15 +5,14 @@
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
 #include <map>
 #include <random>
 
 #include "host/base/Errors.h"
+#include "tests/support/TemporaryDirectory.h"
 
 namespace host::image {
 
@@ -291,16 +290,8 @@ TEST(ImageFile, RefusesToWriteElfAndHugeGaps) {
 
 // --- Files and other tools
 
-class ImageFiles : public testing::Test {
-  protected:
-    ImageFiles() { std::filesystem::create_directory(directory_); }
-    ~ImageFiles() override { std::filesystem::remove_all(directory_); }
-
-    const std::filesystem::path directory_ =
-        std::filesystem::path(testing::TempDir()) / fmt::format("image-files-{}", getpid());
-};
-
-TEST_F(ImageFiles, AgreeWithOtherTools) {
+TEST(ImageFiles, AgreeWithOtherTools) {
+    const test::TemporaryDirectory directory;
     std::mt19937 random(2);
     Image sparse;
     for (std::uint32_t i = 0; i < 40; ++i) {
@@ -314,8 +305,8 @@ TEST_F(ImageFiles, AgreeWithOtherTools) {
         std::ranges::copy(section.bytes, flat.begin() + section.address);
     }
     const Image filled = MakeImage({{0, flat}});
-    std::ofstream(directory_ / "in.hex") << FormatImage(sparse, Format::IntelHex);
-    std::ofstream(directory_ / "in.srec") << FormatImage(sparse, Format::SRecord);
+    directory.Write("in.hex", FormatImage(sparse, Format::IntelHex));
+    directory.Write("in.srec", FormatImage(sparse, Format::SRecord));
 
     const std::pair<std::string, const Image&> cases[] = {
         {"srec_cat in.hex -intel -o out -motorola", sparse},
@@ -329,14 +320,13 @@ TEST_F(ImageFiles, AgreeWithOtherTools) {
         {"objcopy -I srec -O ihex in.srec out", sparse},
     };
     for (const auto& [command, image] : cases) {
-        ASSERT_EQ(0, std::system(("cd '" + directory_.string() + "' && " + command).c_str()));
-        EXPECT_TRUE(image == ReadImageFile((directory_ / "out").string(), {{}, 0}).image)
-            << command;
-        std::filesystem::remove(directory_ / "out");
+        ASSERT_EQ(0, std::system(("cd '" + directory.Path().string() + "' && " + command).c_str()));
+        EXPECT_TRUE(image == ReadImageFile(directory.File("out"), {{}, 0}).image) << command;
+        std::filesystem::remove(directory.File("out"));
     }
 }
 
-TEST_F(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
+TEST(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
     const std::string firmware = FIRMWARE_DIRECTORY "/firmware";
     const Image image = ReadImageFile(firmware + ".bin", {{}, 0}).image;
     EXPECT_EQ(4568U, image.ByteCount());
@@ -344,8 +334,9 @@ TEST_F(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
     EXPECT_EQ(image, ReadImageFile(firmware + ".ihex", {}).image);
 }
 
-TEST_F(ImageFiles, SayWhyTheyCannotBeRead) {
-    const std::string path = directory_.string();
+TEST(ImageFiles, SayWhyTheyCannotBeRead) {
+    const test::TemporaryDirectory directory;
+    const std::string path = directory.Path();
     EXPECT_EQ("can't read the image file " + path + ": Is a directory",
               FailureOf([&] { ReadImageFile(path, {}); }));
     EXPECT_EQ("can't read the image file " + path + "/x: No such file or directory",
