@@ -233,9 +233,7 @@ void Check(const ToolRuns& runs, const Work& work, const std::string& fault, Sai
     runs.PutBack();
     said = runs.Run(work.words, fault);
     for (const std::string& text : runs.FalseClaims(work, said, ToolRuns::ReadDevice(fault)))
-        ADD_FAILURE() << "not true: " << text
-                      << "
-            --sim " << kDevice << fault << ' '
+        ADD_FAILURE() << "not true: " << text << "\n--sim " << kDevice << fault << ' '
                       << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
                       << said.text << said.end;
 }
