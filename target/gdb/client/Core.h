@@ -21,9 +21,8 @@
 //   comes, the program had stopped by itself.
 // - A crash is kept until Stop or RequireRunning throws it, as StoppedByItself. Nothing is running
 //   then.
-// - Events that arrived are taken in before each Resume and after each reset, in Stopped, where
-// they
-//   mean nothing.
+// - Events that arrived are taken in before each Resume and after each reset. The core is Stopped
+//   then, and they mean nothing.
 
 #pragma once
 
