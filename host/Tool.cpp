@@ -47,7 +47,7 @@ std::optional<FileBusy> SaveSettings(const Context& context) try {
 Outcome RunCommand(Reporter& reporter, const ParsedLine& line) {
     SettingStore settings;
     const CommonOptions& options = line.common;
-    if (line.command->readsSettings)
+    if (line.command->needs != Needs::Nothing)
         settings = LoadSettings(options.settingsFile.value_or(""), options.set, line.project);
     if (options.verbose >= 2) settings.SetUnlessChosen(keys::kVerbose, "1");
     Context context{options, reporter, settings};
@@ -113,8 +113,10 @@ int RunTool(const std::vector<std::string>& words) {
         return static_cast<int>(outcome.status);
     }
     Reporter reporter(ReporterOptions(line.common));
-    reporter.Begin(line.command->name);
+    const bool hasTarget = line.command->needs >= Needs::ServedTarget;
+    reporter.Begin(line.command->name, hasTarget ? ToJson(line.common) : Json(nullptr));
     outcome = Guarded(reporter, [&] { return RunCommand(reporter, line); });
+    if (outcome.status == ExitStatus::Done && !outcome.done.empty()) reporter.Done(outcome.done);
     outcome = CheckOutput(std::move(outcome), reporter.OutputError(), reporter);
     reporter.End(outcome);
     return static_cast<int>(outcome.status);

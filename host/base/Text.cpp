@@ -59,6 +59,13 @@ std::string RangeText(const base::AddressRange& range) {
     return fmt::format("{:#x}-{:#x}", range.first, range.last);
 }
 
+std::string RangesText(const std::vector<base::AddressRange>& ranges) {
+    std::string text;
+    for (std::size_t i = 0; i < ranges.size(); ++i)
+        text += (i == 0 ? "" : i + 1 < ranges.size() ? ", " : " and ") + RangeText(ranges[i]);
+    return text;
+}
+
 std::string SizeText(std::uint64_t bytes) {
     if (bytes < 1024) return CountText(bytes, "byte");
     constexpr std::array units{"KiB", "MiB", "GiB"};

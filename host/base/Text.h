@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <string>
+#include <vector>
 
 #include "base/AddressRange.h"
 
@@ -19,7 +20,9 @@ std::uint32_t ParseHexArgument(const std::string& text, const std::string& what)
 base::AddressRange ParseRange(const std::string& text);
 
 std::string RangeText(const base::AddressRange& range);  ///< "0x0-0x3ffff"
-std::string SizeText(std::uint64_t bytes);               ///< "5.5 KiB", "256 KiB", "12 bytes"
+/// "0x0-0x3, 0x8-0xb and 0x10-0x13"
+std::string RangesText(const std::vector<base::AddressRange>& ranges);
+std::string SizeText(std::uint64_t bytes);  ///< "5.5 KiB", "256 KiB", "12 bytes"
 std::string CountText(std::uint64_t count, const char* thing);  ///< "1 sector", "2 sectors"
 std::string DurationText(double seconds);                       ///< "320 ms", "4.2 s", "2:05"
 

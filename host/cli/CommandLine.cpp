@@ -77,6 +77,20 @@ std::string MissingArgument(const FollowedLine& line) {
     return "";
 }
 
+/// An option that the command would do nothing with.
+std::string UselessOption(const FollowedLine& line) {
+    if (line.command == nullptr || line.command->needs == Needs::Device) return "";
+    const bool served = line.command->needs == Needs::ServedTarget;
+    for (const GivenOption& given : line.given) {
+        const std::string name = given.row->LongName();
+        const bool used =
+            served && name == "--plugin" && (line.Has("--gdb") || line.Has("--board"));
+        if (given.row->isForPlugin && !used)
+            return fmt::format("{}: '{}' does nothing with it; leave it out", name, line.name);
+    }
+    return "";
+}
+
 /// What is wrong with the line, empty when nothing is. A line without a command is another matter.
 std::string Complaint(const CommandRows& commands, const FollowedLine& line) {
     const auto below = SecondWords(commands, line.name);
@@ -85,6 +99,7 @@ std::string Complaint(const CommandRows& commands, const FollowedLine& line) {
     if (!line.complaint.empty()) return line.complaint;
     if (line.awaited != nullptr) return ValueMissing(*line.awaited);
     if (!line.strays.empty()) return StrayText(commands, line);
+    if (std::string useless = UselessOption(line); !useless.empty()) return useless;
     return line.command == nullptr ? "" : MissingArgument(line);
 }
 
@@ -135,12 +150,30 @@ void DropWhatMeansNothing(GivenOptions& given) {
     });
 }
 
+/// Whoever has set a variable to nothing has meant something else than no variable.
+void RequireNoneEmpty(const GivenOptions& given) {
+    for (const auto& [row, text, by] : given) {
+        if (by != GivenBy::Environment || !text.empty()) continue;
+        std::vector<std::string> options = row->contraries;
+        options.insert(options.begin(), row->LongName());
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("the environment variable {} is set and empty; unset it, or say "
+                                  "{}",
+                                  row->environment, fmt::join(options, " or ")));
+    }
+}
+
+/// A GDB server is meant only where it was typed.
+bool IsServed(const CommandRow& command) {
+    return command.needs == Needs::ServedTarget;
+}
+
 GivenOptions OfEnvironment(const CommandRow& command, const ReadVariable& environment) {
     GivenOptions given;
     for (const OptionRow& row : CommonRows())
-        if (*row.environment != '\0' && !(command.ignoresGdbVariable && row.LongName() == "--gdb"))
-            if (const std::string text = environment(row.environment); !text.empty())
-                given.push_back({&row, text, GivenBy::Environment});
+        if (*row.environment != '\0' && !(IsServed(command) && row.LongName() == "--gdb"))
+            if (const auto text = environment(row.environment))
+                given.push_back({&row, *text, GivenBy::Environment});
     return given;
 }
 
@@ -169,10 +202,11 @@ GivenOptions WithWhatIsAround(const FollowedLine& line, const ReadVariable& envi
     };
     if (!typed.empty()) putBoard(typed);
     PutBelow(given, OfEnvironment(*line.command, environment));
-    const bool mayHaveDefault = typed.empty() && !line.command->ignoresGdbVariable;
+    const bool mayHaveDefault = typed.empty() && !IsServed(*line.command);
     if (mayHaveDefault && !project.defaultBoard.empty() && !NamesTarget(given))
         putBoard(project.defaultBoard);
     DropWhatMeansNothing(given);
+    if (line.command->needs >= Needs::ServedTarget) RequireNoneEmpty(given);
     return given;
 }
 
@@ -189,9 +223,9 @@ void Place(CommonOptions& common, const GivenOptions& given, const std::string& 
 
 }  // namespace
 
-std::string ProcessEnvironment(const char* name) {
+std::optional<std::string> ProcessEnvironment(const char* name) {
     const char* text = std::getenv(name);
-    return text == nullptr ? "" : text;
+    return text == nullptr ? std::nullopt : std::optional<std::string>(text);
 }
 
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
@@ -201,9 +235,7 @@ ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& lin
     if (!parsed.answer.empty()) return parsed;
     RefuseNonsense(commands, line);
     parsed.command = line.command;
-    const ProjectFile found = (line.command->readsSettings || line.command->ignoresGdbVariable)
-                                  ? project()
-                                  : ProjectFile();
+    const ProjectFile found = line.command->needs != Needs::Nothing ? project() : ProjectFile();
     parsed.project.path = found.path;
     parsed.given = WithWhatIsAround(line, environment, found, parsed.project.texts);
     parsed.common = ValuesOf(CommonOptionTable(), parsed.given);

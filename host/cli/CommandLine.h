@@ -3,6 +3,7 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 #include <string>
 
 #include "host/cli/CommonOptions.h"
@@ -20,9 +21,9 @@ struct ParsedLine {
     std::string answer;                   ///< help, version or man page
 };
 
-/// A variable's text; empty when it isn't set.
-using ReadVariable = std::function<std::string(const char* name)>;
-std::string ProcessEnvironment(const char* name);
+/// A variable's text; nothing when it isn't set.
+using ReadVariable = std::function<std::optional<std::string>(const char* name)>;
+std::optional<std::string> ProcessEnvironment(const char* name);
 
 using ReadProject = std::function<ProjectFile()>;
 

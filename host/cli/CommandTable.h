@@ -16,6 +16,15 @@ namespace host {
 struct Context;
 struct Outcome;
 
+/// What a command works with, beside the line itself: options and variables for anything else are
+/// not for it.
+enum class Needs {
+    Nothing,
+    Settings,
+    ServedTarget,  ///< simulated, or behind a GDB server that was typed; without a trace
+    Device,
+};
+
 struct CommandRow {
     const char* name;  ///< "erase", or two words: "mac read"
     const char* help = "";
@@ -23,8 +32,7 @@ struct CommandRow {
     const char* example = "";  ///< one or more command lines
     std::vector<OptionRow> options = {};
     std::function<Outcome(Context&, const GivenOptions&)> run = {};
-    bool readsSettings = true;
-    bool ignoresGdbVariable = false;  ///< a GDB server is meant only where it was typed
+    Needs needs = Needs::Device;
 };
 
 /// All commands, in the order in which the help lists them.

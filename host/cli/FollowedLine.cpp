@@ -116,6 +116,10 @@ class Follower {
     }
 
     void Give(const OptionRow& row, const std::string& value) {
+        const bool isOnce = !row.isSwitch && !row.isRepeated;
+        if (isOnce && line_.Has(row.LongName()))
+            Complain(fmt::format("{} is there twice, and it takes one value; leave one out",
+                                 row.LongName()));
         line_.given.push_back({&row, value});
         Complain(Objection(row, value));
     }

@@ -14,7 +14,7 @@
 
 namespace host {
 
-// How the kinds of members take a text: the last one of several counts, unless they collect them.
+// How the kinds of members take a text: one value, or all of them.
 inline void TakeText(bool& member, const std::string& /*text*/) {
     member = true;
 }

@@ -31,10 +31,11 @@ struct OptionRow {
     bool isRequired = false;
     const char* environment = "";  ///< the variable that stands in for it
     std::vector<std::string> contraries =
-        {};                   ///< options that, given by a stronger one, silence it
-    const char* needs = "";   ///< without this one it means nothing, unless typed
-    bool isSwitch = true;     ///< it takes no value
-    bool isRepeated = false;  ///< it may be there again, and adds to what was
+        {};                    ///< options that, given by a stronger one, silence it
+    const char* needs = "";    ///< without this one it means nothing, unless typed
+    bool isForPlugin = false;  ///< it means nothing where no plug-in is loaded
+    bool isSwitch = true;      ///< it takes no value
+    bool isRepeated = false;   ///< it may be there again, and adds to what was
 
     bool IsArgument() const { return names[0] != '-'; }
 

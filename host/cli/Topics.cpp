@@ -66,14 +66,17 @@ std::string ProjectHelp() {
            "  expect = \"quen,flash=512K\"\n\n"
            "  [board.bench.settings]       # above those for all\n"
            "  FlashCrystalFreq = \"10\"\n\n" +
-           Wrap("A board may have gdb or sim, loader (from the file's own folder), expect, wait, and "
-                "of the options for a GDB server: server, attach, writes, reads, live, pc, sp, "
-                "ram-end, timeout, detach. What would be run on this machine, or written, can't "
-                "stand there.") +
+           Wrap(
+               "A board may have gdb or sim, loader (from the file's own folder), expect, wait, "
+               "and "
+               "of the options for a GDB server: server, attach, writes, reads, live, pc, sp, "
+               "ram-end, timeout, detach. What would be run on this machine, or written, can't "
+               "stand there.") +
            "\n" +
-           Wrap("What is typed comes first, a board that is typed among it; then the environment, "
-                "the project's default board and its settings, and your own settings. 'settings' "
-                "shows where each value comes from.");
+           Wrap(
+               "What is typed comes first, a board that is typed among it; then the environment, "
+               "the project's default board and its settings, and your own settings. 'settings' "
+               "shows where each value comes from.");
 }
 
 std::string OptionsHelp() {

@@ -1,4 +1,4 @@
-// corvane-flash blank-check: is the flash, or a range of it, erased?
+// corvane-flash blank-check: is the flash, or some of it, erased?
 
 #include <fmt/format.h>
 
@@ -13,10 +13,11 @@ namespace host::commands {
 namespace {
 
 Outcome BlankCheckOn(Context& context, FlashDevice& device, const RangeChoice& options) {
-    const base::AddressRange range = ChooseRange(device, kBlankCheckKeys, options.range);
-    Outcome outcome = RunOperation(device, plugin::kBlankCheck, Verbosity::Verbose);
-    outcome.result.update({{"blank", true}, {"address", range.first}, {"bytes", range.Size()}});
-    context.reporter.Result(RangeText(range) + " is blank");
+    const ChosenRanges chosen = ChooseJoinedRanges(device, options.ranges);
+    Outcome outcome = RunOverRanges(device, plugin::kBlankCheck, chosen, {});
+    outcome.result["blank"] = true;
+    for (const base::AddressRange& range : chosen.ranges)
+        context.reporter.Result(RangeText(range) + " is blank");
     return outcome;
 }
 
@@ -28,12 +29,13 @@ Outcome RunBlankCheck(Context& context, const RangeChoice& options) {
 }  // namespace
 
 CommandRow BlankCheck() {
-    return Command<RangeChoice>({.name = "blank-check",
-                                 .help = "Check that the flash, or a range of it, is erased",
-                                 .details = "The exit status is 5 when a byte isn't 0xFF.",
-                                 .example = "  corvane-flash blank-check --range 0x8000-0x8fff"},
-                                {RangeOption("The addresses to check; default: the whole flash")},
-                                RunBlankCheck);
+    return Command<RangeChoice>(
+        {.name = "blank-check",
+         .help = "Check that the flash, or some of it, is erased",
+         .details = "The exit status is 5 when a byte isn't 0xFF.",
+         .example = "  corvane-flash blank-check --range 0x8000-0x8fff"},
+        {RangeOption("The addresses to check; default: the whole flash; may be repeated")},
+        RunBlankCheck);
 }
 
 }  // namespace host::commands

@@ -20,27 +20,48 @@ struct ChecksumOptions : RangeChoice, ImageForm {
     std::optional<std::string> imageFile;
 };
 
-Outcome Answer(Context& context, const base::AddressRange& range, const std::string& checksum) {
-    context.reporter.Result(checksum);
-    return {.result = {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}}};
+struct RangeChecksum {
+    base::AddressRange range;
+    std::string checksum;
+};
+
+/// Of one range, the checksum alone; of several, a line for each that names it.
+Json Answer(Reporter& reporter, const std::vector<RangeChecksum>& found) {
+    const bool single = found.size() == 1;
+    Json ranges = Json::array();
+    for (const auto& [range, checksum] : found) {
+        reporter.Result(single ? checksum : fmt::format("{:<10}  {}", checksum, RangeText(range)));
+        ranges.push_back(
+            {{"checksum", checksum}, {"address", range.first}, {"bytes", range.Size()}});
+    }
+    Json result = single ? ranges[0] : Json::object();
+    result["ranges"] = std::move(ranges);
+    return result;
 }
 
 Outcome OfImage(Context& context, const ChecksumOptions& options) {
     const LoadedImages images = ReadNamed(context, {*options.imageFile}, options);
     return WithDevice(context, [&](FlashDevice& device) {
         RequireFit(device, device.Info(), images);
-        const base::AddressRange range = device.RangeInFlash(options.range);
-        return Answer(context, range, base::HexText(ImageChecksum(images.image, range)));
+        std::vector<RangeChecksum> found;
+        for (const base::AddressRange& range : ChooseRanges(device, options.ranges).ranges)
+            found.push_back({range, base::HexText(ImageChecksum(images.image, range))});
+        return Outcome{.result = Answer(context.reporter, found)};
     });
 }
 
 Outcome OfFlash(Context& context, const ChecksumOptions& options) {
     return WithDevice(context, [&](FlashDevice& device) {
-        const base::AddressRange range = ChooseRange(device, kChecksumKeys, options.range);
+        std::vector<RangeChecksum> found;
+        const auto note = [&](const base::AddressRange& range) {
+            found.push_back({range, "0x" + device.Published(keys::kChecksumValue)});
+        };
         const Outcome operation =
-            RunOperation(device, plugin::kCalculateChecksum, Verbosity::Verbose);
-        Outcome outcome = Answer(context, range, "0x" + device.Published(keys::kChecksumValue));
-        outcome.result.update(operation.result);
+            RunOverRanges(device, plugin::kCalculateChecksum, ChooseRanges(device, options.ranges),
+                          {.afterEach = note});
+        Outcome outcome{.result = Answer(context.reporter, found)};
+        for (const char* member : {"operation", "phases"})
+            outcome.result[member] = operation.result[member];
         return outcome;
     });
 }
@@ -61,7 +82,8 @@ CommandRow Checksum() {
                     "the image and nothing else.",
          .example = "  corvane-flash checksum\n"
                     "  corvane-flash checksum --of firmware.elf"},
-        {RangeOption("The addresses to cover; default: the whole flash"),
+        {RangeOption("The addresses to cover; default: the whole flash; repeated, each has a "
+                     "checksum of its own"),
          {&ChecksumOptions::imageFile,
           {"--of", "FILE", "Of this image file, not of the flash", Offers::Files}},
          FormatOption(),

@@ -39,7 +39,7 @@ Outcome RunCompletion(Context& context, const CompletionOptions& options) {
     for (const CompletionScript& script : CompletionScripts())
         if (options.shell == script.shell) text = script.text;
     text.pop_back();  // the last line break comes with the result
-    context.reporter.Result(text);
+    context.reporter.Document(text);
     return {.result = {{"shell", options.shell}, {"script", text}}};
 }
 
@@ -63,7 +63,7 @@ CommandRow Completion() {
          .example = "  corvane-flash completion bash > "
                     "~/.local/share/bash-completion/completions/corvane-flash\n"
                     "  corvane-flash completion words -- erase --",
-         .readsSettings = false},
+         .needs = Needs::Nothing},
         {{&CompletionOptions::shell,
           {.names = "SHELL",
            .help = "bash, zsh, fish, or words",

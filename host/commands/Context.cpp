@@ -6,6 +6,9 @@
 #include <fmt/ranges.h>
 
 #include <chrono>
+#include <cstdlib>
+#include <filesystem>
+#include <string_view>
 #include <thread>
 #include <utility>
 
@@ -14,6 +17,8 @@
 #include "host/targets/ExpectedDevice.h"
 
 namespace host {
+
+namespace fs = std::filesystem;
 
 // A typed option silences the variables of the other kind of target. So two kinds can only come
 // from two variables, or from two typed options, which are refused where the target is opened.
@@ -81,7 +86,13 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
         }
         throw;
     }
-    device.Close(context.isDryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
+    try {
+        device.Close(context.isDryRun ? DeviceFile::LeaveAlone : DeviceFile::Save);
+    } catch (const Failure& failure) {
+        if (outcome.status == ExitStatus::Done)
+            return {failure.Status(), failure.what(), outcome.result};
+        context.reporter.Error(failure.what());
+    }
     return outcome;
 }
 
@@ -90,9 +101,24 @@ Trace OpenTrace(const Context& context, const std::string& path) {
     return Trace(path, ExistingFiles(context.options));
 }
 
+/// The logger of the plug-in appends to whatever file its variable names.
+void RequireOtherLog(const Context& context) {
+    const char* log = std::getenv("OSTREL_LOG");
+    if (log != nullptr && std::string_view(log) != "stderr")
+        InputFiles(context).RequireOther(log, "the log (OSTREL_LOG)");
+}
+
+void RequireOtherDeviceFile(const Context& context) {
+    const std::string file = context.options.simFile.value_or("");
+    if (!file.empty() && !context.isDryRun)
+        ReadFiles(context).RequireOther(fs::absolute(file), "the device");
+}
+
 }  // namespace
 
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work) {
+    RequireOtherLog(context);
+    RequireOtherDeviceFile(context);
     if (!context.options.trace) return WorkOn(context, nullptr, work);
     Trace trace = OpenTrace(context, *context.options.trace);
     Outcome outcome;
@@ -111,21 +137,29 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
 }
 
 Outcome NothingTouched(Context& context, Json plan) {
-    context.reporter.Result("Dry run: nothing was touched");
+    context.reporter.Result(context.options.gdb
+                                ? "Dry run: nothing was changed; the board is left halted"
+                                : "Dry run: nothing was touched");
     plan["dryRun"] = true;
     return {.result = std::move(plan)};
 }
 
-FilesInUse InputFiles(const Context& context) {
+FilesInUse ReadFiles(const Context& context) {
     const CommonOptions& options = context.options;
     FilesInUse files;
+    files.Add("/dev/stdin", "the standard input");
     for (const std::string& file : context.imageFiles)
-        files.Add(SplitAddress(file).path, "an image file");
-    files.AddLocked(options.simFile.value_or(""), "the device file");
+        if (file != "-") files.Add(SplitAddress(file).path, "an image file");
     files.Add(options.loader.value_or(""), "the loader");
     files.Add(context.settings.Paths().user, "the settings file");
     files.AddLocked(context.settings.Paths().kept, "the file of kept settings");
     files.Add(PluginFile(options.plugin.value_or("")), "the plug-in");
+    return files;
+}
+
+FilesInUse InputFiles(const Context& context) {
+    FilesInUse files = ReadFiles(context);
+    files.AddLocked(context.options.simFile.value_or(""), "the device file");
     return files;
 }
 

@@ -38,7 +38,10 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
 /// What ends a dry run: `plan` is what would be done.
 Outcome NothingTouched(Context& context, Json plan);
 
-/// What the command line names to be read or kept, which nothing may be written over.
+/// What the run reads: standard input and what the command line names.
+FilesInUse ReadFiles(const Context& context);
+
+/// The same and the device file: what nothing else may be written over.
 FilesInUse InputFiles(const Context& context);
 
 /// --force.

@@ -20,7 +20,7 @@ Outcome RunHelp(Context& context, const HelpOptions& options) {
     const std::string about = fmt::format("{}", fmt::join(options.about, " "));
     std::string text = HelpText(AllCommands(), about);
     text.pop_back();  // the last line break comes with the result
-    context.reporter.Result(text);
+    context.reporter.Document(text);
     return {.result = {{"about", about}, {"text", text}}};
 }
 
@@ -32,7 +32,7 @@ CommandRow Help() {
                                  .example = "  corvane-flash help program\n"
                                             "  corvane-flash help mac read\n"
                                             "  corvane-flash help sim",
-                                 .readsSettings = false},
+                                 .needs = Needs::Nothing},
                                 {{&HelpOptions::about,
                                   {.names = "COMMAND",
                                    .help = "A command or a topic; default: what there is",

@@ -31,7 +31,8 @@ Outcome ShowInfo(Context& context, FlashDevice& device) {
                        {"sectorBytes", info.sectorBytes},
                        {"ramBytes", info.ramBytes},
                        {"operations", plugin::OperationNames(info.operations)},
-                       {"plugin", device.LibraryPath()}}};
+                       {"plugin", device.LibraryPath()},
+                       {"target", ToJson(static_cast<const TargetOptions&>(context.options))}}};
 }
 
 Outcome RunInfo(Context& context, const ImageFiles& options) {
@@ -49,7 +50,8 @@ CommandRow Info() {
         {.name = "info",
          .help = "Show the device: family, id, flash, sectors, RAM, operations",
          .details = "With a FILE, no device is asked: what the file holds is shown, and which "
-                    "classes of device have enough flash for it.",
+                    "classes of device have enough flash for it. Without one, a board "
+                    "is left halted: 'corvane-flash reset --run' starts its program.",
          .example = "  corvane-flash --sim quen,flash=512K info\n"
                     "  corvane-flash info firmware.elf"},
         {ImagesArgument(false), FormatOption(), BaseOption()}, RunInfo);

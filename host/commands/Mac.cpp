@@ -16,7 +16,7 @@ namespace {
 
 struct MacOptions : Committing {
     std::string address;
-    bool force = false;  ///< program one that no device should have
+    bool anyAddress = false;  ///< program one that no device should have
 };
 
 /// Read through the plug-in; the host has padded it to two digits a byte.
@@ -55,10 +55,10 @@ MacAddress RequireMac(const MacOptions& options) {
                                   "02-1b-c3-04-05-06, 2:1b:c3:4:5:6 or 021bc3040506",
                                   text));
     const std::string objection = mac->Objection();
-    if (!objection.empty() && !options.force)
+    if (!objection.empty() && !options.anyAddress)
         throw Failure(ExitStatus::WrongUsage,
-                      fmt::format("{} {}; no device should have it; --force programs it all the "
-                                  "same",
+                      fmt::format("{} {}; no device should have it; --any-address programs it "
+                                  "all the same",
                                   text, objection));
     return *mac;
 }
@@ -93,8 +93,8 @@ CommandRow MacProgram() {
            .help = "Six hexadecimal bytes, separated by - or : or not at all",
            .isRequired = true}},
          CommitOption(),
-         {&MacOptions::force,
-          {"--force", "", "Program a multicast, all-zeros or all-ones address"}}},
+         {&MacOptions::anyAddress,
+          {"--any-address", "", "Program a multicast, all-zeros or all-ones address"}}},
         RunProgramMac);
 }
 

@@ -21,8 +21,9 @@ Outcome MapOn(Context& context, FlashDevice& device, const LoadedImages& images)
     LoadPlan plan;
     if (!images.image.Empty())
         plan = PlanOnDevice(device, RequestedLoad(context.settings), images.image);
-    Json runs =
-        ShowMap(context.reporter, device, device.Meter(), GeometryOf(info), images.image, plan);
+    const FlashGeometry flash = GeometryOf(info);
+    Json runs = ShowMap(context.reporter, ReadAll(device, device.Meter(), flash), flash,
+                        images.image, plan);
     return {.result = {{"flashBytes", info.flashBytes},
                        {"sectorBytes", info.sectorBytes},
                        {"runs", std::move(runs)}}};
@@ -39,8 +40,8 @@ CommandRow Map() {
     return Command<ImageFiles>(
         {.name = "map",
          .help = "Draw what the flash holds, and what images would change",
-         .details = "The flash is read, and nothing is touched. With image files, the map shows "
-                    "what 'program' would do with them.",
+         .details = "The flash is read, and nothing is changed; a board is left halted. With image "
+                    "files, the map shows what 'program' would do with them.",
          .example = "  corvane-flash map\n"
                     "  corvane-flash map firmware.elf"},
         {ImagesArgument(false), FormatOption(), BaseOption()}, RunMap);

@@ -41,7 +41,7 @@ void RequireMacSetting(const Context& context) {
     if (objection.empty()) return;
     throw Failure(ExitStatus::WrongUsage,
                   fmt::format("the setting {}, {}, {}; set another one, or use 'corvane-flash mac "
-                              "program --force'",
+                              "program --any-address'",
                               keys::kMacInput, text, objection));
 }
 
@@ -71,8 +71,7 @@ Outcome OperationOn(FlashDevice& device, const std::string& name) {
         const RegisterValues values = CheckRegisters(device, written, outcome);
         device.Output().Result(Describe(device.UserRegisters(), values));
     }
-    if (outcome.status == ExitStatus::Done)
-        device.Output().Done(fmt::format("Done: operation {}", name));
+    if (outcome.status == ExitStatus::Done) outcome.done = fmt::format("Done: operation {}", name);
     return outcome;
 }
 

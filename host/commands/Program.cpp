@@ -10,6 +10,7 @@
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/FlashMap.h"
+#include "host/flashing/Forecast.h"
 #include "host/flashing/ImageSet.h"
 #include "host/flashing/KeptBytes.h"
 #include "host/flashing/Load.h"
@@ -51,7 +52,10 @@ LoadRequest Request(const SettingStore& settings, const ProgramOptions& options,
 
 /// --keep: adds to the image what else its sectors hold. Returns how many bytes that is.
 std::uint64_t KeepOthers(FlashDevice& device, LoadedImages& images, const EraseChoice& erase) {
-    if (erase.kind == EraseChoice::Kind::Nothing) return 0;
+    if (erase.kind == EraseChoice::Kind::Nothing)
+        throw Failure(ExitStatus::WrongUsage,
+                      "--keep goes with --erase necessary: where nothing is erased, nothing is to "
+                      "be kept");
     if (erase.kind != EraseChoice::Kind::Necessary)
         throw Failure(
             ExitStatus::WrongUsage,
@@ -100,7 +104,24 @@ Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
     ShowUnchanged(context.reporter, plan);
     if (outcome.status != ExitStatus::Done) return outcome;
     if (runAfterwards) device.StartProgram();
-    context.reporter.Done(DoneText(plan));
+    outcome.done = DoneText(plan);
+    return outcome;
+}
+
+/// Ends as the load would, as far as that can be known.
+Outcome DryRunOf(Context& context, FlashDevice& device, const LoadedImages& images,
+                 const LoadPlan& plan, Json planned) {
+    if (!plan.sections.empty()) device.RequireLoader();
+    const FlashGeometry flash = GeometryOf(device.Info());
+    const std::vector<std::uint8_t> contents = ReadAll(device, device.Meter(), flash);
+    planned["runs"] = ShowMap(context.reporter, contents, flash, images.image, plan);
+    Outcome outcome = NothingTouched(context, std::move(planned));
+    const Forecast forecast = ForecastLoad(plan, images.image, contents);
+    if (forecast.notBlank)
+        FailAsNotBlank(outcome, *forecast.notBlank);
+    else if (!forecast.differences.Empty())
+        FailAsForecast(outcome, forecast.differences, images,
+                       AdviceAfter(plan, forecast.differences));
     return outcome;
 }
 
@@ -114,11 +135,7 @@ Outcome ProgramOn(Context& context, FlashDevice& device, const ProgramOptions& o
     ShowPlan(context, info, plan, kept);
     Json planned = ToJson(plan);
     planned["keptBytes"] = kept;
-    if (context.isDryRun) {
-        planned["runs"] =
-            ShowMap(context.reporter, device, device.Meter(), GeometryOf(info), images.image, plan);
-        return NothingTouched(context, planned);
-    }
+    if (context.isDryRun) return DryRunOf(context, device, images, plan, planned);
     device.AddToFailures(planned);
     Outcome outcome = Load(context, device, images, plan, options.run);
     outcome.result["keptBytes"] = kept;

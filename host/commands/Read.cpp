@@ -7,6 +7,8 @@
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
+#include "host/flashing/RangeOperation.h"
+#include "host/flashing/ReadRanges.h"
 #include "host/output/Summary.h"
 
 namespace host::commands {
@@ -32,7 +34,7 @@ image::Format CheckOutput(const Context& context, const ReadOptions& options) {
         throw Failure(ExitStatus::WrongUsage,
                       "'read -' and --json both want standard output; name a file");
     FilesInUse files = InputFiles(context);
-    files.Add(context.options.trace.value_or(""), "the trace");
+    if (context.options.trace != "-") files.Add(context.options.trace.value_or(""), "the trace");
     files.RequireOther(path, "the flash contents");
     if (path != "-") RequireWritable(image::kImageFile, path, ExistingFiles(context.options));
     return format;
@@ -46,15 +48,18 @@ bool WantsDump(const std::string& path, image::Format format) {
 Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options,
                image::Format format) {
     const std::string& path = options.file;
-    const base::AddressRange range = device.RangeInFlash(options.range);
+    base::AddressSet ranges;
+    for (const base::AddressRange& range : ChooseRanges(device, options.ranges).ranges)
+        ranges.Add(range);
     device.Halt();
-    device.Meter().Expect(Phase::Read, range.Size());
-    device.Meter().Begin(Phase::Read);
-    image::Image image;
-    image.Add(range.first, device.ReadFlash(range), "flash");
-    device.Meter().End();
+    const image::Image image = ReadRanges(device, device.Meter(), Phase::Read, ranges);
+    const bool dump = WantsDump(path, format);
     const std::string contents =
-        WantsDump(path, format) ? image::FormatDump(image) : image::FormatImage(image, format);
+        dump ? image::FormatDump(image) : image::FormatImage(image, format);
+    if (format == image::Format::Binary && !dump && contents.size() > ranges.Bytes())
+        context.reporter.Say(Verbosity::Normal,
+                             fmt::format("{} between the ranges are written as 0xff",
+                                         SizeText(contents.size() - ranges.Bytes())));
     if (path == "-") {
         context.reporter.Data(contents);
     } else {
@@ -63,8 +68,9 @@ Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options
     }
     return {.result = {{"file", path},
                        {"format", image::FormatName(format)},
-                       {"address", range.first},
-                       {"bytes", range.Size()},
+                       {"address", ranges.Ranges().front().first},
+                       {"bytes", ranges.Bytes()},
+                       {"ranges", ToJson(ranges.Ranges())},
                        {"phases", PhasesJson(device.Meter().Phases())}}};
 }
 
@@ -82,7 +88,7 @@ CommandRow Read() {
          .help = "Read flash back into a file",
          .details = "The extension chooses the format: .hex, .ihex for Intel HEX, .srec, .s19 and "
                     "the like for S-records, raw binary for all others. A terminal shows raw "
-                    "binary as a hex dump.",
+                    "binary as a hex dump. A board is left halted.",
          .example = "  corvane-flash read backup.hex\n"
                     "  corvane-flash read page.bin --range 0x400-0x7ff\n"
                     "  corvane-flash read - | sha256sum"},
@@ -91,7 +97,8 @@ CommandRow Read() {
            .help = "The file to write; - is standard output",
            .offers = Offers::Files,
            .isRequired = true}},
-         RangeOption("The addresses to read; default: the whole flash"),
+         RangeOption("The addresses to read; default: the whole flash; repeated, raw binary has "
+                     "0xff between them"),
          {&ReadOptions::format,
           {.names = "--format",
            .value = "FORMAT",

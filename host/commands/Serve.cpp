@@ -17,6 +17,7 @@ struct ServeOptions {
 
 template <typename Server>
 Outcome ServeThere(Reporter& reporter, Server&& server) {
+    reporter.WorksOn(server.Device());
     const Json where{{"host", server.Where().host}, {"port", server.Port()}};
     reporter.Listening(server.Where().Text(), where);
     server.Run();
@@ -42,7 +43,7 @@ Outcome RunServe(Context& context, const ServeOptions& options) {
 CommandRow Serve() {
     return Command<ServeOptions>(
         {.name = "serve",
-         .help = "Serve a probe with flash added, or the simulated device, to debuggers",
+         .help = "Serve a probe with flash added, or the simulated device",
          .details = "Until Ctrl-C, to one client at a time: others are told so. With --gdb, a "
                     "debugger finds the probe's GDB server here, and flash that it can load into; "
                     "what it can't be told is shown on standard error, and by 'monitor corvane'. "
@@ -53,7 +54,7 @@ CommandRow Serve() {
          .example = "  corvane-flash serve 3333 --gdb :3334 --loader FlashLoaderMerrow.out\n"
                     "  corvane-flash --sim quen --sim-file board.sim serve 3333\n"
                     "  gdb-multiarch -ex 'target remote :3333' -ex load firmware.elf",
-         .ignoresGdbVariable = true},
+         .needs = Needs::ServedTarget},
         {{&ServeOptions::address,
           {.names = "[HOST:]PORT", .help = "Where to listen", .isRequired = true}}},
         RunServe);

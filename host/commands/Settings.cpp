@@ -54,10 +54,12 @@ Outcome List(Context& context) {
         all.push_back(ToJson(context, info));
     }
     const SettingPaths& paths = context.settings.Paths();
-    context.reporter.Say(
-        Verbosity::Verbose,
-        fmt::format("Project file: {}\nYour file: {}\nKept values: {}",
-                    paths.project.empty() ? "none" : paths.project, paths.user, paths.kept));
+    const auto say = [&](const char* what, const std::string& file) {
+        context.reporter.Say(Verbosity::Verbose, what + (file.empty() ? "none" : file));
+    };
+    say("Project file: ", paths.project);
+    say("Your file: ", paths.user);
+    say("Kept values: ", paths.kept);
     return {.result = {{"settings", all}, {"options", ListOptions(context)}}};
 }
 
@@ -121,7 +123,8 @@ CommandRow Settings() {
              "your settings file, kept value (KEY=TEXT here, and what the "
              "plug-in publishes), default. With -q, only the values are shown.",
          .example = "  corvane-flash settings FlashTimeoutValue\n"
-                    "  corvane-flash settings FlashCrystalFreq=10"},
+                    "  corvane-flash settings FlashCrystalFreq=10",
+         .needs = Needs::Settings},
         {{&SettingsOptions::setting,
           {.names = "KEY",
            .help = "The setting to show; as KEY=TEXT, the setting to keep with this text",

@@ -5,7 +5,7 @@
 namespace host::commands {
 
 Option<RangeChoice> RangeOption(const char* help) {
-    return {&RangeChoice::range, {"--range", "A-B|A+LENGTH", help}};
+    return {&RangeChoice::ranges, {"--range", "A-B|A+LENGTH", help}};
 }
 
 Option<ImageForm> FormatOption() {
@@ -43,7 +43,10 @@ LoadedImages ReadNamed(Context& context, const std::vector<std::string>& files,
 }
 
 Option<DryRun> DryRunOption() {
-    return {&DryRun::dryRun, {"--dry-run", "", "Show what would be done, and touch nothing"}};
+    return {&DryRun::dryRun,
+            {"--dry-run", "",
+             "Show what would be done and how it would end, and change nothing; a board is left "
+             "halted"}};
 }
 
 Option<Comparing> NoVerifyOption() {

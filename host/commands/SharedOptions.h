@@ -12,7 +12,7 @@
 namespace host::commands {
 
 struct RangeChoice {
-    std::optional<std::string> range;
+    std::vector<std::string> ranges;
 };
 Option<RangeChoice> RangeOption(const char* help);
 

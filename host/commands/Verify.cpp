@@ -1,11 +1,14 @@
 // corvane-flash verify: compare flash with image files.
 
+#include <fmt/format.h>
+
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/Comparison.h"
 #include "host/flashing/ImageSet.h"
+#include "host/flashing/RangeOperation.h"
 #include "host/output/Summary.h"
 
 namespace host::commands {
@@ -14,17 +17,29 @@ namespace {
 
 struct VerifyOptions : ImageFiles, RangeChoice {};
 
+std::string EqualText(const image::Image& all, const image::Image& compared,
+                      const std::vector<base::AddressRange>& ranges) {
+    if (compared == all) return "The flash holds the image";
+    return fmt::format("The flash holds the image in {}: {} of {} were compared",
+                       RangesText(ranges), compared.ByteCount(),
+                       CountText(all.ByteCount(), "byte"));
+}
+
 Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
-                 const std::optional<std::string>& range) {
-    const LoadedImages images = range ? Within(all, device.RangeInFlash(range)) : all;
+                 const std::vector<std::string>& ranges) {
+    const ChosenRanges chosen = ChooseJoinedRanges(device, ranges);
+    const LoadedImages images = chosen.isWholeFlash ? all : Within(all, chosen.ranges);
     RequireFit(device, device.Info(), images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
     const Differences differences = CompareWithFlash(device, device.Meter(), images.image);
     const bool equal = differences.Empty();
-    Outcome outcome{.result = {{"equal", equal}, {"phases", PhasesJson(device.Meter().Phases())}}};
+    Outcome outcome{.result = {{"equal", equal},
+                               {"imageBytes", all.image.ByteCount()},
+                               {"comparedBytes", images.image.ByteCount()},
+                               {"phases", PhasesJson(device.Meter().Phases())}}};
     ShowSummary(context.reporter, device.Meter().Phases());
     if (equal)
-        context.reporter.Result("The flash holds the image");
+        context.reporter.Result(EqualText(all.image, images.image, chosen.ranges));
     else
         FailAsDifferent(outcome, differences, images, "");
     return outcome;
@@ -33,7 +48,7 @@ Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
 Outcome RunVerify(Context& context, const VerifyOptions& options) {
     const LoadedImages images = ReadNamed(context, options.files, options);
     return WithDevice(context, [&](FlashDevice& device) {
-        return VerifyOn(context, device, images, options.range);
+        return VerifyOn(context, device, images, options.ranges);
     });
 }
 
@@ -46,7 +61,7 @@ CommandRow Verify() {
                                    .example = "  corvane-flash verify firmware.elf"},
                                   {ImagesArgument(true), FormatOption(), BaseOption(),
                                    RangeOption("Compare only these addresses; default: all of the "
-                                               "image")},
+                                               "image; may be repeated")},
                                   RunVerify);
 }
 

@@ -69,7 +69,8 @@ std::string FailureText(const FailedCall& call) {
 std::string RestText(const FailedCall& call) {
     if (!call.shown) return FailureText(call);
     if (!call.cause.empty()) return call.doing + " failed: " + call.cause;
-    return call.doing + (call.error.empty() ? " ended with the errors above" : ": " + call.error);
+    return call.doing + " ended with the errors above" +
+           (call.error.empty() ? "" : "; then " + call.error);
 }
 
 DeviceFailure NotBlankFailure(const FailedCall& call, const KnownState& state, Json members) {

@@ -33,17 +33,34 @@ bool IsNoIdentification(std::uint32_t word) {
     return word == 0 || word == 0xFFFFFFFF;
 }
 
+/// Everything else divides by these numbers and counts with them.
+void RequireUsable(const DeviceInfo& info) {
+    constexpr std::uint64_t kAddresses = std::uint64_t{1} << 32;
+    const bool usable = info.sectorBytes != 0 && info.flashBytes != 0 &&
+                        info.flashBytes <= kAddresses && info.sectorBytes <= info.flashBytes;
+    if (usable) return;
+    throw Failure(ExitStatus::DeviceFailed,
+                  fmt::format("the plug-in has published a flash of {} with sectors of {}, which "
+                              "can't be; name another plug-in with --plugin",
+                              SizeText(info.flashBytes), SizeText(info.sectorBytes)));
+}
+
 TraceLine LinesTo(Trace* trace) {
     if (trace == nullptr) return {};
     return [trace](const char* source, const std::string& text) { trace->Line(source, text); };
 }
 
+std::unique_ptr<OpenTarget> OpenAndTell(const DeviceOptions& options, Reporter& reporter) {
+    const auto say = [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); };
+    auto target = Open(options.target, LinesTo(options.trace), say);
+    reporter.WorksOn(target->Description());
+    return target;
+}
+
 }  // namespace
 
 FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter)
-    : FlashDevice(Open(options.target, LinesTo(options.trace),
-                       [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); }),
-                  options, settings, reporter) {}
+    : FlashDevice(OpenAndTell(options, reporter), options, settings, reporter) {}
 
 FlashDevice::FlashDevice(std::unique_ptr<OpenTarget> target, const DeviceOptions& options,
                          SettingStore& settings, Reporter& reporter)
@@ -96,6 +113,7 @@ void FlashDevice::Initialize() {
     info_.ramBytes = PublishedSize(settings_, keys::kRamSize);
     info_.sectorBytes = static_cast<std::uint32_t>(PublishedSize(settings_, keys::kSectorSize));
     info_.operations = operations;
+    if (info_.hasFlash) RequireUsable(info_);
     watch_.SetGeometry(info_.flashBytes, info_.sectorBytes);
     target_->RamEndsAt(plugin::kLoaderBuffers + static_cast<std::uint32_t>(info_.ramBytes));
 }
@@ -120,19 +138,22 @@ void FlashDevice::RequireFlash() {
         fmt::format("the device ({}) has no flash that the plug-in can work on", info_.family));
 }
 
-base::AddressRange FlashDevice::RangeInFlash(const std::optional<std::string>& text) {
+base::AddressRange FlashDevice::RangeInFlash(const std::string& text) {
     RequireFlash();
-    if (!text) return info_.Flash();
-    const base::AddressRange range = ParseRange(*text);
+    const base::AddressRange range = ParseRange(text);
     if (Contains(range.first) && Contains(range.last)) return range;
     throw Failure(ExitStatus::WrongUsage,
                   fmt::format("the range {} doesn't lie in the device's flash, {}",
                               RangeText(range), RangeText(info_.Flash())));
 }
 
+void FlashDevice::RequireLoader() {
+    target_->RequireLoader(ExecutableDirectory());
+}
+
 void FlashDevice::ResetSettings(plugin::ResetMode mode) {
     // The plug-in erases before it asks for the loader.
-    if (mode == plugin::ResetMode::LoadBegins) target_->RequireLoader(ExecutableDirectory());
+    if (mode == plugin::ResetMode::LoadBegins) RequireLoader();
     const int number = static_cast<int>(mode);
     Call("resetting the device", fmt::format("ResetSettings {}", number),
          [&] { return device_->ResetSettings(number); });
@@ -291,6 +312,9 @@ void FlashDevice::Fail(const std::string& doing, const std::string& error) {
     FailedCall call{doing, error};
     if (!host_.Errors().empty()) call.shown = host_.Errors().front();
     call.cause = host_.FirstFailure();
+    // The plug-in blames an option then.
+    const std::string commit = UnendedCommit(UserRegisters());
+    if (doubt_.empty() && call.cause.empty() && !commit.empty()) call = {doing, commit};
     LeaveHalted();
     throw MakeDeviceFailure(call, StateAfterFailure(), failureMembers_);
 }

@@ -63,12 +63,15 @@ class FlashDevice final : public FlashReader {
     /// By the plug-in's own answer.
     bool Contains(std::uint32_t address) override;
 
-    /// The range of a command, the whole flash when none was given. Failure (WrongUsage) when it
-    /// doesn't lie in flash, Failure (DeviceFailed) when there is no flash.
-    base::AddressRange RangeInFlash(const std::optional<std::string>& text);
+    /// A range as the command line has it. Failure (WrongUsage) when it doesn't lie in flash,
+    /// Failure (DeviceFailed) when there is no flash.
+    base::AddressRange RangeInFlash(const std::string& text);
 
     /// Failure (DeviceFailed) for a device whose flash the plug-in can't work on.
     void RequireFlash();
+
+    /// Failure (BadFile) when the target needs a loader of its own and hasn't got it.
+    void RequireLoader();
 
     void ResetSettings(plugin::ResetMode mode);
 

@@ -54,7 +54,8 @@ const char* FlashHost::Slot(AfterInterrupt after, Action&& action) noexcept {
     } catch (const std::exception& error) {
         try {
             errorText_ = error.what();
-            if (firstFailure_.empty()) firstFailure_ = errorText_;
+            // What fails behind an error of the plug-in is no cause of it.
+            if (firstFailure_.empty() && errors_.empty()) firstFailure_ = errorText_;
             watch_.SlotFailed();
             return errorText_.c_str();
         } catch (...) {

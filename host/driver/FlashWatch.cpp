@@ -2,9 +2,12 @@
 
 #include "host/driver/FlashWatch.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
 #include <string_view>
 
+#include "host/base/Text.h"
 #include "host/facts/FlashMemory.h"
 #include "host/facts/Operations.h"
 
@@ -54,6 +57,11 @@ void FlashWatch::Read(std::uint32_t address, std::size_t bytes, const std::uint8
             notBlank_ = {address + static_cast<std::uint32_t>(found - data), *found};
     }
     meter_.Advance(bytes);
+}
+
+void FlashWatch::StillAtWork(const base::AddressRange& chunk, std::chrono::seconds limit) {
+    meter_.Say(fmt::format("Waiting for the loader to finish {}, up to {} s", RangeText(chunk),
+                           limit.count()));
 }
 
 void FlashWatch::SlotFailed() {

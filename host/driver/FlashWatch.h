@@ -46,6 +46,8 @@ class FlashWatch final : public LoaderObserver {
     void HandingOver(const base::AddressRange& chunk) override { work_.attempted.Add(chunk); }
     void HandedOver(const base::AddressRange& chunk) override { work_.handedOver.Add(chunk); }
     void Programmed(const base::AddressRange& chunk) override;
+    void StillAtWork(const base::AddressRange& chunk, std::chrono::seconds limit) override;
+
     /// The plug-in goes on with a load after an erase that failed, and then nobody knows what the
     /// flash controller makes of it.
     void SlotFailed();

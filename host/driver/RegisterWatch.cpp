@@ -43,6 +43,13 @@ void RegisterWatch::Read(std::uint32_t address, std::uint32_t word) {
     committing_.reset();
 }
 
+std::string UnendedCommit(const UserRegisterWork& work) {
+    for (unsigned index = 0; index < work.registers.size(); ++index)
+        if (work.registers.at(index).commit == Commit::Begun)
+            return fmt::format("the commit of user register {} hasn't ended", index);
+    return "";
+}
+
 std::string Describe(const UserRegisterWork& work, const RegisterValues& values) {
     const auto untouched = [](const UserRegister& one) { return !one.written; };
     if (std::ranges::all_of(work.registers, untouched))

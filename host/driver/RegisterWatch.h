@@ -46,6 +46,9 @@ class RegisterWatch {
     std::optional<unsigned> committing_;
 };
 
+/// That a commit was begun and not seen to end; empty when none was.
+std::string UnendedCommit(const UserRegisterWork& work);
+
 /// What each register was found to hold; nothing for one that can't be read.
 using RegisterValues = std::array<std::optional<std::uint32_t>, 2>;
 

@@ -12,6 +12,7 @@
 #include <filesystem>
 #include <system_error>
 
+#include "host/base/Printable.h"
 #include "host/files/InputFile.h"
 #include "host/files/Streams.h"
 
@@ -55,7 +56,7 @@ Trace::Trace(const std::string& path, Existing existing)
 
 void Trace::Line(const char* source, const std::string& text) {
     const std::chrono::duration<double> elapsed = std::chrono::steady_clock::now() - start_;
-    Write(fmt::format("{:12.6f}  {:<7}  {}\n", elapsed.count(), source, text));
+    Write(fmt::format("{:12.6f}  {:<7}  {}\n", elapsed.count(), source, Printable(text)));
 }
 
 void Trace::Write(const std::string& text) {

@@ -14,6 +14,7 @@ struct FileKind {
     const char* name;  ///< "image file"
     ExitStatus unusable;
     std::uint64_t maxBytes;
+    bool fromStandardInput = false;  ///< "-" is standard input, and not a file of that name
 };
 
 /// The Failure of an error number: "can't read the image file none.hex: No such file or directory".

@@ -20,15 +20,15 @@ class FileBusy : public Failure {
     using Failure::Failure;
 };
 
-/// Where the lock of a file lies.
+/// Where the lock of a file lies; empty for a name that leads nowhere.
 std::string LockPath(const std::string& path);
 
 class FileLock {
   public:
-    /// Takes the lock of a file that need not exist, whatever the name that leads to it. Another
-    /// run is waited for up to 10 s, which `say` tells the user; then FileBusy (of the kind's
-    /// status). Where no lock file can be made, no run can replace the file either: nothing is
-    /// locked.
+    /// Takes the lock of a file that need not exist, whatever the name that leads to it, and
+    /// removes what killed runs have left of the file. Another run is waited for up to 10 s, which
+    /// `say` tells the user; then FileBusy (of the kind's status). Where no lock file can be made,
+    /// no run can replace the file either: nothing is locked.
     FileLock(const FileKind& kind, const std::string& path, const WaitNotice& say);
     ~FileLock();
 
@@ -38,6 +38,7 @@ class FileLock {
   private:
     std::string path_;
     base::Descriptor file_;
+    bool made_ = false;  ///< the lock file is this run's
 };
 
 }  // namespace host

@@ -35,7 +35,7 @@ bool IsSameFile(const std::string& one, const std::string& other) {
 }  // namespace
 
 void FilesInUse::Add(const std::string& path, const std::string& what) {
-    if (!path.empty() && path != "-") files_.push_back({path, what});
+    if (!path.empty()) files_.push_back({path, what});
 }
 
 void FilesInUse::AddLocked(const std::string& path, const std::string& what) {

@@ -9,7 +9,7 @@ namespace host {
 
 class FilesInUse {
   public:
-    /// `what` says what the file is to the run: "the image file". An empty path and "-" add none.
+    /// `what` says what the file is to the run: "the image file". An empty path adds none.
     void Add(const std::string& path, const std::string& what);
 
     /// The same for a file that is locked: its lock is in use as well.

@@ -23,11 +23,16 @@ namespace {
 constexpr std::size_t kBeginningBytes = std::size_t{64} << 10;
 constexpr std::size_t kPieceBytes = std::size_t{256} << 10;
 
+bool IsStandardInput(const FileKind& kind, const std::string& path) {
+    return kind.fromStandardInput && path == "-";
+}
+
 /// Blocking is what O_NONBLOCK prevents: the open of a pipe would wait for its writer. Standard
 /// input keeps its mode, which belongs to others as well.
 base::Descriptor Open(const FileKind& kind, const std::string& path) {
-    const int file = path == "-" ? fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, 3)
-                                 : open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
+    const int file = IsStandardInput(kind, path)
+                         ? fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, 3)
+                         : open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
     if (file < 0) throw FileFailure(kind, "read", path, errno);
     return base::Descriptor(file);
 }
@@ -43,8 +48,9 @@ std::uint64_t KnownSize(const base::Descriptor& file) {
 
 Failure FileFailure(const FileKind& kind, const char* doing, const std::string& path,
                     const std::string& why) {
-    return {kind.unusable, fmt::format("can't {} the {} {}: {}", doing, kind.name,
-                                       path == "-" ? "on standard input" : path, why)};
+    return {kind.unusable,
+            fmt::format("can't {} the {} {}: {}", doing, kind.name,
+                        IsStandardInput(kind, path) ? "on standard input" : path, why)};
 }
 
 Failure FileFailure(const FileKind& kind, const char* doing, const std::string& path, int error) {

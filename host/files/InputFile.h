@@ -13,7 +13,8 @@ namespace host {
 
 class InputFile {
   public:
-    /// Opens the file; "-" is standard input. Failure (of the kind's status) as in all below.
+    /// Opens the file; "-" is standard input for kinds that come from there. Failure (of the kind's
+    /// status) as in all below.
     InputFile(const FileKind& kind, const std::string& path);
 
     /// The first 64 KiB; less only of a smaller file.

@@ -3,6 +3,7 @@
 #include "host/files/OutputFile.h"
 
 #include <fcntl.h>
+#include <fmt/format.h>
 #include <stdlib.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -36,6 +37,12 @@ std::optional<struct stat> Look(const FileKind& kind, const std::string& path) {
     return std::nullopt;
 }
 
+bool IsStandardInput(const struct stat& file) {
+    struct stat input {};
+    return fstat(STDIN_FILENO, &input) == 0 && input.st_dev == file.st_dev &&
+           input.st_ino == file.st_ino;
+}
+
 /// The permissions of a file that is created without any wish of its own.
 mode_t DefaultMode() {
     const mode_t mask = umask(0);
@@ -50,10 +57,13 @@ bool RenameToNew(const char* from, const char* to) {
     return errno == EINVAL && link(from, to) == 0 && unlink(from) == 0;
 }
 
+/// What a temporary file adds to the name of its target, before six letters and digits.
+constexpr char kTemporary[] = ".corvane-";
+
 class TemporaryFile {
   public:
     TemporaryFile(const FileKind& kind, std::string target)
-        : kind_(kind), target_(std::move(target)), path_(target_ + ".XXXXXX") {
+        : kind_(kind), target_(std::move(target)), path_(target_ + kTemporary + "XXXXXX") {
         file_ = base::Descriptor(mkostemp(path_.data(), O_CLOEXEC));
         if (!file_.IsOpen()) Fail();
     }
@@ -117,6 +127,11 @@ void RequireWritable(const FileKind& kind, const std::string& path, Existing exi
     if (!status && access(DirectoryOf(FollowLinks(path)).c_str(), W_OK) != 0)
         throw FileFailure(kind, "write", path, errno);
     if (!status || !S_ISREG(status->st_mode)) return;
+    if (IsStandardInput(*status))
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("{} can't be written: it is the file that standard input comes "
+                                  "from; name another one",
+                                  path));
     if (existing == Existing::Keep)
         throw Failure(ExitStatus::WrongUsage, path + " exists; overwrite it with --force");
     // The superuser may write everything, but whoever took the permission away meant it.
@@ -132,6 +147,18 @@ void WriteWholeFile(const FileKind& kind, const std::string& path, std::string_v
     TemporaryFile file(kind, FollowLinks(path));
     file.Write(contents, old);
     file.Rename(existing);
+}
+
+void RemoveLeftovers(const std::string& path) {
+    const fs::path target = FollowLinks(path);
+    const std::string beginning = target.filename().string() + kTemporary;
+    std::error_code ignored;
+    for (const fs::directory_entry& entry : fs::directory_iterator(DirectoryOf(target), ignored)) {
+        const std::string name = entry.path().filename().string();
+        const bool isOurs = name.starts_with(beginning) && name.size() == beginning.size() + 6;
+        if (isOurs && entry.symlink_status(ignored).type() == fs::file_type::regular)
+            fs::remove(entry.path(), ignored);
+    }
 }
 
 base::Descriptor OpenForWriting(const FileKind& kind, const std::string& path) {

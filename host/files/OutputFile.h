@@ -25,6 +25,9 @@ void RequireWritable(const FileKind& kind, const std::string& path, Existing exi
 void WriteWholeFile(const FileKind& kind, const std::string& path, std::string_view contents,
                     Existing existing);
 
+/// Removes the temporary files that killed runs have left beside a file; nobody may be writing it.
+void RemoveLeftovers(const std::string& path);
+
 /// Opens a file to write into as it grows: a new one, one that is there (its contents stay for the
 /// caller to judge), or a pipe, whose reader is waited for.
 base::Descriptor OpenForWriting(const FileKind& kind, const std::string& path);

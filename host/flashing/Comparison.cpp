@@ -115,14 +115,16 @@ Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image:
 }
 
 Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,
-                              const base::AddressRange& range) {
-    const std::vector<std::uint8_t> erased(std::min<std::uint64_t>(kPieceBytes, range.Size()),
-                                           0xFF);
-    return Verify(reader, meter, [&](Differences& differences) {
-        ReadPieces(reader, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
-            Compare(differences, address, std::span(erased).first(actual.size()), actual);
-        });
-    });
+                              const std::vector<base::AddressRange>& ranges) {
+    const std::vector<std::uint8_t> erased(kPieceBytes, 0xFF);
+    const auto compare = [&](Differences& differences) {
+        for (const base::AddressRange& range : ranges)
+            ReadPieces(
+                reader, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
+                    Compare(differences, address, std::span(erased).first(actual.size()), actual);
+                });
+    };
+    return Verify(reader, meter, compare);
 }
 
 void FailAsDifferent(Outcome& outcome, const Differences& differences, const LoadedImages& images,
@@ -130,6 +132,13 @@ void FailAsDifferent(Outcome& outcome, const Differences& differences, const Loa
     Fail(outcome, differences, &images,
          fmt::format("the flash differs from {}: {}{}{}", images.Name(), Extent(differences),
                      advice.empty() ? "" : "; ", advice));
+}
+
+void FailAsForecast(Outcome& outcome, const Differences& differences, const LoadedImages& images,
+                    const std::string& advice) {
+    Fail(outcome, differences, &images,
+         fmt::format("this load would fail: the flash would differ from {}: {}; {}", images.Name(),
+                     Extent(differences), advice));
 }
 
 void FailAsNotErased(Outcome& outcome, const Differences& differences) {

@@ -50,14 +50,18 @@ void Compare(Differences& differences, std::uint32_t address,
 /// Reads all that the image covers and compares. The target is halted first.
 Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image);
 
-/// The same with what an erase leaves.
+/// The same of some ranges with what an erase leaves.
 Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,
-                              const base::AddressRange& range);
+                              const std::vector<base::AddressRange>& ranges);
 
 /// Makes the outcome the failure (ContentsDiffer) of a flash that should hold the images, with a
 /// line for each of the first ranges that names the file; `advice` ends the closing line.
 void FailAsDifferent(Outcome& outcome, const Differences& differences, const LoadedImages& images,
                      const std::string& advice);
+
+/// The same of a load that would leave such a flash.
+void FailAsForecast(Outcome& outcome, const Differences& differences, const LoadedImages& images,
+                    const std::string& advice);
 
 /// The same of a flash that should be erased.
 void FailAsNotErased(Outcome& outcome, const Differences& differences);

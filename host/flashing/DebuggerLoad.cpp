@@ -295,7 +295,7 @@ void DebuggerLoad::Program(Sectors&& sectors, const image::Image& loose) {
 void DebuggerLoad::EraseOnly(const std::vector<base::AddressRange>& runs) {
     for (const base::AddressRange& run : runs) {
         const auto blank = [&] {
-            return CompareWithErased(*device_, device_->Meter(), run).Empty();
+            return CompareWithErased(*device_, device_->Meter(), {run}).Empty();
         };
         if (blank()) continue;
         SelectRange(settings_, kEraseKeys, run);

@@ -25,6 +25,7 @@ constexpr struct {
     {'=', "held", "held already"},
     {'+', "program", "to be programmed"},
     {'x', "cleared", "cleared along with it"},
+    {'!', "blocked", "needs an erase first"},
 };
 
 constexpr std::uint64_t kLinesMax = 16;
@@ -68,12 +69,22 @@ class Mapper {
   private:
     MapState StateOf(const base::AddressRange& piece, bool covered) const {
         const base::AddressRange start{piece.first, piece.first};
-        if (covered) return programmed_.BytesIn(start) != 0 ? MapState::Program : MapState::Held;
+        if (covered && programmed_.BytesIn(start) == 0) return MapState::Held;
+        if (covered) return IsBlocked(piece) ? MapState::Blocked : MapState::Program;
         const auto begin = contents_.begin() + static_cast<std::ptrdiff_t>(piece.first);
         const bool blank = std::all_of(begin, begin + static_cast<std::ptrdiff_t>(piece.Size()),
                                        [](std::uint8_t byte) { return byte == 0xFF; });
         if (blank) return MapState::Blank;
         return erased_.BytesIn(start) != 0 ? MapState::Cleared : MapState::Used;
+    }
+
+    /// Programming can only clear bits.
+    bool IsBlocked(const base::AddressRange& piece) const {
+        if (erased_.BytesIn({piece.first, piece.first}) != 0) return false;
+        const image::Section& section = image_.Sections()[section_];
+        for (std::uint64_t at = piece.first; at <= piece.last; ++at)
+            if ((section.bytes[at - section.address] & ~contents_[at]) != 0) return true;
+        return false;
     }
 
     void Append(const base::AddressRange& piece, MapState state) {
@@ -171,13 +182,18 @@ Json ToJson(const std::vector<MapRun>& runs) {
     return all;
 }
 
-Json ShowMap(Reporter& reporter, FlashReader& reader, WorkMeter& meter, const FlashGeometry& flash,
-             const image::Image& image, const LoadPlan& plan) {
+std::vector<std::uint8_t> ReadAll(FlashReader& reader, WorkMeter& meter,
+                                  const FlashGeometry& flash) {
     reader.Halt();
     meter.Expect(Phase::Read, flash.flashBytes);
     meter.Begin(Phase::Read);
-    const auto contents = reader.ReadFlash({0, static_cast<std::uint32_t>(flash.flashBytes - 1)});
+    auto contents = reader.ReadFlash({0, static_cast<std::uint32_t>(flash.flashBytes - 1)});
     meter.End();
+    return contents;
+}
+
+Json ShowMap(Reporter& reporter, const std::vector<std::uint8_t>& contents,
+             const FlashGeometry& flash, const image::Image& image, const LoadPlan& plan) {
     const std::vector<MapRun> runs = MapFlash(contents, flash, image, plan);
     for (const std::string& line : DrawMap(runs, flash, reporter.Columns()))
         reporter.Result(line);

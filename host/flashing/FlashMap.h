@@ -25,6 +25,7 @@ enum class MapState {
     Held,     ///< holds the image's bytes already
     Program,  ///< gets the image's bytes
     Cleared,  ///< holds something that a load erases, and that isn't the image's
+    Blocked,  ///< can't get the image's bytes: bits of it are 0 and aren't erased
 };
 
 struct MapRun {
@@ -45,9 +46,12 @@ std::vector<std::string> DrawMap(const std::vector<MapRun>& runs, const FlashGeo
 
 Json ToJson(const std::vector<MapRun>& runs);
 
-/// Halts the target, reads all of the flash, shows its map, and returns the runs for the JSON
-/// lines.
-Json ShowMap(Reporter& reporter, FlashReader& reader, WorkMeter& meter, const FlashGeometry& flash,
-             const image::Image& image, const LoadPlan& plan);
+/// Halts the target and reads all of the flash.
+std::vector<std::uint8_t> ReadAll(FlashReader& reader, WorkMeter& meter,
+                                  const FlashGeometry& flash);
+
+/// Shows the map of these contents, and returns its runs for the JSON lines.
+Json ShowMap(Reporter& reporter, const std::vector<std::uint8_t>& contents,
+             const FlashGeometry& flash, const image::Image& image, const LoadPlan& plan);
 
 }  // namespace host

@@ -45,23 +45,38 @@ NamedFile SplitAddress(const std::string& text) {
                     text, behind));
 }
 
-LoadedImages Within(const LoadedImages& images, const base::AddressRange& range) {
-    LoadedImages within;
+namespace {
+
+std::optional<base::AddressRange> Overlap(const base::AddressRange& one,
+                                          const base::AddressRange& other) {
+    const base::AddressRange both{std::max(one.first, other.first), std::min(one.last, other.last)};
+    return both.first <= both.last ? std::optional(both) : std::nullopt;
+}
+
+void AddWithin(LoadedImages& within, const LoadedImages& images, const base::AddressRange& range) {
+    bool found = false;
     for (const image::Section& section : images.image.Sections()) {
-        const std::uint32_t first = std::max(section.address, range.first);
-        const std::uint32_t last = std::min(section.Last(), range.last);
-        if (first > last) continue;
-        const auto begin = section.bytes.begin() + (first - section.address);
-        const auto end = section.bytes.begin() + (last - section.address) + 1;
-        within.image.Add(first, {begin, end}, images.Name());
+        const auto part = Overlap({section.address, section.Last()}, range);
+        if (!part) continue;
+        found = true;
+        const auto begin = section.bytes.begin() + (part->first - section.address);
+        const auto end = section.bytes.begin() + (part->last - section.address) + 1;
+        within.image.Add(part->first, {begin, end}, images.Name());
     }
-    if (within.image.Empty())
+    if (!found)
         throw Failure(ExitStatus::WrongUsage,
                       fmt::format("{}: no bytes in the range {}", images.Name(), RangeText(range)));
-    for (const auto& [file, part] : images.origins)
-        if (part.first <= range.last && range.first <= part.last)
-            within.origins.push_back(
-                {file, {std::max(part.first, range.first), std::min(part.last, range.last)}});
+    for (const LoadedImages::Origin& origin : images.origins)
+        if (const auto part = Overlap(origin.range, range))
+            within.origins.push_back({origin.file, *part});
+}
+
+}  // namespace
+
+LoadedImages Within(const LoadedImages& images, const std::vector<base::AddressRange>& ranges) {
+    LoadedImages within;
+    for (const base::AddressRange& range : ranges)
+        AddWithin(within, images, range);
     return within;
 }
 

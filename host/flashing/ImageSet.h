@@ -46,8 +46,8 @@ NamedFile SplitAddress(const std::string& text);
 /// binary.
 image::ImageFile ReadNamedFile(const std::string& text, const image::ReadOptions& options);
 
-/// What of the images lies in a range. Failure (WrongUsage) when it is nothing.
-LoadedImages Within(const LoadedImages& images, const base::AddressRange& range);
+/// What of the images lies in some ranges. Failure (WrongUsage) when it is nothing for one of them.
+LoadedImages Within(const LoadedImages& images, const std::vector<base::AddressRange>& ranges);
 
 /// Reads the files and joins them. Failure (WrongUsage) for a second raw binary without a
 /// place of its own.

@@ -22,6 +22,9 @@ class ProbeServing {
     ProbeServing(const DeviceOptions& options, const std::string& address,
                  const SettingStore& settings, Reporter& reporter);
 
+    /// What is served, for the user.
+    std::string Device() const { return BoardAt(*options_.target.gdb); }
+
     /// Where debuggers connect, with the port that was got.
     const target::gdb::Address& Where() const { return address_; }
     std::uint16_t Port() const { return server_->Port(); }

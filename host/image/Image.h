@@ -21,7 +21,7 @@ inline constexpr std::uint64_t kFlashBytesMax = std::uint64_t{128} << 20;
 
 /// Text needs two digits a byte, and as much again for what stands around them; ELF files hold
 /// debugging information as well.
-inline constexpr FileKind kImageFile{"image file", ExitStatus::BadFile, 4 * kFlashBytesMax};
+inline constexpr FileKind kImageFile{"image file", ExitStatus::BadFile, 4 * kFlashBytesMax, true};
 
 /// A run of bytes at consecutive addresses; never empty inside an Image.
 struct Section {

@@ -90,22 +90,21 @@ bool UpdateGate::Passes(Phase phase, const PhaseProgress& progress, Time now) {
 void ProgressDisplay::DrawBar(Phase phase, const PhaseProgress& progress) {
     if (style_ != ProgressStyle::Bar) return;
     // One column stays free: a terminal wraps when its last one is written.
-    fmt::print(stream_, "\r\033[K{}", BarLine(phase, progress, TerminalColumns(stream_) - 1));
-    std::fflush(stream_);
+    write_("\r\033[K" + BarLine(phase, progress, TerminalColumns(stream_) - 1));
     drawn_ = true;
 }
 
 void ProgressDisplay::DrawPlain(Phase phase, const PhaseProgress& progress) {
     unsigned& next = nextPercent_[phase];
     if (style_ != ProgressStyle::Plain || progress.Percent() < next) return;
-    fmt::print(stream_, "{}: {} % ({} of {})\n", Name(phase).running, progress.Percent(),
-               SizeText(progress.doneBytes), SizeText(progress.totalBytes));
+    write_(fmt::format("{}: {} % ({} of {})\n", Name(phase).running, progress.Percent(),
+                       SizeText(progress.doneBytes), SizeText(progress.totalBytes)));
     next = progress.Percent() / 10 * 10 + 10;
 }
 
 void ProgressDisplay::Clear() {
     if (!drawn_) return;
-    fmt::print(stream_, "\r\033[K");
+    write_("\r\033[K");
     drawn_ = false;
 }
 

@@ -4,9 +4,11 @@
 
 #include <chrono>
 #include <cstdio>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
+#include <utility>
 
 #include "host/output/Phases.h"
 
@@ -39,7 +41,11 @@ class UpdateGate {
 
 class ProgressDisplay {
   public:
-    ProgressDisplay(ProgressStyle style, std::FILE* stream) : style_(style), stream_(stream) {}
+    using Writer = std::function<void(const std::string&)>;
+
+    /// Draws by `write`, on the screen behind `stream`.
+    ProgressDisplay(ProgressStyle style, std::FILE* stream, Writer write)
+        : style_(style), stream_(stream), write_(std::move(write)) {}
 
     /// To be called for every step: a line for each ten percent that were passed.
     void DrawPlain(Phase phase, const PhaseProgress& progress);
@@ -53,6 +59,7 @@ class ProgressDisplay {
   private:
     ProgressStyle style_;
     std::FILE* stream_;
+    Writer write_;
     bool drawn_ = false;
     std::map<Phase, unsigned> nextPercent_;
 };

@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <string_view>
+#include <utility>
 
 #include "host/files/Streams.h"
 
@@ -35,14 +36,21 @@ Reporter::Reporter(const Options& options)
     : options_(options),
       out_(options.json ? stderr : stdout),
       colour_(WantsColour(stderr)),
-      display_(Style(options), stderr) {}
+      display_(Style(options), stderr,
+               [](const std::string& text) { WriteAll(STDERR_FILENO, text); }) {}
 
-void Reporter::Begin(const std::string& command) {
-    JsonLine("begin", {{"tool", "corvane-flash " CORVANE_FLASH_VERSION}, {"command", command}});
+void Reporter::Begin(const std::string& command, const Json& target) {
+    JsonLine("begin", {{"tool", "corvane-flash " CORVANE_FLASH_VERSION},
+                       {"command", command},
+                       {"target", target}});
 }
 
 void Reporter::Result(const std::string& text) {
     Line(out_, text);
+}
+
+void Reporter::Document(const std::string& text) {
+    Line(out_, text, Breaks::Keep);
 }
 
 void Reporter::Data(const std::string& bytes) {
@@ -55,15 +63,18 @@ void Reporter::Say(Verbosity level, const std::string& text) {
     Line(stderr, text);
 }
 
+void Reporter::WorksOn(const std::string& target) {
+    if (!std::exchange(saidTarget_, true)) Say(Verbosity::Normal, target);
+}
+
 void Reporter::Listening(const std::string& address, const Json& parts) {
     JsonLine("listening", parts);
     Result(fmt::format("Listening at {}; Ctrl-C ends it", address));
-    std::fflush(out_);
 }
 
 void Reporter::PluginMessage(Verbosity level, const std::string& text) {
     JsonLine("message", {{"from", "plug-in"}, {"level", "info"}, {"text", text}});
-    if (Hears(level)) Line(stderr, text);
+    if (Hears(level)) Line(stderr, text, Breaks::Keep);
 }
 
 void Reporter::PluginError(Verbosity level, const std::string& text) {
@@ -77,8 +88,8 @@ void Reporter::Error(const std::string& text) {
 }
 
 void Reporter::ClosingError(const std::string& text) {
-    const char* form = colour_ ? "\033[1;31mcorvane-flash:\033[0m {}" : "corvane-flash: {}";
-    Line(stderr, fmt::format(fmt::runtime(form), text));
+    const char* name = colour_ ? "\033[1;31mcorvane-flash:\033[0m " : "corvane-flash: ";
+    Write(stderr, name + Printable(text) + "\n");
 }
 
 void Reporter::Progress(Phase phase, const PhaseProgress& progress) {
@@ -107,13 +118,14 @@ void Reporter::JsonLine(const char* event, const Json& members) {
     Json line{{"version", kJsonVersion}, {"event", event}};
     line.update(members);
     // File names need not be UTF-8; what isn't is replaced.
-    Line(stdout, line.dump(-1, ' ', false, Json::error_handler_t::replace));
+    Write(stdout, PrintableJson(line.dump(-1, ' ', false, Json::error_handler_t::replace)) + "\n");
 }
 
-void Reporter::Line(std::FILE* stream, const std::string& text) {
-    Write(stream, text + "\n");
+void Reporter::Line(std::FILE* stream, const std::string& text, Breaks breaks) {
+    Write(stream, Printable(text, breaks) + "\n");
 }
 
+// What can't be written to standard error is lost, and the work goes on.
 void Reporter::Write(std::FILE* stream, const std::string& text) {
     display_.Clear();
     const int error = WriteAll(fileno(stream), text);

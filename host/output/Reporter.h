@@ -1,4 +1,5 @@
-// Everything that the tool says: results on standard output, messages and progress on standard
+// Everything that the tool says, in one place, through which no control character from outside
+// reaches a terminal: results on standard output, messages and progress on standard
 // error, or JSON lines on standard output and everything else on standard error.
 
 #pragma once
@@ -9,6 +10,7 @@
 
 #include "host/base/Errors.h"
 #include "host/base/Json.h"
+#include "host/base/Printable.h"
 #include "host/base/Terminal.h"
 #include "host/output/Progress.h"
 
@@ -22,6 +24,7 @@ struct Outcome {
     std::string error = {};
     Json result = Json::object();
     std::vector<std::string> details = {};  ///< lines to show below the error
+    std::string done = {};                  ///< to be shown when all is done, files included
 };
 
 class Reporter {
@@ -34,16 +37,23 @@ class Reporter {
 
     explicit Reporter(const Options& options);
 
-    void Begin(const std::string& command);
+    /// `target` is what the options name to work on, or null.
+    void Begin(const std::string& command, const Json& target);
 
     /// What the command was run for: shown whatever the level.
     void Result(const std::string& text);
+
+    /// The same of several lines.
+    void Document(const std::string& text);
 
     /// The same as bytes that aren't for people, which go to standard output as they are.
     void Data(const std::string& bytes);
 
     /// A line for those who want to hear this much.
     void Say(Verbosity level, const std::string& text);
+
+    /// What is worked on: said once, however often it is opened.
+    void WorksOn(const std::string& target);
 
     /// What the command has done, the last line of its summary.
     void Done(const std::string& text) {
@@ -78,13 +88,14 @@ class Reporter {
 
   private:
     void JsonLine(const char* event, const Json& members);
-    void Line(std::FILE* stream, const std::string& text);
+    void Line(std::FILE* stream, const std::string& text, Breaks breaks = Breaks::Escape);
     void Write(std::FILE* stream, const std::string& text);
 
     Options options_;
     std::FILE* out_;  ///< where results go that people read
     bool colour_;
     int outputError_ = 0;
+    bool saidTarget_ = false;
     UpdateGate gate_;
     ProgressDisplay display_;
     std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();

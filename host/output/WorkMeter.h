@@ -30,6 +30,9 @@ class WorkMeter {
     void Advance(std::uint64_t bytes);
     void End();
 
+    /// Why nothing seems to go on.
+    void Say(const std::string& text) { reporter_.Say(Verbosity::Normal, text); }
+
     std::optional<Phase> Running() const { return current_; }
     const PhaseRecord& Phases() const { return phases_; }
 

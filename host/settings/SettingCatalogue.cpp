@@ -58,7 +58,7 @@ const SettingInfo kCatalogue[] = {
     {keys::kRegisterInputs[1], Form::Hex, "ffffffff",
      "value to program into user register 1, or the one read back"},
     {keys::kRegisterCommits[1], Form::Hex, "0", "1: commit user register 1 when it is programmed"},
-    {keys::kCrystalFreq, Form::Hex, "8",
+    {keys::kCrystalFreq, Form::NonzeroHex, "8",
      "crystal frequency in MHz, in hexadecimal: 10 is 16 MHz; for Ravik, Tolva and Mesk"},
     {keys::kTimeout, Form::Seconds, "30",
      "longest wait for the flash loader in one section, in seconds; corvane-flash itself waits "
@@ -90,6 +90,8 @@ bool Accepts(const SettingInfo& info, const std::string& text) {
             return IsDecimal(text, 1);
         case Form::Hex:
             return base::ParseHex32(text).has_value();
+        case Form::NonzeroHex:
+            return base::ParseHex32(text).value_or(0) != 0;
         case Form::Mac:
             return ParseMacAddress(text).has_value();
         case Form::Choice:
@@ -137,6 +139,8 @@ std::string AcceptedTexts(const SettingInfo& info) {
             return "a whole decimal number of seconds, at least 1";
         case Form::Hex:
             return "a hexadecimal number up to ffffffff";
+        case Form::NonzeroHex:
+            return "a hexadecimal number from 1 to ffffffff";
         case Form::Mac:
             return "six hexadecimal bytes, as in 02-1b-c3-04-05-06";
         case Form::Choice:

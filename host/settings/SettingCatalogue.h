@@ -10,7 +10,7 @@
 
 namespace host {
 
-enum class SettingForm { Switch, Integer, Hex, Seconds, Mac, Choice, Published };
+enum class SettingForm { Switch, Integer, Hex, NonzeroHex, Seconds, Mac, Choice, Published };
 
 struct SettingInfo {
     const char* key;

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <sstream>
+#include <string_view>
 
 #include "host/base/Errors.h"
 #include "host/files/InputFile.h"
@@ -54,7 +55,10 @@ SettingPaths FindSettingPaths(const std::string& chosen) {
     }
     std::error_code ignored;
     if (fs::exists(paths.user, ignored) && !fs::is_regular_file(paths.user, ignored)) return paths;
-    paths.kept = fs::path(paths.user).replace_extension(".kept.toml").string();
+    constexpr std::string_view kExtension = ".toml";
+    const bool isToml = paths.user.ends_with(kExtension);
+    paths.kept = isToml ? paths.user.substr(0, paths.user.size() - kExtension.size()) + ".kept.toml"
+                        : paths.user + ".kept";
     return paths;
 }
 

@@ -23,7 +23,7 @@ std::optional<std::string> TextOf(const toml::node& node, SettingForm form) {
     if (number == nullptr) return std::nullopt;
     const bool hex =
         (number->flags() & toml::value_flags::format_as_hexadecimal) != toml::value_flags::none;
-    if (form == SettingForm::Hex)
+    if (form == SettingForm::Hex || form == SettingForm::NonzeroHex)
         return hex ? std::optional(fmt::format("{:x}", number->get())) : std::nullopt;
     return fmt::format("{}", number->get());
 }

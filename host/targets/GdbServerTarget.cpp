@@ -62,7 +62,7 @@ std::unique_ptr<gdb::GdbTarget> Connect(const TargetOptions& options, const Trac
 }  // namespace
 
 GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& trace)
-    : own_(host::Connect(options, trace)), target_(*own_) {}
+    : server_(*options.gdb), own_(host::Connect(options, trace)), target_(*own_) {}
 
 ProbeConnector::ProbeConnector(const TargetOptions& options)
     : address_(ParseServer(options)), options_(ParseOptions(options)) {

@@ -12,6 +12,11 @@
 
 namespace host {
 
+/// What is worked on there, for the user.
+inline std::string BoardAt(const std::string& server) {
+    return "Board at the GDB server " + server;
+}
+
 class GdbServerTarget final : public OpenTarget {
   public:
     /// Failure (WrongUsage) for options that can't be read, Failure (Unreachable) for a server or a
@@ -23,6 +28,7 @@ class GdbServerTarget final : public OpenTarget {
 
     target::Target& Get() override { return target_; }
     std::string Advice() override;
+    std::string Description() const override { return BoardAt(server_); }
     void RamEndsAt(std::uint32_t address) override { target_.SetRamEnd(address); }
     void RequireLoader(const std::string& directory) override;
     void Release(bool run) override {
@@ -30,6 +36,7 @@ class GdbServerTarget final : public OpenTarget {
     }
 
   private:
+    std::string server_;
     std::unique_ptr<target::gdb::GdbTarget> own_;
     target::gdb::GdbTarget& target_;
 };

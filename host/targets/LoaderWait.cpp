@@ -15,6 +15,9 @@ namespace host {
 
 namespace {
 
+/// Whoever looks at a bar that stands still for longer wonders.
+constexpr std::chrono::seconds kPatience{3};
+
 constexpr std::uint32_t StatusWord(std::size_t block) {
     return plugin::kParameterBlocks[block] + plugin::kStatusOffset;
 }
@@ -108,6 +111,7 @@ void LoaderWait::LoadProgram(const std::string& fileName, const std::string& dir
 void LoaderWait::Run() {
     next_.Run();
     loaderRuns_ = std::exchange(programLoaded_, false);
+    toldOfWait_ = false;
 }
 
 void LoaderWait::Halt() {
@@ -147,10 +151,17 @@ bool LoaderWait::Await(std::size_t block, Time until, const std::function<bool()
         const Time pause = StandsStill() ? Time::zero() : Due(block, until) - RanFor();
         if (pause > Time::zero() && !stop_()) Pause(pause);
         if (!Look(block, isPending)) break;
+        TellOfLongWait(*chunks_[block]);
         if (stop_() || RanFor() >= until) return false;
     }
     Finish(block);
     return true;
+}
+
+void LoaderWait::TellOfLongWait(const Chunk& chunk) {
+    if (toldOfWait_ || RanFor() - chunk.start < kPatience) return;
+    toldOfWait_ = true;
+    observer_.StillAtWork(chunk.flash, std::chrono::floor<std::chrono::seconds>(limit_));
 }
 
 /// When the next look should be sent off. A loader that has crashed is found out by a look.

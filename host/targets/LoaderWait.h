@@ -34,6 +34,10 @@ class LoaderObserver {
     /// The loader was seen to have finished the chunk.
     virtual void Programmed(const base::AddressRange& chunk) = 0;
 
+    /// The loader has been at a chunk for some seconds; it is given up when it needs more than
+    /// `limit`. Called once while a loader runs.
+    virtual void StillAtWork(const base::AddressRange& /*chunk*/, std::chrono::seconds /*limit*/) {}
+
   protected:
     ~LoaderObserver() = default;
 };
@@ -95,6 +99,7 @@ class LoaderWait final : public target::Target {
     bool Await(std::size_t block, Time until, const std::function<bool()>& isPending);
     Time Due(std::size_t block, Time until) const;
     bool Look(std::size_t block, const std::function<bool()>& isPending);
+    void TellOfLongWait(const Chunk& chunk);
     void Finish(std::size_t block);
     void BeginAfter(const Chunk& chunk, Time seen, Chunk& next) const;
     void Forget();
@@ -105,6 +110,7 @@ class LoaderWait final : public target::Target {
     Time limit_ = std::chrono::seconds(30);
     bool programLoaded_ = false;
     bool loaderRuns_ = false;
+    bool toldOfWait_ = false;
     std::array<std::optional<Chunk>, 2> chunks_;  ///< at work, by their blocks
     LoaderPace pace_;
 };

@@ -42,6 +42,16 @@ void RequireOneKind(const TargetOptions& options) {
                       "--gdb-option, --loader and --wait are for a target behind --gdb HOST:PORT");
 }
 
+Json ToJson(const TargetOptions& options) {
+    const auto text = [](const std::optional<std::string>& given) {
+        return given ? Json(*given) : Json(nullptr);
+    };
+    if (!options.gdb)
+        return {{"kind", "simulated"}, {"sim", text(options.sim)}, {"file", text(options.simFile)}};
+    if (options.sim || options.simFile) return nullptr;
+    return {{"kind", "gdb"}, {"server", text(options.gdb)}};
+}
+
 std::unique_ptr<OpenTarget> Open(const TargetOptions& options, const TraceLine& trace,
                                  const WaitNotice& say) {
     RequireOneKind(options);

@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "host/base/Json.h"
 #include "host/files/FileLock.h"
 #include "target/Target.h"
 
@@ -26,6 +27,9 @@ struct TargetOptions {
     std::optional<std::string> expect;    ///< what the device must be, whatever it is reached by
 };
 
+/// The same for JSON lines; null when they contradict each other.
+Json ToJson(const TargetOptions& options);
+
 /// Takes lines for the trace; `source` is who speaks.
 using TraceLine = std::function<void(const char* source, const std::string& text)>;
 
@@ -39,6 +43,9 @@ class OpenTarget {
     /// be said when none was found.
     virtual std::string Advice() = 0;
 
+    /// What is worked on, in one line for the user.
+    virtual std::string Description() const = 0;
+
     /// What the plug-in has found out: the address behind the device's RAM.
     virtual void RamEndsAt(std::uint32_t /*address*/) {}
 
@@ -47,7 +54,7 @@ class OpenTarget {
     virtual void RequireLoader(const std::string& /*directory*/) {}
 
     /// Keeps what must outlive the run; `changed` tells whether there is anything new. Failure
-    /// (Unreachable).
+    /// (BadFile).
     virtual void Keep(bool /*changed*/) {}
 
     /// The last thing done with a target: leaves it halted, or has it run its own program from

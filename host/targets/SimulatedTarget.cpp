@@ -22,6 +22,9 @@ namespace {
 constexpr FileKind kContentsFile{"contents file of the simulated device", ExitStatus::Unreachable,
                                  target::kContentsBytesMax};
 
+/// The same when it can't be written: then the device was worked on.
+constexpr FileKind kKeptContents{kContentsFile.name, ExitStatus::BadFile, kContentsFile.maxBytes};
+
 bool IsThere(const std::string& path) {
     std::error_code error;
     return std::filesystem::exists(path, error) || error;
@@ -47,6 +50,17 @@ std::string WithSuggestion(std::string text, const std::string& suggestion) {
     return text + suggestion;
 }
 
+/// A file that is replaced when it is saved would part from its other names.
+void RequireOneName(const std::string& path) {
+    std::error_code error;
+    const auto names = std::filesystem::hard_link_count(path, error);
+    if (!error && names > 1 && std::filesystem::is_regular_file(path, error))
+        throw Failure(ExitStatus::BadFile,
+                      fmt::format("the {} {} has {} names (hard links), and saving it would leave "
+                                  "the others behind; copy it, or use a symbolic link",
+                                  kContentsFile.name, path, names));
+}
+
 std::unique_ptr<target::SimulatedDevice> Open(const TargetOptions& options) {
     const target::DeviceOptions device =
         options.sim ? target::ParseDeviceOptions(*options.sim) : target::DefaultDeviceOptions();
@@ -60,6 +74,7 @@ std::unique_ptr<target::SimulatedDevice> Open(const TargetOptions& options) {
 SimulatedTarget::SimulatedTarget(const TargetOptions& options, const WaitNotice& say)
     : path_(options.simFile.value_or("")) {
     if (!path_.empty()) lock_.emplace(kContentsFile, path_, say);
+    if (!path_.empty()) RequireOneName(path_);
     try {
         device_ = Open(options);
     } catch (const target::OptionError& error) {
@@ -74,9 +89,18 @@ SimulatedTarget::SimulatedTarget(const TargetOptions& options, const WaitNotice&
     }
 }
 
+std::string SimulatedTarget::Name() const {
+    return fmt::format("Simulated {}, kept {}", device_->Options().className,
+                       path_.empty() ? "nowhere" : "in " + path_);
+}
+
+std::string SimulatedTarget::Description() const {
+    return Name() + (path_.empty() ? "; --gdb for a board" : "");
+}
+
 void SimulatedTarget::Keep(bool changed) {
     if (path_.empty() || (!changed && IsThere(path_))) return;
-    WriteWholeFile(kContentsFile, path_, target::EncodeContents(*device_), Existing::Replace);
+    WriteWholeFile(kKeptContents, path_, target::EncodeContents(*device_), Existing::Replace);
 }
 
 void SimulatedTarget::Release(bool run) {

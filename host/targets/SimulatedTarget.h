@@ -22,6 +22,10 @@ class SimulatedTarget final : public OpenTarget {
 
     target::Target& Get() override { return *device_; }
     std::string Advice() override { return "check the options of --sim"; }
+    std::string Description() const override;
+
+    /// Which device, and where it is kept.
+    std::string Name() const;
     target::SimulatedDevice& Device() { return *device_; }
 
     /// Keeps the contents, if a file was named for them; a file that is there already is left alone

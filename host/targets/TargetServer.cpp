@@ -39,11 +39,9 @@ TargetServer::TargetServer(const TargetOptions& options, const std::string& addr
     address_.port = std::to_string(server_.Port());
 }
 
-void TargetServer::Run() try {
+void TargetServer::Run() {
     server_.Run();
     if (!kept_) target_.Keep(true);
-} catch (const Failure& failure) {
-    throw Failure(ExitStatus::BadFile, failure.what());
 }
 
 }  // namespace host

@@ -23,6 +23,7 @@ class TargetServer {
 
     /// Where clients connect, with the port that was got.
     const target::gdb::Address& Where() const { return address_; }
+    std::string Device() const { return target_.Name(); }
     std::uint16_t Port() const { return server_.Port(); }
 
     /// Serves until Ctrl-C. Failure (BadFile) when the contents couldn't be kept at the end.

@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "host/base/MacAddress.h"
+#include "host/base/Printable.h"
 #include "host/base/Text.h"
 #include "tests/support/FailureOf.h"
 
@@ -33,6 +34,14 @@ TEST(Text, NeverRoundsUpToAThousandOfAUnit) {
     EXPECT_EQ(DurationText(0.9994) + DurationText(0.9996) + DurationText(59.94),
               "999 ms1.0 s59.9 s");
     EXPECT_EQ(DurationText(59.96) + DurationText(119.6), "1:002:00");
+}
+
+TEST(Printable, LeavesNothingThatATerminalObeys) {
+    EXPECT_EQ(Printable("a\tb\n\x1b[2J\x7f \u00e4\u20ac\U0001F600 \xC2\x9b\x9b\xff"),
+              "a\tb\\n\\x1b[2J\\x7f \u00e4\u20ac\U0001F600 \\u009b\\x9b\\xff");
+    EXPECT_EQ(Printable("a\nb\r", Breaks::Keep), "a\nb\\x0d");
+    EXPECT_EQ(Printable("cut \xE2\x82"), "cut \\xe2\\x82");
+    EXPECT_EQ(PrintableJson("\"\u00e4\xC2\x9b\x7f\""), "\"\u00e4\\u009b\\u007f\"");
 }
 
 TEST(MacAddress, IsReadInAllFormsAndRefusedInNoOther) {

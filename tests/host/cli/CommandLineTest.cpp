@@ -43,7 +43,7 @@ ProjectFile TwoBoards(const std::string& standard) {
 /// The meaning as the rows tell it. Variables stand before the line's words; DEFAULT_BOARD is that
 /// of a project.
 std::string Meaning(Words words) {
-    std::map<std::string, std::string> variables;
+    std::map<std::string, std::optional<std::string>> variables;
     while (!words.empty() &&
            (words.front().starts_with("CORVANE_") || words.front().starts_with("DEFAULT_"))) {
         const auto equals = words.front().find('=');
@@ -56,7 +56,7 @@ std::string Meaning(Words words) {
             AllCommands(), line, [&](const char* name) { return variables[name]; },
             [&] {
                 const auto board = variables.find("DEFAULT_BOARD");
-                return board == variables.end() ? ProjectFile() : TwoBoards(board->second);
+                return board == variables.end() ? ProjectFile() : TwoBoards(*board->second);
             });
         static constexpr const char* kBy[] = {"", " (environment)", " (board)"};
         if (parsed.command == nullptr) return parsed.answer;

@@ -61,7 +61,7 @@ TEST(DeviceFailure, TellsWhatWasDoneWhyItFailedAndWhatTheDeviceHolds) {
          {},
          ExitStatus::DeviceFailed,
          "erasing: Erase failed; then E" + asItWas,
-         "erasing: E" + asItWas},
+         "erasing ended with the errors above; then E" + asItWas},
         {{"erasing", "E", "S.", "the cable"},
          With([](KnownState& state) { state.traced = true; }),
          ExitStatus::DeviceFailed,

@@ -130,8 +130,11 @@ TEST(FileLock, KeepsOthersOutUntilItIsGoneAndLeavesNothing) {
                                               directory.File("link") + "; waiting up to 10 s"}));
     EXPECT_FALSE(fs::exists(LockPath(file)));
     // A file of that name which is no lock stays; where none can be made, nothing is locked.
-    directory.Write("file.lock", "mine");
-    { const FileLock lock(kNote, file, say); }
+    for (const char* contents : {"", "mine"}) {
+        directory.Write("file.lock", contents);
+        { const FileLock lock(kNote, file, say); }
+        EXPECT_EQ(test::Contents(LockPath(file)), contents);
+    }
     { const FileLock lock(kNote, directory.File("none/file"), say); }
     EXPECT_EQ(test::Contents(LockPath(file)), "mine");
     EXPECT_EQ(said.size(), 1U);

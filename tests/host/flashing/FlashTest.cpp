@@ -9,6 +9,7 @@
 
 #include "host/flashing/Comparison.h"
 #include "host/flashing/FlashMap.h"
+#include "host/flashing/Forecast.h"
 #include "host/flashing/ImageSet.h"
 #include "host/flashing/KeptBytes.h"
 #include "host/flashing/Unchanged.h"
@@ -47,6 +48,38 @@ TEST(FlashMap, TellsWhatALoadDoesToEachPart) {
     EXPECT_EQ(runs, expected);
     EXPECT_EQ(DrawMap(runs, flash, 40)[0], "0x00  #x=#");
     EXPECT_EQ(DrawMap(runs, {64, 1}, 13)[1], "0x08  ########");
+    plan.erased.clear();
+    contents[17] = 0xFE;
+    image = {};
+    image.Add(17, {0xFE}, "image");
+    plan.sections = image.Sections();
+    EXPECT_EQ(MapFlash(contents, flash, image, plan)[2].state, Program);
+    image = {};
+    image.Add(17, {0xFD}, "image");
+    EXPECT_EQ(MapFlash(contents, flash, image, plan)[2], (MapRun{{17, 17}, Blocked}));
+}
+
+TEST(Forecast, IsWhatTheLoadWouldFind) {
+    std::vector<std::uint8_t> contents(64, 0x0F);
+    contents[3] = 0xFE;
+    image::Image image;
+    image.Add(2, {0x0F, 0xF0}, "image");
+    image.Add(16, {0x80}, "image");
+    LoadPlan plan;
+    plan.sections = image.Sections();
+    plan.erased = {{16, 31}};
+    const Forecast compared = ForecastLoad(plan, image, contents);
+    EXPECT_FALSE(compared.notBlank);
+    EXPECT_EQ(compared.differences, Differences{});
+    contents[3] = 0xDE;
+    EXPECT_EQ(ForecastLoad(plan, image, contents).differences,
+              (Differences{1, 1, {{{3, 3}, 0xF0, 0xD0}}, 3, 3}));
+    plan.checks.compare = false;
+    EXPECT_TRUE(ForecastLoad(plan, image, contents).differences.Empty());
+    plan.checks.blankCheck = true;
+    EXPECT_EQ(ForecastLoad(plan, image, contents).notBlank.value_or(NotBlank{}).actual, 0x0F);
+    plan.sections = {image.Sections()[1]};
+    EXPECT_FALSE(ForecastLoad(plan, image, contents).notBlank);
 }
 
 TEST(Comparison, JoinsWhatLiesCloseAndKeepsTheFirstRanges) {
@@ -87,7 +120,7 @@ TEST(Comparison, ReadsWhatTheImageCoversPieceByPiece) {
     EXPECT_EQ(flash.log, "halt 10-11 40-10003f 100040-10004f ");
     EXPECT_EQ(flash.Progress(Phase::Verify), "1048594 of 0");
     flash.log.clear();
-    EXPECT_EQ(CompareWithErased(flash, flash.meter, {1, 0x100005}), expected);
+    EXPECT_EQ(CompareWithErased(flash, flash.meter, {{1, 0x100005}}), expected);
     EXPECT_EQ(flash.log, "halt 1-100000 100001-100005 ");
     EXPECT_FALSE(flash.meter.Running());
 }
@@ -193,12 +226,12 @@ TEST(ImageSet, TellsWhatDoesNotFitAndWhereABytesComesFrom) {
     images.Add(ImageOf({{0x3FFF, {9}}}), "app.hex");
     EXPECT_EQ(images.FileOf(0x12) + images.FileOf(0x3FFF) + images.FileOf(0x13),
               "boot.elfapp.hexthe images");
-    const LoadedImages part = Within(images, {0x11, 0x20});
+    const LoadedImages part = Within(images, {{0x11, 0x20}});
     EXPECT_EQ(part.image, ImageOf({{0x11, {2, 3}}, {0x20, {4}}}));
     EXPECT_EQ(part.origins.size(), 2U);
     EXPECT_EQ(part.origins[0].range, (base::AddressRange{0x11, 0x12}));
     EXPECT_EQ(test::FailureOf([&] {
-                  Within(images, {0x13, 0x1F});
+                  Within(images, {{0x20, 0x20}, {0x13, 0x1F}});
               }),
               "2: the images: no bytes in the range 0x13-0x1f");
     test::FakeFlash fits(0x4000, 0xFF);

@@ -72,6 +72,9 @@ class Board final : public target::Target, public LoaderObserver {
     void HandingOver(const base::AddressRange&) override { log += "handing "; }
     void HandedOver(const base::AddressRange&) override { log += "handed "; }
     void Programmed(const base::AddressRange& chunk) override { Note(RangeText(chunk).c_str()); }
+    void StillAtWork(const base::AddressRange&, std::chrono::seconds limit) override {
+        Note(fmt::format("waiting-{}", limit.count()).c_str());
+    }
 
   private:
     void Exchange() {
@@ -234,8 +237,10 @@ TEST(LoaderWait, AwaitsTheLoaderBeforeItIsStopped) {
     fixture.wait.Halt();
     EXPECT_EQ(fixture.board.log,
               "halt@0 load@0 run@0 handing handed 0x0-0x7ff@1533 read@1533 handing handed "
-              "0x800-0xfff@3033 halt@3033 load@3033 run@3033 handing handed reset@33033 "
-              "load@33033 run@33033 handing handed halt@63033 load@63033 run@63033 handing "
+              "0x800-0xfff@3033 halt@3033 load@3033 run@3033 handing handed "
+              "waiting-30@6127 reset@33033 "
+              "load@33033 run@33033 handing handed waiting-30@36082 halt@63033 load@63033 "
+              "run@63033 handing "
               "halt@66082 load@66082 run@66082 handing handed halt@66082 ");
 }
 
