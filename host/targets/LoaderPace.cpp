@@ -21,7 +21,7 @@ constexpr int kSinkingShare = 2048;
 }  // namespace
 
 LoaderPace::Time LoaderPace::Margin() const {
-    return (mailboxBytes_ + most_.value_or(least_)) / kMarginShare;
+    return (lookTime_ + most_.value_or(least_)) / kMarginShare;
 }
 
 LoaderPace::Time LoaderPace::Guess() const {
@@ -37,7 +37,7 @@ void LoaderPace::Pending(Time ran) {
     if (most_ && least_ < *most_) return;
     if (most_) step_ = Time::zero();
     most_.reset();
-    step_ = known_ ? std::max(2 * step_, Margin()) : std::max(least_ / kStepShare, mailboxBytes_);
+    step_ = known_ ? std::max(2 * step_, Margin()) : std::max(least_ / kStepShare, lookTime_);
 }
 
 void LoaderPace::Done(Time ran) {

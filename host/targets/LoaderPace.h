@@ -28,8 +28,8 @@ class LoaderPace {
     void Done(Time ran);
 
     /// What a look costs.
-    void LookTook(Time time) { mailboxBytes_ = time; }
-    Time LookTime() const { return mailboxBytes_; }
+    void LookTook(Time time) { lookTime_ = time; }
+    Time LookTime() const { return lookTime_; }
 
   private:
     /// How far apart the bounds may be: little beside what a chunk costs at all.
@@ -39,7 +39,7 @@ class LoaderPace {
     std::optional<Time> most_;
     Time step_ = std::chrono::milliseconds(1);  ///< beyond the lower bound, where there is no other
     Time sinking_{0};
-    Time mailboxBytes_{0};
+    Time lookTime_{0};
     bool tooEarly_ = false;  ///< the last look
     bool known_ = false;
 };

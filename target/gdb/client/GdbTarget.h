@@ -156,8 +156,7 @@ class GdbTarget final : public Target {
     std::optional<MemoryPort> liveMemory_;
     Core core_;
     std::optional<RegisterNumbers> registers_;
-    std::optional<std::string>
-        mailboxBytes_;      ///< as read last, until something may have changed them
+    std::optional<std::string> mailboxBytes_;  ///< as they are in this stop
     std::string crash_;     ///< that ended what Run began; nobody need wait for it
     bool started_ = false;  ///< by Run, and neither halted nor reset since
     bool liveTried_ = false;
