@@ -75,7 +75,7 @@ timeout 60 lldb -x -b -o "gdb-remote 127.0.0.1:$port" -o 'register write r7 0x12
     -o 'process plugin packet monitor corvane' -o detach image.elf >lldb 2>&1 || { cat lldb; exit 1; }
 says lldb 'r7 = 0x01234567' 'compared: 11[01].[0-9] KiB in 112 sectors' detached
 cmp small.bin held.bin
-[ ! -s probe.refused ] || { cat probe.refused; exit 1; }
+if grep -v '^Board at ' probe.refused; then exit 1; fi
 
 # The other one is told; the next one is served when one has gone, in the middle of a load even. What
 # was begun is said.

@@ -11,7 +11,7 @@ require gdb-multiarch
 build_loader
 sim=quen,erase-time=1ms,chunk-time=1ms
 
-CORVANE_SIM=$sim CORVANE_SIM_FILE=served.sim CORVANE_GDB=:1 timeout 300 "$tool" serve 0 >listening 2>refused &
+CORVANE_SIM=$sim CORVANE_SIM_FILE=served.sim CORVANE_GDB=:1 timeout 300 "$tool" -q serve 0 >listening 2>refused &
 server=$!
 port=$(await listening 's/.*:\([0-9]*\);.*/\1/p')
 as_inside "$sim" "$port" 70000 || { cat refused; exit 1; }
