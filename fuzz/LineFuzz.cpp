@@ -1,6 +1,7 @@
 // Command lines: a word in each line of the input. Whatever stands there, it is parsed or refused
 // in words, and what the completion offers at its end is what the parser takes.
 
+#include <optional>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -19,7 +20,7 @@ using Words = std::vector<std::string>;
 void Parse(const FollowedLine& line) {
     try {
         const ParsedLine parsed =
-            ParseCommandLine(AllCommands(), line, [](const char*) { return ""; });
+            ParseCommandLine(AllCommands(), line, [](const char*) { return std::nullopt; });
         Require((parsed.command == nullptr) != parsed.answer.empty(),
                 "it is a command or answered");
         Require(parsed.command == nullptr || (line.complaint.empty() && line.strays.empty()),

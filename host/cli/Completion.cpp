@@ -19,7 +19,9 @@ class Completer {
         : commands_(commands), line_(line) {}
 
     Completions At(const std::string& cursor) const {
-        if (line_.awaited != nullptr) return OfferedValues(*line_.awaited, "", cursor);
+        if (line_.awaited != nullptr)
+            return IsTaken(*line_.awaited) ? Completions()
+                                           : OfferedValues(*line_.awaited, "", cursor);
         if (!line_.optionsEnded && cursor.starts_with('-')) return AtOption(cursor);
         if (line_.command == nullptr)
             return line_.MayNameCommand() ? CommandWords(line_.name) : Completions();
@@ -29,10 +31,15 @@ class Completer {
     }
 
   private:
+    /// Whether an option is there already and can't be there again.
+    bool IsTaken(const OptionRow& row) const {
+        return !row.isRepeated && line_.Has(row.LongName());
+    }
+
     Completions AtOption(const std::string& cursor) const {
         if (const auto equals = cursor.find('='); equals != std::string::npos) {
             const OptionRow* row = line_.FindOption(cursor.substr(0, equals));
-            if (row == nullptr || row->isSwitch) return {};
+            if (row == nullptr || row->isSwitch || IsTaken(*row)) return {};
             return OfferedValues(*row, cursor.substr(0, equals + 1), cursor.substr(equals + 1));
         }
         Completions offered = OptionWords(CommonRows());
@@ -50,7 +57,7 @@ class Completer {
     Completions OptionWords(const std::vector<OptionRow>& rows) const {
         Completions offered;
         for (const OptionRow& row : rows) {
-            if (row.IsArgument() || (line_.Has(row.LongName()) && !row.isRepeated)) continue;
+            if (row.IsArgument() || IsTaken(row)) continue;
             for (const std::string& name : row.Names())
                 offered.words.push_back({name, row.help});
         }
