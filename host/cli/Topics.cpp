@@ -17,23 +17,28 @@ namespace host {
 
 namespace {
 
-/// The target's own help, wrapped like the rest: headings, and lines of a name and a text.
 std::string DevicesHelp() {
+    std::string names;
+    for (const std::string& name : target::DeviceOptionNames())
+        names += " " + name;
+    return "A simulated device stands in for a board: --sim says which one, and --sim-file\n"
+           "keeps its contents in a file, so that the next command finds them.\n\n"
+           "  corvane-flash --sim quen,flash=256K --sim-file board.sim program app.hex\n"
+           "  corvane-flash --sim tolva,loader=hangs program app.hex\n\n"
+           "Classes, with what they have where no option says otherwise:\n" +
+           target::DeviceClassesHelp() + "\n" + Wrap("Options:" + names) +
+           "'help sim-options' explains them.\n";
+}
+
+/// Lines of a name and a text, wrapped like the rest.
+std::string DeviceOptionsTopic() {
     std::istringstream lines(target::DeviceOptionsHelp());
-    std::string text =
-        "A simulated device stands in for a board: --sim says which one, and --sim-file\n"
-        "keeps its contents in a file, so that the next command finds them.\n\n"
-        "Examples:\n"
-        "  corvane-flash --sim quen,flash=256K --sim-file board.sim program app.hex\n"
-        "  corvane-flash --sim tolva,loader=hangs program app.hex\n";
+    std::string text = "What can be said of a simulated device, as in --sim quen,flash=256K:\n";
     for (std::string line; std::getline(lines, line);) {
         const std::size_t name = line.find_first_not_of(' ');
-        const std::size_t blanks = name == 0 ? std::string::npos : line.find("  ", name);
-        if (blanks == std::string::npos)
-            text += "\n" + line + "\n";
-        else
-            text += Entry(line.substr(name, blanks - name),
-                          std::string_view(line).substr(line.find_first_not_of(' ', blanks)));
+        const std::size_t blanks = line.find("  ", name);
+        text += Entry(line.substr(name, blanks - name),
+                      std::string_view(line).substr(line.find_first_not_of(' ', blanks)), 18);
     }
     return text;
 }
@@ -99,7 +104,8 @@ std::string StatusHelp() {
 }
 
 const Topic kTopics[] = {
-    {"sim", "Simulated devices: classes, options, faults", DevicesHelp},
+    {"sim", "Simulated devices: classes", DevicesHelp},
+    {"sim-options", "Simulated devices: options, faults", DeviceOptionsTopic},
     {"gdb", "Boards behind a GDB server", GdbHelp},
     {"project", "The project file and its boards", ProjectHelp},
     {"options", "The options that every command takes", OptionsHelp},

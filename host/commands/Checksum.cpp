@@ -45,7 +45,7 @@ Outcome OfImage(Context& context, const ChecksumOptions& options) {
         RequireFit(device, device.Info(), images);
         std::vector<RangeChecksum> found;
         for (const base::AddressRange& range : ChooseRanges(device, options.ranges).ranges)
-            found.push_back({range, base::HexText(ImageChecksum(images.image, range))});
+            found.push_back({range, fmt::format("{:#010x}", ImageChecksum(images.image, range))});
         return Outcome{.result = Answer(context.reporter, found)};
     });
 }
@@ -54,7 +54,7 @@ Outcome OfFlash(Context& context, const ChecksumOptions& options) {
     return WithDevice(context, [&](FlashDevice& device) {
         std::vector<RangeChecksum> found;
         const auto note = [&](const base::AddressRange& range) {
-            found.push_back({range, "0x" + device.Published(keys::kChecksumValue)});
+            found.push_back({range, ChecksumText(device.Published(keys::kChecksumValue))});
         };
         const Outcome operation =
             RunOverRanges(device, plugin::kCalculateChecksum, ChooseRanges(device, options.ranges),

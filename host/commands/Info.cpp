@@ -2,6 +2,8 @@
 
 #include <fmt/format.h>
 
+#include "host/base/Terminal.h"
+#include "host/cli/Layout.h"
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/FileInfo.h"
@@ -10,6 +12,15 @@
 namespace host::commands {
 
 namespace {
+
+/// Wrapped behind the names where people read it; a line for programs.
+std::string OnThisScreen(const std::string& operations) {
+    constexpr std::size_t kNameColumns = 12;
+    if (!IsTerminal(stdout)) return operations;
+    std::string text = Wrap(operations, kNameColumns + 1, kNameColumns).substr(1);
+    text.pop_back();
+    return text;
+}
 
 Outcome ShowInfo(Context& context, FlashDevice& device) {
     const DeviceInfo& info = device.Info();
@@ -22,7 +33,7 @@ Outcome ShowInfo(Context& context, FlashDevice& device) {
     reporter.Result("Flash       " + flash);
     reporter.Result("Sector      " + SizeText(info.sectorBytes));
     reporter.Result("RAM         " + SizeText(info.ramBytes));
-    reporter.Result("Operations  " + info.operations);
+    reporter.Result("Operations  " + OnThisScreen(info.operations));
     reporter.Result("Plug-in     " + device.LibraryPath());
     return {.result = {{"family", info.family},
                        {"identification", info.identification},

@@ -13,6 +13,7 @@
 #include "host/commands/Commands.h"
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
+#include "host/flashing/ImageChecksum.h"
 #include "host/flashing/RangeOperation.h"
 #include "host/flashing/UserRegisters.h"
 
@@ -55,7 +56,7 @@ void RequireInput(const Context& context, const std::string& name) {
 Json Found(const FlashDevice& device, const std::string& name) {
     if (name == plugin::kReadMac) return {{"mac", device.Published(keys::kMacInput)}};
     if (name == plugin::kCalculateChecksum)
-        return {{"checksum", "0x" + device.Published(keys::kChecksumValue)}};
+        return {{"checksum", ChecksumText(device.Published(keys::kChecksumValue))}};
     for (const unsigned index : {0U, 1U})
         if (name == plugin::ReadRegisterOperation(index))
             return {{"register", index}, {"value", PublishedRegister(device, index)}};

@@ -7,6 +7,7 @@
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
+#include "host/commands/WrittenRegisters.h"
 #include "host/driver/FlashDevice.h"
 #include "host/flashing/DeviceGeometry.h"
 #include "host/flashing/FlashMap.h"
@@ -21,7 +22,7 @@ namespace host::commands {
 
 namespace {
 
-struct ProgramOptions : ImageFiles, Comparing, Running, DryRun {
+struct ProgramOptions : ImageFiles, Comparing, Running, DryRun, RegisterOptionsOfLoad {
     std::optional<std::string> erase;
     bool keep = false;
     bool blankCheck = false;
@@ -66,14 +67,19 @@ std::uint64_t KeepOthers(FlashDevice& device, LoadedImages& images, const EraseC
     return kept.ByteCount();
 }
 
-void ShowPlan(Context& context, const DeviceInfo& info, const LoadPlan& plan, std::uint64_t kept) {
+void ShowPlan(Context& context, const DeviceInfo& info, const LoadPlan& plan, std::uint64_t kept,
+              const WantedRegisters& registers) {
     const std::string keeping =
         kept == 0 ? "" : fmt::format(" ({} of it kept from the flash)", SizeText(kept));
+    const std::string sections =
+        plan.sections.empty() ? "" : " in " + CountText(plan.sections.size(), "section");
     context.reporter.Say(Verbosity::Normal,
-                         fmt::format("{}{} in {} for {}, {} of flash", SizeText(plan.imageBytes),
-                                     keeping, CountText(plan.sections.size(), "section"),
-                                     info.family, SizeText(info.flashBytes)));
-    for (const std::string& line : Describe(plan, GeometryOf(info))) {
+                         fmt::format("{}{}{} for {}, {} of flash", SizeText(plan.imageBytes),
+                                     keeping, sections, info.family, SizeText(info.flashBytes)));
+    std::vector<std::string> lines = Describe(plan, GeometryOf(info));
+    for (const std::string& text : Describe(registers))
+        lines.push_back(fmt::format("{:<8} {}", "program", text));
+    for (const std::string& line : lines) {
         if (context.isDryRun)
             context.reporter.Result(line);
         else
@@ -93,7 +99,7 @@ const char* DoneText(const LoadPlan& plan) {
 }
 
 Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
-             const LoadPlan& plan, bool runAfterwards) {
+             const LoadPlan& plan, const WantedRegisters& registers, bool runAfterwards) {
     const LoadResult load = RunLoad(device, plan, images.image);
     Outcome outcome{.result = ToJson(plan)};
     if (load.checksum) outcome.result["checksum"] = *load.checksum;
@@ -102,6 +108,7 @@ Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
     outcome.result["phases"] = PhasesJson(device.Meter().Phases());
     ShowSummary(context.reporter, device.Meter().Phases());
     ShowUnchanged(context.reporter, plan);
+    if (outcome.status == ExitStatus::Done) WriteAfterLoad(context, device, registers, outcome);
     if (outcome.status != ExitStatus::Done) return outcome;
     if (runAfterwards) device.StartProgram();
     outcome.done = DoneText(plan);
@@ -126,18 +133,18 @@ Outcome DryRunOf(Context& context, FlashDevice& device, const LoadedImages& imag
 }
 
 Outcome ProgramOn(Context& context, FlashDevice& device, const ProgramOptions& options,
-                  LoadedImages images) {
+                  const WantedRegisters& registers, LoadedImages images) {
     const DeviceInfo& info = device.Info();
     RequireFit(device, info, images);
     const LoadRequest request = Request(context.settings, options, device);
     const std::uint64_t kept = options.keep ? KeepOthers(device, images, request.erase) : 0;
     const LoadPlan plan = PlanOnDevice(device, request, images.image);
-    ShowPlan(context, info, plan, kept);
+    ShowPlan(context, info, plan, kept, registers);
     Json planned = ToJson(plan);
     planned["keptBytes"] = kept;
     if (context.isDryRun) return DryRunOf(context, device, images, plan, planned);
     device.AddToFailures(planned);
-    Outcome outcome = Load(context, device, images, plan, options.run);
+    Outcome outcome = Load(context, device, images, plan, registers, options.run);
     outcome.result["keptBytes"] = kept;
     return outcome;
 }
@@ -153,10 +160,15 @@ void CheckEraseOption(const ProgramOptions& options) {
 
 Outcome RunProgram(Context& context, const ProgramOptions& options) {
     CheckEraseOption(options);
+    const WantedRegisters registers = RequireRegisters(options);
+    if (options.run && !registers.Empty() && !registers.commit)
+        throw Failure(ExitStatus::WrongUsage,
+                      "--run resets the device, which forgets a register that isn't committed; add "
+                      "--commit");
     context.isDryRun = options.dryRun;
     LoadedImages images = ReadNamed(context, options.files, options);
     return WithDevice(context, [&](FlashDevice& device) {
-        return ProgramOn(context, device, options, std::move(images));
+        return ProgramOn(context, device, options, registers, std::move(images));
     });
 }
 
@@ -172,6 +184,7 @@ CommandRow Program() {
                     "Sectors that hold the image's bytes already are left alone.",
          .example = "  corvane-flash program firmware.elf\n"
                     "  corvane-flash program boot.hex app.srec --crc\n"
+                    "  corvane-flash program fw.elf --mac 02-1b-c3-04-05-06 --commit\n"
                     "  corvane-flash program data.bin --base 0x8000 --erase none"},
         {ImagesArgument(true),
          FormatOption(),
@@ -191,6 +204,13 @@ CommandRow Program() {
           {"--crc", "", "Calculate the CRC-32 of the whole flash afterwards"}},
          {&ProgramOptions::rewrite,
           {"--rewrite", "", "Erase and program also what the flash holds already"}},
+         {&RegisterOptionsOfLoad::mac,
+          {"--mac", "ADDRESS", "Program this MAC address after the flash"}},
+         {&RegisterOptionsOfLoad::registers,
+          {"--register", "INDEX=VALUE",
+           "Program a user register after the flash, hexadecimal; for both, give it twice"}},
+         CommitOption(),
+         AnyAddressOption(),
          NoVerifyOption(),
          RunOption("Reset the device afterwards and let it run its program"),
          DryRunOption()},

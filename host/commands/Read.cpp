@@ -18,6 +18,7 @@ namespace {
 struct ReadOptions : RangeChoice {
     std::string file;
     std::optional<std::string> format;
+    bool trim = false;
 };
 
 /// What can be known to be wrong before the device is asked for anything.
@@ -45,6 +46,21 @@ bool WantsDump(const std::string& path, image::Format format) {
     return path == "-" && format == image::Format::Binary && isatty(STDOUT_FILENO) != 0;
 }
 
+/// What was read up to the last byte that isn't blank. Failure (ContentsDiffer) when all of it is.
+image::Image WithoutBlankEnd(const image::Image& image) {
+    image::Image trimmed;
+    for (auto section = image.Sections().rbegin(); section != image.Sections().rend(); ++section) {
+        std::vector<std::uint8_t> bytes = section->bytes;
+        while (trimmed.Empty() && !bytes.empty() && bytes.back() == 0xFF)
+            bytes.pop_back();
+        trimmed.Add(section->address, std::move(bytes), "the flash");
+    }
+    if (trimmed.Empty())
+        throw Failure(ExitStatus::ContentsDiffer,
+                      "all that was read is blank, and nothing is written; without --trim it is");
+    return trimmed;
+}
+
 Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options,
                image::Format format) {
     const std::string& path = options.file;
@@ -52,14 +68,15 @@ Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options
     for (const base::AddressRange& range : ChooseRanges(device, options.ranges).ranges)
         ranges.Add(range);
     device.Halt();
-    const image::Image image = ReadRanges(device, device.Meter(), Phase::Read, ranges);
+    image::Image image = ReadRanges(device, device.Meter(), Phase::Read, ranges);
+    if (options.trim) image = WithoutBlankEnd(image);
     const bool dump = WantsDump(path, format);
     const std::string contents =
         dump ? image::FormatDump(image) : image::FormatImage(image, format);
-    if (format == image::Format::Binary && !dump && contents.size() > ranges.Bytes())
+    if (format == image::Format::Binary && !dump && contents.size() > image.ByteCount())
         context.reporter.Say(Verbosity::Normal,
                              fmt::format("{} between the ranges are written as 0xff",
-                                         SizeText(contents.size() - ranges.Bytes())));
+                                         SizeText(contents.size() - image.ByteCount())));
     if (path == "-") {
         context.reporter.Data(contents);
     } else {
@@ -69,7 +86,7 @@ Outcome ReadOn(Context& context, FlashDevice& device, const ReadOptions& options
     return {.result = {{"file", path},
                        {"format", image::FormatName(format)},
                        {"address", ranges.Ranges().front().first},
-                       {"bytes", ranges.Bytes()},
+                       {"bytes", image.ByteCount()},
                        {"ranges", ToJson(ranges.Ranges())},
                        {"phases", PhasesJson(device.Meter().Phases())}}};
 }
@@ -99,6 +116,8 @@ CommandRow Read() {
            .isRequired = true}},
          RangeOption("The addresses to read; default: the whole flash; repeated, raw binary has "
                      "0xff between them"),
+         {&ReadOptions::trim,
+          {"--trim", "", "Leave out the blank bytes (0xff) at the end of what is read"}},
          {&ReadOptions::format,
           {.names = "--format",
            .value = "FORMAT",

@@ -2,12 +2,11 @@
 
 #include <fmt/format.h>
 
-#include "base/Hex.h"
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
+#include "host/commands/WrittenRegisters.h"
 #include "host/driver/FlashDevice.h"
-#include "host/facts/SettingKeys.h"
 #include "host/flashing/UserRegisters.h"
 
 namespace host::commands {
@@ -35,24 +34,6 @@ Outcome ShowRegister(Context& context, FlashDevice& device, unsigned index) {
     return {.result = {{"register", index}, {"value", value}}};
 }
 
-Outcome Write(Context& context, FlashDevice& device, const RegisterProgramOptions& options,
-              std::uint32_t value) {
-    const unsigned index = options.Index();
-    const std::uint32_t old = ReadRegister(device, index);
-    context.settings.Set(Origin::CommandLine, keys::kRegisterInputs[index], base::HexText(value));
-    ChooseCommit(context.settings, context.reporter, keys::kRegisterCommits[index], options.commit);
-    device.Perform(plugin::ProgramRegisterOperation(index));
-    Outcome outcome;
-    RegisterValues expected;
-    expected.at(index) = value;
-    const std::uint32_t now = *CheckRegisters(device, expected, outcome).at(index);
-    context.reporter.Result(
-        fmt::format("User register {}: was {:#010x}, is {:#010x}", index, old, now));
-    outcome.result.update({{"register", index}, {"old", old}, {"value", now}});
-    SayWhetherCommitted(context.reporter, device.UserRegisters(), outcome);
-    return outcome;
-}
-
 Outcome RunReadRegister(Context& context, const RegisterOptions& options) {
     return WithDevice(context, [&](FlashDevice& device) {
         return ShowRegister(context, device, options.Index());
@@ -61,8 +42,9 @@ Outcome RunReadRegister(Context& context, const RegisterOptions& options) {
 
 Outcome RunProgramRegister(Context& context, const RegisterProgramOptions& options) {
     const std::uint32_t value = ParseHexArgument(options.value, "the value");
-    return WithDevice(context,
-                      [&](FlashDevice& device) { return Write(context, device, options, value); });
+    return WithDevice(context, [&](FlashDevice& device) {
+        return WriteRegister(context, device, options.Index(), value, options.commit);
+    });
 }
 
 }  // namespace

@@ -57,6 +57,11 @@ Option<Committing> CommitOption() {
     return {&Committing::commit, {"--commit", "", "Make the value survive a reset"}};
 }
 
+Option<AnyAddress> AnyAddressOption() {
+    return {&AnyAddress::anyAddress,
+            {"--any-address", "", "Program a multicast, all-zeros or all-ones address"}};
+}
+
 Option<Running> RunOption(const char* help) {
     return {&Running::run, {"--run", "", help}};
 }

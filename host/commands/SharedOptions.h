@@ -50,6 +50,11 @@ struct Committing {
 };
 Option<Committing> CommitOption();
 
+struct AnyAddress {
+    bool anyAddress = false;  ///< program a MAC address that no device should have
+};
+Option<AnyAddress> AnyAddressOption();
+
 struct Running {
     bool run = false;
 };

@@ -2,6 +2,8 @@
 
 #include <fmt/format.h>
 
+#include <limits>
+
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
@@ -15,7 +17,9 @@ namespace host::commands {
 
 namespace {
 
-struct VerifyOptions : ImageFiles, RangeChoice {};
+struct VerifyOptions : ImageFiles, RangeChoice {
+    bool list = false;
+};
 
 std::string EqualText(const image::Image& all, const image::Image& compared,
                       const std::vector<base::AddressRange>& ranges) {
@@ -26,12 +30,14 @@ std::string EqualText(const image::Image& all, const image::Image& compared,
 }
 
 Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
-                 const std::vector<std::string>& ranges) {
-    const ChosenRanges chosen = ChooseJoinedRanges(device, ranges);
+                 const VerifyOptions& options) {
+    const ChosenRanges chosen = ChooseJoinedRanges(device, options.ranges);
     const LoadedImages images = chosen.isWholeFlash ? all : Within(all, chosen.ranges);
     RequireFit(device, device.Info(), images);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
-    const Differences differences = CompareWithFlash(device, device.Meter(), images.image);
+    const std::size_t shown =
+        options.list ? std::numeric_limits<std::size_t>::max() : Differences::kRangesShown;
+    const Differences differences = CompareWithFlash(device, device.Meter(), images.image, shown);
     const bool equal = differences.Empty();
     Outcome outcome{.result = {{"equal", equal},
                                {"imageBytes", all.image.ByteCount()},
@@ -47,22 +53,26 @@ Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
 
 Outcome RunVerify(Context& context, const VerifyOptions& options) {
     const LoadedImages images = ReadNamed(context, options.files, options);
-    return WithDevice(context, [&](FlashDevice& device) {
-        return VerifyOn(context, device, images, options.ranges);
-    });
+    return WithDevice(
+        context, [&](FlashDevice& device) { return VerifyOn(context, device, images, options); });
 }
 
 }  // namespace
 
 CommandRow Verify() {
-    return Command<VerifyOptions>({.name = "verify",
-                                   .help = "Compare flash with image files",
-                                   .details = "The exit status is 5 when a byte differs.",
-                                   .example = "  corvane-flash verify firmware.elf"},
-                                  {ImagesArgument(true), FormatOption(), BaseOption(),
-                                   RangeOption("Compare only these addresses; default: all of the "
-                                               "image; may be repeated")},
-                                  RunVerify);
+    return Command<VerifyOptions>(
+        {.name = "verify",
+         .help = "Compare flash with image files",
+         .details = "The exit status is 5 when a byte differs.",
+         .example = "  corvane-flash verify firmware.elf"},
+        {ImagesArgument(true),
+         FormatOption(),
+         BaseOption(),
+         RangeOption("Compare only these addresses; default: all of the "
+                     "image; may be repeated"),
+         {&VerifyOptions::list,
+          {"--list", "", "List every range that differs, not the first ones alone"}}},
+        RunVerify);
 }
 
 }  // namespace host::commands

@@ -23,9 +23,9 @@ void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
          std::uint8_t actual) {
     const bool joins =
         differences.rangeCount != 0 && address - differences.lastAddress <= kJoinedGapBytesMax + 1;
-    if (!joins && ++differences.rangeCount <= Differences::kRangesShown)
+    if (!joins && ++differences.rangeCount <= differences.rangesShown)
         differences.ranges.push_back({{address, address}, expected, actual});
-    if (differences.rangeCount <= Differences::kRangesShown)
+    if (differences.rangeCount <= differences.rangesShown)
         differences.ranges.back().range.last = address;
     ++differences.byteCount;
     differences.lastAddress = address;
@@ -102,8 +102,10 @@ void Compare(Differences& differences, std::uint32_t address,
             Add(differences, address + static_cast<std::uint32_t>(i), expected[i], actual[i]);
 }
 
-Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image) {
+Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                             std::size_t rangesShown) {
     return Verify(reader, meter, [&](Differences& differences) {
+        differences.rangesShown = rangesShown;
         for (const image::Section& section : image.Sections())
             ReadPieces(reader, {section.address, section.Last()},
                        [&](std::uint32_t address, std::span<const std::uint8_t> actual) {

@@ -30,7 +30,6 @@ struct DifferentRange {
 
 struct Differences {
     static constexpr std::size_t kRangesShown = 8;
-
     std::uint64_t byteCount = 0;  ///< that differ
     std::uint64_t rangeCount = 0;
     std::vector<DifferentRange> ranges = {};  ///< the first of them
@@ -38,6 +37,8 @@ struct Differences {
 
     /// The first byte of which a bit that should be 1 is 0: only an erase can mend that.
     std::optional<std::uint32_t> notErased = {};
+
+    std::size_t rangesShown = kRangesShown;  ///< no more of them are kept
 
     bool Empty() const { return byteCount == 0; }
     bool operator==(const Differences&) const = default;
@@ -48,7 +49,8 @@ void Compare(Differences& differences, std::uint32_t address,
              std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual);
 
 /// Reads all that the image covers and compares. The target is halted first.
-Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image);
+Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                             std::size_t rangesShown = Differences::kRangesShown);
 
 /// The same of some ranges with what an erase leaves.
 Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,

@@ -33,4 +33,8 @@ std::uint32_t ImageChecksum(const image::Image& image, const base::AddressRange&
     return static_cast<std::uint32_t>(crc);
 }
 
+std::string ChecksumText(const std::string& digits) {
+    return "0x" + std::string(8 - std::min<std::size_t>(8, digits.size()), '0') + digits;
+}
+
 }  // namespace host

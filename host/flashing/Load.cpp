@@ -9,6 +9,7 @@
 #include "host/driver/FlashDevice.h"
 #include "host/facts/SettingKeys.h"
 #include "host/flashing/DeviceGeometry.h"
+#include "host/flashing/ImageChecksum.h"
 #include "host/flashing/ProgramSettings.h"
 #include "host/flashing/Unchanged.h"
 
@@ -55,7 +56,7 @@ LoadResult RunLoad(FlashDevice& device, const LoadPlan& plan, const image::Image
     LoadResult result;
     if (plan.checks.checksum) {
         device.ResetSettings(plugin::ResetMode::LoadComplete);
-        result.checksum = "0x" + device.Published(keys::kChecksumValue);
+        result.checksum = ChecksumText(device.Published(keys::kChecksumValue));
     }
     if (plan.checks.compare) result.differences = CompareWithFlash(device, device.Meter(), image);
     return result;

@@ -27,12 +27,11 @@ Image ParseBinary(const std::string& contents, const std::string& name, std::uin
 std::string FormatBinary(const Image& image) {
     const std::uint64_t span = SpanBytes(image);
     if (span > kMaxSpanBytes) {
-        throw Failure(
-            ExitStatus::WrongUsage,
-            fmt::format("raw binary: the gaps filled, the bytes from 0x{:08X} to 0x{:08X} "
-                        "would take {} MiB; write Intel HEX (.hex) or S-records (.srec)",
-                        image.Sections().front().address, image.Sections().back().Last(),
-                        span >> 20));
+        throw Failure(ExitStatus::WrongUsage,
+                      fmt::format("raw binary: the gaps filled, the bytes from {:#x} to {:#x} "
+                                  "would take {} MiB; write Intel HEX (.hex) or S-records (.srec)",
+                                  image.Sections().front().address, image.Sections().back().Last(),
+                                  span >> 20));
     }
     std::string contents;
     contents.reserve(span);

@@ -11,6 +11,7 @@
 #include <utility>
 
 #include "host/base/Errors.h"
+#include "host/base/Text.h"
 
 namespace host::image {
 namespace {
@@ -20,9 +21,9 @@ constexpr std::uint64_t kAddressSpaceBytes = 0x1'0000'0000;
 void RequireInAddressSpace(std::uint64_t address, std::size_t size, const std::string& origin) {
     if (address + size > kAddressSpaceBytes) {
         throw Failure(ExitStatus::BadFile,
-                      fmt::format("{}: {} bytes at address 0x{:08X} run past 0xFFFFFFFF; check the "
+                      fmt::format("{}: {} at address {:#x} run past 0xffffffff; check the "
                                   "load address",
-                                  origin, size, address));
+                                  origin, CountText(size, "byte"), address));
     }
 }
 
@@ -35,12 +36,11 @@ void RequireEqualOverlap(const Section& present, const Section& added, const std
     };
     const auto [had, wants] = std::ranges::mismatch(part(present), part(added));
     if (had == part(present).end()) return;
-    throw Failure(
-        ExitStatus::BadFile,
-        fmt::format("{} puts 0x{:02X} at address 0x{:08X}, where 0x{:02X} stands already; "
-                    "leave one of the two out",
-                    origin, *wants, begin + static_cast<std::size_t>(had - part(present).begin()),
-                    *had));
+    throw Failure(ExitStatus::BadFile,
+                  fmt::format("{} puts {:#04x} at address {:#x}, where {:#04x} stands already; "
+                              "leave one of the two out",
+                              origin, *wants,
+                              begin + static_cast<std::size_t>(had - part(present).begin()), *had));
 }
 
 /// Makes room as appending would, so that many small additions cost no more than one large one.

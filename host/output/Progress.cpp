@@ -87,11 +87,18 @@ bool UpdateGate::Passes(Phase phase, const PhaseProgress& progress, Time now) {
     return true;
 }
 
+std::string Erasure(std::size_t drawnColumns, std::size_t columns) {
+    const std::size_t above = drawnColumns == 0 ? 0 : (drawnColumns - 1) / columns;
+    return above == 0 ? "\r\033[K" : fmt::format("\033[{}A\r\033[J", above);
+}
+
 void ProgressDisplay::DrawBar(Phase phase, const PhaseProgress& progress) {
     if (style_ != ProgressStyle::Bar) return;
     // One column stays free: a terminal wraps when its last one is written.
-    write_("\r\033[K" + BarLine(phase, progress, TerminalColumns(stream_) - 1));
-    drawn_ = true;
+    const std::size_t columns = TerminalColumns(stream_);
+    const std::string line = BarLine(phase, progress, columns - 1);
+    write_(Erasure(drawnColumns_, columns) + line);
+    drawnColumns_ = line.size();
 }
 
 void ProgressDisplay::DrawPlain(Phase phase, const PhaseProgress& progress) {
@@ -103,9 +110,9 @@ void ProgressDisplay::DrawPlain(Phase phase, const PhaseProgress& progress) {
 }
 
 void ProgressDisplay::Clear() {
-    if (!drawn_) return;
-    write_("\r\033[K");
-    drawn_ = false;
+    if (drawnColumns_ == 0) return;
+    write_(Erasure(drawnColumns_, TerminalColumns(stream_)));
+    drawnColumns_ = 0;
 }
 
 }  // namespace host

@@ -23,6 +23,10 @@ ProgressStyle ChooseStyle(const std::string& option, std::FILE* stream);
 /// One line of at most `columns` characters; a narrow one leaves out what matters least.
 std::string BarLine(Phase phase, const PhaseProgress& progress, std::size_t columns);
 
+/// What removes a line of so many characters. A terminal that was made narrower since has broken it
+/// into several.
+std::string Erasure(std::size_t drawnColumns, std::size_t columns);
+
 /// Holds updates back to ten a second for each phase, the first and the completing one excepted,
 /// and lets no phase run backwards.
 class UpdateGate {
@@ -60,7 +64,7 @@ class ProgressDisplay {
     ProgressStyle style_;
     std::FILE* stream_;
     Writer write_;
-    bool drawn_ = false;
+    std::size_t drawnColumns_ = 0;  ///< of the line that stands there; 0: none
     std::map<Phase, unsigned> nextPercent_;
 };
 

@@ -75,7 +75,7 @@ void FlashController::Write(std::uint32_t address, std::uint32_t value, CoreStat
 // A lost address leaves the old one, which the next command then works on.
 void FlashController::WriteAddress(std::uint32_t value, Time now) {
     const auto lost = [&](const char* ruleName, const char* why) {
-        rules_.Record(ruleName, fmt::format("Flash address 0x{:08X} lost: {}", value, why));
+        rules_.Record(ruleName, fmt::format("Flash address {:#x} lost: {}", value, why));
     };
     if (IsBusy()) return lost(rule::kOneCommand, "a command is at work");
     if (!system_.IsClockStable(now))
@@ -89,7 +89,7 @@ void FlashController::WriteAddress(std::uint32_t value, Time now) {
 void FlashController::WriteBlocks(std::uint32_t address, std::uint32_t value, Time now) {
     if (now < blocksReady_) {
         return rules_.Record(rule::kBlockWrite,
-                             fmt::format("Flash blocks 0x{:08X} lost: the last word of these "
+                             fmt::format("Flash blocks {:#x} lost: the last word of these "
                                          "registers is still being written",
                                          value));
     }
@@ -100,7 +100,7 @@ void FlashController::WriteBlocks(std::uint32_t address, std::uint32_t value, Ti
 void FlashController::Command(std::uint32_t value, CoreState core, Time now) {
     if (!TakesKey(value >> 16)) {
         rules_.Record(rule::kWriteKey,
-                      fmt::format("Flash command 0x{:08X} ignored: wrong write key", value));
+                      fmt::format("Flash command {:#010x} ignored: wrong write key", value));
         return;
     }
     // From here on the key was right, so that somebody meant it: what makes no sense is refused.
@@ -118,7 +118,7 @@ void FlashController::Command(std::uint32_t value, CoreState core, Time now) {
     }
     if (const auto obstacle = WhyCommandIsLost(bit, now)) {
         rules_.Record(obstacle->rule,
-                      fmt::format("Flash command 0x{:08X} lost: {}", value, obstacle->why));
+                      fmt::format("Flash command {:#010x} lost: {}", value, obstacle->why));
         return;
     }
     running_ = bit == kEraseSector ? SectorErase(now)
@@ -162,7 +162,7 @@ FlashController::Running FlashController::SectorErase(Time now) const {
     const std::uint32_t address = registers_.Read(reg::kFlashAddress);
     if (!flash_.Contains(address, 1) || address % options_.sectorSizeBytes != 0) {
         Refuse(rule::kSectorAddress,
-               fmt::format("the flash address register holds 0x{:08X}, which is not the start of a "
+               fmt::format("the flash address register holds {:#x}, which is not the start of a "
                            "0x{:X}-byte sector of the 0x{:X}-byte flash",
                            address, options_.sectorSizeBytes, flash_.SizeBytes()));
     }
@@ -183,7 +183,7 @@ FlashController::Running FlashController::Commit(Time now) const {
     const std::uint32_t address = reg::kUserRegister0 + (operand - kCommitBase) * 4;
     if (operand < kCommitBase || operand > kCommitBase + 1 || !registers_.Has(address)) {
         Refuse(rule::kCommitAddress,
-               fmt::format("the flash address register holds 0x{:08X}, which stands for no user "
+               fmt::format("the flash address register holds {:#x}, which stands for no user "
                            "register of class {}",
                            operand, options_.className));
     }
@@ -281,7 +281,7 @@ std::optional<Obstacle> FlashController::PrepareToProgram(std::uint32_t address,
     }
     if (unsettled_.Undo(address, sizeBytes, now)) {
         rules_.Record(rule::kEraseSettling,
-                      fmt::format("Erase of the flash at 0x{:08X} undone: it was used before the "
+                      fmt::format("Erase of the flash at {:#x} undone: it was used before the "
                                   "erase had settled",
                                   address));
     }

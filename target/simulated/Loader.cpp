@@ -106,11 +106,10 @@ bool Loader::StartChunk(Time start) {
     const std::uint32_t size = ram_.Word(ByteCount(block_));
     if (address % kBlockSizeBytes != 0 || size % kBlockSizeBytes != 0 || size == 0 ||
         size > kBufferSizeBytes || !flash_.Contains(address, size)) {
-        rules_.Record(
-            rule::kLoaderParameters,
-            fmt::format("The loader was given {} bytes for 0x{:08X}: it takes 128 to 2048 "
-                        "bytes in whole 128-byte blocks inside the 0x{:X}-byte flash",
-                        size, address, flash_.SizeBytes()));
+        rules_.Record(rule::kLoaderParameters,
+                      fmt::format("The loader was given {} bytes for {:#x}: it takes 128 to 2048 "
+                                  "bytes in whole 128-byte blocks inside the 0x{:X}-byte flash",
+                                  size, address, flash_.SizeBytes()));
         ram_.SetWord(Status(block_), kStatusBadParameters);
         block_ ^= 1;
         return true;
@@ -123,8 +122,8 @@ bool Loader::StartChunk(Time start) {
 bool Loader::IsLost(std::uint32_t address, std::uint32_t sizeBytes, Time start) {
     const auto obstacle = controller_.PrepareToProgram(address, sizeBytes, start);
     if (!obstacle) return false;
-    rules_.Record(obstacle->rule, fmt::format("The loader programmed nothing at 0x{:08X}: {}",
-                                              address, obstacle->why));
+    rules_.Record(obstacle->rule, fmt::format("The loader programmed nothing at {:#x}: {}", address,
+                                              obstacle->why));
     return true;
 }
 
@@ -144,7 +143,7 @@ void Loader::ProgramFromBuffer(std::uint32_t sizeBytes) {
         flash_.Program(chunk_->flashAddress, ram_.Bytes(Buffer(block_), sizeBytes));
     if (notErased) {
         rules_.Record(rule::kErasedCells,
-                      fmt::format("The loader programmed 0x{:08X}, where bits that had to become 1 "
+                      fmt::format("The loader programmed {:#x}, where bits that had to become 1 "
                                   "were not erased",
                                   *notErased));
     }

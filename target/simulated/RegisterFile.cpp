@@ -112,7 +112,7 @@ const RegisterFile::Register& RegisterFile::Find(std::uint32_t address) const {
     const auto found = registers_.find(address);
     if (found == registers_.end()) {
         Refuse(rule::kMappedAddress,
-               fmt::format("a device of class {} has no memory and no register at 0x{:08X}",
+               fmt::format("a device of class {} has no memory and no register at {:#x}",
                            className_, address));
     }
     return found->second;

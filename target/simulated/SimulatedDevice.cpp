@@ -46,7 +46,7 @@ void SimulatedDevice::Read(void* buffer, std::size_t count, std::uint32_t addres
                            std::size_t width) {
     const Transfer transfer{count, address, page, width};
     const auto describe = [&] {
-        return fmt::format("Reading {} x {} bytes at 0x{:08X} on page {}", count, width, address,
+        return fmt::format("Reading {} x {} bytes at {:#x} on page {}", count, width, address,
                            page);
     };
     Perform(transfer.SizeBytes(), describe,
@@ -57,7 +57,7 @@ void SimulatedDevice::Write(const void* buffer, std::size_t count, std::uint32_t
                             std::size_t width) {
     const Transfer transfer{count, address, page, width};
     const auto describe = [&] {
-        return fmt::format("Writing {} x {} bytes at 0x{:08X} on page {}", count, width, address,
+        return fmt::format("Writing {} x {} bytes at {:#x} on page {}", count, width, address,
                            page);
     };
     Perform(transfer.SizeBytes(), describe, [&] {
@@ -124,7 +124,7 @@ void SimulatedDevice::Pause(std::chrono::nanoseconds time) {
 }
 
 void SimulatedDevice::EraseByProbe(std::uint32_t address, std::uint32_t sizeBytes) {
-    const std::string describe = fmt::format("Erasing {} bytes at 0x{:08X}", sizeBytes, address);
+    const std::string describe = fmt::format("Erasing {} bytes at {:#x}", sizeBytes, address);
     Perform(0, describe, [&] {
         const std::uint32_t size = RequireSectors(address, sizeBytes);
         if (options_.faults.eraseNeverEnds) throw TargetError(describe + ": it doesn't end");
@@ -136,14 +136,14 @@ void SimulatedDevice::EraseByProbe(std::uint32_t address, std::uint32_t sizeByte
 
 void SimulatedDevice::ProgramByProbe(std::uint32_t address, std::string_view bytes) {
     const std::string describe =
-        fmt::format("Programming {} bytes at 0x{:08X}", bytes.size(), address);
+        fmt::format("Programming {} bytes at {:#x}", bytes.size(), address);
     Perform(bytes.size(), describe, [&] {
         RequireFlash(address, bytes.size());
         const std::size_t chunks = (bytes.size() + Loader::kChunkMax - 1) / Loader::kChunkMax;
         time_.AddPause(chunks * options_.timings.chunk);
         const auto* first = reinterpret_cast<const std::uint8_t*>(bytes.data());
         if (const auto at = flash_.Program(address, {first, bytes.size()}))
-            throw TargetError(fmt::format("{}: 0x{:08X} isn't erased", describe, *at));
+            throw TargetError(fmt::format("{}: {:#x} isn't erased", describe, *at));
     });
 }
 
@@ -154,7 +154,7 @@ std::uint32_t SimulatedDevice::RequireSectors(std::uint32_t address,
     const std::uint32_t sector = options_.sectorSizeBytes;
     if (address % sector != 0 || sizeBytes % sector != 0)
         throw TargetError(
-            fmt::format("Erasing {} bytes at 0x{:08X}: the device erases whole sectors of {} bytes",
+            fmt::format("Erasing {} bytes at {:#x}: the device erases whole sectors of {} bytes",
                         sizeBytes, address, sector));
     const std::uint64_t end = std::uint64_t{address} + sizeBytes;
     const std::uint64_t beyond = end - std::min<std::uint64_t>(end, flash_.SizeBytes());
@@ -165,8 +165,8 @@ std::uint32_t SimulatedDevice::RequireSectors(std::uint32_t address,
 
 void SimulatedDevice::RequireFlash(std::uint32_t address, std::uint64_t sizeBytes) const {
     if (flash_.Contains(address, sizeBytes)) return;
-    throw TargetError(fmt::format("{} bytes at 0x{:08X}: the device has {} bytes of flash",
-                                  sizeBytes, address, flash_.SizeBytes()));
+    throw TargetError(fmt::format("{} bytes at {:#x}: the device has {} bytes of flash", sizeBytes,
+                                  address, flash_.SizeBytes()));
 }
 
 template <typename Describe, typename Action>

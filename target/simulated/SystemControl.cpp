@@ -49,8 +49,8 @@ void SystemControl::Write(std::uint32_t address, std::uint32_t value, CoreState 
             return;
         case reg::kTestControl:
             if (registers_.Has(address) && IsTestRegisterLocked()) {
-                return rules_.Record(
-                    rule::kFixUp, fmt::format("Write of 0x{:08X} ignored: it is locked", address));
+                return rules_.Record(rule::kFixUp,
+                                     fmt::format("Write of {:#x} ignored: it is locked", address));
             }
             return registers_.Write(address, value);
         // Words of the watchdogs alone are never lost: they are on a clock of their own.
@@ -60,7 +60,7 @@ void SystemControl::Write(std::uint32_t address, std::uint32_t value, CoreState 
             if (!peripherals_.Write((address - reg::kSoftwareReset0) / 4, value, now)) {
                 return rules_.Record(
                     rule::kResetRecovery,
-                    fmt::format("Write of 0x{:08X} lost: it came too soon after a reset", address));
+                    fmt::format("Write of {:#x} lost: it came too soon after a reset", address));
             }
             return registers_.Write(address, value);
         default:

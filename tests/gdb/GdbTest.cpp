@@ -299,7 +299,7 @@ TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
         const char* refusal;
     } rows[] = {
         {0x20000000, 0x20010000, 0x20001000, ""},
-        {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000FFFF)"},
+        {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000ffff)"},
         {0x20000000, 0x20002004, 0x20001000, "outside the RAM"},
         {0x20000000, 0x20010000, 0x20001FF0, "where its buffers and parameter blocks are"},
     };

@@ -337,7 +337,7 @@ TEST(Faults, ComeAsAsked) {
     DebuggedDevice once("tolva,fail-access=3", false);  // the device's halt is the first
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
     EXPECT_EQ(ErrorOf([&] { once.Word(0x400FE000); }),
-              "Reading 1 x 4 bytes at 0x400FE000 on page 1: the connection to the target failed at "
+              "Reading 1 x 4 bytes at 0x400fe000 on page 1: the connection to the target failed at "
               "access 3 [fail-access]");
     EXPECT_EQ(once.Word(0x400FE000), 0x10010100U);
 
@@ -377,7 +377,7 @@ TEST(Contents, KeepTheDevice) {
     EXPECT_LT(contents.size(), 2048U);
     auto device = target::DecodeContents(contents, target::DefaultDeviceOptions());
     EXPECT_EQ(DefinitionText(device->Options()),
-              "dorna,id=0x901A0200,flash=128M,ram=256K,sector=1K,keyconfig=0xFFFFFFEF");
+              "dorna,id=0x901a0200,flash=128M,ram=256K,sector=1K,keyconfig=0xffffffef");
     EXPECT_EQ(device->Options().timings.sectorErase, 8ms);
     EXPECT_EQ(device->CommittedUserRegisters(), (std::array{0x00C31B02U, 0x00060504U}));
     Bytes expected(0x8000000, 0xFF);

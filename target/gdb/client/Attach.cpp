@@ -90,7 +90,7 @@ void GdbTarget::RequireReportedReads() {
     if (!base::FromHex(reply)) connection_.Reject(fmt::format("m{:x},4", address), reply);
     const Profile& cure = profile_->reads != nullptr ? *profile_ : *FindProfile("openocd");
     throw ProtocolError(fmt::format(
-        "hides reads that fail: it answers \"{}\" for 0x{:08X}, where nothing is, so that a lost "
+        "hides reads that fail: it answers \"{}\" for {:#x}, where nothing is, so that a lost "
         "device would seem to hold that; {}{}; or go on with --gdb-option reads=trusted",
         Shown(reply), address, &cure == profile_ ? "" : "if it is OpenOCD, ", cure.reads));
 }

@@ -114,7 +114,7 @@ std::string GdbTarget::WhereStopped() try {
         connection_.Ask(fmt::format("p{:x}", RegisterNumber("pc", options_.pc)));
     const auto bytes = base::FromHex(reply);
     if (!bytes || bytes->size() < 4) return "";
-    return fmt::format(" at pc 0x{:08X}", base::WordOf(*bytes));
+    return fmt::format(" at pc {:#x}", base::WordOf(*bytes));
 } catch (const ProtocolError&) {
     return "";
 }
@@ -122,7 +122,7 @@ std::string GdbTarget::WhereStopped() try {
 void GdbTarget::Read(void* buffer, std::size_t count, std::uint32_t address, int /*page*/,
                      std::size_t width) {
     const auto describe = [&] {
-        return fmt::format("Reading {} x {} bytes at 0x{:08X}", count, width, address);
+        return fmt::format("Reading {} x {} bytes at {:#x}", count, width, address);
     };
     Perform(describe, [&] {
         const std::size_t size = CheckedSize(count, address, width);
@@ -141,7 +141,7 @@ void GdbTarget::Read(void* buffer, std::size_t count, std::uint32_t address, int
 void GdbTarget::Write(const void* buffer, std::size_t count, std::uint32_t address, int /*page*/,
                       std::size_t width) {
     const auto describe = [&] {
-        return fmt::format("Writing {} x {} bytes at 0x{:08X}", count, width, address);
+        return fmt::format("Writing {} x {} bytes at {:#x}", count, width, address);
     };
     Perform(describe, [&] {
         const std::size_t size = CheckedSize(count, address, width);

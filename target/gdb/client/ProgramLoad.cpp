@@ -59,17 +59,16 @@ void GdbTarget::RequireFits(const LoaderFile& loader, const std::string& path) c
     const std::uint64_t end = std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
     for (const LoaderFile::Segment& segment : loader.segments) {
         const std::uint64_t segmentEnd = std::uint64_t{segment.address} + segment.bytes.size();
-        const std::string range = fmt::format("0x{:08X}-0x{:08X}", segment.address, segmentEnd - 1);
+        const std::string range = fmt::format("{:#x}-{:#x}", segment.address, segmentEnd - 1);
         if (segment.address < ramStart || segmentEnd > ramEnd)
-            RefuseLoader(
-                path, fmt::format("has a segment at {}, outside the RAM (0x{:08X}-0x{:08X})", range,
-                                  ramStart, ramEnd - 1));
+            RefuseLoader(path, fmt::format("has a segment at {}, outside the RAM ({:#x}-{:#x})",
+                                           range, ramStart, ramEnd - 1));
         const bool outside = segmentEnd <= first || segment.address >= end;
         const bool reserved = segment.address >= first && segmentEnd <= end &&
                               segment.bytes.find_first_not_of('\0') == std::string::npos;
         if (!outside && !reserved)
             RefuseLoader(path, fmt::format("has a segment at {}, where its buffers and parameter "
-                                           "blocks are (0x{:08X}-0x{:08X})",
+                                           "blocks are ({:#x}-{:#x})",
                                            range, first, end - 1));
     }
 }
@@ -90,7 +89,7 @@ void GdbTarget::LoadSegments(const std::string& path) {
         const auto [there, wanted] = std::mismatch(held.begin(), held.end(), segment.bytes.begin());
         if (there != held.end())
             throw ProtocolError(fmt::format(
-                "took the program, but 0x{:08X} doesn't hold what was written there: is that RAM?",
+                "took the program, but {:#x} doesn't hold what was written there: is that RAM?",
                 segment.address + static_cast<std::uint32_t>(there - held.begin())));
     }
     WriteRegister(RegisterNumber("sp", options_.sp), *ramEnd_);

@@ -310,7 +310,7 @@ ProbeSession::Reply ProbeSession::WriteMemory(const Arguments& arguments) {
     if (arguments.length == 0 || !TouchesOwn(arguments)) return std::nullopt;
     if (TouchesCollected(arguments))
         throw TargetError(
-            fmt::format("writing {} bytes at 0x{:08X}: a debugger writes flash by its "
+            fmt::format("writing {} bytes at {:#x}: a debugger writes flash by its "
                         "load command",
                         arguments.length, arguments.address));
     Settle();

@@ -151,23 +151,22 @@ DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& toda
     return reopened;
 }
 
+std::string DeviceClassesHelp() {
+    std::string text =
+        fmt::format("  {:<7} {:<6} {:<5} {:<7} {:<11} {}\n", "", "flash", "ram", "sector", "id",
+                    "keyconfig");
+    for (const DeviceClass& one : DeviceClasses())
+        text += fmt::format("  {:<7} {:<6} {:<5} {:<7} {:<11} {}\n", one.name,
+                            FormatSize(one.flashSizeBytes), FormatSize(one.ramSizeBytes),
+                            FormatSize(one.sectorSizeBytes), RegisterText(one.identification),
+                            RegisterText(one.keyConfiguration));
+    return text;
+}
+
 std::string DeviceOptionsHelp() {
-    std::string text = "Device classes, with the defaults of each:\n";
-    for (const std::string& name : DeviceClassNames()) {
-        const DeviceOptions options = DefaultDeviceOptions(name);
-        text += fmt::format("  {:<7}flash={},ram={},id={},keyconfig={}", name,
-                            FormatSize(options.flashSizeBytes), FormatSize(options.ramSizeBytes),
-                            RegisterText(options.identification),
-                            RegisterText(options.keyConfiguration));
-        if (HasSizeRegisters(options)) {
-            text += fmt::format(",sector={}", FormatSize(options.sectorSizeBytes));
-        }
-        text += '\n';
-    }
-    text += "Device options:\n";
-    for (const OptionRow& row : OptionTable()) {
+    std::string text;
+    for (const OptionRow& row : OptionTable())
         text += fmt::format("  {:<17}{} ({})\n", row.name, row.meaning, row.accepts);
-    }
     return text;
 }
 

@@ -91,7 +91,10 @@ std::string DefinitionText(const DeviceOptions& options);
 /// values, when a given option contradicts the kept device. The result is unchecked.
 DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& today);
 
-/// Lines for a help text: each class with its defaults, each option with its meaning.
+/// Lines for a help text: each class with its defaults.
+std::string DeviceClassesHelp();
+
+/// The same: each option with its meaning.
 std::string DeviceOptionsHelp();
 
 /// For shell completion.

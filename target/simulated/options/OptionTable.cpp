@@ -182,7 +182,7 @@ std::span<const OptionRow> OptionTable() {
 }
 
 std::string RegisterText(std::uint32_t value) {
-    return fmt::format("0x{:08X}", value);
+    return fmt::format("{:#010x}", value);
 }
 
 }  // namespace target

@@ -78,9 +78,9 @@ TEST(Image, IsUnchangedByWhatItRefuses) {
     Image image = MakeImage({{0x10, {1, 2, 3}}, {0xFFFFFFFE, {4, 5}}});
     const Image before = image;
     const Bytes different{0, 1, 2, 9}, tooLong{4, 5, 6};
-    EXPECT_EQ("b.elf puts 0x09 at address 0x00000012, where 0x03 stands already",
+    EXPECT_EQ("b.elf puts 0x09 at address 0x12, where 0x03 stands already",
               FailureOf([&] { image.Add(0x0F, different, "b.elf"); }));
-    EXPECT_EQ("b.elf: 3 bytes at address 0xFFFFFFFE run past 0xFFFFFFFF",
+    EXPECT_EQ("b.elf: 3 bytes at address 0xfffffffe run past 0xffffffff",
               FailureOf([&] { image.Add(0xFFFFFFFE, tooLong, "b.elf"); }));
     FailureOf([&] { image.Add(MakeImage({{0, {1}}, {0x11, {3}}}), "b.elf"); });
     EXPECT_EQ(before, image);
@@ -123,7 +123,7 @@ TEST(ImageFile, NamesFileAndLineOfWhatIsWrong) {
         {":00000006FA", "f: line 1: record type 06 found, 00 to 05 expected"},
         {":0100000401FA", "f: line 1: length 1 found, 2 expected in a record of type 04"},
         {":0200000001A25B\n:0200000001A25B\n:0100010003FB\n:00000001FF",
-         "f: line 3 puts 0x03 at address 0x00000001, where 0xA2 stands already"},
+         "f: line 3 puts 0x03 at address 0x1, where 0xa2 stands already"},
         {"S104001001EB", "f: line 1: checksum 0xEB found, 0xEA expected"},
         {"S104001001EA\nS5030002FA", "f: line 2: data records: 1 found, 2 expected by this count"},
         {"S5030000FC\nS104001001EA",
@@ -132,7 +132,7 @@ TEST(ImageFile, NamesFileAndLineOfWhatIsWrong) {
         {"S904000001FA", "f: line 1: address and data: 3 bytes found, 2 expected in an S9 record"},
         {"S4030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
         {"S307FFFFFFFF0102F9\nS9030000FC",
-         "f: line 1: 2 bytes at address 0xFFFFFFFF run past 0xFFFFFFFF"},
+         "f: line 1: 2 bytes at address 0xffffffff run past 0xffffffff"},
     };
     for (const auto& [contents, text] : cases)
         EXPECT_EQ(text, Complaint(contents));
@@ -148,7 +148,7 @@ TEST(ImageFile, NeedsABaseForRawBinary) {
     EXPECT_EQ(MakeImage({{1, {':', '0'}}}), ParseImage(":0", "f", {Format::Binary, 1}));
     EXPECT_EQ("f: raw binary has no address of its own",
               Complaint(":0", {Format::Binary, {}}, ExitStatus::WrongUsage));
-    EXPECT_EQ("f: 2 bytes at address 0xFFFFFFFF run past 0xFFFFFFFF",
+    EXPECT_EQ("f: 2 bytes at address 0xffffffff run past 0xffffffff",
               Complaint("MZ", {{}, 0xFFFFFFFF}));
 }
 
@@ -211,7 +211,7 @@ TEST(ImageFile, RefusesElfFilesThatAreCutOffOrUnfit) {
          "f: section header table: 40 bytes expected at offset 61, but the file ends at 88"},
         {MakeElf({{1, 0, 0, 0}}, ""), "f: no bytes to load found (read as elf)"},
         {MakeElf({{1, 0, 8, 2}, {1, 1, 9, 1}, {1, 0, 9, 1}}, "ab"),
-         "f: segment 2 puts 0x61 at address 0x00000009, where 0x62 stands already"},
+         "f: segment 2 puts 0x61 at address 0x9, where 0x62 stands already"},
         {MakeElf(segments, "abcd", 1), "f: a relocatable object" + expected},
         {MakeElf(segments, "abcd", 3),
          "f: a shared object or a position-independent program" + expected},
@@ -281,7 +281,7 @@ TEST(ImageFile, WritesRecordsThatEndAtMultiplesOfTheirLength) {
 TEST(ImageFile, RefusesToWriteElfAndHugeGaps) {
     const Image far = MakeImage({{0, {1}}, {0x10000000, {2}}});
     EXPECT_EQ(
-        "raw binary: the gaps filled, the bytes from 0x00000000 to 0x10000000 would take "
+        "raw binary: the gaps filled, the bytes from 0x0 to 0x10000000 would take "
         "256 MiB",
         FailureOf([&] { FormatImage(far, Format::Binary); }, ExitStatus::WrongUsage));
     EXPECT_EQ("ELF can't be made from memory contents",

@@ -19,6 +19,8 @@ TEST(Progress, FitsEveryTerminal) {
               "Programming  [#####.....]  50 %  5 KiB of 10 KiB  2.0 s left  2.5 KiB/s");
     EXPECT_EQ(BarLine(Phase::Program, half, 40), "Programming   50 %  5 KiB of 10 KiB");
     EXPECT_EQ(BarLine(Phase::Program, half, 20), "Programming   50 %");
+    EXPECT_EQ(Erasure(0, 40) + Erasure(40, 40), "\r\033[K\r\033[K");
+    EXPECT_EQ(Erasure(79, 40) + Erasure(81, 40), "\033[1A\r\033[J\033[2A\r\033[J");
     const PhaseProgress many[] = {half, {}, {0, 1, 0}, {1, 1, 0}, {~0ULL / 200, ~0ULL / 100, 1e9}};
     for (const PhaseProgress& progress : many)
         for (std::size_t columns = 0; columns < 250; ++columns)
