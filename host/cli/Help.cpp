@@ -53,7 +53,7 @@ std::string ToolHelp(const CommandRows& commands) {
     std::string topics;
     for (const Topic& topic : Topics())
         topics += fmt::format("{}{}", topics.empty() ? "" : ", ", topic.name);
-    return text + "\n" + Wrap("The options that every command takes: 'help options'; --version") +
+    return text + Wrap("The options that every command takes: 'help options'; --version") +
            Wrap(fmt::format("'help COMMAND' tells more, 'help TOPIC' too: {}", topics)) +
            Wrap("Example: corvane-flash program firmware.elf");
 }

@@ -95,7 +95,8 @@ std::string ManPage(const CommandRows& commands) {
     page += ".SH COMMANDS\n";
     for (const CommandRow& command : commands)
         page += CommandText(command);
-    page += ".SH SIMULATED DEVICES\n.nf\n" + Roff(target::DeviceClassesHelp() + "\n" + target::DeviceOptionsHelp()) + "\n.fi\n";
+    page += ".SH SIMULATED DEVICES\n.nf\n" +
+            Roff(target::DeviceClassesHelp() + "\n" + target::DeviceOptionsHelp()) + "\n.fi\n";
     page +=
         ".SH GDB SERVERS\nWith \\fB\\-\\-gdb\\fR the target is a board behind a GDB server. "
         "\\fB\\-\\-gdb\\-option\\fR takes:\n";

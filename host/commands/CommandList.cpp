@@ -7,10 +7,25 @@ namespace host {
 const CommandRows& AllCommands() {
     using namespace commands;
     static const CommandRows table{
-        Info(),     Program(),    Verify(),    Map(),          Read(),
-        Erase(),    BlankCheck(), Checksum(),  RegisterRead(), RegisterProgram(),
-        MacRead(),  MacProgram(), Operation(), Reset(),        Serve(),
-        Settings(), Completion(), Help(),
+        Info(),
+        Check(),
+        Program(),
+        Verify(),
+        Map(),
+        Read(),
+        Erase(),
+        BlankCheck(),
+        Checksum(),
+        RegisterRead(),
+        RegisterProgram(),
+        MacRead(),
+        MacProgram(),
+        Operation(),
+        Reset(),
+        Serve(),
+        Settings(),
+        Completion(),
+        Help(),
     };
     return table;
 }

@@ -15,6 +15,7 @@ const CommandRows& AllCommands();
 namespace host::commands {
 
 CommandRow Info();
+CommandRow Check();
 CommandRow Program();
 CommandRow Verify();
 CommandRow Map();

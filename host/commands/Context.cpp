@@ -117,13 +117,17 @@ void RequireOtherDeviceFile(const Context& context) {
 }  // namespace
 
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work) {
+    return WithTrace(context, [&](Trace* trace) { return WorkOn(context, trace, work); });
+}
+
+Outcome WithTrace(Context& context, const std::function<Outcome(Trace*)>& work) {
     RequireOtherLog(context);
     RequireOtherDeviceFile(context);
-    if (!context.options.trace) return WorkOn(context, nullptr, work);
+    if (!context.options.trace) return work(nullptr);
     Trace trace = OpenTrace(context, *context.options.trace);
     Outcome outcome;
     try {
-        outcome = WorkOn(context, &trace, work);
+        outcome = work(&trace);
     } catch (...) {
         if (!trace.Problem().empty()) context.reporter.Error(trace.Problem());
         throw;

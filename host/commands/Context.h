@@ -35,6 +35,9 @@ const TargetOptions& TargetOf(const CommonOptions& options);
 /// released; a trace that isn't whole is a failure.
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work);
 
+/// Runs work that may be traced. A trace that isn't whole is a failure.
+Outcome WithTrace(Context& context, const std::function<Outcome(Trace*)>& work);
+
 /// What ends a dry run: `plan` is what would be done.
 Outcome NothingTouched(Context& context, Json plan);
 

@@ -50,17 +50,17 @@ TraceLine LinesTo(Trace* trace) {
     return [trace](const char* source, const std::string& text) { trace->Line(source, text); };
 }
 
-std::unique_ptr<OpenTarget> OpenAndTell(const DeviceOptions& options, Reporter& reporter) {
+}  // namespace
+
+std::unique_ptr<OpenTarget> Open(const DeviceOptions& options, Reporter& reporter) {
     const auto say = [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); };
     auto target = Open(options.target, LinesTo(options.trace), say);
     reporter.WorksOn(target->Description());
     return target;
 }
 
-}  // namespace
-
 FlashDevice::FlashDevice(const DeviceOptions& options, SettingStore& settings, Reporter& reporter)
-    : FlashDevice(OpenAndTell(options, reporter), options, settings, reporter) {}
+    : FlashDevice(Open(options, reporter), options, settings, reporter) {}
 
 FlashDevice::FlashDevice(std::unique_ptr<OpenTarget> target, const DeviceOptions& options,
                          SettingStore& settings, Reporter& reporter)

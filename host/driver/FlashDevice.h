@@ -43,6 +43,10 @@ struct DeviceOptions {
 /// What becomes of the file of a simulated device, where one was named.
 enum class DeviceFile { Save, LeaveAlone };
 
+/// The target that the options name, told as the one that is worked on. Failure (WrongUsage) or
+/// Failure (Unreachable).
+std::unique_ptr<OpenTarget> Open(const DeviceOptions& options, Reporter& reporter);
+
 class FlashDevice final : public FlashReader {
   public:
     /// Failure (Unreachable) when plug-in or target can't be had.

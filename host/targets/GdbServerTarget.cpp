@@ -92,6 +92,20 @@ std::string GdbServerTarget::Advice() {
         description.empty() ? "" : " (" + description + ")");
 }
 
+std::optional<ServerFacts> GdbServerTarget::Server() const {
+    const gdb::Profile& profile = target_.Server();
+    const gdb::Profile& cure = profile.reads == nullptr ? *gdb::FindProfile("openocd") : profile;
+    return ServerFacts{.name = fmt::format("the GDB server at {} ({})", server_, profile.title),
+                       .packetBytes = target_.PacketSize(),
+                       .binaryWrites = target_.WritesBinary(),
+                       .reportsReads = fmt::format(
+                           "{}{}", &cure == &profile ? "" : "if it is OpenOCD, ", cure.reads)};
+}
+
+std::vector<base::AddressRange> GdbServerTarget::LoaderMemory(const std::string& directory) {
+    return host::LoaderMemory(target_, directory);
+}
+
 void GdbServerTarget::RequireLoader(const std::string& directory) try {
     target_.RequireProgram(plugin::kLoaderFile, directory + plugin::kLoaderSubdirectory);
 } catch (const target::TargetError& error) {

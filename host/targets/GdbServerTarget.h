@@ -30,7 +30,10 @@ class GdbServerTarget final : public OpenTarget {
     std::string Advice() override;
     std::string Description() const override { return BoardAt(server_); }
     void RamEndsAt(std::uint32_t address) override { target_.SetRamEnd(address); }
+    std::optional<ServerFacts> Server() const override;
     void RequireLoader(const std::string& directory) override;
+    std::vector<base::AddressRange> LoaderMemory(const std::string& directory) override;
+    std::optional<std::uint32_t> ProgramCounter() override { return target_.ProgramCounter(); }
     void Release(bool run) override {
         if (own_) own_->Release(run);
     }

@@ -3,6 +3,7 @@
 
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -10,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "base/AddressRange.h"
 #include "host/base/Json.h"
 #include "host/files/FileLock.h"
 #include "target/Target.h"
@@ -33,6 +35,14 @@ Json ToJson(const TargetOptions& options);
 /// Takes lines for the trace; `source` is who speaks.
 using TraceLine = std::function<void(const char* source, const std::string& text)>;
 
+/// The server between the tool and its target.
+struct ServerFacts {
+    std::string name;             ///< "the GDB server at localhost:3333 (OpenOCD)"
+    std::size_t packetBytes = 0;  ///< the longest packet that it takes
+    bool binaryWrites = false;    ///< it takes bytes as they are, not as digits
+    std::string reportsReads;     ///< what makes it tell of reads that fail
+};
+
 class OpenTarget {
   public:
     virtual ~OpenTarget() = default;
@@ -49,9 +59,21 @@ class OpenTarget {
     /// What the plug-in has found out: the address behind the device's RAM.
     virtual void RamEndsAt(std::uint32_t /*address*/) {}
 
+    /// Nothing where there is none.
+    virtual std::optional<ServerFacts> Server() const { return std::nullopt; }
+
     /// To be asked before flash is erased for a load. Failure (BadFile) when the loader's file
     /// can't be had; `directory` is what the host tells the plug-in.
     virtual void RequireLoader(const std::string& /*directory*/) {}
+
+    /// What loading and running the loader changes of the memory beside flash; nothing where it
+    /// isn't a program in RAM. TargetError.
+    virtual std::vector<base::AddressRange> LoaderMemory(const std::string& /*directory*/) {
+        return {};
+    }
+
+    /// Where the halted program stands, if that can be known.
+    virtual std::optional<std::uint32_t> ProgramCounter() { return std::nullopt; }
 
     /// Keeps what must outlive the run; `changed` tells whether there is anything new. Failure
     /// (BadFile).

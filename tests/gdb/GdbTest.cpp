@@ -257,7 +257,24 @@ TEST(GdbClient, TriesWhetherARunningTargetCanBeAsked) {
         EXPECT_NE(result.find(row.result), std::string::npos) << row.answer << ": " << result;
         const auto log = peer.Log();
         EXPECT_EQ(std::count(log.begin(), log.end(), "m2000100c,4"), row.live) << row.answer;
+        // Of a server that isn't known, "X" isn't believed.
+        EXPECT_TRUE(std::ranges::none_of(log, [](const auto& one) { return one[0] == 'X'; }));
     }
+}
+
+// A second server with the same memory needs no stop of the first.
+TEST(GdbClient, AsksASecondServerAboutTheRunningTarget) {
+    const auto obeys = [](const std::string&) { return std::nullopt; };
+    Peer peer(obeys);
+    Peer second(obeys);
+    GdbOptions options = Quick();
+    ParseGdbOption("live=" + second.Where().Text(), options);
+    EXPECT_EQ(ResultOf([&] { return Work(peer.Where(), options); }), "done");
+    const auto first = peer.Log();
+    EXPECT_EQ(std::count(first.begin(), first.end(), "m2000100c,4"), 0);
+    const std::vector<std::string> asked{"qSupported", "m2000100c,4"};
+    EXPECT_EQ(second.Log(), asked);
+    EXPECT_NE(ResultOf([&] { return Work(Peer(obeys).Where(), options); }), "done");
 }
 
 // What is refused before anything is touched, and the option that lets it pass.
@@ -301,6 +318,7 @@ TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
         {0x20000000, 0x20010000, 0x20001000, ""},
         {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000ffff)"},
         {0x20000000, 0x20002004, 0x20001000, "outside the RAM"},
+        {0x20000000, 0x20002010, 0x20001000, "leaves 8 bytes for its stack, below 0x20002010"},
         {0x20000000, 0x20010000, 0x20001FF0, "where its buffers and parameter blocks are"},
     };
     for (const auto& row : rows) {

@@ -29,9 +29,10 @@ host/settings: host/facts host/files host/base base
 host/output: host/files host/base base
 host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/gdb/probe target/simulated target/simulated/options base
 host/driver: host/output host/settings host/targets host/image host/facts host/files host/base plugin target base
+host/checks: host/driver host/targets host/output host/settings host/facts host/base target base
 host/flashing: host/driver host/targets host/image host/output host/settings host/facts host/files host/base target/gdb/probe base
 host/cli: host/settings host/targets host/facts host/files host/base target/gdb/client target/simulated/options
-host/commands: host/cli host/flashing host/driver host/targets host/image host/output host/settings host/facts host/files host/base base
+host/commands: host/cli host/checks host/flashing host/driver host/targets host/image host/output host/settings host/facts host/files host/base base
 host: host/commands host/cli host/output host/settings host/facts host/files host/base"
 
 failed=0

@@ -112,6 +112,8 @@ leave halted running
 # The core resets slowly, begins in the wrong state where the vectors are zero, can't be halted, and
 # crashes: into lockup while the vectors are erased, into the image's endless handler, or into a catch.
 through '' 0 running '' reset --run
+through '' 0 running '' reset --run --gdb-option detach=yes
+through '' 0 halted Quen info --gdb-option detach=yes
 through reset-time=700 0 halted 'Done' $load --rewrite
 as_it_was never-halts '[14]' running halt program large.bin --base 8000
 as_it_was never-halts '[14]' running halt mac program 02-1B-C3-04-05-07 --commit
@@ -125,10 +127,31 @@ head -c 2048 /dev/zero >zeros.bin
 through '' 0 halted 'Done' program zeros.bin --base 0
 through '' 0 halted 'Done' $load
 
+# Ctrl-C as the loader works.
+attach
+"$tool" --gdb ":$port" --loader loader.out --trace steps --force $load --rewrite >said 2>&1 </dev/null &
+client=$!
+[ -n "$(await steps 's/.*WriteMemory 0x20000000.*/written/p')" ] || { echo "no chunk"; cat said; exit 1; }
+kill -INT "$client"
+interrupted=0
+wait "$client" || interrupted=$?
+[ "$interrupted" = 130 ] && grep -q 'interrupted; the flash is incomplete: 15 KiB erased' said ||
+    { echo "Ctrl-C -> $interrupted"; cat said; exit 1; }
+leave halted
+through '' 0 halted 'Done' $load
+
+# What a load needs is found out before one.
+as_it_was '' 0 halted 'Done: a load can work' check
+as_it_was never-halts 4 running 'FAIL *attach .*still runs' check
+as_it_was crash-after=0 4 halted "FAIL *run .*outside the RAM: it crashed" check
+as_it_was cable-off=20000008:9 4 "$any" 'FAIL *memory ' check
+
 # Failed reads are hidden: nobody works like that unless the user says so.
 failed_reads=disable
 as_it_was '' 4 halted 'gdb_report_data_abort enable' verify image.bin --base 0
+as_it_was '' 4 halted 'FAIL *failed reads *hidden' check
 trusted='--gdb-option reads=trusted'
+as_it_was '' 0 halted 'note *failed reads *hidden' check $trusted
 through '' 0 halted 'Done' $load --rewrite $trusted
 gone='identification register reads 0x00000000, not'
 as_it_was cable-off=4000:1 4 "$any" "$gone" read out.bin --range 0-7fff $trusted

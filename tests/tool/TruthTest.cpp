@@ -10,6 +10,7 @@
 #include <array>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <nlohmann/json.hpp>
 
 #include "host/Tool.h"
@@ -377,6 +378,32 @@ void HideFailedRead(const std::string& payload, std::string& wire) {
     if (RangeOf(payload, "m") && wire.find("$E") != std::string::npos) wire = *AsIfDone(payload);
 }
 
+/// Less than was asked for, which the protocol allows.
+void CutRead(const std::string& payload, std::string& wire) {
+    const auto read = RangeOf(payload, "m");
+    if (!read || read->bytes < 2 || wire.size() < 2 * std::size_t{read->bytes}) return;
+    wire = test::Framed(wire.substr(wire.find('$') + 1, read->bytes & ~1U));
+}
+
+/// Flash is asked for once, and told as it was then until the target has run.
+test::Peer::Bend CachedReads() {
+    return [cache = std::map<std::string, std::string>()](const std::string& payload,
+                                                          std::string& wire) mutable {
+        const auto read = RangeOf(payload, "m");
+        if (payload == "c" || payload.starts_with("vCont;c")) cache.clear();
+        if (read && read->first < kFlashBytes)
+            wire = cache.try_emplace(payload, wire).first->second;
+    };
+}
+
+/// A write that goes wrong is told as the answer to the next one.
+test::Peer::Hook LateWrites() {
+    return [](const std::string& payload) -> std::optional<std::string> {
+        const auto write = RangeOf(payload, "X");
+        return write && write->bytes >= 8 ? std::optional(kOk) : std::nullopt;
+    };
+}
+
 std::vector<LyingServer> LyingServers() {
     const auto none = [](const std::string&) { return std::nullopt; };
     const auto dropWrites = [](std::uint32_t first, std::uint32_t end) {
@@ -423,6 +450,9 @@ std::vector<LyingServer> LyingServers() {
          },
          {}},
         {"zeros for failed reads", none, HideFailedRead},
+        {"half of each answer to a read", none, CutRead},
+        {"flash read once until the target runs", none, CachedReads()},
+        {"binary writes answered first and made later", LateWrites(), {}},
     };
 }
 
@@ -507,6 +537,64 @@ TEST(Truth, HoldsOfWhatIsReadAsTheCableComesOff) {
             for (const char* told : {" value: ", "holds 0x", "differ"})
                 EXPECT_EQ(said.text.find(told), std::string::npos) << lost << ' ' << said.text;
         }
+    }
+}
+
+TEST(Truth, HoldsOfAServerThatDrivesAnotherDevice) {
+    for (const auto* device : {"quen,registers=ones", "quen,registers=zeros"}) {
+        const test::TemporaryDirectory directory;
+        setenv("XDG_CONFIG_HOME", directory.Path().c_str(), 1);
+        fs::current_path(directory.Path());
+        test::Peer peer([](const std::string&) { return std::nullopt; }, device);
+        const Said said = ToolRuns::Run({"info"}, Words{"--gdb", peer.Where().Text()});
+        EXPECT_EQ(said.status, 4);
+        EXPECT_NE(said.text.find("the server answers, but its target (architecture arm"),
+                  std::string::npos)
+            << said.text;
+        EXPECT_EQ(said.text.find("--sim"), std::string::npos) << said.text;
+        fs::current_path("/");
+    }
+}
+
+// Whichever request of a check fails, the RAM is as it was, or told not to be.
+TEST(Truth, HoldsOfTheRamThatACheckWrites) {
+    const ToolRuns runs;
+    std::vector<std::uint8_t> before(0x3000);
+    for (std::size_t i = 0; i < before.size(); ++i)
+        before[i] = static_cast<std::uint8_t>(3 * i + i / 256);
+    std::size_t packets = 9;
+    Said said;
+    for (std::size_t failing = 8; failing < packets + 29; failing += 29) {
+        std::size_t index = 0;
+        test::Peer peer(
+            [&](const std::string&) -> std::optional<std::string> {
+                if (index++ != failing) return std::nullopt;
+                return "+$E01#a6";
+            },
+            {}, runs.Device());
+        peer.Device().Write(before.data(), before.size(), 0x20000000, 1, 1);
+        said = ToolRuns::Run({"check"}, {"--gdb", peer.Where().Text(), "--loader",
+                                         test::LoaderFile(), "--gdb-option", "timeout=60s"});
+        packets = peer.Log().size();
+        auto after = before;
+        peer.Device().Read(after.data(), after.size(), 0x20000000, 1, 1);
+        const bool told = said.text.find("FAIL  put back") != std::string::npos;
+        EXPECT_TRUE(told || after == before) << failing << '\n' << said.text;
+        EXPECT_EQ(said.status == 4, said.text.find("FAIL") != std::string::npos) << said.text;
+        EXPECT_EQ(peer.Device().FlashContents(), std::vector<std::uint8_t>(kFlashBytes));
+    }
+    EXPECT_EQ(said.status, 0) << said.text;
+    const auto losesTargetAt = [&](std::size_t lost) {
+        test::Peer peer(LosesTarget{lost}, {}, runs.Device());
+        said = ToolRuns::Run({"check"}, {"--gdb", peer.Where().Text(), "--loader",
+                                         test::LoaderFile(), "--gdb-option", kTrusted});
+        return peer.Log().size();
+    };
+    packets = losesTargetAt(100'000);
+    EXPECT_EQ(said.status, 0) << said.text;
+    for (std::size_t lost = 8; lost < packets; lost += 41) {
+        losesTargetAt(lost);
+        EXPECT_EQ(said.status, 4) << lost << '\n' << said.text;
     }
 }
 

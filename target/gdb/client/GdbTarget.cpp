@@ -108,15 +108,19 @@ void GdbTarget::Perform(const Text& describe, const std::function<void()>& actio
     }
 }
 
-/// Where a program that has stopped by itself stands, as far as the server tells.
-std::string GdbTarget::WhereStopped() try {
+std::optional<std::uint32_t> GdbTarget::ProgramCounter() try {
     const std::string reply =
         connection_.Ask(fmt::format("p{:x}", RegisterNumber("pc", options_.pc)));
     const auto bytes = base::FromHex(reply);
-    if (!bytes || bytes->size() < 4) return "";
-    return fmt::format(" at pc {:#x}", base::WordOf(*bytes));
+    if (!bytes || bytes->size() < 4) return std::nullopt;
+    return base::WordOf(*bytes);
 } catch (const ProtocolError&) {
-    return "";
+    return std::nullopt;
+}
+
+std::string GdbTarget::WhereStopped() {
+    const auto pc = ProgramCounter();
+    return pc ? fmt::format(" at pc {:#x}", *pc) : "";
 }
 
 void GdbTarget::Read(void* buffer, std::size_t count, std::uint32_t address, int /*page*/,

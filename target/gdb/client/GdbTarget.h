@@ -91,6 +91,9 @@ class GdbTarget final : public Target {
     bool StandsStill() const override { return started_ && core_.IsStopped(); }
     std::chrono::nanoseconds RanFor() const override { return core_.RanFor(); }
 
+    /// Where the stopped program stands, if the server tells.
+    std::optional<std::uint32_t> ProgramCounter();
+
     /// Where the stack of a loaded program begins, unless the options say otherwise.
     void SetRamEnd(std::uint32_t address) { ramEnd_ = address; }
 

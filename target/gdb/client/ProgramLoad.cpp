@@ -25,6 +25,9 @@ constexpr std::size_t kDocumentSizeMax = std::size_t{1} << 20;
 // More than programs of this kind use.
 constexpr std::uint32_t kStackBytes = 1024;
 
+// Below that no compiled program gets far.
+constexpr std::uint64_t kStackBytesMin = 64;
+
 // The directory text was written for another system.
 std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
                        std::string directory) {
@@ -50,19 +53,24 @@ void GdbTarget::RequireProgram(const std::string& fileName, const std::string& d
     RequireFits(ReadLoaderFile(path), path);
 }
 
-/// The program lies in RAM, and its code and variables not where it is spoken to. The memory for
-/// that may be segments of its own, without contents.
+/// The program lies in RAM, begins there and has room for a stack above it; its code and variables
+/// aren't where it is spoken to. The memory for that may be segments of its own, without contents.
 void GdbTarget::RequireFits(const LoaderFile& loader, const std::string& path) const {
     const std::uint64_t ramStart = options_.device.ramStart.value_or(0);
     const std::uint64_t ramEnd = ramEnd_ ? *ramEnd_ : std::uint64_t{1} << 32;
     const std::uint64_t first = options_.device.ramStart.value_or(mailbox_.address);
     const std::uint64_t end = std::uint64_t{mailbox_.address} + mailbox_.sizeBytes;
+    std::uint64_t top = end;
+    bool entered = false;
     for (const LoaderFile::Segment& segment : loader.segments) {
         const std::uint64_t segmentEnd = std::uint64_t{segment.address} + segment.bytes.size();
         const std::string range = fmt::format("{:#x}-{:#x}", segment.address, segmentEnd - 1);
         if (segment.address < ramStart || segmentEnd > ramEnd)
             RefuseLoader(path, fmt::format("has a segment at {}, outside the RAM ({:#x}-{:#x})",
                                            range, ramStart, ramEnd - 1));
+        top = std::max(top, segmentEnd);
+        const std::uint32_t entry = loader.entry & ~std::uint32_t{1};
+        entered = entered || (entry >= segment.address && entry < segmentEnd);
         const bool outside = segmentEnd <= first || segment.address >= end;
         const bool reserved = segment.address >= first && segmentEnd <= end &&
                               segment.bytes.find_first_not_of('\0') == std::string::npos;
@@ -71,6 +79,11 @@ void GdbTarget::RequireFits(const LoaderFile& loader, const std::string& path) c
                                            "blocks are ({:#x}-{:#x})",
                                            range, first, end - 1));
     }
+    if (!entered)
+        RefuseLoader(path, fmt::format("begins at {:#x}, where it has nothing", loader.entry));
+    if (top + kStackBytesMin > ramEnd)
+        RefuseLoader(path, fmt::format("leaves {} bytes for its stack, below {:#x}",
+                                       ramEnd - std::min(top, ramEnd), ramEnd));
 }
 
 void GdbTarget::LoadSegments(const std::string& path) {

@@ -152,9 +152,8 @@ DeviceOptions ReopenOptions(const DeviceOptions& kept, const DeviceOptions& toda
 }
 
 std::string DeviceClassesHelp() {
-    std::string text =
-        fmt::format("  {:<7} {:<6} {:<5} {:<7} {:<11} {}\n", "", "flash", "ram", "sector", "id",
-                    "keyconfig");
+    std::string text = fmt::format("  {:<7} {:<6} {:<5} {:<7} {:<11} {}\n", "", "flash", "ram",
+                                   "sector", "id", "keyconfig");
     for (const DeviceClass& one : DeviceClasses())
         text += fmt::format("  {:<7} {:<6} {:<5} {:<7} {:<11} {}\n", one.name,
                             FormatSize(one.flashSizeBytes), FormatSize(one.ramSizeBytes),
