@@ -96,11 +96,6 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
     return outcome;
 }
 
-Trace OpenTrace(const Context& context, const std::string& path) {
-    InputFiles(context).RequireOther(path, "the trace");
-    return Trace(path, ExistingFiles(context.options));
-}
-
 /// The logger of the plug-in appends to whatever file its variable names.
 void RequireOtherLog(const Context& context) {
     const char* log = std::getenv("OSTREL_LOG");
@@ -116,6 +111,13 @@ void RequireOtherDeviceFile(const Context& context) {
 
 }  // namespace
 
+std::optional<Trace> OpenTrace(const Context& context) {
+    if (!context.options.trace) return std::nullopt;
+    InputFiles(context).RequireOther(*context.options.trace, "the trace");
+    return std::optional<Trace>(std::in_place, *context.options.trace,
+                                ExistingFiles(context.options));
+}
+
 Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>& work) {
     return WithTrace(context, [&](Trace* trace) { return WorkOn(context, trace, work); });
 }
@@ -123,21 +125,21 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
 Outcome WithTrace(Context& context, const std::function<Outcome(Trace*)>& work) {
     RequireOtherLog(context);
     RequireOtherDeviceFile(context);
-    if (!context.options.trace) return work(nullptr);
-    Trace trace = OpenTrace(context, *context.options.trace);
+    std::optional<Trace> trace = OpenTrace(context);
+    if (!trace) return work(nullptr);
     Outcome outcome;
     try {
-        outcome = work(&trace);
+        outcome = work(&*trace);
     } catch (...) {
-        if (!trace.Problem().empty()) context.reporter.Error(trace.Problem());
+        if (!trace->Problem().empty()) context.reporter.Error(trace->Problem());
         throw;
     }
-    if (trace.Problem().empty()) return outcome;
+    if (trace->Problem().empty()) return outcome;
     if (outcome.status != ExitStatus::Done) {
-        context.reporter.Error(trace.Problem());
+        context.reporter.Error(trace->Problem());
         return outcome;
     }
-    return {ExitStatus::BadFile, trace.Problem(), outcome.result};
+    return {ExitStatus::BadFile, trace->Problem(), outcome.result};
 }
 
 Outcome NothingTouched(Context& context, Json plan) {

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 
 #include "host/cli/CommonOptions.h"
 #include "host/driver/FlashDevice.h"
@@ -37,6 +38,9 @@ Outcome WithDevice(Context& context, const std::function<Outcome(FlashDevice&)>&
 
 /// Runs work that may be traced. A trace that isn't whole is a failure.
 Outcome WithTrace(Context& context, const std::function<Outcome(Trace*)>& work);
+
+/// The trace that the options ask for. Failure (BadFile).
+std::optional<Trace> OpenTrace(const Context& context);
 
 /// What ends a dry run: `plan` is what would be done.
 Outcome NothingTouched(Context& context, Json plan);

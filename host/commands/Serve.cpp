@@ -28,9 +28,15 @@ Outcome RunServe(Context& context, const ServeOptions& options) {
     Reporter& reporter = context.reporter;
     const TargetOptions& target = TargetOf(context.options);
     RequireOneKind(target);
-    if (target.gdb)
-        return ServeThere(reporter, ProbeServing({target, context.options.plugin}, options.address,
-                                                 context.settings, reporter));
+    if (target.gdb) {
+        std::optional<Trace> trace = OpenTrace(context);
+        Outcome outcome = ServeThere(
+            reporter, ProbeServing({target, context.options.plugin, trace ? &*trace : nullptr},
+                                   options.address, context.settings, reporter));
+        if (trace && !trace->Problem().empty())
+            return {ExitStatus::BadFile, trace->Problem(), outcome.result};
+        return outcome;
+    }
     return ServeThere(
         reporter,
         TargetServer(

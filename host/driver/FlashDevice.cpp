@@ -45,12 +45,12 @@ void RequireUsable(const DeviceInfo& info) {
                               SizeText(info.flashBytes), SizeText(info.sectorBytes)));
 }
 
+}  // namespace
+
 TraceLine LinesTo(Trace* trace) {
     if (trace == nullptr) return {};
     return [trace](const char* source, const std::string& text) { trace->Line(source, text); };
 }
-
-}  // namespace
 
 std::unique_ptr<OpenTarget> Open(const DeviceOptions& options, Reporter& reporter) {
     const auto say = [&](const std::string& text) { reporter.Say(Verbosity::Normal, text); };

@@ -40,6 +40,9 @@ struct DeviceOptions {
     Trace* trace = nullptr;
 };
 
+/// What a target tells the trace; empty without one.
+TraceLine LinesTo(Trace* trace);
+
 /// What becomes of the file of a simulated device, where one was named.
 enum class DeviceFile { Save, LeaveAlone };
 

@@ -17,7 +17,7 @@ ProbeServing::ProbeServing(const DeviceOptions& options, const std::string& addr
     : options_(options),
       settings_(settings),
       reporter_(reporter),
-      connector_(options.target),
+      connector_(options.target, LinesTo(options.trace)),
       address_(ListenAddress(address)) {
     try {
         server_ = std::make_unique<gdb::ProbeServer>(

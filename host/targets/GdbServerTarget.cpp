@@ -4,6 +4,8 @@
 
 #include <fmt/format.h>
 
+#include <utility>
+
 #include "host/base/Errors.h"
 #include "host/base/Interrupt.h"
 #include "host/facts/FlashMemory.h"
@@ -64,8 +66,8 @@ std::unique_ptr<gdb::GdbTarget> Connect(const TargetOptions& options, const Trac
 GdbServerTarget::GdbServerTarget(const TargetOptions& options, const TraceLine& trace)
     : server_(*options.gdb), own_(host::Connect(options, trace)), target_(*own_) {}
 
-ProbeConnector::ProbeConnector(const TargetOptions& options)
-    : address_(ParseServer(options)), options_(ParseOptions(options)) {
+ProbeConnector::ProbeConnector(const TargetOptions& options, TraceLine trace)
+    : address_(ParseServer(options)), options_(ParseOptions(options)), trace_(std::move(trace)) {
     if (options_.loader.empty()) return;
     try {
         gdb::ReadLoaderFile(options_.loader);
@@ -76,7 +78,7 @@ ProbeConnector::ProbeConnector(const TargetOptions& options)
 
 std::unique_ptr<gdb::GdbTarget> ProbeConnector::Connect() const {
     return std::make_unique<gdb::GdbTarget>(address_, options_, kMailbox, Interrupted,
-                                            gdb::PacketTrace(), gdb::GdbTarget::Lent());
+                                            PacketsTo(trace_), gdb::GdbTarget::Lent());
 }
 
 std::vector<base::AddressRange> LoaderMemory(const gdb::GdbTarget& probe,

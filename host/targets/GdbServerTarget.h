@@ -48,13 +48,14 @@ class GdbServerTarget final : public OpenTarget {
 /// (WrongUsage) for options that can't be read, Failure (BadFile) for the loader's file.
 class ProbeConnector {
   public:
-    explicit ProbeConnector(const TargetOptions& options);
+    ProbeConnector(const TargetOptions& options, TraceLine trace);
 
     std::unique_ptr<target::gdb::GdbTarget> Connect() const;
 
   private:
     target::gdb::Address address_;
     target::gdb::GdbOptions options_;
+    TraceLine trace_;
 };
 
 /// What a load changes of the target's memory beside flash. TargetError.

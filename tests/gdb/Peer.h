@@ -68,6 +68,7 @@ class Peer {
 
     Address Where() const { return address_; }
     SimulatedDevice& Device() { return *device_; }
+    ServedSimulation& Served() { return served_; }
     std::vector<std::string> Log() {
         done_ = true;
         if (thread_.joinable()) thread_.join();

@@ -14,6 +14,9 @@ namespace target::gdb {
 
 namespace {
 
+// Of a server that describes none.
+constexpr unsigned kAllRegisters = ~0U;
+
 /// Calls `step` with each part of the range that a block has: where it begins in the range and in
 /// the block, and its size.
 template <typename Blocks, typename Step>
@@ -58,11 +61,12 @@ void SavedTarget::Take(const std::vector<base::AddressRange>& memory) {
 /// Without those that the server doesn't tell, which nobody can have set either.
 std::map<unsigned, std::string> SavedTarget::ReadRegisters() {
     std::map<unsigned, std::string> values;
+    if (probe_.Registers().empty()) values[kAllRegisters] = probe_.Wire().Ask("g");
     for (const auto& [name, number] : probe_.Registers()) {
         const std::string reply = probe_.Wire().Ask(fmt::format("p{:x}", number));
         if (!IsError(reply) && base::FromHex(reply)) values[number] = reply;
     }
-    if (values.empty())
+    if (values.empty() || IsRefusal(values.begin()->second))
         throw ProtocolError("doesn't tell the core's registers, which could not be put back");
     return values;
 }
@@ -75,7 +79,8 @@ bool SavedTarget::WriteRegisters() {
         const auto found = now.find(number);
         if (found != now.end() && found->second == value) continue;
         same = false;
-        probe_.Wire().Agrees(fmt::format("P{:x}={}", number, value));
+        probe_.Wire().Agrees(number == kAllRegisters ? "G" + value
+                                                     : fmt::format("P{:x}={}", number, value));
     }
     return same;
 }

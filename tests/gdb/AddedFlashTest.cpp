@@ -1,0 +1,316 @@
+// A debugger's load through a probe with flash added, each packet in turn going wrong on one side
+// or the other: what the debugger is told is compared with the device.
+
+#include <fmt/format.h>
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <chrono>
+#include <numeric>
+
+#include "base/Hex.h"
+#include "host/driver/FlashDevice.h"
+#include "host/flashing/DebuggerLoad.h"
+#include "host/targets/GdbServerTarget.h"
+#include "target/gdb/probe/ProbeSession.h"
+#include "tests/gdb/Peer.h"
+#include "tests/support/VirtualTime.h"
+
+namespace {
+
+using namespace target;
+using namespace target::gdb;
+using namespace std::chrono_literals;
+using test::Peer;
+
+constexpr std::uint32_t kFlashBytes = 0x10000;
+constexpr std::uint32_t kScratch = 0x20000FF0;  // loader buffers, and the blocks behind them
+
+std::string Pattern(std::size_t size, unsigned seed) {
+    std::string bytes(size, '\0');
+    for (std::size_t i = 0; i < size; ++i)
+        bytes[i] = static_cast<char>(i * i + i / 256 + seed);
+    return bytes;
+}
+
+std::string Write(std::uint32_t address, const std::string& bytes) {
+    return fmt::format("vFlashWrite:{:x}:", address) + bytes;
+}
+
+/// Zeros, which are neither erased nor written, but for the last sectors.
+std::unique_ptr<SimulatedDevice> Device() {
+    static test::VirtualClock clock;
+    auto device = std::make_unique<SimulatedDevice>(
+        ParseDeviceOptions("quen,flash=64K,erase-time=1ms"), &clock);
+    device->Flash().Preset(0, std::vector<std::uint8_t>(kFlashBytes - 0x800, 0));
+    return device;
+}
+
+/// The debugger's end, the session, and what lies behind it.
+class Debugger {
+  public:
+    explicit Debugger(Peer& peer)
+        : reporter_({host::Verbosity::Quiet, false, "none"}),
+          open_([this](GdbTarget& probe) { return FlashOf(probe); }),
+          complain_([this](const std::string& text) { complaints += text + "\n"; }) {
+        host::TargetOptions options;
+        options.gdb = "127.0.0.1:" + peer.Where().port;  // a look-up of a name takes real time
+        options.loader = test::LoaderFile();
+        options.gdbOptions = {"timeout=1s"};
+        probe_ = host::ProbeConnector(options, {}).Connect();
+        int ends[2];
+        EXPECT_EQ(socketpair(AF_UNIX, SOCK_STREAM, 0, ends), 0);
+        own_ = Socket(ends[0], {});
+        client_.emplace(Reception::Client{Socket(ends[1], {}), ""});
+        client_->StopAcknowledging();
+        session_.emplace(*client_, *probe_, open_, complain_);
+    }
+
+    /// The answer; none when the connection ends, or nothing comes.
+    std::optional<std::string> Ask(const std::string& request) try {
+        own_.Write(Framed(Escaped(request)), After(1s));
+        client_->Read();
+        for (const Deadline end = After(3s); std::chrono::steady_clock::now() < end;) {
+            while (const auto frame = client_->Next())
+                session_->Take(*frame);
+            probe_->Wire().TakeArrived();
+            decoder_.Feed(own_.Read(After(20ms)));
+            while (const auto frame = decoder_.Next())
+                if (frame->kind == Frame::Kind::Packet && !frame->payload.starts_with("O4"))
+                    return frame->payload;
+        }
+        return std::nullopt;
+    } catch (const std::runtime_error&) {
+        return std::nullopt;
+    }
+
+    void Leave() { session_->Leave(); }
+
+    std::string complaints;
+
+  private:
+    std::unique_ptr<FlashProgrammer> FlashOf(GdbTarget& probe) {
+        return std::make_unique<host::DebuggerLoad>(
+            [this, &probe](host::SettingStore& settings) {
+                return std::make_unique<host::FlashDevice>(
+                    std::make_unique<host::GdbServerTarget>(probe),
+                    host::DeviceOptions{{}, FLASH_CORVANE_LIBRARY}, settings, reporter_);
+            },
+            [&probe] { return host::LoaderMemory(probe, ""); }, settings_);
+    }
+
+    host::SettingStore settings_;
+    host::Reporter reporter_;
+    const OpenFlash open_;
+    const ComplaintSink complain_;
+    std::unique_ptr<GdbTarget> probe_;
+    Socket own_;
+    FrameDecoder decoder_{FrameDecoder::Sender::Server};
+    std::optional<ClientPort> client_;
+    std::optional<ProbeSession> session_;
+};
+
+// Two odd pieces and a gap; a sector that is only erased; RAM written before and in between.
+const std::string kRam = Pattern(64, 7);
+const std::string kLater = Pattern(16, 9);
+const std::string kFirst = Pattern(1500, 1);
+const std::string kSecond = Pattern(700, 2);
+
+const std::vector<std::string> kLoad = {
+    "qSupported:swbreak+",
+    "?",
+    "qXfer:memory-map:read::0,fff",
+    "Z0,100,2",
+    "Hg1",
+    "P5=78563412",
+    fmt::format("M{:x},{:x}:", kScratch, kRam.size()) + base::ToHex(kRam),
+    "vFlashErase:400,800",
+    "vFlashErase:1000,400",
+    Write(0x403, kFirst),
+    fmt::format("M{:x},{:x}:", kScratch + 8, kLater.size()) + base::ToHex(kLater),
+    "vFlashErase:c00,400",
+    Write(0xBF0, kSecond),
+    "m1000,4",
+    "vFlashDone",
+};
+
+std::string ExpectedFlash() {
+    std::string flash(kFlashBytes - 0x800, '\0');
+    flash += std::string(0x800, '\xFF');
+    flash.replace(0x400, 0xC00, 0xC00, '\xFF').replace(0x1000, 0x400, 0x400, '\xFF');
+    return flash.replace(0x403, kFirst.size(), kFirst).replace(0xBF0, kSecond.size(), kSecond);
+}
+
+std::string ExpectedRam() {
+    std::string ram = kRam;
+    return ram.replace(8, kLater.size(), kLater);
+}
+
+struct Told {
+    std::vector<std::string> answers;  ///< "-" for none
+    bool Done() const { return answers.back() == "OK"; }
+};
+
+/// Asks for all of it, as `bend` has it, and holds what was told against the device.
+Told CheckLoad(Peer& peer, const std::string& fault, const std::vector<std::string>& load) {
+    Told told;
+    const auto start = std::chrono::system_clock::now();
+    std::string complaints;
+    testing::internal::CaptureStderr();
+    {
+        Debugger debugger(peer);
+        for (const std::string& request : load)
+            told.answers.push_back(debugger.Ask(request).value_or("-"));
+        debugger.Leave();
+        complaints = debugger.complaints;
+    }
+    peer.Log();
+    complaints += testing::internal::GetCapturedStderr();
+    EXPECT_LT(std::chrono::system_clock::now() - start, 20s) << fault;
+    if (!told.Done()) return told;
+    const auto flash = peer.Device().FlashContents();
+    EXPECT_TRUE(std::string(flash.begin(), flash.end()) == ExpectedFlash()) << fault << complaints;
+    // RAM and registers of a debugger whose own requests were not all carried out are its own
+    // affair.
+    if (std::ranges::count(told.answers, "OK") < 12) return told;
+    std::string ram(kRam.size(), '\0');
+    peer.Device().Halt();
+    peer.Device().Read(ram.data(), ram.size(), kScratch, 1, 1);
+    EXPECT_EQ(base::ToHex(ram), base::ToHex(ExpectedRam())) << fault << complaints;
+    EXPECT_EQ(peer.Served().Registers().values[5], 0x12345678U) << fault << complaints;
+    return told;
+}
+
+const std::optional<std::string> kAsItIs;
+
+TEST(AddedFlash, IsLoadedAndNothingElseChanges) {
+    Peer peer([](const std::string&) { return kAsItIs; }, {}, Device());
+    const Told told = CheckLoad(peer, "no fault", kLoad);
+    std::string answers;
+    for (const std::string& answer : told.answers)
+        answers += answer.substr(0, 8) + " ";
+    EXPECT_EQ(answers, "PacketSi T05threa l<?xml v OK OK OK OK OK OK OK OK OK OK ffffffff OK ");
+    EXPECT_NE(told.answers[0].find(";QStartNoAckMode+;qXfer:memory-map:read+"), std::string::npos);
+    EXPECT_NE(told.answers[2].find("\"flash\" start=\"0x0\" length=\"0x10000\"><property "
+                                   "name=\"blocksize\">0x400"),
+              std::string::npos);
+}
+
+// Each line: requests of a session of its own, and the answers. Nothing is touched by what is
+// refused.
+TEST(AddedFlash, RefusesWhatItCanNotDo) {
+    const struct {
+        std::vector<std::string> requests;
+        const char* answers;
+    } rows[] = {
+        {{"vFlashWrite:400:a", "vFlashDone"}, "E01 OK "},
+        {{"vFlashErase:10,400", "vFlashErase:10000,400", "vFlashErase:0,ffff0000"}, "E01 E01 E01 "},
+        {{"vFlashErase:zz", "vFlashWrite:ffff:ab", "vFlashDonex"}, "E01 E01 E01 "},
+        {{"vFlashErase:fc00,800"}, "E01 "},
+        {{"vFlashErase:400,400", "vFlashWrite:500:ab", "vFlashWrite:500:ab", "vFlashWrite:501:x"},
+         "OK OK OK E01 "},
+        {{"vFlashErase:400,400", "vFlashWrite:400:ab", "m3fe,5", "M400,1:00", "x400,1"},
+         "OK OK 00006162ff E01  "},
+        {{"QNonStop:1", "vCont;c", "vFlashErase:400,400"}, " - E01 "},
+        {{Write(0xF900, "blank"), "vFlashDone", "mf900,5", Write(0xF900, "blanc")},
+         "OK OK 626c616e6b E01 "},
+    };
+    for (const auto& row : rows) {
+        Peer peer([](const std::string&) { return kAsItIs; }, {}, Device());
+        std::string answers;
+        std::string complaints;
+        {
+            Debugger debugger(peer);
+            debugger.Ask("qSupported");
+            debugger.Ask("?");
+            for (const std::string& request : row.requests)
+                answers += debugger.Ask(request).value_or("-") + " ";
+            debugger.Leave();
+            complaints = debugger.complaints;
+        }
+        EXPECT_EQ(answers, row.answers) << row.requests[0] << complaints;
+        const auto held = peer.Device().FlashContents();
+        if (row.requests.back() == Write(0xF900, "blanc")) continue;
+        EXPECT_TRUE(std::all_of(held.begin(), held.end() - 0x800, [](auto b) { return b == 0; }));
+    }
+}
+
+// The debugger's requests, each left out, or sent twice.
+TEST(AddedFlash, TellsTheTruthWhateverTheDebuggerSends) {
+    for (std::size_t at = 0; at + 1 < kLoad.size(); ++at) {
+        std::vector<std::string> twice = kLoad;
+        twice.insert(twice.begin() + static_cast<std::ptrdiff_t>(at), kLoad[at]);
+        Peer peer([](const std::string&) { return kAsItIs; }, {}, Device());
+        EXPECT_TRUE(CheckLoad(peer, "twice: " + kLoad[at].substr(0, 20), twice).Done());
+        if (!kLoad[at].starts_with("vFlash")) continue;
+        std::vector<std::string> without = kLoad;
+        without.erase(without.begin() + static_cast<std::ptrdiff_t>(at));
+        Peer other([](const std::string&) { return kAsItIs; }, {}, Device());
+        Debugger debugger(other);
+        bool refused = false;
+        for (const std::string& request : without)
+            refused = refused || debugger.Ask(request).value_or("-") == "E01";
+        const bool erase =
+            kLoad[at].starts_with("vFlashErase") && kLoad[at] != "vFlashErase:1000,400";
+        EXPECT_EQ(refused, erase) << kLoad[at].substr(0, 20);
+    }
+}
+
+struct ReplyFault {
+    const char* name;
+    void (*bend)(std::string& wire, std::string& late);
+};
+
+const ReplyFault kFaults[] = {
+    {"dropped", [](std::string& wire, std::string&) { wire.clear(); }},
+    {"refused", [](std::string& wire, std::string&) { wire = "+" + Framed("E01"); }},
+    {"damaged",
+     [](std::string& wire, std::string&) {
+         if (!wire.empty()) wire.back() ^= 1;
+     }},
+    {"doubled", [](std::string& wire, std::string&) { wire += wire; }},
+    {"late", [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
+    {"cut", [](std::string& wire,
+               std::string&) { wire = wire.substr(0, wire.size() / 2) + Peer::kClose; }},
+};
+
+// A chunk, an erase or a loader that went nowhere, although the probe said OK.
+TEST(AddedFlash, ComparesWhatItSaysIsDone) {
+    for (const char* lost : {"X20000000", "X20001004", "M400fd008", "X20002000"}) {
+        Peer peer(
+            [&](const std::string& payload) -> std::optional<std::string> {
+                if (!payload.starts_with(lost)) return std::nullopt;
+                return Framed("OK");
+            },
+            {}, Device());
+        const Told told = CheckLoad(peer, lost, kLoad);
+        const auto log = peer.Log();
+        EXPECT_TRUE(std::ranges::any_of(log, [&](auto& line) { return line.starts_with(lost); }));
+        EXPECT_EQ(told.answers.back(), "E01") << lost;
+    }
+}
+
+TEST(AddedFlash, TellsTheTruthWhateverTheProbeAnswers) {
+    std::size_t packets = 0;
+    for (const ReplyFault& fault : kFaults)
+        for (std::size_t failing = 0; failing == 0 || failing < packets; ++failing) {
+            std::size_t index = 0;
+            std::string late;
+            std::string bent;
+            Peer peer([](const std::string&) { return kAsItIs; },
+                      [&](const std::string& payload, std::string& wire) {
+                          wire.insert(0, std::exchange(late, ""));
+                          if (index++ != failing) return;
+                          bent = payload.substr(0, 30);
+                          fault.bend(wire, late);
+                      },
+                      Device());
+            CheckLoad(peer, fmt::format("{} {}", failing, fault.name), kLoad);
+            packets = std::max(packets, index);
+            if (HasFailure()) FAIL() << bent;
+        }
+    EXPECT_GT(packets, 100U);
+}
+
+}  // namespace
