@@ -19,6 +19,7 @@ ProbeServing::ProbeServing(const DeviceOptions& options, const std::string& addr
       reporter_(reporter),
       connector_(options.target, LinesTo(options.trace)),
       address_(ListenAddress(address)) {
+    const PluginLibrary isThere(options_.plugin.value_or(""));
     try {
         server_ = std::make_unique<gdb::ProbeServer>(
             [this] { return connector_.Connect(); },

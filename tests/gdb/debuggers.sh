@@ -1,13 +1,14 @@
 #!/usr/bin/env bash
-# debuggers.sh TOOL: stock GDB and LLDB load through the tool, which adds flash to a probe's GDB server:
+# debuggers.sh TOOL REGISTER-LENDER: stock GDB and LLDB load through the tool, which adds flash to a probe's GDB server:
 # here the one of the simulated device, whose own flash packets never pass.
 set -euo pipefail
 tool=$1
+lender=$2
 servers=()
 trap 'kill "${servers[@]}" 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$(dirname "$0")/as-inside.sh"
-require gdb-multiarch lldb arm-none-eabi-as
+require gdb-multiarch lldb arm-none-eabi-as qemu-system-arm
 build_loader
 
 # serve NAME OPTION...: a server, whose port is $port then.
@@ -93,6 +94,45 @@ serve nobody --gdb :1
 timeout 60 gdb-multiarch -nx -batch -ex "target remote :$port" >gdb 2>&1 || true
 says nobody.refused 'refused; is it running'
 says gdb 'E.can.t connect to the GDB server at localhost:1'
+
+# On QEMU, where loader and firmware run: the example's loader programs, and the debugger then has its
+# breakpoints, steps and Ctrl-C.
+ARM_CC='clang --target=arm-none-eabi -fuse-ld=lld' sh "$firmware/../loader/build.sh" "$work/toy.out"
+board=$((20000 + RANDOM % 10000))
+timeout 200 qemu-system-arm -M mps2-an385 -S -display none -serial none -monitor none \
+    -gdb "tcp:127.0.0.1:$board" >qemu 2>&1 &
+emulator=$!
+sleep 1
+timeout 200 "$lender" "$board" >lent 2>&1 &
+serve qemu --gdb ":$(await lent 1p)" --loader toy.out --gdb-option server=qemu
+registers=$(printf '%s\n' 'echo <' 'info registers' 'x/2wx 0x20000010' 'echo >')
+cat >qemu.gdb <<END
+target remote :$port
+set {int}0x20000010=0x1234
+set \$r7=77
+hbreak *0x3000
+$registers
+load
+$registers
+compare-sections
+monitor system_reset
+maintenance flush register-cache
+delete
+break Tick
+continue
+stepi
+delete
+python import threading,os,signal; threading.Timer(2,lambda: os.kill(os.getpid(),signal.SIGINT)).start()
+continue
+load
+monitor corvane
+detach
+END
+timeout --foreground 100 gdb-multiarch -nx -batch -x qemu.gdb firmware.elf >gdb 2>&1 || { cat gdb qemu.refused; exit 1; }
+kill $emulator
+says gdb '^r7 *0x4d' '0x20000010:.0x00001234' '.text.*: matched' 'Breakpoint.*Tick ()' '^0x000000ae in Tick' \
+    'received signal SIGINT' '4.5 KiB of it left alone'
+[ -z "$(sed -n '/^</,/^>/ { /^>\|^pc \|^xpsr /d; s/^<//; p; }' gdb | sort | uniq -u)" ] || { cat gdb; exit 1; }
 
 kill "${servers[@]}"
 wait "${servers[@]}" || { echo "a server ended with $?"; exit 1; }
