@@ -8,6 +8,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <stdexcept>
 #include <string>
 
@@ -55,6 +56,14 @@ class Target {
 
     /// Whether a read that has failed may look like one that was answered.
     virtual bool HidesFailedReads() const { return false; }
+
+    /// The CRC-32 of so many bytes at an address (base/Crc32.h), summed up where they are, without
+    /// moving them; nothing where nobody can do that, or where it isn't known that whoever does it
+    /// does it right. The target is halted.
+    virtual std::optional<std::uint32_t> Checksum(std::uint32_t /*address*/,
+                                                  std::uint32_t /*sizeBytes*/) {
+        return std::nullopt;
+    }
 
     /// Whether the running target was stopped by an access and hasn't gone on yet. Until a pause,
     /// or a look that finds its program busy, lets it go on, looks cost nothing more.

@@ -19,6 +19,7 @@ Outcome MapOn(Context& context, FlashDevice& device, const LoadedImages& images)
     RequireFit(device, device.Info(), images);
     const DeviceInfo& info = device.Info();
     LoadPlan plan;
+    device.CompareBytes();  // trying the target's checksum writes to RAM
     if (!images.image.Empty())
         plan = PlanOnDevice(device, RequestedLoad(context.settings), images.image);
     const FlashGeometry flash = GeometryOf(info);

@@ -22,7 +22,7 @@ namespace host::commands {
 
 namespace {
 
-struct ProgramOptions : ImageFiles, Comparing, Running, DryRun, RegisterOptionsOfLoad {
+struct ProgramOptions : ImageFiles, Comparing, ComparisonKind, Running, DryRun, RegisterOptionsOfLoad {
     std::optional<std::string> erase;
     bool keep = false;
     bool blankCheck = false;
@@ -89,13 +89,16 @@ void ShowPlan(Context& context, const DeviceInfo& info, const LoadPlan& plan, st
 
 void ShowUnchanged(Reporter& reporter, const LoadPlan& plan) {
     if (plan.unchangedBytes != 0 && reporter.Hears(Verbosity::Normal))
-        reporter.Result(fmt::format("{:<13} {}", "Left alone", SizeText(plan.unchangedBytes)));
+        reporter.Result(fmt::format("{:<13} {}{}", "Left alone", SizeText(plan.unchangedBytes),
+                                    ByChecksumText(plan.lookedByChecksum)));
 }
 
-const char* DoneText(const LoadPlan& plan) {
-    if (plan.sections.empty()) return "Done: the flash held the image already";
-    return plan.checks.compare ? "Done: the flash holds the image"
-                               : "Done: the image is programmed, but not compared";
+std::string DoneText(const LoadPlan& plan, bool comparedByChecksum) {
+    if (plan.sections.empty())
+        return std::string("Done: the flash held the image already") +
+               ByChecksumText(plan.checks.compare ? comparedByChecksum : plan.lookedByChecksum);
+    if (!plan.checks.compare) return "Done: the image is programmed, but not compared";
+    return std::string("Done: the flash holds the image") + ByChecksumText(comparedByChecksum);
 }
 
 Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
@@ -103,6 +106,7 @@ Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
     const LoadResult load = RunLoad(device, plan, images.image);
     Outcome outcome{.result = ToJson(plan)};
     if (load.checksum) outcome.result["checksum"] = *load.checksum;
+    if (plan.checks.compare) outcome.result["comparedBy"] = ComparedBy(load.differences);
     if (!load.differences.Empty())
         FailAsDifferent(outcome, load.differences, images, AdviceAfter(plan, load.differences));
     outcome.result["phases"] = PhasesJson(device.Meter().Phases());
@@ -111,7 +115,7 @@ Outcome Load(Context& context, FlashDevice& device, const LoadedImages& images,
     if (outcome.status == ExitStatus::Done) WriteAfterLoad(context, device, registers, outcome);
     if (outcome.status != ExitStatus::Done) return outcome;
     if (runAfterwards) device.StartProgram();
-    outcome.done = DoneText(plan);
+    outcome.done = DoneText(plan, load.differences.byChecksum);
     return outcome;
 }
 
@@ -136,6 +140,8 @@ Outcome ProgramOn(Context& context, FlashDevice& device, const ProgramOptions& o
                   const WantedRegisters& registers, LoadedImages images) {
     const DeviceInfo& info = device.Info();
     RequireFit(device, info, images);
+    ApplyTo(device, options);
+    if (options.dryRun) device.CompareBytes();  // trying the target's checksum writes to RAM
     const LoadRequest request = Request(context.settings, options, device);
     const std::uint64_t kept = options.keep ? KeepOthers(device, images, request.erase) : 0;
     const LoadPlan plan = PlanOnDevice(device, request, images.image);
@@ -212,6 +218,7 @@ CommandRow Program() {
          CommitOption(),
          AnyAddressOption(),
          NoVerifyOption(),
+         CompareOption(),
          RunOption("Reset the device afterwards and let it run its program"),
          DryRunOption()},
         RunProgram);

@@ -2,6 +2,8 @@
 
 #include "host/commands/SharedOptions.h"
 
+#include "host/driver/FlashDevice.h"
+
 namespace host::commands {
 
 Option<RangeChoice> RangeOption(const char* help) {
@@ -47,6 +49,22 @@ Option<DryRun> DryRunOption() {
             {"--dry-run", "",
              "Show what would be done and how it would end, and change nothing; a board is left "
              "halted"}};
+}
+
+Option<ComparisonKind> CompareOption() {
+    return {&ComparisonKind::compare,
+            {.names = "--compare",
+             .value = "HOW",
+             .help = "bytes: read what is compared, also where the target can tell its CRC-32",
+             .choices = {"auto", "bytes"}}};
+}
+
+void ApplyTo(FlashDevice& device, const ComparisonKind& options) {
+    if (options.compare == "bytes") device.CompareBytes();
+}
+
+const char* ByChecksumText(bool byChecksum) {
+    return byChecksum ? ", by CRC-32" : "";
 }
 
 Option<Comparing> NoVerifyOption() {

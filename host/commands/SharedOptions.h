@@ -9,6 +9,12 @@
 #include "host/cli/Option.h"
 #include "host/commands/Context.h"
 
+namespace host {
+
+class FlashDevice;
+
+}  // namespace host
+
 namespace host::commands {
 
 struct RangeChoice {
@@ -39,6 +45,17 @@ struct DryRun {
     bool dryRun = false;
 };
 Option<DryRun> DryRunOption();
+
+struct ComparisonKind {
+    std::optional<std::string> compare;
+};
+Option<ComparisonKind> CompareOption();
+
+/// Lets the device compare as the option says. Failure (WrongUsage).
+void ApplyTo(FlashDevice& device, const ComparisonKind& options);
+
+/// ", by CRC-32", where it was.
+const char* ByChecksumText(bool byChecksum);
 
 struct Comparing {
     bool noVerify = false;

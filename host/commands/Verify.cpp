@@ -17,7 +17,7 @@ namespace host::commands {
 
 namespace {
 
-struct VerifyOptions : ImageFiles, RangeChoice {
+struct VerifyOptions : ImageFiles, RangeChoice, ComparisonKind {
     bool list = false;
 };
 
@@ -34,6 +34,7 @@ Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
     const ChosenRanges chosen = ChooseJoinedRanges(device, options.ranges);
     const LoadedImages images = chosen.isWholeFlash ? all : Within(all, chosen.ranges);
     RequireFit(device, device.Info(), images);
+    ApplyTo(device, options);
     device.Meter().Expect(Phase::Verify, images.image.ByteCount());
     const std::size_t shown =
         options.list ? std::numeric_limits<std::size_t>::max() : Differences::kRangesShown;
@@ -42,10 +43,12 @@ Outcome VerifyOn(Context& context, FlashDevice& device, const LoadedImages& all,
     Outcome outcome{.result = {{"equal", equal},
                                {"imageBytes", all.image.ByteCount()},
                                {"comparedBytes", images.image.ByteCount()},
+                               {"comparedBy", ComparedBy(differences)},
                                {"phases", PhasesJson(device.Meter().Phases())}}};
     ShowSummary(context.reporter, device.Meter().Phases());
     if (equal)
-        context.reporter.Result(EqualText(all.image, images.image, chosen.ranges));
+        context.reporter.Result(EqualText(all.image, images.image, chosen.ranges) +
+                                ByChecksumText(differences.byChecksum));
     else
         FailAsDifferent(outcome, differences, images, "");
     return outcome;
@@ -71,7 +74,8 @@ CommandRow Verify() {
          RangeOption("Compare only these addresses; default: all of the "
                      "image; may be repeated"),
          {&VerifyOptions::list,
-          {"--list", "", "List every range that differs, not the first ones alone"}}},
+          {"--list", "", "List every range that differs, not the first ones alone"}},
+         CompareOption()},
         RunVerify);
 }
 

@@ -8,6 +8,7 @@
 #include <charconv>
 #include <utility>
 
+#include "base/Crc32.h"
 #include "base/Hex.h"
 #include "host/base/Interrupt.h"
 #include "host/facts/FlashMemory.h"
@@ -215,6 +216,27 @@ std::vector<std::uint8_t> FlashDevice::ReadFlash(const base::AddressRange& range
         return error;
     });
     return bytes;
+}
+
+std::optional<bool> FlashDevice::HoldsByChecksum(std::uint32_t address,
+                                                 std::span<const std::uint8_t> bytes) {
+    if (comparesBytes_ || bytes.empty()) return std::nullopt;
+    std::optional<std::uint32_t> sum;
+    std::string error;
+    Call("summing up flash at " + base::HexText(address), "", [&]() -> const char* {
+        try {
+            host_.NoteRead();
+            sum = loader_.Checksum(address, static_cast<std::uint32_t>(bytes.size()));
+        } catch (const target::TargetError& failure) {
+            error = failure.what();
+        }
+        return error.empty() ? nullptr : error.c_str();
+    });
+    if (!sum) return std::nullopt;
+    const std::string_view text(reinterpret_cast<const char*>(bytes.data()), bytes.size());
+    const bool holds = *sum == base::AddToCrc32(base::kCrc32Begin, text);
+    if (holds) meter_.Advance(bytes.size());
+    return holds;
 }
 
 std::uint32_t FlashDevice::ReadUserRegister(unsigned index) {

@@ -100,6 +100,12 @@ class FlashDevice final : public FlashReader {
 
     /// Reads flash of the halted target, counting the bytes for the running phase.
     std::vector<std::uint8_t> ReadFlash(const base::AddressRange& range) override;
+    std::optional<bool> HoldsByChecksum(std::uint32_t address,
+                                        std::span<const std::uint8_t> bytes) override;
+
+    /// From now on nothing is compared by its checksum.
+    void CompareBytes() { comparesBytes_ = true; }
+
     std::uint32_t ReadUserRegister(unsigned index);
     void Halt() override;
 
@@ -150,7 +156,8 @@ class FlashDevice final : public FlashReader {
     PhaseRecord confirmed_;    ///< the phases as they were when what was read was confirmed last
     std::string doubt_;        ///< why it can't be confirmed any more
     bool identified_ = false;  ///< the device was reached, and its properties are known
-    bool closing_ = false;     ///< after a failure
+    bool comparesBytes_ = false;
+    bool closing_ = false;  ///< after a failure
     bool haltFailed_ = false;
     bool runsAtEnd_ = false;
 };

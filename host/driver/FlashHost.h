@@ -36,6 +36,7 @@ class FlashHost final : public IFlashHost {
 
     /// Whether anything was read that ReadsConfirmed hasn't been called for.
     bool HasUnconfirmedReads() const { return unconfirmedReads_; }
+    void NoteRead() { unconfirmedReads_ = true; }  ///< not by a slot
     void ReadsConfirmed() { unconfirmedReads_ = false; }
 
     /// To be called around each call into the plug-in: what an earlier one left doesn't count for

@@ -3,6 +3,8 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
+#include <span>
 #include <vector>
 
 #include "base/AddressRange.h"
@@ -19,6 +21,11 @@ class FlashReader {
 
     /// The contents of a range in flash.
     virtual std::vector<std::uint8_t> ReadFlash(const base::AddressRange& range) = 0;
+
+    /// Whether flash holds these bytes, by their CRC-32; nothing where that isn't known without
+    /// reading them. Counts them for the running phase when it does.
+    virtual std::optional<bool> HoldsByChecksum(std::uint32_t address,
+                                                std::span<const std::uint8_t> bytes) = 0;
 
   protected:
     ~FlashReader() = default;

@@ -32,13 +32,13 @@ void Add(Differences& differences, std::uint32_t address, std::uint8_t expected,
     if ((expected & ~actual) != 0 && !differences.notErased) differences.notErased = address;
 }
 
-/// Calls `compare` for each piece of a range that was read.
+/// Calls `compare` for each piece of a range.
 template <typename Action>
-void ReadPieces(FlashReader& reader, const base::AddressRange& range, const Action& compare) {
+void ForEachPiece(const base::AddressRange& range, const Action& compare) {
     std::uint64_t rest = range.Size();
     for (std::uint32_t address = range.first; rest > 0;) {
         const auto size = static_cast<std::uint32_t>(std::min<std::uint64_t>(kPieceBytes, rest));
-        compare(address, reader.ReadFlash({address, address + (size - 1)}));
+        compare(base::AddressRange{address, address + (size - 1)});
         rest -= size;
         address += size;
     }
@@ -95,6 +95,10 @@ void Fail(Outcome& outcome, const Differences& differences, const LoadedImages* 
 
 }  // namespace
 
+const char* ComparedBy(const Differences& differences) {
+    return differences.byChecksum ? "crc-32" : "bytes";
+}
+
 void Compare(Differences& differences, std::uint32_t address,
              std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual) {
     for (std::size_t i = 0; i < expected.size(); ++i)
@@ -107,12 +111,14 @@ Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image:
     return Verify(reader, meter, [&](Differences& differences) {
         differences.rangesShown = rangesShown;
         for (const image::Section& section : image.Sections())
-            ReadPieces(reader, {section.address, section.Last()},
-                       [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
-                           const std::span<const std::uint8_t> all = section.bytes;
-                           Compare(differences, address,
-                                   all.subspan(address - section.address, actual.size()), actual);
-                       });
+            ForEachPiece({section.address, section.Last()}, [&](const base::AddressRange& piece) {
+                const std::span<const std::uint8_t> expected =
+                    std::span(section.bytes).subspan(piece.first - section.address, piece.Size());
+                if (reader.HoldsByChecksum(piece.first, expected).value_or(false))
+                    differences.byChecksum = true;
+                else
+                    Compare(differences, piece.first, expected, reader.ReadFlash(piece));
+            });
     });
 }
 
@@ -121,10 +127,10 @@ Differences CompareWithErased(FlashReader& reader, WorkMeter& meter,
     const std::vector<std::uint8_t> erased(kPieceBytes, 0xFF);
     const auto compare = [&](Differences& differences) {
         for (const base::AddressRange& range : ranges)
-            ReadPieces(
-                reader, range, [&](std::uint32_t address, std::span<const std::uint8_t> actual) {
-                    Compare(differences, address, std::span(erased).first(actual.size()), actual);
-                });
+            ForEachPiece(range, [&](const base::AddressRange& piece) {
+                Compare(differences, piece.first, std::span(erased).first(piece.Size()),
+                        reader.ReadFlash(piece));
+            });
     };
     return Verify(reader, meter, compare);
 }

@@ -38,17 +38,24 @@ struct Differences {
     /// The first byte of which a bit that should be 1 is 0: only an erase can mend that.
     std::optional<std::uint32_t> notErased = {};
 
+    /// Some of the bytes weren't read, for their CRC-32 was right.
+    bool byChecksum = false;
+
     std::size_t rangesShown = kRangesShown;  ///< no more of them are kept
 
     bool Empty() const { return byteCount == 0; }
     bool operator==(const Differences&) const = default;
 };
 
+/// "crc-32" or "bytes", for JSON.
+const char* ComparedBy(const Differences& differences);
+
 /// Adds what differs between two runs of bytes at an address to what was found so far, below it.
 void Compare(Differences& differences, std::uint32_t address,
              std::span<const std::uint8_t> expected, std::span<const std::uint8_t> actual);
 
-/// Reads all that the image covers and compares. The target is halted first.
+/// Compares all that the image covers: by its CRC-32 where the target can tell that, and the bytes
+/// where it can't, or where it is another one. The target is halted first.
 Differences CompareWithFlash(FlashReader& reader, WorkMeter& meter, const image::Image& image,
                              std::size_t rangesShown = Differences::kRangesShown);
 

@@ -64,6 +64,7 @@ FlashDevice& DebuggerLoad::Device() {
     if (!device_) {
         settings_ = chosen_;
         device_ = open_(settings_);
+        device_->CompareBytes();  // a server may sum up by a program in the debugger's RAM
     }
     return *device_;
 }

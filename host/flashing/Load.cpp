@@ -44,9 +44,10 @@ LoadPlan PlanOnDevice(FlashDevice& device, const LoadRequest& request, const ima
     RequireErasable(device.Info(), request.erase);
     const FlashGeometry flash = GeometryOf(device.Info());
     const bool look = request.erase.kind == EraseChoice::Kind::Necessary && !request.rewrite;
-    return PlanLoad(request, image,
-                    look ? ReadForPlan(device, device.Meter(), image, flash) : image::Image{},
-                    flash);
+    const FlashNow now = look ? ReadForPlan(device, device.Meter(), image, flash) : FlashNow{};
+    LoadPlan plan = PlanLoad(request, image, now.contents, flash);
+    plan.lookedByChecksum = now.byChecksum;
+    return plan;
 }
 
 LoadResult RunLoad(FlashDevice& device, const LoadPlan& plan, const image::Image& image) {

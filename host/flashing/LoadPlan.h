@@ -36,6 +36,7 @@ struct LoadPlan {
 
     base::AddressSet unchanged = {};   ///< sectors of the image that are left alone
     std::uint64_t unchangedBytes = 0;  ///< of the image, in these sectors
+    bool lookedByChecksum = false;     ///< some are known by their CRC-32 alone
 
     bool ErasesWhole() const { return erase.kind == EraseChoice::Kind::Everything; }
     bool operator==(const LoadPlan&) const = default;

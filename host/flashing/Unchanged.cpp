@@ -4,9 +4,9 @@
 
 #include <algorithm>
 #include <span>
+#include <utility>
 
 #include "host/facts/LoaderMemory.h"
-#include "host/flashing/ReadRanges.h"
 
 namespace host {
 
@@ -145,11 +145,23 @@ base::AddressSet Unchanged(const image::Image& image, const image::Image& flashN
     return WorthLeaving(unchanged, sectors, flash.sectorBytes);
 }
 
-image::Image ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
-                         const FlashGeometry& flash) {
+FlashNow ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                     const FlashGeometry& flash) {
     reader.Halt();
-    if (!HoldsASample(reader, image, flash)) return {};
-    return ReadRanges(reader, meter, Phase::Look, SectorsOf(image, flash));
+    FlashNow now;
+    if (!HoldsASample(reader, image, flash)) return now;
+    const base::AddressSet sectors = SectorsOf(image, flash);
+    meter.Expect(Phase::Look, sectors.Bytes());
+    meter.Begin(Phase::Look);
+    for (const base::AddressRange& range : sectors.Ranges()) {
+        std::vector<std::uint8_t> wanted = ContentsAfterLoad(image, range);
+        const bool holds = reader.HoldsByChecksum(range.first, wanted).value_or(false);
+        now.byChecksum = now.byChecksum || holds;
+        now.contents.Add(range.first, holds ? std::move(wanted) : reader.ReadFlash(range),
+                         "the flash");
+    }
+    meter.End();
+    return now;
 }
 
 }  // namespace host

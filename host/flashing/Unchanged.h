@@ -18,6 +18,12 @@ namespace host {
 std::vector<std::uint8_t> ContentsAfterLoad(const image::Image& image,
                                             const base::AddressRange& range);
 
+/// What is known of the flash before a load.
+struct FlashNow {
+    image::Image contents = {};
+    bool byChecksum = false;  ///< some of it wasn't read, for its CRC-32 was right
+};
+
 /// A few blocks spread over the image that erased flash doesn't hold, as far as there are any.
 std::vector<base::AddressRange> SampleBlocks(const image::Image& image, const FlashGeometry& flash);
 
@@ -34,9 +40,10 @@ image::Image Without(const image::Image& image, const base::AddressSet& addresse
 base::AddressSet Unchanged(const image::Image& image, const image::Image& flashNow,
                            const FlashGeometry& flash);
 
-/// Reads the image's sectors, to see which of them can be left alone. Unless one of the samples
-/// holds the image's bytes, nothing else is read and nothing returned. The target is halted first.
-image::Image ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
-                         const FlashGeometry& flash);
+/// What the image's sectors hold, to see which of them can be left alone. Unless one of the samples
+/// holds the image's bytes, nothing else is read and nothing returned; what has the right CRC-32
+/// isn't read. The target is halted first.
+FlashNow ReadForPlan(FlashReader& reader, WorkMeter& meter, const image::Image& image,
+                     const FlashGeometry& flash);
 
 }  // namespace host

@@ -64,6 +64,11 @@ void LoaderWait::Read(void* buffer, std::size_t count, std::uint32_t address, in
     });
 }
 
+std::optional<std::uint32_t> LoaderWait::Checksum(std::uint32_t address, std::uint32_t sizeBytes) {
+    AwaitIdle();
+    return next_.Checksum(address, sizeBytes);
+}
+
 void LoaderWait::Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
                        std::size_t width) {
     Chunk* chunk = NoteHandOver(buffer, count * width, address);

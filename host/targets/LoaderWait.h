@@ -67,6 +67,8 @@ class LoaderWait final : public target::Target {
     void Write(const void* buffer, std::size_t count, std::uint32_t address, int page,
                std::size_t width) override;
 
+    std::optional<std::uint32_t> Checksum(std::uint32_t address, std::uint32_t sizeBytes) override;
+
     // These await the loader first. LoadProgram leaves 0 in both status words. Halt halts the
     // target even when the loader isn't done, and throws afterwards.
     void LoadProgram(const std::string& fileName, const std::string& directory) override;

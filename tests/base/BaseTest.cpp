@@ -1,4 +1,4 @@
-// Hexadecimal texts and sets of addresses.
+// Hexadecimal texts, checksums and sets of addresses.
 
 #include <gtest/gtest.h>
 
@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "base/AddressSet.h"
+#include "base/Crc32.h"
 #include "base/Hex.h"
 
 namespace base {
@@ -32,6 +33,10 @@ TEST(Hex, NumbersAreReadWhole) {
     };
     for (const auto& [text, expected] : cases)
         EXPECT_EQ(ParseHex32(text), expected) << text;
+}
+
+TEST(Crc32, IsTheOneOfDebuggers) {
+    EXPECT_EQ(AddToCrc32(AddToCrc32(kCrc32Begin, "1234"), "56789"), 0x0376E6E7U);
 }
 
 TEST(AddressSet, JoinsWhatOverlapsOrTouches) {

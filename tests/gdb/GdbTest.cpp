@@ -15,6 +15,7 @@
 #include <thread>
 #include <vector>
 
+#include "base/Crc32.h"
 #include "base/Hex.h"
 #include "target/gdb/client/GdbTarget.h"
 #include "target/gdb/server/Server.h"
@@ -331,6 +332,50 @@ TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
         const std::string result = ResultOf([&] { return target.RequireProgram("", ""), ""; });
         EXPECT_NE(result.find(row.refusal), std::string::npos) << result;
         EXPECT_EQ(result.empty(), *row.refusal == 0) << result;
+    }
+}
+
+// A server that answers anything else for bytes that were just written isn't believed elsewhere.
+TEST(GdbClient, BelievesNoChecksumThatIsNotProved) {
+    const struct {
+        const char* name;
+        const char* payload;  ///< begins so
+        const char* wire;     ///< null: what was answered to it first
+        const char* result;
+    } rows[] = {
+        {"right", "(none)", "", "the bytes' own"},
+        {"unknown", "qCRC", "$#00", "none"},
+        {"always the same", "qCRC", "$Cba2db49c#a8", "none"},
+        {"kept from the first time", "qCRC", nullptr, "none"},
+        {"of RAM, not of flash", "qCRC:0,", "$E01#a6", "none"},
+        {"of RAM, flash garbled", "qCRC:0,", "$Cxyz#ae", "answered \"Cxyz\""},
+    };
+    const std::string image(3000, 'a');
+    for (const auto& row : rows) {
+        auto device = std::make_unique<SimulatedDevice>(ParseDeviceOptions("quen,latency=1ns"));
+        device->Flash().Preset(0, std::vector<std::uint8_t>(image.begin(), image.end()));
+        std::string kept;
+        Peer peer([](const std::string&) { return std::nullopt; },
+                  [&](const std::string& payload, std::string& wire) {
+                      if (!payload.starts_with(row.payload)) return;
+                      if (kept.empty()) kept = row.wire == nullptr ? wire : row.wire;
+                      wire = kept;
+                  },
+                  std::move(device));
+        GdbTarget target(peer.Where(), Quick(), kMailbox, {}, {});
+        std::string ram(0x1000, 'r');
+        target.Write(ram.data(), ram.size(), 0x20001000, 1, 1);
+        const std::string result = ResultOf([&] {
+            const auto crc = target.Checksum(0, 3000);
+            if (!crc) return "none";
+            return *crc == base::AddToCrc32(base::kCrc32Begin, image) ? "the bytes' own" : "wrong";
+        });
+        EXPECT_NE(result.find(row.result), std::string::npos) << row.name << ": " << result;
+        if (!result.starts_with("Summing")) {
+            std::string now(ram.size(), '?');
+            target.Read(now.data(), now.size(), 0x20001000, 1, 1);
+            EXPECT_EQ(now, ram) << row.name;
+        }
     }
 }
 

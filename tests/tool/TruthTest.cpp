@@ -13,6 +13,7 @@
 #include <map>
 #include <nlohmann/json.hpp>
 
+#include "base/Crc32.h"
 #include "host/Tool.h"
 #include "host/targets/SimulatedTarget.h"
 #include "target/simulated/Contents.h"
@@ -404,6 +405,10 @@ test::Peer::Hook LateWrites() {
     };
 }
 
+std::string NewImageChecksum() {
+    return fmt::format("{:x}", base::AddToCrc32(base::kCrc32Begin, test::Contents("new.bin")));
+}
+
 std::vector<LyingServer> LyingServers() {
     const auto none = [](const std::string&) { return std::nullopt; };
     const auto dropWrites = [](std::uint32_t first, std::uint32_t end) {
@@ -453,6 +458,10 @@ std::vector<LyingServer> LyingServers() {
         {"half of each answer to a read", none, CutRead},
         {"flash read once until the target runs", none, CachedReads()},
         {"binary writes answered first and made later", LateWrites(), {}},
+        {"the image's checksum for chunks that aren't written", dropWrites(0x20000000, 0x20001000),
+         [](const std::string& payload, std::string& wire) {
+             if (payload.starts_with("qCRC:")) wire = test::Framed("C" + NewImageChecksum());
+         }},
     };
 }
 

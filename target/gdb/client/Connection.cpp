@@ -49,6 +49,16 @@ std::string Connection::Ask(const std::string& request) {
     return AwaitReply(request, wait);
 }
 
+std::string Connection::Ask(const std::string& request, milliseconds time) {
+    Send(request);
+    Wait wait = Patience(time);
+    while (!packet_) {
+        if (!Step(wait))
+            Lose(fmt::format("sent no reply to \"{}\" {}", Shown(request), Within(time)));
+    }
+    return AwaitReply(request, wait);
+}
+
 std::string Connection::AwaitReply(const std::string& request, Wait& wait) {
     while (!packet_) {
         if (!Step(wait))
@@ -162,9 +172,9 @@ Wait Connection::Patience(milliseconds time) const {
     return {After(time), After(kOutputLimit * time)};
 }
 
-std::string Connection::WithinTimeout() const {
+std::string Connection::Within(milliseconds time) {
     return fmt::format("within {} s; --gdb-option timeout=TIME allows it more",
-                       std::chrono::duration<double>(timeout_).count());
+                       std::chrono::duration<double>(time).count());
 }
 
 void Connection::Lose(const std::string& why) {

@@ -70,6 +70,9 @@ class Connection {
     /// Sends a request and returns its reply.
     std::string Ask(const std::string& request);
 
+    /// The same for one that may take longer.
+    std::string Ask(const std::string& request, std::chrono::milliseconds time);
+
     /// Sends a request that is answered by OK.
     void RequireOk(const std::string& request);
 
@@ -109,7 +112,7 @@ class Connection {
     Wait Patience(std::chrono::milliseconds time) const;
 
     /// "within 5 s; --gdb-option timeout=TIME allows it more".
-    std::string WithinTimeout() const;
+    std::string WithinTimeout() const { return Within(timeout_); }
 
     /// From now on neither side acknowledges packets.
     void StopAcknowledging() { acknowledged_ = false; }
@@ -126,6 +129,7 @@ class Connection {
     std::uint64_t SentCount() const { return sentCount_; }
 
   private:
+    static std::string Within(std::chrono::milliseconds time);
     std::optional<Frame> NextFrame(Deadline& deadline);
     bool FeedBefore(Deadline deadline);
     bool AwaitAck(Wait& wait);

@@ -198,6 +198,7 @@ void GdbTarget::Run() {
     Perform([] { return std::string("Running the target"); },
             [&] {
                 if (started_) throw ProtocolError("isn't asked: the target is running already");
+                checksumProved_ = false;
                 mailboxBytes_.reset();
                 const bool tries = options_.live == GdbOptions::Live::Auto &&
                                    (profile_->triesLive || features_.nonStop);
@@ -230,6 +231,7 @@ void GdbTarget::Reset(bool /*flag*/) {
             // Whatever it did, it doesn't do it any more.
         }
         started_ = false;
+        checksumProved_ = false;
         crash_.clear();
         mailboxBytes_.reset();
         std::string output;

@@ -82,6 +82,10 @@ class GdbTarget final : public Target {
     /// The numbers of the core's registers by name; none when the server doesn't tell them.
     const RegisterNumbers& Registers();
 
+    /// By the server's "qCRC", once it has summed up right what was just written to the loader's
+    /// RAM, twice; what was there is put back.
+    std::optional<std::uint32_t> Checksum(std::uint32_t address, std::uint32_t sizeBytes) override;
+
     void Run() override;
     void Halt() override;
     void Reset(bool flag) override;
@@ -137,6 +141,8 @@ class GdbTarget final : public Target {
     MemoryPort& Memory();
     std::string ReadDocument(const std::string& name);
     unsigned RegisterNumber(const std::string& name, const std::optional<std::uint32_t>& given);
+    std::optional<std::uint32_t> ServerChecksum(std::uint32_t address, std::uint32_t sizeBytes);
+    bool ProveChecksum();
     void WriteRegister(unsigned number, std::uint32_t value);
     void LoadSegments(const std::string& path);
     void StopForAccess();
@@ -163,6 +169,8 @@ class GdbTarget final : public Target {
     std::string crash_;     ///< that ended what Run began; nobody need wait for it
     bool started_ = false;  ///< by Run, and neither halted nor reset since
     bool liveTried_ = false;
+    bool checksumProved_ = false;   ///< since the program was loaded, or the target reset
+    bool checksumRefused_ = false;  ///< by the server, or for a wrong one
 };
 
 }  // namespace target::gdb

@@ -123,6 +123,14 @@ TEST(Comparison, ReadsWhatTheImageCoversPieceByPiece) {
     EXPECT_EQ(CompareWithErased(flash, flash.meter, {{1, 0x100005}}), expected);
     EXPECT_EQ(flash.log, "halt 1-100000 100001-100005 ");
     EXPECT_FALSE(flash.meter.Running());
+    // What has another checksum is read.
+    flash.log.clear();
+    flash.sumsUp = true;
+    Differences bySum = expected;
+    bySum.byChecksum = true;
+    EXPECT_EQ(CompareWithFlash(flash, flash.meter, image), bySum);
+    EXPECT_EQ(flash.log, "halt sum:10 sum:40 40-10003f sum:100040 ");
+    EXPECT_EQ(flash.Progress(Phase::Verify), "3145769 of 0");
 }
 
 TEST(Comparison, SaysWhichFileAndRange) {
@@ -175,11 +183,11 @@ TEST(Unchanged, IsReadOnlyWhenASampleHoldsTheImage) {
     const FlashGeometry geometry{0x4000, 0x400};
     const image::Image image = ImageOf({{0x410, std::vector<std::uint8_t>(0x23F0, 0x11)}});
     test::FakeFlash flash(0x4000, 0xFF);
-    EXPECT_TRUE(ReadForPlan(flash, flash.meter, image, geometry).Empty());
+    EXPECT_TRUE(ReadForPlan(flash, flash.meter, image, geometry).contents.Empty());
     EXPECT_EQ(flash.log, "halt 400-47f 2400-247f ");
     flash.log.clear();
     std::fill_n(flash.bytes.begin() + 0x2400, 0x400, std::uint8_t{0x11});
-    const image::Image now = ReadForPlan(flash, flash.meter, image, geometry);
+    const image::Image now = ReadForPlan(flash, flash.meter, image, geometry).contents;
     EXPECT_EQ(flash.log, "halt 400-47f 2400-247f 400-27ff ");
     EXPECT_EQ(flash.Progress(Phase::Look), "9216 of 9216");
     // What wasn't read counts as different.
@@ -192,6 +200,13 @@ TEST(Unchanged, IsReadOnlyWhenASampleHoldsTheImage) {
     };
     for (const auto& [known, unchanged] : cases)
         EXPECT_EQ(Unchanged(image, known, geometry).Ranges(), unchanged);
+    flash.log.clear();
+    flash.sumsUp = true;
+    std::fill_n(flash.bytes.begin() + 0x410, 0x1FF0, std::uint8_t{0x11});
+    const FlashNow summed = ReadForPlan(flash, flash.meter, image, geometry);
+    EXPECT_TRUE(summed.byChecksum);
+    EXPECT_EQ(Unchanged(image, summed.contents, geometry).Bytes(), 0x2400U);
+    EXPECT_EQ(flash.log, "halt 400-47f sum:400 ");
 }
 
 TEST(Unchanged, IsLeftAloneWhereThatSavesMoreThanALoaderStart) {
