@@ -69,12 +69,19 @@ std::optional<std::uint32_t> GdbTarget::ServerChecksum(std::uint32_t address,
 /// behind the mailbox, where the loader is: servers that sum up on the target use the start of RAM.
 bool GdbTarget::ProveChecksum() {
     const std::uint32_t address = mailbox_.address + mailbox_.sizeBytes;
-    const std::string before = memory_.Read(address, kProofSize);
+    std::string before;
     bool right = true;
-    for (unsigned number = 0; number < 2 && right; ++number) {
-        const std::string bytes = ProofBytes(number);
-        memory_.Write(address, bytes);
-        right = ServerChecksum(address, kProofSize) == base::AddToCrc32(base::kCrc32Begin, bytes);
+    try {
+        before = memory_.Read(address, kProofSize);
+        for (unsigned number = 0; number < 2 && right; ++number) {
+            const std::string bytes = ProofBytes(number);
+            memory_.Write(address, bytes);
+            const std::uint32_t sum = base::AddToCrc32(base::kCrc32Begin, bytes);
+            right = ServerChecksum(address, kProofSize) == sum;
+        }
+    } catch (const ProtocolError&) {
+        if (connection_.IsLost()) throw;
+        right = false;  // no RAM there, so nothing is proved
     }
     memory_.Write(address, before);
     return right;
