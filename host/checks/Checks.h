@@ -26,7 +26,7 @@ enum class Verdict {
 struct Finding {
     const char* name;
     Verdict verdict = Verdict::Passed;
-    std::string text;        ///< what was seen, or what came instead
+    std::string text = {};   ///< what was seen, or what came instead
     std::string means = {};  ///< what that means for a load, unless it has passed
     std::string helps = {};  ///< what to try then
 };

@@ -83,7 +83,7 @@ const FaultyHost kFaultyCores[] = {
         })},
     {"is left halted, ready for LoadProgram; came the error text \"the target runs\"",
      [](H& host) {
-         static bool runs = false;
+         [[maybe_unused]] static bool runs = false;
          On(&H::reset, [](auto&, auto& reset, bool flag) {
              const char* const error = reset(flag);
              return runs = true, error;

@@ -87,7 +87,7 @@ const FaultyHost kFaultyMemory[] = {
     // Byte by byte, of which the register takes the last.
     {"flash address register at 0x400FD000 as it was written; came 0x00000000 instead",
      Bent([](Transfer& t, auto&) {
-         t.address += t.Writes() && t.address > kRegisters ? 0x1000 : 0;
+         t.address += t.Writes() && t.address > kRegisters ? 0x1000U : 0U;
      })},
     {"expected the flash address register at 0x400FD000 as it was written; came the er",
      Bent(
