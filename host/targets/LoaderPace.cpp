@@ -16,7 +16,7 @@ constexpr int kStepShare = 8;
 
 /// How slowly the lower bound begins to sink: a look in vain now and then is cheaper than to miss
 /// that the flash has become faster.
-constexpr int kSinkingShare = 2048;
+constexpr int kSinkingShare = 1024;
 
 }  // namespace
 

@@ -189,9 +189,14 @@ bool LoaderWait::Look(std::size_t block, const std::function<bool()>& isPending)
     Chunk& chunk = *chunks_[block];
     // A look that finds it pending has let it go on.
     const Time looked = free ? stoppedAt : RanFor();
-    if (!pending || looked <= chunk.begun) return pending;
+    // Where nothing stops it, its begin is a guess, and one that is far too early would have it
+    // slower than it is. It has certainly begun when the one before was seen done.
+    const bool isFarGuess = chunk.start - chunk.begun > pace_.Guess() / 10;
+    const Time begun =
+        isFarGuess && !StopsForReads() && chunk.number == 1 ? chunk.start : chunk.begun;
+    if (!pending || looked <= begun) return pending;
     chunk.atWork = looked;
-    pace_.Pending((chunk.atWork - chunk.begun) / chunk.number);
+    pace_.Pending((chunk.atWork - begun) / chunk.number);
     return true;
 }
 

@@ -163,7 +163,9 @@ void Stream(Fixture& fixture, std::chrono::microseconds chunkTime, int variation
         fixture.board.now.count(), limit.count(), fixture.board.stops, fixture.board.packets);
     EXPECT_LE(fixture.board.now, limit + limit / 8) << all;
     EXPECT_LE(fixture.board.stops, fixture.board.stopsForReads ? kChunks * 55 / 100 : 0) << all;
-    EXPECT_LE(fixture.board.packets, kChunks * 365 / 100) << all;
+    // A look at a flash that works on meanwhile costs no time.
+    EXPECT_LE(fixture.board.packets, kChunks * (fixture.board.stopsForReads ? 365 : 405) / 100)
+        << all;
 }
 
 TEST(LoaderWait, LosesLittleAndStopsSeldom) {
