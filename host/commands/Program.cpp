@@ -22,7 +22,12 @@ namespace host::commands {
 
 namespace {
 
-struct ProgramOptions : ImageFiles, Comparing, ComparisonKind, Running, DryRun, RegisterOptionsOfLoad {
+struct ProgramOptions : ImageFiles,
+                        Comparing,
+                        ComparisonKind,
+                        Running,
+                        DryRun,
+                        RegisterOptionsOfLoad {
     std::optional<std::string> erase;
     bool keep = false;
     bool blankCheck = false;
