@@ -75,7 +75,7 @@ std::string CheckPackets(CheckSubject& subject) {
     if (!server) throw CheckNotMade("there is no server: the target is simulated in the tool");
     const std::size_t room = server->packetBytes / (server->binaryWrites ? 1 : 2);
     const std::size_t packets = (plugin::kChunkBytes + room - 1) / room;
-    const std::string text =
+    std::string text =
         fmt::format("{} bytes, written {}: about {} for a chunk of 2 KiB", server->packetBytes,
                     server->binaryWrites ? "as they are" : "in hexadecimal digits",
                     packets == 1 ? "1 packet" : fmt::format("{} packets", packets));

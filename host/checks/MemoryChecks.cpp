@@ -88,6 +88,7 @@ Spread SpreadOf(std::vector<double> values) {
 Spread RatesOf(const std::vector<double>& seconds) {
     constexpr double kShortest = 1e-9;
     std::vector<double> rates;
+    rates.reserve(seconds.size());
     for (const double one : seconds)
         rates.push_back(plugin::kChunkBytes / std::max(one, kShortest));
     return SpreadOf(rates);
@@ -126,7 +127,7 @@ std::string CheckDelay(CheckSubject& subject) {
         subject.Target().Read(&word, 1, plugin::kLoaderBuffers, plugin::kRamPage, sizeof word);
     }));
     subject.speed.delaySeconds = delay;
-    const std::string text = Shown(delay, 1e-3, "ms an access (least, middle, most)");
+    std::string text = Shown(delay, 1e-3, "ms an access (least, middle, most)");
     constexpr double kSlowSeconds = 0.05;
     if (delay.median > kSlowSeconds) throw CheckNoted(text);
     return text;

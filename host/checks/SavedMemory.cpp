@@ -2,6 +2,8 @@
 
 #include "host/checks/SavedMemory.h"
 
+#include <utility>
+
 #include <fmt/format.h>
 
 #include "host/base/Text.h"
@@ -19,8 +21,8 @@ std::vector<std::uint8_t> ReadRange(target::Target& target, const base::AddressR
 
 }  // namespace
 
-SavedMemory::SavedMemory(target::Target& target, const base::AddressSet& ranges)
-    : target_(target), ranges_(ranges) {
+SavedMemory::SavedMemory(target::Target& target, base::AddressSet ranges)
+    : target_(target), ranges_(std::move(ranges)) {
     for (const base::AddressRange& range : ranges_.Ranges())
         contents_.push_back(ReadRange(target_, range));
 }

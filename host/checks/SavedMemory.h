@@ -13,7 +13,7 @@ namespace host {
 class SavedMemory {
   public:
     /// Reads the ranges; nothing was written when that fails. TargetError.
-    SavedMemory(target::Target& target, const base::AddressSet& ranges);
+    SavedMemory(target::Target& target, base::AddressSet ranges);
 
     /// Writes back what was read, and looks whether it is there. TargetError.
     void PutBack() const;
