@@ -2,9 +2,9 @@
 
 #include "host/checks/SavedMemory.h"
 
-#include <utility>
-
 #include <fmt/format.h>
+
+#include <utility>
 
 #include "host/base/Text.h"
 #include "host/facts/FlashMemory.h"

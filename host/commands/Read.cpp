@@ -49,11 +49,11 @@ bool WantsDump(const std::string& path, image::Format format) {
 /// What was read up to the last byte that isn't blank. Failure (ContentsDiffer) when all of it is.
 image::Image WithoutBlankEnd(const image::Image& image) {
     image::Image trimmed;
-    for (auto section = image.Sections().rbegin(); section != image.Sections().rend(); ++section) {
-        std::vector<std::uint8_t> bytes = section->bytes;
+    for (std::size_t i = image.Sections().size(); i-- > 0;) {
+        std::vector<std::uint8_t> bytes = image.Sections()[i].bytes;
         while (trimmed.Empty() && !bytes.empty() && bytes.back() == 0xFF)
             bytes.pop_back();
-        trimmed.Add(section->address, std::move(bytes), "the flash");
+        trimmed.Add(image.Sections()[i].address, std::move(bytes), "the flash");
     }
     if (trimmed.Empty())
         throw Failure(ExitStatus::ContentsDiffer,
