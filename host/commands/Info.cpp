@@ -33,7 +33,7 @@ Outcome ShowInfo(Context& context, FlashDevice& device) {
     reporter.Result("Flash       " + flash);
     reporter.Result("Sector      " + SizeText(info.sectorBytes));
     reporter.Result("RAM         " + SizeText(info.ramBytes));
-    reporter.Result("Operations  " + OnThisScreen(info.operations));
+    reporter.Document("Operations  " + OnThisScreen(info.operations));
     reporter.Result("Plug-in     " + device.LibraryPath());
     return {.result = {{"family", info.family},
                        {"identification", info.identification},
