@@ -59,6 +59,7 @@ std::string CheckPackets(CheckSubject& subject);
 std::string CheckMemory(CheckSubject& subject);
 std::string CheckDelay(CheckSubject& subject);
 std::string CheckRate(CheckSubject& subject);
+std::string CheckChecksum(CheckSubject& subject);
 
 // LoaderChecks.cpp: the file, a reset, a run, and that all is as it was.
 std::string CheckLoader(CheckSubject& subject);

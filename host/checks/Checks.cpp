@@ -57,6 +57,8 @@ constexpr CheckRow kChecks[] = {
     {"delay", "each exchange with the target costs so much, and a chunk takes several",
      "a nearer server, or a shorter latency timer of the probe's driver", CheckDelay},
     {"rate", "how long an image takes isn't known", "see above", CheckRate},
+    {"checksum", "a comparison takes as long as reading, or tells what isn't so",
+     "a server that has qCRC; --compare bytes", CheckChecksum},
     {"reset", "a load would begin with a target in whatever state it is",
      "--gdb-option reset=COMMAND, a monitor command that resets and halts it, or reset=packet:vRun",
      CheckReset},

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <chrono>
 
+#include "base/Crc32.h"
 #include "base/Hex.h"
 #include "host/base/Errors.h"
 #include "host/base/Interrupt.h"
@@ -147,6 +148,20 @@ std::string CheckRate(CheckSubject& subject) {
     return fmt::format("reading {}, writing {} (least, middle, most)",
                        Shown(*subject.speed.readBytesPerSecond, 1e3, "kB/s"),
                        Shown(*subject.speed.writeBytesPerSecond, 1e3, "kB/s"));
+}
+
+std::string CheckChecksum(CheckSubject& subject) {
+    if (!subject.opened.Server())
+        throw CheckNotMade("there is no server: the target is simulated in the tool");
+    const auto told = subject.Target().Checksum(plugin::kLoaderBuffers, plugin::kChunkBytes);
+    if (!told) throw CheckNoted("the server has no qCRC, or one that sums up wrongly");
+    std::string bytes(plugin::kChunkBytes, '\0');
+    subject.Target().Read(bytes.data(), bytes.size(), plugin::kLoaderBuffers, plugin::kRamPage, 1);
+    const std::uint32_t sum = base::AddToCrc32(base::kCrc32Begin, bytes);
+    if (*told != sum)
+        throw CheckFailed(
+            fmt::format("qCRC gives {:#010x} for bytes that sum up to {:#010x}", *told, sum));
+    return "qCRC gives the sum of the bytes that are read";
 }
 
 }  // namespace host
