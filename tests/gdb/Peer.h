@@ -58,8 +58,8 @@ class Peer {
               *device_, [](const std::string&) {}, [] {}),
           hook_(std::move(hook)),
           bend_(std::move(bend)),
-          listener_(Socket::Listen(Address::Parse(":0"), [this] { return done_.load(); })),
-          address_(Address::Parse(std::to_string(listener_.Port()))),
+          listener_(Socket::Listen(Address::Parse("127.0.0.1:0"), [this] { return done_.load(); })),
+          address_(Address::Parse("127.0.0.1:" + std::to_string(listener_.Port()))),
           thread_([this] { Serve(); }) {}
     ~Peer() {
         done_ = true;

@@ -72,10 +72,10 @@ says mi '^+download,{section=".data"' '^^done,address="0x'
 # By LLDB, which writes RAM before it says that the flash is done.
 timeout 60 lldb -x -b -o "gdb-remote 127.0.0.1:$port" -o 'register write r7 0x1234567' \
     -o 'target modules load --file image.elf --load --slide 0' -o 'register read r7' \
-    -o 'memory read --force -b --outfile held.bin 0x20000ff1 0x20001baa' \
+    -o 'memory read --force -b --outfile held.bin 0x20000ff0 0x20001baa' \
     -o 'process plugin packet monitor corvane' -o detach image.elf >lldb 2>&1 || { cat lldb; exit 1; }
 says lldb 'r7 = 0x01234567' 'compared: 11[01].[0-9] KiB in 112 sectors' detached
-cmp small.bin held.bin
+tail -c +2 held.bin | cmp small.bin -  # newer ones make each address even
 if grep -v '^Board at ' probe.refused; then exit 1; fi
 
 # The other one is told; the next one is served when one has gone, in the middle of a load even. What
