@@ -83,8 +83,7 @@ std::string UselessOption(const FollowedLine& line) {
     const bool served = line.command->needs == Needs::ServedTarget;
     for (const GivenOption& given : line.given) {
         const std::string name = given.row->LongName();
-        const bool used =
-            served && name == "--plugin" && (line.Has("--gdb") || line.Has("--board"));
+        const bool used = served && (line.Has("--gdb") || line.Has("--board"));
         if (given.row->isForPlugin && !used)
             return fmt::format("{}: '{}' does nothing with it; leave it out", name, line.name);
     }

@@ -21,7 +21,7 @@ struct Outcome;
 enum class Needs {
     Nothing,
     Settings,
-    ServedTarget,  ///< simulated, or behind a GDB server that was typed; without a trace
+    ServedTarget,  ///< simulated, or behind a GDB server that was typed
     Device,
 };
 

@@ -420,7 +420,7 @@ TEST(GdbClient, ReportsAFailureOfAnyRequest) {
                 const bool optional = IsOptional(failed) && !forGood;
                 EXPECT_TRUE(result == "done"
                                 ? optional
-                                : result.find("GDB server at localhost:") != result.npos)
+                                : result.find("GDB server at 127.0.0.1:") != result.npos)
                     << failing << " " << failed << " -> " << wire << ": " << result;
                 EXPECT_LT(std::chrono::steady_clock::now() - start, 10s);
             }

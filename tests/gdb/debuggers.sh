@@ -93,11 +93,14 @@ expect 2 'give one of them' serve 0 --gdb ":$board" --sim quen
 serve nobody --gdb :1
 timeout 60 gdb-multiarch -nx -batch -ex "target remote :$port" >gdb 2>&1 || true
 says nobody.refused 'refused; is it running'
-says gdb 'E.can.t connect to the GDB server at localhost:1'
+says gdb 'can.t connect to the GDB server at localhost:1'
 
 # On QEMU, where loader and firmware run: the example's loader programs, and the debugger then has its
 # breakpoints, steps and Ctrl-C.
-ARM_CC='clang --target=arm-none-eabi -fuse-ld=lld' sh "$firmware/../loader/build.sh" "$work/toy.out"
+# Newer ones don't let a debugger put PRIMASK back, so that this loader leaves it alone.
+cp -r "$firmware/../loader" toy
+sed -i '/cpsid i/d' toy/startup.c
+ARM_CC='clang --target=arm-none-eabi -fuse-ld=lld' sh toy/build.sh "$work/toy.out"
 board=$((20000 + RANDOM % 10000))
 timeout 200 qemu-system-arm -M mps2-an385 -S -display none -serial none -monitor none \
     -gdb "tcp:127.0.0.1:$board" >qemu 2>&1 &

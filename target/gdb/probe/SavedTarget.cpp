@@ -71,25 +71,28 @@ std::map<unsigned, std::string> SavedTarget::ReadRegisters() {
     return values;
 }
 
-/// Whether all were as they should be already. Some are others under a second name.
-bool SavedTarget::WriteRegisters() {
-    bool same = true;
+/// Returns the number of one that wasn't yet as it should be. Some are others under a second name.
+std::optional<unsigned> SavedTarget::WriteRegisters() {
+    std::optional<unsigned> written;
     const auto now = ReadRegisters();
     for (const auto& [number, value] : registers_) {
         const auto found = now.find(number);
         if (found != now.end() && found->second == value) continue;
-        same = false;
+        written = number;
         probe_.Wire().Agrees(number == kAllRegisters ? "G" + value
                                                      : fmt::format("P{:x}={}", number, value));
     }
-    return same;
+    return written;
 }
 
 void SavedTarget::PutBack() try {
     for (const Block& block : memory_)
         probe_.Write(block.bytes.data(), block.bytes.size(), block.address, 0, 1);
-    if (!WriteRegisters() && !WriteRegisters() && !WriteRegisters())
-        throw ProtocolError("doesn't take all of the registers");
+    constexpr int kTimes = 3;
+    std::optional<unsigned> written = WriteRegisters();
+    for (int i = 1; written && i < kTimes; ++i)
+        written = WriteRegisters();
+    if (written) throw ProtocolError(fmt::format("doesn't take register {}", *written));
     for (const auto& [key, request] : requests_.breakpoints)
         probe_.Wire().RequireOk(request);
     for (const auto& [what, request] : requests_.threads)

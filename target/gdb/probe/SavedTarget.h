@@ -49,7 +49,7 @@ class SavedTarget {
 
     void Take(const std::vector<base::AddressRange>& memory);
     std::map<unsigned, std::string> ReadRegisters();
-    bool WriteRegisters();
+    std::optional<unsigned> WriteRegisters();
 
     GdbTarget& probe_;
     const DebuggerRequests requests_;
