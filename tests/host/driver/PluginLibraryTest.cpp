@@ -34,7 +34,7 @@ TEST(PluginLibrary, IsRefusedWithTheReason) {
         {OSTREL_LOGGER_LIBRARY, " is no flash plug-in: it exports no CreateFlashDevice2"},
     };
     for (const auto& [file, reason] : cases) {
-        const std::string failure = test::FailureOf([&file = file] { PluginLibrary{file}; });
+        const std::string failure = test::FailureOf([&path = file] { PluginLibrary{path}; });
         EXPECT_TRUE(failure.starts_with("4: ")) << failure;
         EXPECT_NE(failure.find(reason), std::string::npos) << failure;
         EXPECT_NE(failure.find(file), std::string::npos) << failure;

@@ -164,7 +164,7 @@ TEST(FilesInUse, AreFoundUnderAnyName) {
     };
     for (const auto& [name, what] : cases) {
         const std::string failure =
-            FailureOf([&, name = name] { files.RequireOther(directory.File(name), "the trace"); });
+            FailureOf([&, it = name] { files.RequireOther(directory.File(it), "the trace"); });
         EXPECT_EQ(failure.substr(0, failure.rfind(',')),
                   *what == '\0' ? ""
                                 : "2: the trace can't be written to " + directory.File(name) +
