@@ -27,7 +27,7 @@ class Completer {
             return line_.MayNameCommand() ? CommandWords(line_.name) : Completions();
         const Completions arguments = AtArgument(cursor);
         const bool none = arguments.words.empty() && !arguments.filesBehind;
-        return none ? OptionWords(line_.command->options) : arguments;
+        return none && !line_.optionsEnded ? OptionWords(line_.command->options) : arguments;
     }
 
   private:
