@@ -18,6 +18,7 @@
 #include "base/Crc32.h"
 #include "base/Hex.h"
 #include "target/gdb/client/GdbTarget.h"
+#include "target/gdb/client/RegisterNumbers.h"
 #include "target/gdb/server/Server.h"
 #include "target/gdb/wire/Frame.h"
 #include "tests/gdb/Peer.h"
@@ -212,6 +213,52 @@ TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
 
 /// The session's answer, and more behind it. A program of ours that runs is never taken for
 /// crashed.
+std::string NumbersIn(const std::string& document) try {
+    std::string text;
+    for (const auto& [name, number] : ReadRegisterNumbers([&](const std::string& asked) {
+             return asked == "target.xml" ? document : "<f><reg name='in-" + asked + "'/></f>";
+         }))
+        text += name + "=" + std::to_string(number) + " ";
+    return text;
+} catch (const DescriptionError& error) {
+    return error.what();
+}
+
+TEST(GdbClient, ReadsTargetDescriptions) {
+    std::string deep;
+    for (int i = 0; i < 100000; ++i)
+        deep += "<a>";
+    const struct {
+        std::string document;
+        std::string found;
+    } cases[] = {
+        {"<?xml version='1.0'?><!DOCTYPE t [<!ELEMENT t (\"]>\")>]><t\n a = '>' ><!-- <reg> -->"
+         "<![CDATA[</t>]]>text<reg name='SP' regnum='13'/><reg name=\"pc\"></reg ></t>",
+         "pc=14 sp=13 "},
+        {"<t><reg name='a'/><xi:include href='x'/><reg name='b' regnum='0x1F'/></t>",
+         "a=0 b=31 in-x=1 "},
+        {"<reg name='x' regnum='1x'/>", "the target description numbers a register '1x'"},
+        {"",
+         "the target description's document target.xml is no XML: an element expected in line "
+         "1"},
+        {"<t>\n<reg name='a'>\n</t>", "no XML: </reg> expected in line 3"},
+        {"<t/></t>", "no XML: no end tag expected"},
+        {"<t", "no XML: > expected"},
+        {"<t a>", "no XML: = expected"},
+        {"<t a=1>", "no XML: a value in quotes expected"},
+        {"<t a='1'b='2'>", "no XML: > expected"},
+        {"<t a='1>", "no XML: ' expected"},
+        {"< t/>", "no XML: a name expected"},
+        {"<!- t>", "no XML: a name expected"},
+        {"<t/><!-- ->", "no XML: --> expected"},
+        {"<t/><!DOCTYPE [>", "no XML: > expected"},
+        {deep, "no XML: </a> expected"},
+    };
+    for (const auto& [document, found] : cases)
+        EXPECT_NE(NumbersIn(document).find(found), std::string::npos)
+            << document.substr(0, 99) << ": " << NumbersIn(document);
+}
+
 TEST(GdbClient, TakesNoStopFromBeforeForACrash) {
     const struct {
         const char* payload;  ///< begins so

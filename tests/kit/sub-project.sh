@@ -17,7 +17,7 @@ target_link_libraries(host PRIVATE FlashCorvane::headers \${CMAKE_DL_LIBS})
 add_dependencies(host FlashCorvane::flash_corvane)
 END
 arguments=()
-for package in CLI11 fmt nlohmann_json pugixml tomlplusplus ZLIB PkgConfig Threads GTest; do
+for package in CLI11 fmt nlohmann_json tomlplusplus ZLIB PkgConfig Threads GTest; do
     arguments+=("-DCMAKE_DISABLE_FIND_PACKAGE_$package=ON")
 done
 cmake --no-warn-unused-cli -G Ninja -S "$trial" -B "$trial/build" "${arguments[@]}" >/dev/null
