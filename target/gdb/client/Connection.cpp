@@ -17,6 +17,9 @@ using std::chrono::milliseconds;
 // than so many times the time that a reply may take.
 constexpr int kOutputLimit = 12;
 
+// For a server that is busy, or keeps a connection open whose other side is closed.
+constexpr milliseconds kToRead(1000);
+
 // As much of a command's output as anybody reads.
 constexpr std::size_t kOutputMax = std::size_t{64} << 10;
 
@@ -175,6 +178,20 @@ Wait Connection::Patience(milliseconds time) const {
 std::string Connection::Within(milliseconds time) {
     return fmt::format("within {} s; --gdb-option timeout=TIME allows it more",
                        std::chrono::duration<double>(time).count());
+}
+
+// Closed at once, with something of the server's unread, the connection would break for a server
+// that is busy, and the last request with it.
+void Connection::Close() {
+    try {
+        socket_.EndWriting();
+        const Deadline end = socket_.Until(After(kToRead));
+        while (std::chrono::steady_clock::now() < end && !socket_.Read(end).empty()) {
+        }
+    } catch (const SocketError&) {
+        // It has read all, and closed its side.
+    }
+    socket_.Close();
 }
 
 void Connection::Lose(const std::string& why) {

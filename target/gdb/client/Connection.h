@@ -123,7 +123,9 @@ class Connection {
 
     bool IsLost() const { return !lost_.empty(); }
     std::chrono::milliseconds Timeout() const { return timeout_; }
-    void Close() { socket_.Close(); }
+
+    /// Nothing more is asked. Waits a little for the server to have read what was.
+    void Close();
 
     /// How many packets went to the server, interrupts included.
     std::uint64_t SentCount() const { return sentCount_; }

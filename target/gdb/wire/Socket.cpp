@@ -146,6 +146,10 @@ void Socket::Close() {
     if (IsOpen()) close(std::exchange(descriptor_, -1));
 }
 
+void Socket::EndWriting() const {
+    shutdown(descriptor_, SHUT_WR);
+}
+
 Socket Socket::Connect(const Address& address, Deadline deadline,
                        const InterruptCheck& interrupted) {
     const AddressList list = LookUpBefore(deadline, address, interrupted);

@@ -69,6 +69,9 @@ class Socket {
     bool IsOpen() const { return descriptor_ >= 0; }
     void Close();
 
+    /// The peer reads what was written, and then that there is no more.
+    void EndWriting() const;
+
     /// What has arrived, as soon as anything has; an empty text when nothing came before the
     /// deadline. SocketError when the connection is closed or broken.
     std::string Read(Deadline deadline);
