@@ -3,18 +3,13 @@
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
-#include <sys/socket.h>
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
-#include <numeric>
 
 #include "base/Hex.h"
-#include "host/driver/FlashDevice.h"
-#include "host/flashing/DebuggerLoad.h"
-#include "host/targets/GdbServerTarget.h"
-#include "target/gdb/probe/ProbeSession.h"
-#include "tests/gdb/Peer.h"
+#include "tests/gdb/Debugger.h"
 #include "tests/support/VirtualTime.h"
 
 namespace {
@@ -22,6 +17,7 @@ namespace {
 using namespace target;
 using namespace target::gdb;
 using namespace std::chrono_literals;
+using test::Debugger;
 using test::Peer;
 
 constexpr std::uint32_t kFlashBytes = 0x10000;
@@ -47,70 +43,6 @@ std::unique_ptr<SimulatedDevice> Device() {
     return device;
 }
 
-/// The debugger's end, the session, and what lies behind it.
-class Debugger {
-  public:
-    explicit Debugger(Peer& peer)
-        : reporter_({host::Verbosity::Quiet, false, "none"}),
-          open_([this](GdbTarget& probe) { return FlashOf(probe); }),
-          complain_([this](const std::string& text) { complaints += text + "\n"; }) {
-        host::TargetOptions options;
-        options.gdb = "127.0.0.1:" + peer.Where().port;  // a look-up of a name takes real time
-        options.loader = test::LoaderFile();
-        options.gdbOptions = {"timeout=1s"};
-        probe_ = host::ProbeConnector(options, {}).Connect();
-        int ends[2];
-        EXPECT_EQ(socketpair(AF_UNIX, SOCK_STREAM, 0, ends), 0);
-        own_ = Socket(ends[0], {});
-        client_.emplace(Reception::Client{Socket(ends[1], {}), ""});
-        client_->StopAcknowledging();
-        session_.emplace(*client_, *probe_, open_, complain_);
-    }
-
-    /// The answer; none when the connection ends, or nothing comes.
-    std::optional<std::string> Ask(const std::string& request) try {
-        own_.Write(Framed(Escaped(request)), After(1s));
-        client_->Read();
-        for (const Deadline end = After(3s); std::chrono::steady_clock::now() < end;) {
-            while (const auto frame = client_->Next())
-                session_->Take(*frame);
-            probe_->Wire().TakeArrived();
-            decoder_.Feed(own_.Read(After(20ms)));
-            while (const auto frame = decoder_.Next())
-                if (frame->kind == Frame::Kind::Packet && !frame->payload.starts_with("O4"))
-                    return frame->payload;
-        }
-        return std::nullopt;
-    } catch (const std::runtime_error&) {
-        return std::nullopt;
-    }
-
-    void Leave() { session_->Leave(); }
-
-    std::string complaints;
-
-  private:
-    std::unique_ptr<FlashProgrammer> FlashOf(GdbTarget& probe) {
-        return std::make_unique<host::DebuggerLoad>(
-            [this, &probe](host::SettingStore& settings) {
-                return std::make_unique<host::FlashDevice>(
-                    std::make_unique<host::GdbServerTarget>(probe),
-                    host::DeviceOptions{{}, FLASH_CORVANE_LIBRARY}, settings, reporter_);
-            },
-            [&probe] { return host::LoaderMemory(probe, ""); }, settings_);
-    }
-
-    host::SettingStore settings_;
-    host::Reporter reporter_;
-    const OpenFlash open_;
-    const ComplaintSink complain_;
-    std::unique_ptr<GdbTarget> probe_;
-    Socket own_;
-    FrameDecoder decoder_{FrameDecoder::Sender::Server};
-    std::optional<ClientPort> client_;
-    std::optional<ProbeSession> session_;
-};
-
 // Two odd pieces and a gap; a sector that is only erased; RAM written before and in between.
 const std::string kRam = Pattern(64, 7);
 const std::string kLater = Pattern(16, 9);
@@ -135,6 +67,9 @@ const std::vector<std::string> kLoad = {
     "vFlashDone",
 };
 
+constexpr std::size_t kFirstErase = 7;
+constexpr std::size_t kLastRam = 10;
+
 std::string ExpectedFlash() {
     std::string flash(kFlashBytes - 0x800, '\0');
     flash += std::string(0x800, '\xFF');
@@ -152,39 +87,55 @@ struct Told {
     bool Done() const { return answers.back() == "OK"; }
 };
 
-/// Asks for all of it, as `bend` has it, and holds what was told against the device.
-Told CheckLoad(Peer& peer, const std::string& fault, const std::vector<std::string>& load) {
+Told AskAll(Debugger& debugger, const std::vector<std::string>& requests) {
     Told told;
-    const auto start = std::chrono::system_clock::now();
-    std::string complaints;
-    testing::internal::CaptureStderr();
-    {
-        Debugger debugger(peer);
-        for (const std::string& request : load)
-            told.answers.push_back(debugger.Ask(request).value_or("-"));
-        debugger.Leave();
-        complaints = debugger.complaints;
-    }
-    peer.Log();
-    complaints += testing::internal::GetCapturedStderr();
-    EXPECT_LT(std::chrono::system_clock::now() - start, 20s) << fault;
-    if (!told.Done()) return told;
-    const auto flash = peer.Device().FlashContents();
-    EXPECT_TRUE(std::string(flash.begin(), flash.end()) == ExpectedFlash()) << fault << complaints;
-    // RAM and registers of a debugger whose own requests were not all carried out are its own
-    // affair.
-    if (std::ranges::count(told.answers, "OK") < 12) return told;
+    for (const std::string& request : requests)
+        told.answers.push_back(debugger.Ask(request).value_or("-"));
+    return told;
+}
+
+/// What the debugger had on the target before the load.
+void CheckGivenBack(Peer& peer, const std::string& what) {
     std::string ram(kRam.size(), '\0');
     peer.Device().Halt();
     peer.Device().Read(ram.data(), ram.size(), kScratch, 1, 1);
-    EXPECT_EQ(base::ToHex(ram), base::ToHex(ExpectedRam())) << fault << complaints;
-    EXPECT_EQ(peer.Served().Registers().values[5], 0x12345678U) << fault << complaints;
+    EXPECT_EQ(base::ToHex(ram), base::ToHex(ExpectedRam())) << what;
+    EXPECT_EQ(peer.Served().Registers().values[5], 0x12345678U) << what;
+}
+
+void CheckFlash(Peer& peer, const std::string& what) {
+    const auto flash = peer.Device().FlashContents();
+    EXPECT_TRUE(std::string(flash.begin(), flash.end()) == ExpectedFlash()) << what;
+}
+
+/// Asks for all of it and holds what was told against the device.
+Told CheckLoad(Peer& peer, const std::string& fault, const std::vector<std::string>& load,
+               Debugger::Way way = Debugger::Way::Plain) {
+    Told told;
+    const auto start = std::chrono::system_clock::now();
+    std::string what = fault;
+    testing::internal::CaptureStderr();
+    {
+        Debugger debugger(peer, way);
+        told = AskAll(debugger, load);
+        debugger.Leave();
+        what += debugger.complaints;
+    }
+    peer.Log();
+    what += testing::internal::GetCapturedStderr();
+    EXPECT_LT(std::chrono::system_clock::now() - start, 20s) << fault;
+    if (!told.Done()) return told;
+    CheckFlash(peer, what);
+    // RAM and registers of a debugger whose own requests were not all carried out are its own
+    // affair.
+    if (std::ranges::count(told.answers, "OK") >= 12) CheckGivenBack(peer, what);
     return told;
 }
 
 const std::optional<std::string> kAsItIs;
 
 TEST(AddedFlash, IsLoadedAndNothingElseChanges) {
+    const test::Patience patience;
     Peer peer([](const std::string&) { return kAsItIs; }, {}, Device());
     const Told told = CheckLoad(peer, "no fault", kLoad);
     std::string answers;
@@ -200,6 +151,7 @@ TEST(AddedFlash, IsLoadedAndNothingElseChanges) {
 // Each line: requests of a session of its own, and the answers. Nothing is touched by what is
 // refused.
 TEST(AddedFlash, RefusesWhatItCanNotDo) {
+    const test::Patience patience;
     const struct {
         std::vector<std::string> requests;
         const char* answers;
@@ -222,10 +174,9 @@ TEST(AddedFlash, RefusesWhatItCanNotDo) {
         std::string complaints;
         {
             Debugger debugger(peer);
-            debugger.Ask("qSupported");
-            debugger.Ask("?");
-            for (const std::string& request : row.requests)
-                answers += debugger.Ask(request).value_or("-") + " ";
+            AskAll(debugger, {"qSupported", "?"});
+            for (const std::string& answer : AskAll(debugger, row.requests).answers)
+                answers += answer + " ";
             debugger.Leave();
             complaints = debugger.complaints;
         }
@@ -238,6 +189,7 @@ TEST(AddedFlash, RefusesWhatItCanNotDo) {
 
 // The debugger's requests, each left out, or sent twice.
 TEST(AddedFlash, TellsTheTruthWhateverTheDebuggerSends) {
+    const test::Patience patience;
     for (std::size_t at = 0; at + 1 < kLoad.size(); ++at) {
         std::vector<std::string> twice = kLoad;
         twice.insert(twice.begin() + static_cast<std::ptrdiff_t>(at), kLoad[at]);
@@ -248,12 +200,64 @@ TEST(AddedFlash, TellsTheTruthWhateverTheDebuggerSends) {
         without.erase(without.begin() + static_cast<std::ptrdiff_t>(at));
         Peer other([](const std::string&) { return kAsItIs; }, {}, Device());
         Debugger debugger(other);
-        bool refused = false;
-        for (const std::string& request : without)
-            refused = refused || debugger.Ask(request).value_or("-") == "E01";
+        const bool refused = std::ranges::count(AskAll(debugger, without).answers, "E01") > 0;
         const bool erase =
             kLoad[at].starts_with("vFlashErase") && kLoad[at] != "vFlashErase:1000,400";
         EXPECT_EQ(refused, erase) << kLoad[at].substr(0, 20);
+    }
+}
+
+// Damaged on the way and sent again; arrived in pieces; the answer damaged, and asked for again.
+TEST(AddedFlash, TakesPacketsThatComeThroughBadly) {
+    const test::Patience patience;
+    using Way = Debugger::Way;
+    for (const Way way : {Way::Damaged, Way::Late, Way::Refused}) {
+        Peer peer([](const std::string&) { return kAsItIs; }, {}, Device());
+        EXPECT_TRUE(CheckLoad(peer, "", kLoad, way).Done()) << static_cast<int>(way);
+        const auto erases = std::ranges::count(peer.Log(), "z0,100,2");
+        EXPECT_EQ(erases, 1) << "a load was done twice";
+    }
+}
+
+// As the debugger's Ctrl-C, or its end, comes with one of the packets to the probe.
+TEST(AddedFlash, CanBeInterruptedAndLeft) {
+    const test::Patience patience;
+    std::size_t packets = 0;
+    for (const bool hangsUp : {false, true}) {
+        int failed = 0;
+        for (std::size_t at = 0; at == 0 || at < packets; at += 3) {
+            std::size_t index = 0;
+            std::atomic<Debugger*> debugger = nullptr;
+            std::atomic<bool> later = false;
+            Peer peer(
+                [&](const std::string&) -> std::optional<std::string> {
+                    if (index++ == at && debugger && !later)
+                        hangsUp ? debugger.load()->HangUp() : debugger.load()->Interrupt();
+                    return std::nullopt;
+                },
+                {}, Device());
+            Debugger own(peer);
+            debugger = &own;
+            const Told first = AskAll(own, kLoad);
+            packets = std::max(packets, index);
+            later = true;
+            const std::string what =
+                fmt::format("{} {}: {}", hangsUp, at, fmt::join(first.answers, "|"));
+            if (first.Done()) CheckFlash(peer, what);
+            if (!first.Done()) ++failed;
+            if (!hangsUp) {
+                EXPECT_TRUE(AskAll(own, kLoad).Done()) << what << own.complaints;
+                CheckFlash(peer, what + own.complaints);
+            }
+            own.Leave();
+            const bool begun = first.answers[kFirstErase] == "OK";
+            if (begun && own.complaints.empty()) CheckFlash(peer, what);
+            peer.Log();
+            if (!hangsUp || first.answers[kLastRam] == "OK")
+                CheckGivenBack(peer, what + own.complaints);
+            if (HasFailure()) return;
+        }
+        EXPECT_GT(failed, 15);
     }
 }
 

@@ -78,7 +78,9 @@ class Peer {
 
   private:
     void Serve() try {
-        Socket client = listener_.Accept(After(std::chrono::seconds(5)));
+        Socket client;
+        while (!done_ && !client.IsOpen())
+            client = listener_.Accept(After(std::chrono::seconds(1)));
         Session session(served_, [](const std::string&) {});
         FrameDecoder decoder(FrameDecoder::Sender::Client);
         while (!done_ && client.IsOpen()) {

@@ -17,11 +17,20 @@ constexpr long long LookNs = 1'000'000;
 
 // Another thread of the process answers within this time, or not at all.
 constexpr int kPatienceMs = 5;
+std::atomic<int> patienceMs{kPatienceMs};
 
 }  // namespace
 
 std::chrono::nanoseconds test::VirtualNow() {
     return std::chrono::nanoseconds(nowNs);
+}
+
+test::Patience::Patience() {
+    patienceMs = 1000;
+}
+
+test::Patience::~Patience() {
+    patienceMs = kPatienceMs;
 }
 
 // These stand before the C library's in the look-up order of everything that the process loads.
@@ -54,7 +63,7 @@ __attribute__((visibility("default"))) int clock_nanosleep(clockid_t, int flags,
 }
 
 __attribute__((visibility("default"))) int poll(struct pollfd* files, nfds_t count, int timeoutMs) {
-    const auto wait = std::min(timeoutMs, kPatienceMs);
+    const auto wait = std::min(timeoutMs, patienceMs.load());
     const auto ready = static_cast<int>(syscall(SYS_poll, files, count, wait));
     if (ready == 0) nowNs += timeoutMs * 1'000'000LL;
     return ready;
