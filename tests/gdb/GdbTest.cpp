@@ -22,6 +22,7 @@
 #include "target/gdb/server/Server.h"
 #include "target/gdb/wire/Frame.h"
 #include "tests/gdb/Peer.h"
+#include "tests/support/Cases.h"
 
 namespace {
 
@@ -43,36 +44,10 @@ std::string FramesIn(FrameDecoder& decoder) {
 
 TEST(GdbFrames, AreReadAsTheyStandOnTheWire) {
     using Sender = FrameDecoder::Sender;
-    const struct {
-        Sender sender;
-        const char* wire;
-        const char* frames;
-    } rows[] = {
-        {Sender::Server, "$OK#9a", "packet(OK)"},
-        {Sender::Server, "$#00", "packet()"},
-        {Sender::Server, "$OK#9A$OK#9b", "packet(OK)damage(a packet with a wrong checksum)"},
-        {Sender::Server, "$OK#9", ""},
-        {Sender::Server, "$OK#g0", "damage(a packet with a wrong checksum)"},
-        {Sender::Server, "+-\x03noise+", "ack()nak()interrupt()ack()"},
-        {Sender::Server, "$m4$OK#9a", "packet(OK)"},
-        {Sender::Server, "%Stop:T05#99", "note(Stop:T05)"},
-        {Sender::Server, "%Stop:T05#00$OK#9a$OK#00",
-         "packet(OK)damage(a packet with a wrong checksum)"},
-        {Sender::Server, "$0* #7a", "packet(0000)"},
-        {Sender::Server, "$0*\"0#ac", "packet(0000000)"},
-        {Sender::Client, "$0* #7a", "packet(0* )"},
-        {Sender::Server, "$* #4a", "damage(a packet with a malformed run)"},
-        {Sender::Server, "$0*#5a", "damage(a packet with a malformed run)"},
-        {Sender::Server, "$0*\x1f#79", "damage(a packet with a malformed run)"},
-        {Sender::Client,
-         "$a}\x03"
-         "b#43",
-         "packet(a#b)"},
-    };
-    for (const auto& row : rows) {
-        FrameDecoder whole(row.sender);
-        whole.Feed(row.wire);
-        EXPECT_EQ(FramesIn(whole), row.frames) << row.wire;
+    for (const auto& row : test::ReadTable("gdb/frames.txt", 3)) {
+        FrameDecoder whole(row[0] == "Server" ? Sender::Server : Sender::Client);
+        whole.Feed(test::Unescaped(row[1]));
+        EXPECT_EQ(FramesIn(whole), row[2]) << row[1];
     }
     std::string bytes;
     for (int i = 0; i < 256; ++i)
@@ -126,93 +101,33 @@ std::string ResultOf(const std::function<std::string()>& work) {
     }
 }
 
-// A payload's answer in place of the session's: once, or each time.
-struct Quirk {
-    const char* payload;  ///< begins so
-    const char* wire;
-    const char* result;  ///< a part of the error, or "done"
-    int times = 1;
-};
-
 TEST(GdbClient, BearsWhatServersDoAndReportsTheRest) {
-    const Quirk quirks[] = {
-        // Acknowledgements: refused once, twice, accepted but garbled, lost, garbled reply, late
-        // stop reply.
-        {"qSupported", "-", "done"},
-        {"qSupported", "-", "refused \"qSupported", 2},
-        {"qSupported", "-$PacketSize=10#91", "done"},
-        {"qSupported", "$PacketSize=100#c1", "acknowledged no packet"},
-        {"qSupported", "+$PacketSize=100#16", "sent no reply"},
-        {"qSupported", "", "acknowledged no packet"},
-        {"?", "$T05#b9", "done", 9},
-        // The way in.
-        {"qSupported", "+$#00", "number of the register sp; --gdb-option sp=NUMBER does"},
-        {"qSupported", "+$PacketSize=10#91", "packets of 16 bytes only"},
-        {"qSupported", "+$PacketSize=ffffffffffffffffff#5c",
-         "number of the register sp; --gdb-option sp=NUMBER does"},
-        {"?", "$W00#b7", "no running target (\"W00\")"},
-        {"?", "$S00#b3", "done"},
-        {"?", "$E01#a6", "answered \"E01\" to \"?\""},
-        {"?", "$O41#b4$T05thread:p1.1;#a6", "done"},
-        {"?", "%Some:news#8b$T05#b9", "done"},
-        {"?", "$T05#b9$T05#b9", "done"},
-        // Accesses.
-        {"m20000100", "$E03#a8", "Reading 64 x 1 bytes at 0x20000100: the GDB server at"},
-        {"m20000100", "$00#60", "answered \"00\" to \"m20000100,40\""},
-        {"m20000100", "$00050a0f14#51", "done"},
-        {"m20000100", "$0g#97", "answered \"0g\""},
-        {"m20000100", "$00#61", "sent a packet with a wrong checksum"},
-        {"m20000100", "$0", "sent no reply to \"m20000100,40\" within 0.5 s"},
-        {"m20000100", Peer::kClose, "is gone: it closed the connection"},
-        {"X20000100,0", "$#00", "done"},
-        {"X20000100,4", "$E01#a6", "Writing 64 x 1 bytes at 0x20000100"},
-        // Run control.
-        {"vCont?", "$#00", "done"},
-        {"vCont;c", "$E01#a6", "\"E01\""},
-        {"vCont;c", "$T0b#e6", "stopped by itself: SIGSEGV at pc 0x20002000"},
-        {"vCont;c", "$T05#b9", "stopped by itself: SIGTRAP at pc 0x20002000"},
-        {"vCont;c", "$W00#b7", "has ended"},
-        {"\x03", "$O41#b4$T05#b9", "done"},
-        {"\x03", "$T05#b9$T02#b6", "done"},
-        {"\x03", "$T04#b8", "stopped by itself: SIGILL"},
-        {"\x03", "", "didn't stop the target within"},
-        // The loader.
-        {"qXfer:features", "$#00", "answered \"\" to \"qXfer:features:read:target.xml:0"},
-        {"qXfer:features", "$l<target#2f", "no XML"},
-        {"qXfer:features", "$l<target/>#9c", "register sp; --gdb-option sp=NUMBER"},
-        {"qXfer:features", "$l<target><xi:include href='a'/></target>#f6", "without end", 99},
-        {"qXfer:features", "$m#6d", "sends its document target.xml without end"},
-        {"m20002000", "$fee7fee600000000#4d", "0x20002003 doesn't hold what was written there"},
-        {"P10", "$O48#bb$OK#9a", "done"},
-        {"P10", "$O#4f$OK#9a", "done"},
-        {"P10", "$E.no such register#a8", "answered \"no such register\" to \"P10"},
-        {"P10", "$E01#a6", "answered \"E01\" to \"P10=00000001\""},
-        {"P", "$#00", "Loading the program"},
-        // The monitor.
-        {"qRcmd", "$#00", "takes no monitor commands"},
-        {"qRcmd", "$O41#b4$E01#a6", "answered \"E01\" to the monitor command \"reset halt\": A"},
-        {"qRcmd", "$O41#b4$O42#b5$OK#9a", "done"},
-        {"qRcmd", "$O#4f$T05#b9$OK#9a", "done"},
-        {"qRcmd", "$garbage#c9$OK#9a", "answered \"garbage\" to \"qRcmd"},
-        {"qRcmd", "$41#65$OK#9a", "sent \"OK\" without being asked"},
-        {"qRcmd", "$41#65", "done"},
-        {"qRcmd", "$O41#b4", "sent no reply to \"qRcmd"},
-    };
-    for (const Quirk& quirk : quirks) {
-        SCOPED_TRACE(testing::Message() << testing::PrintToString(quirk.payload) << " -> "
-                                        << testing::PrintToString(quirk.wire));
-        int left = quirk.times;
-        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
-            if (!payload.starts_with(quirk.payload) || left-- <= 0) return std::nullopt;
-            return quirk.wire;
-        });
-        const std::string result = ResultOf([&] { return Work(peer.Where()); });
-        EXPECT_NE(result.find(quirk.result), std::string::npos) << result;
+    for (const auto& row : test::ReadTable("gdb/answers.txt", 5)) {
+        SCOPED_TRACE(row[0] + " -> " + row[1]);
+        const std::string request = test::Unescaped(row[0]);
+        const std::string wire = test::Unescaped(row[1]);
+        const bool behind = wire.starts_with("...");
+        int left = row[4].empty() ? 1 : std::stoi(row[4]);
+        Peer peer(
+            [&](const std::string& payload) -> std::optional<std::string> {
+                if (behind || !payload.starts_with(request) || left-- <= 0) return std::nullopt;
+                return wire;
+            },
+            [&](const std::string& payload, std::string& answer) {
+                if (behind && payload.starts_with(request)) answer += wire.substr(3);
+            },
+            std::make_unique<SimulatedDevice>(ParseDeviceOptions("quen")));
+        GdbOptions options = Quick();
+        if (!row[3].empty()) {
+            options.server = GdbOptions().server;
+            options.device = {0x20000000, 0x10000000, {{0xE000EDF0, 1, 0x20000}}};
+            ParseGdbOption(row[3], options);
+        }
+        const std::string result = ResultOf([&] { return Work(peer.Where(), options); });
+        EXPECT_NE(result.find(row[2]), std::string::npos) << result;
     }
 }
 
-/// The session's answer, and more behind it. A program of ours that runs is never taken for
-/// crashed.
 std::string NumbersIn(const std::string& document) try {
     std::string text;
     for (const auto& [name, number] : ReadRegisterNumbers([&](const std::string& asked) {
@@ -225,57 +140,13 @@ std::string NumbersIn(const std::string& document) try {
 }
 
 TEST(GdbClient, ReadsTargetDescriptions) {
+    for (const auto& row : test::ReadTable("gdb/descriptions.txt", 2))
+        EXPECT_NE(NumbersIn(test::Unescaped(row[0])).find(row[1]), std::string::npos)
+            << row[0] << ": " << NumbersIn(test::Unescaped(row[0]));
     std::string deep;
     for (int i = 0; i < 100000; ++i)
         deep += "<a>";
-    const struct {
-        std::string document;
-        std::string found;
-    } cases[] = {
-        {"<?xml version='1.0'?><!DOCTYPE t [<!ELEMENT t (\"]>\")>]><t\n a = '>' ><!-- <reg> -->"
-         "<![CDATA[</t>]]>text<reg name='SP' regnum='13'/><reg name=\"pc\"></reg ></t>",
-         "pc=14 sp=13 "},
-        {"<t><reg name='a'/><xi:include href='x'/><reg name='b' regnum='0x1F'/></t>",
-         "a=0 b=31 in-x=1 "},
-        {"<reg name='x' regnum='1x'/>", "the target description numbers a register '1x'"},
-        {"",
-         "the target description's document target.xml is no XML: an element expected in line "
-         "1"},
-        {"<t>\n<reg name='a'>\n</t>", "no XML: </reg> expected in line 3"},
-        {"<t/></t>", "no XML: no end tag expected"},
-        {"<t", "no XML: > expected"},
-        {"<t a>", "no XML: = expected"},
-        {"<t a=1>", "no XML: a value in quotes expected"},
-        {"<t a='1'b='2'>", "no XML: > expected"},
-        {"<t a='1>", "no XML: ' expected"},
-        {"< t/>", "no XML: a name expected"},
-        {"<!- t>", "no XML: a name expected"},
-        {"<t/><!-- ->", "no XML: --> expected"},
-        {"<t/><!DOCTYPE [>", "no XML: > expected"},
-        {deep, "no XML: </a> expected"},
-    };
-    for (const auto& [document, found] : cases)
-        EXPECT_NE(NumbersIn(document).find(found), std::string::npos)
-            << document.substr(0, 99) << ": " << NumbersIn(document);
-}
-
-TEST(GdbClient, TakesNoStopFromBeforeForACrash) {
-    const struct {
-        const char* payload;  ///< begins so
-        const char* more;
-    } rows[] = {
-        {"?", "$T05#b9"},    {"P10", "%Stop:T05#99"},         {"vCont;c", "$T05#b9"},
-        {"\x03", "$T02#b6"}, {"\x03", "$T02#b6%Stop:T02#96"},
-    };
-    for (const auto& row : rows) {
-        Peer peer([](const std::string&) { return std::nullopt; },
-                  [&](const std::string& payload, std::string& wire) {
-                      if (payload.starts_with(row.payload)) wire += row.more;
-                  },
-                  std::make_unique<SimulatedDevice>(ParseDeviceOptions("quen")));
-        EXPECT_EQ(ResultOf([&] { return Work(peer.Where()); }), "done")
-            << testing::PrintToString(row.payload) << row.more;
-    }
+    EXPECT_NE(NumbersIn(deep).find("no XML: </a> expected"), std::string::npos);
 }
 
 // What a server in all-stop mode makes of a read while the program runs.
@@ -323,37 +194,6 @@ TEST(GdbClient, AsksASecondServerAboutTheRunningTarget) {
     const std::vector<std::string> asked{"qSupported", "m2000100c,4"};
     EXPECT_EQ(second.Log(), asked);
     EXPECT_NE(ResultOf([&] { return Work(Peer(obeys).Where(), options); }), "done");
-}
-
-// What is refused before anything is touched, and the option that lets it pass.
-TEST(GdbClient, FindsOutWhatServersHide) {
-    const struct {
-        const char* payload;
-        const char* wire;
-        const char* options;
-        const char* result;
-    } rows[] = {
-        {"m10000000", "$00000000#80", "server=pyocd", "hides reads that fail: it answers"},
-        {"m10000000", "$00000000#80", "reads=trusted", "done"},
-        {"me000edf0", "$01000000#81", "server=pyocd", "didn't halt the target: it still runs"},
-        {"me000edf0", "$03000200#85", "server=pyocd", "done"},
-        {"qRcmd,76657273696f6e", "$O426c61636b204d61676963#5c$OK#9a", "timeout=300ms",
-         "(packet:vRun)"},
-        {"vRun;", "$T05#b9", "reset=packet:vRun", "done"},
-        {"R00", "", "reset=packet:R", "done"},
-    };
-    for (const auto& row : rows) {
-        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
-            if (!payload.starts_with(row.payload)) return std::nullopt;
-            return row.wire;
-        });
-        GdbOptions options;
-        options.timeout = 500ms;
-        options.device = {0x20000000, 0x10000000, {{0xE000EDF0, 1, 0x20000}}};
-        ParseGdbOption(row.options, options);
-        const std::string result = ResultOf([&] { return Work(peer.Where(), options); });
-        EXPECT_NE(result.find(row.result), std::string::npos) << row.options << ": " << result;
-    }
 }
 
 TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
@@ -575,44 +415,20 @@ TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
     }
 }
 
-// What clients ask and how they go on, each line with a session of its own; a flash of one sector
-// and an eighth. An interrupt stands as "^C".
 TEST(GdbServer, AnswersByTheProtocol) {
-    const struct {
-        std::vector<std::string> requests;
-        const char* replies;
-        const char* device = "dorna,flash=18K";
-    } rows[] = {
-        {{"?", "vFlashErase:0,8000", "vFlashErase:4000,4000", "vFlashErase:0,4800"},
-         "T05thread:1; OK OK E01 "},
-        {{"vFlashErase:0,c000", "vFlashErase:8000,0", "vFlashErase:8000,4000"}, "E01 E01 E01 "},
-        {{"vFlashErase:0,4000"}, "E01 ", "dorna,erase=never"},
-        {{"vFlashWrite:0:abcd", "vFlashWrite:1:a", "vFlashDone"}, "OK E01 OK "},
-        // A step ends at once; an interrupt between two answers the next resume.
-        {{"s100", "pf", "^C", "c", "^C"}, "T02thread:1; 00010000 T02thread:1; "},
-        {{"s", "^C", "?", "c", "^C"}, "T02thread:1; T05thread:1; T02thread:1; "},
-        {{"^C", "c", "m0,4", "^C"}, "E01 T02thread:1; "},
-        {{"vCont;c:zz", "vCont;C0:1", "vCont;s:p1.-1;c:-1", "vCont;s:1;c:zz", "vCont;"},
-         "E01 E01 T02thread:1; E01 E01 "},
-        {{"Z0,100,2", "z1,100,4;cond", "Z5,100,2", "Z0,x"}, "OK OK E01 E01 "},
-        {{"m0,0", "m20000000,2", "M20000000,2:abcd", "m20000000,2"}, "E01 ffff OK abcd "},
-        {{"qRcmd,68616c74", "qRcmd,7265736574", "c", "^C", "qRcmd,726573756d65"},
-         "OK OK T02thread:1; OK "},
-        {{"qRcmd,726573657420696e6974", "qRcmd,726573657420"}, "OK E01 "},
-    };
-    for (const auto& row : rows) {
-        SimulatedDevice device(ParseDeviceOptions(row.device));
+    for (const auto& row : test::ReadTable("gdb/requests.txt", 3)) {
+        SimulatedDevice device(ParseDeviceOptions(row[2].empty() ? "dorna,flash=18K" : row[2]));
         ServedSimulation served(
             device, [](const std::string&) {}, [] {});
         Session session(served, [](const std::string& text) {
             EXPECT_EQ(text.find("page 1"), text.npos) << text;
         });
         std::string replies;
-        for (const std::string& request : row.requests)
+        for (const std::string& request : test::Split(row[0], "; "))
             for (const std::string& reply :
                  request == "^C" ? session.Interrupt() : session.Answer(request))
-                if (!reply.starts_with('O') || reply == "OK") replies += reply + " ";
-        EXPECT_EQ(replies, row.replies) << row.requests[0];
+                if (!reply.starts_with('O') || reply == "OK") replies += " " + reply;
+        EXPECT_EQ(replies, " " + row[1]) << row[0];
     }
 }
 

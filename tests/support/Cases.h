@@ -32,6 +32,22 @@ inline std::vector<std::string> Split(const std::string& text, const std::string
     return parts;
 }
 
+/// A text in which \n, \r, \t and \xNN stand for such characters.
+inline std::string Unescaped(const std::string& text) {
+    std::string plain;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (text[i] != '\\') {
+            plain += text[i];
+        } else if (text.at(++i) == 'x') {
+            plain += static_cast<char>(std::stoi(text.substr(i + 1, 2), nullptr, 16));
+            i += 2;
+        } else {
+            plain += text[i] == 'n' ? '\n' : text[i] == 'r' ? '\r' : '\t';
+        }
+    }
+    return plain;
+}
+
 /// Rows with columns between " | ": as many as asked for, "" for those that are left out.
 inline std::vector<std::vector<std::string>> ReadTable(const std::string& file,
                                                        std::size_t columns) {
