@@ -4,11 +4,10 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
-#include <new>
 #include <thread>
 
+#include "tests/support/FailingMemory.h"
 #include "tests/support/VirtualTime.h"
 
 namespace test {
@@ -19,11 +18,13 @@ constexpr uint32_t kStatus[] = {0x100C, 0x101C};
 constexpr uint32_t kRomControl = 0x400FE0F0;
 constexpr uint32_t kToDo = 0xFFFFFFFF;
 
+// The library that is loaded takes its memory in this process, too.
 char givenBack[80];
 
 }  // namespace
 
 const char* Dangling(const std::string& text) {
+    onAllocation = [] { std::memset(givenBack, '#', sizeof givenBack - 1); };
     std::snprintf(givenBack, sizeof givenBack, "%s", text.c_str());
     return givenBack;
 }
@@ -214,24 +215,3 @@ std::string CheckedHost::Faults(const Calls& calls) {
 }
 
 }  // namespace test
-
-// The library that is loaded takes its memory here, too. All forms of new whose memory the delete
-// below may get: those of the sanitizers give memory that free() doesn't take back.
-[[gnu::noinline]] void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-    std::memset(test::givenBack, '#', sizeof test::givenBack - 1);
-    return std::malloc(size);
-}
-
-[[gnu::noinline]] void* operator new(std::size_t size) {
-    void* memory = operator new(size, std::nothrow);
-    if (memory == nullptr) throw std::bad_alloc();
-    return memory;
-}
-
-[[gnu::noinline]] void operator delete(void* memory) noexcept {
-    std::free(memory);
-}
-
-[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept {
-    std::free(memory);
-}

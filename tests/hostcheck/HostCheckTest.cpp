@@ -59,54 +59,17 @@ TEST(HostCheck, FindsTheFaultOfEachHostAndNothingInAGoodOne) {
     EXPECT_GT(rules, 60);
 }
 
-/// Texts of settings that the plug-in takes, or that it takes for something else.
-constexpr struct {
-    const char* key;
-    const char* text;
-    bool good;
-} kSettingTexts[] = {
-    {"FlashResetSetting", "+1", true},
-    {"FlashResetSetting", "001", true},
-    {"FlashResetSetting", "true", false},
-    {"FlashProgramCRCOption", "", false},
-    {"FlashTimeoutValue", " 30 s", true},
-    {"FlashTimeoutValue", "0x10", false},
-    {"FlashTimeoutValue", "99999999999", false},
-    {"FlashVerboseMode", "-1", true},
-    {"FlashVerboseMode", "1.0", false},
-    {"FlashEraseStartAddr", " 3ffff", true},
-    {"FlashEraseStartAddr", "0X0003FFFF ", true},
-    {"FlashEraseStartAddr", "", true},
-    {"FlashEraseStartAddr", "0000000000000003ffff", true},
-    {"FlashEraseStartAddr", "+10", true},
-    {"FlashEraseStartAddr", "100000000", false},
-    {"FlashEraseStartAddr", "$3ff", false},
-    {"FlashEraseStartAddr", "0x", false},
-    {"FlashEraseStartAddr", "3ff h", false},
-    {"FlashCrystalFreq", "16 MHz", false},
-    {"FlashCrystalFreq", "0", false},
-    {"FlashCrystalFreq", "", false},
-    {"FlashUserRegister1Commit", "yes", false},
-    {"FlashMACAddrInput", "2-1b-c3-4-5-6", true},
-    {"FlashMACAddrInput", "", true},
-    {"FlashMACAddrInput", "02:1B:c3:04:05:06", true},
-    {"FlashMACAddrInput", "zz-zz-zz-zz-zz-zz", false},
-    {"FlashProgramOption", "Do Not Erase Flash Memory", true},
-    {"FlashProgramOption", "Use the Erase Options Specified Below", true},
-    {"FlashProgramOption", "necessary pages only", false},
-    {"FlashEraseType", "By Address Range", true},
-    {"FlashEraseType", "Entire flash", false},
-};
-
 TEST(HostCheck, JudgesTextsOfSettingsAsThePluginReadsThem) {
-    for (const auto& [key, text, good] : kSettingTexts) {
+    for (const auto& row : ReadTable("hostcheck/setting-texts.txt", 3)) {
         CheckedHost host;
-        host.settings[key] = text;
+        host.settings[row[0]] = row[1];
         const string blamed =
-            "error: GetProperty: expected values that the plug-in can read; came \"" +
-            string(text) + "\" for " + key + ", which takes ";
+            row[2] == "good" ? ""
+                             : "error: GetProperty: expected values that the plug-in can read; "
+                               "came \"" +
+                                   row[1] + "\" for " + row[0] + ", which takes ";
         const string faults = host.Faults();
-        EXPECT_EQ(good ? faults : faults.substr(0, blamed.size()), good ? "" : blamed) << text;
+        EXPECT_EQ(blamed.empty() ? faults : faults.substr(0, blamed.size()), blamed) << row[1];
     }
 }
 
@@ -201,80 +164,45 @@ TEST(HostCheck, StartsNoLoaderOnLeftovers) {
     EXPECT_TRUE(host.Told("Host check, CheckLoader: 8 of 9 hold, 13 not checked"));
 }
 
-/// Calls of a host, and what is said of them.
-constexpr struct {
-    const char* told;
-    const char* calls;
-} kCalls[] = {
-    {"", "perform BlankCheck"},
-    {"",
-     "reset 0; write 100 100; write 65336 200; reset 2; reset 1; reset 4; write 100 100; "
-     "write 65336 200; reset 2"},
-    {"error: WriteDataToFlash: expected ResetSettings(0) before the first section; came none\n",
-     "write 0 1"},
-    {"error: WriteDataToFlash: expected ResetSettings(0) before the first section; came none\n",
-     "reset 2; write 0 1; reset 2"},
-    {"error: WriteDataToFlash: expected ResetSettings(0) before the first section; came none\n",
-     "reset 1; write 0 1"},
-    {"error: ResetSettings: expected 2 after the last section; came 0\n",
-     "reset 0; write 0 1; reset 0; write 200 1; reset 2"},
-    {"error: ResetSettings: expected 2 after the last section; came 1\n",
-     "reset 0; write 0 1; reset 1"},
-    {"error: ResetSettings: expected 2 after the last section; came 3\n",
-     "reset 4; write 0 1; reset 3"},
-    {"error: WriteDataToFlash: expected no section of length 0; came one\n",
-     "reset 0; write-nothing 0 0"},
-    {"error: WriteDataToFlash: expected a section in the 64 KiB of flash that AddressWithinFlash "
-     "tells of; came 2 bytes for 0x0000FFFF\n",
-     "reset 0; write 65535 2"},
-    {"error: WriteDataToFlash: expected a section in the 64 KiB of flash that AddressWithinFlash "
-     "tells of; came 4294967295 bytes for 0x00010000\n",
-     "reset 0; write 65536 4294967295"},
-    {"error: WriteDataToFlash: expected as many bytes to read as length says; came fewer\n",
-     "reset 0; write-nothing 0 1"},
-    {"returned: Address value is too big\n", "write 4294967296 1"},
-    {"returned: Unsupported target data type\n", "write-halfwords 0 1"},
-    {"error: PerformOperation: expected a name from the list; came \"erase\"\n", "perform erase"},
-    {"returned: expected a text for operation; came none\n", "perform-nothing"},
-    {"error: This error is shown, 100 % of it, %s and %d, and the operation has failed.\n",
-     "perform CheckShownError"},
-    {"returned: This error is returned, 100 % of it, %s and %d.\n", "perform CheckReturnedError"},
-    {"returned: expected a pointer for within; came null\n", "within-null"},
-    {"returned: expected a pointer for flashAvailable; came null\n", "initialize-null"},
-};
-
+/// What a call returned; "yes" or "no" where it was asked something.
 const char* Call(IFlashDevice2& device, const string& call) {
     static const unsigned char data[200] = {};
+    static const unsigned char* const none = nullptr;
     std::istringstream words(call);
     string name;
     string operation;
     uint64_t first = 0;
-    uint32_t length = 0;
+    int64_t length = 0;
     words >> name;
     if (name == "perform") return words >> operation, device.PerformOperation(operation.c_str());
     words >> first >> length;
+    bool yes = name == "special";
+    const auto count = static_cast<uint32_t>(length);
+    const auto size = static_cast<int32_t>(length);
     if (name == "reset") return device.ResetSettings(static_cast<int>(first));
-    if (name == "write") return device.WriteDataToFlash(data, first, length, 1);
-    if (name == "write-nothing")
-        return device.WriteDataToFlash(static_cast<const unsigned char*>(nullptr), first, length,
-                                       1);
+    if (name == "write") return device.WriteDataToFlash(data, first, count, 1);
+    if (name == "write-nothing") return device.WriteDataToFlash(none, first, count, 1);
     if (name == "write-halfwords")
-        return device.WriteDataToFlash(static_cast<const uint16_t*>(nullptr), first, length, 1);
+        return device.WriteDataToFlash(static_cast<const uint16_t*>(nullptr), first, count, 1);
     if (name == "perform-nothing") return device.PerformOperation(kNoText);
     if (name == "within-null") return device.AddressWithinFlash(0, nullptr);
-    const char* names = nullptr;
-    return name == "initialize-null" ? device.Initialize(nullptr, &names) : "no such call";
+    const char* error = "no such call";
+    if (name == "initialize-null") error = device.Initialize(nullptr, &error);
+    if (name == "within") error = device.AddressWithinFlash(first, &yes);
+    if (name == "range-within") error = device.AddressWithinFlash(first, size, &yes);
+    if (name == "special") error = device.AddressWithinSpecialRegion(first, &yes);
+    return error != nullptr ? error : yes ? "yes" : "no";
 }
 
 TEST(HostCheck, LooksAtTheCallsOfTheHostToo) {
-    for (const auto& row : kCalls) {
+    for (const auto& row : ReadTable("hostcheck/calls.txt", 2)) {
         const string faults = CheckedHost().Faults([&](IFlashDevice2& device) {
             const char* error = nullptr;
-            for (const string& call : Split(row.calls, "; "))
+            for (const string& call : Split(row[0], "; "))
                 error = Call(device, call);
             return error;
         });
-        EXPECT_EQ(faults, row.told);
+        EXPECT_EQ(faults, row[1].empty() ? "" : row[1] + "\n");
     }
     CheckedHost host;
     const string faults = host.Faults([&](IFlashDevice2& d) {
@@ -286,24 +214,9 @@ TEST(HostCheck, LooksAtTheCallsOfTheHostToo) {
     EXPECT_NE(faults.find("expected no other call before this one has returned"), string::npos);
 }
 
-// A device of 64 KiB, as the plug-in answers for one.
-TEST(HostCheck, TellsWhatIsFlash) {
+TEST(HostCheck, TellsWhatItIsAndPublishesTheDevice) {
     CheckedHost host;
     host.Faults([](IFlashDevice2& d) {
-        bool within = false;
-        for (const auto& [address, expected] : {std::pair{0xFFFFU, true}, {0x10000U, false}}) {
-            EXPECT_EQ(d.AddressWithinFlash(address, &within), nullptr);
-            EXPECT_EQ(within, expected);
-        }
-        for (const auto& [size, expected] : {std::pair{1, true}, {2, false}, {-1, true}}) {
-            d.AddressWithinFlash(0xFFFE, size, &within);
-            EXPECT_EQ(within, expected);
-        }
-        d.AddressWithinFlash(0x10000, -1, &within);
-        EXPECT_FALSE(within);
-        within = true;
-        EXPECT_EQ(d.AddressWithinSpecialRegion(0, &within), nullptr);
-        EXPECT_FALSE(within);
         bool available = false;
         const char* names = "";
         EXPECT_EQ(d.Initialize(&available, &names), nullptr);
@@ -311,9 +224,9 @@ TEST(HostCheck, TellsWhatIsFlash) {
         EXPECT_STREQ(names, "CheckProgress | CheckLoader | CheckShownError | CheckReturnedError");
         return static_cast<const char*>(nullptr);
     });
-    EXPECT_EQ(host.settings["DeviceInfoFlashSize"], "64KB");
-    EXPECT_EQ(host.settings["DeviceInfoFamily"], "Host check");
-    EXPECT_EQ(host.settings["FlashChecksumValue"], "--");
+    EXPECT_EQ(host.settings["DeviceInfoFlashSize"] + host.settings["DeviceInfoFamily"] +
+                  host.settings["FlashChecksumValue"],
+              "64KBHost check--");
 }
 
 }  // namespace
