@@ -9,9 +9,12 @@
 #include <array>
 #include <cstdio>
 #include <cstdlib>
+#include <functional>
 #include <locale>
+#include <map>
 
 #include "logger/ostrel_logger.h"
+#include "tests/support/Cases.h"
 #include "tests/support/FailingMemory.h"
 #include "tests/support/RecordingHost.h"
 
@@ -56,49 +59,20 @@ TEST(Library, IsUnloadedAfterUse) {
     EXPECT_EXIT(loadUseUnload(), testing::ExitedWithCode(0), "");
 }
 
-struct Identified {
-    const char* device;
-    const char* family;
-    const char* flashSize;
-    const char* ramSize;
-    const char* sectorSize;
-};
-
 TEST(Identification, OfEveryClass) {
-    const Identified rows[] = {
-        {"ravik,flash=64K,ram=8K", "Ravik", "64KB", "8KB", "1KB"},
-        {"ravik,id=0x00020000", "Ravik", "64KB", "8KB", "1KB"},
-        {"ravik,id=0x0F0800FF,flash=64K,ram=8K", "Ravik", "64KB", "8KB", "1KB"},
-        {"quen,id=0x7F05FFFF,flash=256K,ram=8K", "Quen", "256KB", "8KB", "1KB"},
-        {"mesk,id=0x0F0301FF,flash=96K,ram=64K", "Mesk Rev.B", "96KB", "64KB", "1KB"},
-        {"tolva,revision=A,flash=256K,ram=64K", "Tolva Rev.A", "256KB", "64KB", "1KB"},
-        {"tolva,revision=B,flash=256K,ram=64K", "Tolva Rev.B", "256KB", "64KB", "1KB"},
-        {"tolva,id=0x00018000,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},
-        {"tolva,id=0x00010200,flash=256K,ram=64K", "", "256KB", "64KB", "1KB"},
-        {"mesk,revision=A,flash=2K,ram=64K", "Mesk Rev.A", "2KB", "64KB", "1KB"},
-        {"mesk,revision=B,flash=256K,ram=64K", "Mesk Rev.B", "256KB", "64KB", "1KB"},
-        {"orrin,flash=128K,ram=64K", "Orrin", "128KB", "64KB", "1KB"},
-        {"pell,flash=128K,ram=32K", "Pell", "128KB", "32KB", "1KB"},
-        {"quen,flash=128M,ram=64K", "Quen", "131072KB", "64KB", "1KB"},
-        {"velk,flash=256K,ram=32K,sector=8K", "Velk", "0KB", "32KB", "8KB"},
-        {"dorna,flash=1M,ram=256K,sector=128K", "Dorna", "1024KB", "256KB", "128KB"},
-        // With bit 31, bits 23 to 20 do not count for the class; they do for the sizes.
-        {"dorna,id=0x801A0000,flash=1M,ram=256K,sector=2K", "Dorna", "1024KB", "256KB", "2KB"},
-        {"dorna,id=0x7F1AFFFF,flash=1M,ram=256K,sector=2K", "Ravik", "1024KB", "256KB", "2KB"},
-    };
-    for (const Identified& row : rows) {
-        SCOPED_TRACE(row.device);
-        RecordingHost host(row.device);
+    for (const auto& row : test::ReadTable("plugin/identified.txt", 5)) {
+        SCOPED_TRACE(row[0]);
+        RecordingHost host(row[0]);
         Plugin plugin(host);
         bool flash = false;
         const char* operations = nullptr;
         EXPECT_EQ(plugin->Initialize(&flash, &operations), nullptr);
-        EXPECT_EQ(host.settings["DeviceInfoFamily"], row.family);
-        EXPECT_EQ(flash, std::string(row.flashSize) != "0KB");
-        if (std::string(row.device) == "ravik,id=0x00020000") continue;  // sizes of no interest
-        EXPECT_EQ(host.settings["DeviceInfoFlashSize"], row.flashSize);
-        EXPECT_EQ(host.settings["DeviceInfoRAMSize"], row.ramSize);
-        EXPECT_EQ(host.settings["DeviceInfoSectorSize"], row.sectorSize);
+        EXPECT_EQ(flash, row[2] != "0KB");
+        const char* const keys[] = {"Family", "FlashSize", "RAMSize", "SectorSize"};
+        for (std::size_t i = 0; i < 4; ++i)
+            if (i == 0 || !row[i + 1].empty()) {
+                EXPECT_EQ(host.settings[std::string("DeviceInfo") + keys[i]], row[i + 1]);
+            }
     }
 }
 
@@ -181,80 +155,26 @@ class SettingTexts : public testing::TestWithParam<bool> {
 };
 
 TEST_P(SettingTexts, AreReadInTheirForms) {
-    RecordingHost host("dorna,flash=64K,sector=1K");
+    const test::Settings option = {{"FlashProgramOption", "Do Not Erase Flash Memory"}};
+    RecordingHost host("dorna,flash=64K,sector=1K", option);
     Plugin plugin(host);
-    const auto registerValueOf = [&](const std::string& text) {
-        host.settings["FlashUserRegister0Input"] = text;
-        host.messages.clear();
-        plugin->PerformOperation("ProgramUserRegister0");
-        return host.messages.at(1);
+    const unsigned char byte = 0;
+    const std::map<std::string, std::function<const char*()>> users = {
+        {"FlashUserRegister0Input",
+         [&] { return plugin->PerformOperation("ProgramUserRegister0"); }},
+        {"FlashResetSetting", [&] { return plugin->ResetSettings(0); }},
+        {"FlashVerboseMode", [&] { return plugin->PerformOperation("CalculateChecksum"); }},
+        {"FlashTimeoutValue", [&] { return plugin->WriteDataToFlash(&byte, 0, 1, 1); }},
     };
-    const auto writing = [](const std::string& digits) {
-        return "Writing 0x" + digits + " to User Register 0";
-    };
-    const std::pair<const char*, const char*> addresses[] = {
-        {"0x3FFFF", "3ffff"},
-        {" 3FFFF ", "3ffff"},
-        {"20000", "20000"},
-        {"12-34", "12"},
-        {"0X1f", "1f"},
-        {"", "0"},
-        {"G1", "0"},
-        {"0x", "0"},
-        {"-1", "ffffffff"},
-        {"+a", "a"},
-        {"1FFFFFFFF", "ffffffff"},
-        {"1,000", "1"},
-    };
-    for (const auto& [text, digits] : addresses) {
-        EXPECT_EQ(registerValueOf(text), writing(digits)) << text;
-    }
-
-    const std::string badCast =
-        "bad lexical cast: source type value could not be interpreted as target";
-    const std::pair<const char*, bool> booleans[] = {
-        {"1", true}, {"0", true},   {"01", true}, {"+1", true}, {"-0", true},  {"0001", true},
-        {"", false}, {"-1", false}, {"+", false}, {"2", false}, {" 1", false}, {"true", false},
-    };
-    for (const auto& [text, good] : booleans) {
-        host.settings["FlashResetSetting"] = text;
-        EXPECT_EQ(TextOf(plugin->ResetSettings(0)), good ? "" : badCast) << text;
-    }
-    const std::pair<const char*, bool> integers[] = {
-        {"-2147483648", true}, {"2147483647", true}, {"+7", true},   {"256", true},
-        {"2147483648", false}, {" 1", false},        {"1.0", false}, {"1,000", false},
-    };
-    for (const auto& [text, good] : integers) {
-        host.settings["FlashVerboseMode"] = text;
-        EXPECT_EQ(TextOf(plugin->PerformOperation("CalculateChecksum")), good ? "" : badCast);
-    }
-}
-
-TEST_P(SettingTexts, OfTheTimeOut) {
-    RecordingHost host("dorna,flash=64K,sector=1K",
-                       {{"FlashProgramOption", "Do Not Erase Flash Memory"}});
-    Plugin plugin(host);
-    const std::string timedOut = "shown: Flash Programmer: Flash programming timed out.";
-    const std::pair<const char*, std::string> texts[] = {
-        {"5 s", ""},
-        {" \t+5", ""},
-        {"2147483647", ""},
-        {"0", timedOut},
-        {"-5", timedOut},
-        {"-2147483648", timedOut},
-        {"s5", "invalid stoi argument"},
-        {"+-5", "invalid stoi argument"},
-        {"", "invalid stoi argument"},
-        {"- 5", "invalid stoi argument"},
-        {"2147483648", "stoi argument out of range"},
-    };
-    for (const auto& [text, outcome] : texts) {
-        host.settings["FlashTimeoutValue"] = text;
-        host.errors.clear();
-        const unsigned char byte = 0;
-        std::string actual = TextOf(plugin->WriteDataToFlash(&byte, 0, 1, 1));
-        if (!host.errors.empty()) actual += "shown: " + host.errors[0];
-        EXPECT_EQ(actual, outcome) << text;
+    const test::Settings before = host.settings;
+    for (const auto& row : test::ReadTable("plugin/setting-texts.txt", 3)) {
+        host.settings = before;
+        host.settings[row[0]] = test::Unescaped(row[1]);
+        host.Restart({});
+        std::string outcome = TextOf(users.at(row[0])());
+        if (!host.errors.empty()) outcome += host.errors[0];
+        if (row[0] == "FlashUserRegister0Input") outcome += host.messages.at(1);
+        EXPECT_EQ(outcome, row[2]) << row[0] << " = " << row[1];
     }
 }
 
