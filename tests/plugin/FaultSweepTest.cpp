@@ -11,12 +11,11 @@
 
 #include <algorithm>
 #include <iostream>
-#include <numeric>
 #include <random>
 #include <span>
 #include <string_view>
 
-#include "tests/support/RecordingHost.h"
+#include "tests/support/Program.h"
 
 namespace {
 
@@ -25,37 +24,6 @@ using test::RecordingHost;
 using test::TextOf;
 using namespace std::chrono_literals;
 using Bytes = std::vector<std::uint8_t>;
-
-// Two sections, the first of three chunks. They share a sector, and neither begins or ends with a
-// block. All devices have sectors of 1 KiB.
-struct Section {
-    std::uint32_t address;
-    std::uint32_t size;
-};
-constexpr Section Sections[] = {{0x13F0, 4200}, {0x24D4, 300}};
-
-// The bytes of a section: others in each version of the program.
-Bytes Image(int version, std::uint32_t size) {
-    Bytes image(size);
-    std::iota(image.begin(), image.end(), static_cast<std::uint8_t>(3 + 0x55 * version));
-    return image;
-}
-
-void PutImage(Bytes& flash, int version) {
-    for (const auto [address, size] : Sections)
-        std::ranges::copy(Image(version, size), flash.begin() + address);
-}
-
-// What a host does to load a program. The text is that of the first failing call.
-std::string LoadProgram(Plugin& plugin, int version) {
-    std::string error = TextOf(plugin->ResetSettings(0));
-    for (const auto [address, size] : Sections) {
-        if (!error.empty()) return error;
-        const Bytes image = Image(version, size);
-        error = TextOf(plugin->WriteDataToFlash(image.data(), address, size, 1));
-    }
-    return error.empty() ? TextOf(plugin->ResetSettings(2)) : error;
-}
 
 // An erase option, and what it may change: from the first byte up to the one before the end.
 struct EraseOption {
@@ -66,7 +34,7 @@ struct EraseOption {
 };
 
 const EraseOption EraseOptions[] = {
-    {"Pages", 0x1000, 0x2800, {{"FlashVerboseMode", "1"}}},
+    {"Pages", 0x1000, 0x2C00, {{"FlashVerboseMode", "1"}}},
     {"Range",
      0x0C00,
      0x2C00,
@@ -81,7 +49,7 @@ const EraseOption EraseOptions[] = {
       {"FlashProgramBlankCheckOption", "1"}}},
     {"Nothing",
      0x13F0,
-     0x2600,
+     0x2858,
      {{"FlashProgramOption", "Do Not Erase Flash Memory"}, {"FlashResetSetting", "0"}}},
 };
 
@@ -115,7 +83,7 @@ struct Work {
     int Version(int attempt) const { return Erases() ? attempt : 0; }
 
     std::string Run(Plugin& plugin, int attempt) const {
-        return Loads() ? LoadProgram(plugin, Version(attempt))
+        return Loads() ? test::LoadProgram(plugin, Version(attempt))
                        : TextOf(plugin->PerformOperation(operation));
     }
     // The part of the flash that may change; empty for what touches none.
@@ -140,7 +108,7 @@ struct Work {
     Bytes FlashAfter(std::size_t size, int attempt) const {
         Bytes flash = FlashBefore(size);
         std::ranges::fill(MayChange(flash), 0xFF);
-        if (Loads()) PutImage(flash, Version(attempt));
+        if (Loads()) test::PutProgram(flash, Version(attempt));
         return flash;
     }
 };
@@ -348,7 +316,7 @@ TEST(Misbehaving, TargetIsToldOfInBoundedTime) {
                            EraseOptions[row.erase].settings);
         Plugin plugin(host);
         host.Restart({});
-        LoadProgram(plugin, 0);
+        test::LoadProgram(plugin, 0);
         const auto told = fmt::format("{}", fmt::join(host.errors, "\n"));
         EXPECT_NE(told.find(row.told), std::string::npos) << told;
         const auto [link, pauses, clock] = host.Device().Time();
@@ -361,10 +329,10 @@ TEST(Misbehaving, TargetIsToldOfInBoundedTime) {
 TEST(Misbehaving, StuckCellIsFoundByComparing) {
     RecordingHost host("tolva,flash=32K,stuck-cell=0x1500:0x10");
     Plugin plugin(host);
-    EXPECT_EQ(LoadProgram(plugin, 0), "");
+    EXPECT_EQ(test::LoadProgram(plugin, 0), "");
     EXPECT_EQ(host.errors, std::vector<std::string>());
     Bytes expected(0x8000, 0xFF);
-    PutImage(expected, 0);
+    test::PutProgram(expected, 0);
     const Bytes flash = host.Device().FlashContents();
     const auto differs = std::ranges::mismatch(flash, expected).in1;
     EXPECT_EQ(differs - flash.begin(), 0x1500);
@@ -377,7 +345,7 @@ TEST(Misbehaving, ConnectionIsToldOf) {
         RecordingHost host(fmt::format("tolva,flash=32K,erase-time=4ms,fail-from={}", access));
         Plugin plugin(host);
         host.Restart({});
-        std::string told = LoadProgram(plugin, 0);
+        std::string told = test::LoadProgram(plugin, 0);
         for (const std::string& error : host.errors)
             told += error;
         failed = host.Device().AccessCount() >= access;
