@@ -268,6 +268,54 @@ TEST(Truth, HoldsOfFaultyDevices) {
         }
 }
 
+TEST(Truth, HoldsHoweverSlowTheLoader) {
+    const ToolRuns runs;
+    for (const char* chunkTime : {"0", "1ms", "60ms", "100ms", "500ms", "1500ms"}) {
+        Said said;
+        Check(runs, kWorks[0], fmt::format(",chunk-time={}", chunkTime), said);
+        EXPECT_EQ(said.status, 0) << chunkTime << said.text;
+        EXPECT_EQ(Bytes(said.end["result"], "program"), (kImageBytes + 127) / 128 * 128);
+    }
+    for (const std::size_t bytes : {100U, 5000U}) {
+        std::ofstream("hangs.bin") << std::string(bytes, 'x');
+        const auto before = test::VirtualNow();
+        const Said said = ToolRuns::Run({"program", "hangs.bin", "--base", "0"}, ",loader=hangs");
+        EXPECT_NE(said.text.find(bytes == 100 ? "within 2 s" : "timed out"), std::string::npos)
+            << said.text;
+        EXPECT_LE(test::VirtualNow() - before, std::chrono::seconds(60)) << bytes;
+    }
+}
+
+TEST(Truth, HoldsOfWhatIsLeftAlone) {
+    const ToolRuns runs;
+    std::string image(12 * 1024 - 100, 'x');
+    // How many bytes were looked at, erased and written.
+    const auto load = [&](Words words = {"program", "image.bin", "--base", "0"}) {
+        std::ofstream("image.bin") << image;
+        const Said said = ToolRuns::Run(std::move(words), "");
+        EXPECT_EQ(said.status, 0) << said.text;
+        const Contents now = ToolRuns::ReadDevice("");
+        EXPECT_EQ(std::string(now.flash.begin(), now.flash.begin() + std::ssize(image)), image);
+        const json& result = said.end["result"];
+        EXPECT_EQ(Bytes(result, "verify"), image.size());
+        return fmt::format("{:x} {:x} {:x}", Bytes(result, "look"), Bytes(result, "erase"),
+                           Bytes(result, "program"));
+    };
+    EXPECT_EQ(load(), "0 3000 3000");  // the samples tell that nothing is there
+    EXPECT_EQ(load(), "3000 0 0");
+    EXPECT_EQ(test::Contents("trace").find("LoadProgram"), std::string::npos);
+    image[0x7FF] = 'y';
+    EXPECT_EQ(load(), "3000 400 400");
+    image[0x800] = image[0x1000] = image[0x2C00] = 'z';  // one sector between, then six
+    EXPECT_EQ(load(), "3000 1000 1000");
+    EXPECT_EQ(load({"program", "image.bin", "--base", "0", "--rewrite"}), "0 3000 3000");
+    image.assign(kFlashBytes, 'w');
+    EXPECT_EQ(load(), "0 4000 4000");  // all at once
+    EXPECT_NE(test::Contents("trace").find("0xa4420004"), std::string::npos);
+    image[0] = 'v';
+    EXPECT_EQ(load(), "4000 400 400");
+}
+
 /// What one reply becomes; `late` is sent in front of the next one.
 struct ReplyFault {
     const char* name;

@@ -1,5 +1,4 @@
-// How the host waits for the loader, on a board that says when it was looked at; and whole program
-// loads under virtual time: what they lose, and what they leave alone.
+// How the host waits for the loader, on a board that says when it was looked at.
 
 #include <fmt/format.h>
 #include <gtest/gtest.h>
@@ -7,13 +6,8 @@
 #include <functional>
 #include <random>
 
-#include "host/cli/CommandLine.h"
-#include "host/commands/Commands.h"
 #include "host/facts/LoaderMemory.h"
 #include "host/targets/LoaderWait.h"
-#include "target/simulated/Contents.h"
-#include "tests/support/TemporaryDirectory.h"
-#include "tests/support/VirtualTime.h"
 
 namespace host {
 namespace {
@@ -244,106 +238,6 @@ TEST(LoaderWait, AwaitsTheLoaderBeforeItIsStopped) {
               "load@33033 run@33033 handing handed waiting-30@36082 halt@63033 load@63033 "
               "run@63033 handing "
               "halt@66082 load@66082 run@66082 handing handed halt@66082 ");
-}
-
-/// corvane-flash program, in this process, with files of its own.
-struct Tool {
-    Outcome Program(const std::string& bytes, const std::string& base,
-                    const std::vector<std::string>& more = {}) {
-        directory.Write("image", bytes);
-        Reporter reporter({Verbosity::Quiet, false, "none"});
-        SettingStore settings;
-        std::vector<std::string> words{
-            "program",  directory.File("image"), "--base", base, "--sim", sim,
-            "--plugin", FLASH_CORVANE_LIBRARY};
-        words.insert(words.end(), more.begin(), more.end());
-        const ParsedLine line = ParseCommandLine(AllCommands(), FollowLine(AllCommands(), words));
-        Context context{line.common, reporter, settings};
-        return line.command->run(context, line.given);
-    }
-
-    /// The same on a device that stays. How many bytes were erased and written.
-    std::pair<int, int> Update(const std::string& bytes, bool rewrite = false) {
-        std::vector<std::string> options{"--sim-file", directory.File("contents"), "--trace",
-                                         directory.File("trace")};
-        if (rewrite) options.emplace_back("--rewrite");
-        const Outcome outcome = Program(bytes, "0", options);
-        EXPECT_EQ(outcome.status, ExitStatus::Done) << outcome.error;
-        const auto device = target::DecodeContents(test::Contents(directory.File("contents")),
-                                                   target::ParseDeviceOptions(sim));
-        const auto flash = device->FlashContents();
-        EXPECT_TRUE(std::equal(bytes.begin(), bytes.end(), flash.begin(),
-                               [](char a, std::uint8_t b) { return a == static_cast<char>(b); }));
-        counts.clear();
-        for (std::size_t page = 0; page < 16; ++page)
-            counts += std::to_string(device->Flash().EraseCount(page));
-        const Json phases = outcome.result["phases"];
-        const auto bytesOf = [&](const char* phase) {
-            return phases.contains(phase) ? phases[phase]["bytes"].get<int>() : 0;
-        };
-        looked = bytesOf("look");
-        EXPECT_EQ(bytesOf("verify"), bytes.size());
-        return {bytesOf("erase"), bytesOf("program")};
-    }
-
-    std::string sim = "quen,flash=32K";
-    std::string counts;  ///< how often each of the first pages was erased
-    int looked = 0;
-    const test::TemporaryDirectory directory;
-};
-
-TEST(Program, LosesNoChunkHoweverSlowTheLoader) {
-    for (const char* chunkTime : {"0", "1ms", "60ms", "100ms", "500ms", "1500ms"}) {
-        Tool tool;
-        tool.sim = fmt::format("dorna,chunk-time={}", chunkTime);
-        const Outcome outcome = tool.Program(std::string(5000, 'x'), "1083");
-        EXPECT_EQ(outcome.status, ExitStatus::Done) << chunkTime << outcome.error;
-        EXPECT_EQ(outcome.result["phases"]["program"]["bytes"], 5120) << chunkTime;
-    }
-}
-
-TEST(Program, EndsInBoundedTimeWhenTheLoaderHangs) {
-    for (const std::size_t bytes : {100U, 5000U}) {
-        Tool tool;
-        tool.sim = "dorna,loader=hangs";
-        const auto before = test::VirtualNow();
-        try {
-            tool.Program(std::string(bytes, 'x'), "0");
-            ADD_FAILURE() << bytes;
-        } catch (const Failure& failure) {
-            EXPECT_NE(std::string(failure.what()).find("within 30 s"), std::string::npos)
-                << failure.what();
-        }
-        EXPECT_LE(test::VirtualNow() - before, 60s) << bytes;
-    }
-}
-
-TEST(Program, LeavesAloneWhatIsThere) {
-    using Work = std::pair<int, int>;
-    Tool tool;
-    std::string image(12 * 1024 - 100, 'x');
-    EXPECT_EQ(tool.Update(image), Work(0x3000, 0x3000));
-    EXPECT_EQ(tool.looked, 0);  // the samples tell that nothing is there
-    EXPECT_EQ(tool.counts, "1111111111110000");
-
-    EXPECT_EQ(tool.Update(image), Work(0, 0));
-    EXPECT_EQ(tool.looked, 0x3000);
-    EXPECT_EQ(tool.counts, "1111111111110000");
-    EXPECT_EQ(test::Contents(tool.directory.File("trace")).find("LoadProgram"), std::string::npos);
-
-    image[0x7FF] = 'y';
-    EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
-    EXPECT_EQ(tool.counts, "1211111111110000");
-    image[0x800] = image[0x1000] = image[0x2C00] = 'z';  // one sector between, then six
-    EXPECT_EQ(tool.Update(image), Work(0x1000, 0x1000));
-    EXPECT_EQ(tool.counts, "1222211111120000");
-    EXPECT_EQ(tool.Update(image, true), Work(0x3000, 0x3000));
-
-    image.assign(0x8000, 'w');
-    EXPECT_EQ(tool.Update(image), Work(0x8000, 0x8000));  // all at once
-    EXPECT_NE(test::Contents(tool.directory.File("trace")).find("0xa4420004"), std::string::npos);
-    image[0] = 'v';
-    EXPECT_EQ(tool.Update(image), Work(0x400, 0x400));
 }
 
 }  // namespace
