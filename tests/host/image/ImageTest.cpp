@@ -4,6 +4,7 @@
 #include "host/image/Image.h"
 
 #include <fmt/format.h>
+#include <fmt/ranges.h>
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -11,7 +12,10 @@
 #include <map>
 #include <random>
 
+#include "base/Hex.h"
 #include "host/base/Errors.h"
+#include "tests/support/Cases.h"
+#include "tests/support/FailureOf.h"
 #include "tests/support/TemporaryDirectory.h"
 
 namespace host::image {
@@ -31,22 +35,22 @@ Image MakeImage(const std::vector<Section>& sections) {
     return image;
 }
 
-/// What a Failure says is wrong: its text without the advice behind the semicolon.
+/// The status of a failure and what is wrong: its text without the advice behind the semicolon.
 template <typename Work>
-std::string FailureOf(Work work, ExitStatus expected = ExitStatus::BadFile) {
-    try {
-        work();
-    } catch (const Failure& failure) {
-        EXPECT_EQ(expected, failure.Status());
-        const std::string text = failure.what();
-        return text.substr(0, text.find(';'));
-    }
-    return "no failure";
+std::string FailureOf(Work work) {
+    const std::string text = test::FailureOf(work);
+    return text.substr(0, text.find(';'));
 }
 
-std::string Complaint(const std::string& contents, const ReadOptions& options = {},
-                      ExitStatus expected = ExitStatus::BadFile) {
-    return FailureOf([&] { ParseImage(contents, "f", options); }, expected);
+/// Its bytes at their addresses, or what is wrong with it.
+std::string ReadingOf(const std::string& contents, const ReadOptions& options = {}) {
+    std::string text;
+    const std::string failure = FailureOf([&] {
+        const Image image = ParseImage(contents, "f", options);
+        for (const Section& section : image.Sections())
+            text += fmt::format(" {:x}:{:02x}", section.address, fmt::join(section.bytes, ""));
+    });
+    return failure.empty() ? text.substr(1) : failure;
 }
 
 TEST(Image, JoinsAndOrdersLikeAMapOfBytes) {
@@ -78,9 +82,9 @@ TEST(Image, IsUnchangedByWhatItRefuses) {
     Image image = MakeImage({{0x10, {1, 2, 3}}, {0xFFFFFFFE, {4, 5}}});
     const Image before = image;
     const Bytes different{0, 1, 2, 9}, tooLong{4, 5, 6};
-    EXPECT_EQ("b.elf puts 0x09 at address 0x12, where 0x03 stands already",
+    EXPECT_EQ("3: b.elf puts 0x09 at address 0x12, where 0x03 stands already",
               FailureOf([&] { image.Add(0x0F, different, "b.elf"); }));
-    EXPECT_EQ("b.elf: 3 bytes at address 0xfffffffe run past 0xffffffff",
+    EXPECT_EQ("3: b.elf: 3 bytes at address 0xfffffffe run past 0xffffffff",
               FailureOf([&] { image.Add(0xFFFFFFFE, tooLong, "b.elf"); }));
     FailureOf([&] { image.Add(MakeImage({{0, {1}}, {0x11, {3}}}), "b.elf"); });
     EXPECT_EQ(before, image);
@@ -88,68 +92,11 @@ TEST(Image, IsUnchangedByWhatItRefuses) {
     EXPECT_EQ(MakeImage({{0, {1}}, {0x10, {1, 2, 3, 3}}, {0xFFFFFFFE, {4, 5}}}), image);
 }
 
-TEST(ImageFile, ReadsWhatTheTextFormatsAllow) {
-    const std::pair<std::string, Image> cases[] = {
-        {"\r\n :0200000001a25B \r\n\n:00001000F0\n:00000001FF\t", MakeImage({{0, {1, 0xA2}}})},
-        {":020000021000EC\n:020000040001F9\n:04FFFE0001020304F5\n:0400000500000001F6\n:"
-         "00000001FF\n",
-         MakeImage({{0x1FFFE, {1, 2, 3, 4}}})},
-        {":020000021000EC\n:04FFFE0001020304F5\n:0400000300000001F8\n:00000001FF\n",
-         MakeImage({{0x10000, {3, 4}}, {0x1FFFE, {1, 2}}})},
-        {":04FFFE0001020304F5\n:00000001FF\n", MakeImage({{0xFFFE, {1, 2, 3, 4}}})},
-        {":02000004FFFFFC\n:04FFFE0001020304F5\n:00000001FF\n",
-         MakeImage({{0, {3, 4}}, {0xFFFFFFFE, {1, 2}}})},
-        {"S00600004844521B\r\nS104001001EA\nS205123456025C\nS3061234567803E2\nS5030003F9\n"
-         "S604000003F8\nS70500000000FA",
-         MakeImage({{0x10, {1}}, {0x123456, {2}}, {0x12345678, {3}}})},
-        {"S104001001EA\nS1030000FC\nS5030002FA\n", MakeImage({{0x10, {1}}})},
-    };
-    for (const auto& [contents, image] : cases)
-        EXPECT_EQ(image, ParseImage(contents, "f", {}));
-}
-
-TEST(ImageFile, NamesFileAndLineOfWhatIsWrong) {
-    const std::pair<std::string, std::string> cases[] = {
-        {"", "f: the file is empty"},
-        {"MZ", "f: no known format found (ELF, Intel HEX, S-record)"},
-        {":00000001FF", "f: no bytes to load found (read as ihex)"},
-        {"\n:0200000001A25C", "f: line 2: checksum 0x5C found, 0x5B expected"},
-        {":020000000102", "f: line 1: a record of 6 bytes found, 7 expected by its length byte"},
-        {":0200000001A25", "f: line 1: 13 hexadecimal digits found, pairs expected"},
-        {":02000\x01", "f: line 1: byte 0x01 found in column 7, a hexadecimal digit expected"},
-        {":" + std::string(600, '0'), "f: line 1: 601 characters found, more than any record has"},
-        {":0200000001A25B\n", "f: no end record (:00000001FF) found"},
-        {":00000001FF\n:00000001FF", "f: line 2: more text found behind the end record"},
-        {":00000006FA", "f: line 1: record type 06 found, 00 to 05 expected"},
-        {":0100000401FA", "f: line 1: length 1 found, 2 expected in a record of type 04"},
-        {":0200000001A25B\n:0200000001A25B\n:0100010003FB\n:00000001FF",
-         "f: line 3 puts 0x03 at address 0x1, where 0xa2 stands already"},
-        {"S104001001EB", "f: line 1: checksum 0xEB found, 0xEA expected"},
-        {"S104001001EA\nS5030002FA", "f: line 2: data records: 1 found, 2 expected by this count"},
-        {"S5030000FC\nS104001001EA",
-         "f: neither a count (S5, S6) nor a termination record (S7 to S9) found behind the data"},
-        {"S9030000FC\nS9030000FC", "f: line 2: more text found behind the termination record"},
-        {"S904000001FA", "f: line 1: address and data: 3 bytes found, 2 expected in an S9 record"},
-        {"S4030000FC", "f: line 1: a line found that begins with none of S0 to S3 and S5 to S9"},
-        {"S307FFFFFFFF0102F9\nS9030000FC",
-         "f: line 1: 2 bytes at address 0xffffffff run past 0xffffffff"},
-    };
-    for (const auto& [contents, text] : cases)
-        EXPECT_EQ(text, Complaint(contents));
-    EXPECT_EQ("f: no ELF header found", Complaint("hello", {Format::Elf, {}}));
-    EXPECT_EQ("f: line 1: a line found that begins with none of S0 to S3 and S5 to S9",
-              Complaint("SA030000FC", {Format::SRecord, {}}));
-    EXPECT_EQ("f: line 1: no ':' found at the beginning, where each record of Intel HEX has one",
-              Complaint("hello", {Format::IntelHex, {}}));
-}
-
-TEST(ImageFile, NeedsABaseForRawBinary) {
-    EXPECT_EQ(MakeImage({{0x8000, {'M', 'Z'}}}), ParseImage("MZ", "f", {{}, 0x8000}));
-    EXPECT_EQ(MakeImage({{1, {':', '0'}}}), ParseImage(":0", "f", {Format::Binary, 1}));
-    EXPECT_EQ("f: raw binary has no address of its own",
-              Complaint(":0", {Format::Binary, {}}, ExitStatus::WrongUsage));
-    EXPECT_EQ("f: 2 bytes at address 0xffffffff run past 0xffffffff",
-              Complaint("MZ", {{}, 0xFFFFFFFF}));
+TEST(ImageFile, IsReadOrRefusedByWhatItHolds) {
+    for (const auto& row : test::ReadTable("host/image/files.txt", 4)) {
+        const ReadOptions options{FormatFromName(row[2]), base::ParseHex32(row[3])};
+        EXPECT_EQ(ReadingOf(test::Unescaped(row[0]), options), row[1]);
+    }
 }
 
 // --- ELF
@@ -159,9 +106,8 @@ struct Segment {
     std::uint64_t offset, address, fileSize;
 };
 
-/// A 32-bit little-endian ELF file of a type (2: an executable) with these segments, and `bytes`
-/// behind its tables.
-std::string MakeElf(const std::vector<Segment>& segments, const std::string& bytes, int type = 2) {
+/// A 32-bit little-endian executable with these segments, and `bytes` behind its tables.
+std::string MakeElf(const std::vector<Segment>& segments, const std::string& bytes) {
     std::string elf{0x7F, 'E', 'L', 'F', 1, 1, 1};
     elf.resize(16);
     const std::uint64_t headerSize = 52;
@@ -170,7 +116,7 @@ std::string MakeElf(const std::vector<Segment>& segments, const std::string& byt
         for (int i = 0; i < size; ++i)
             elf += static_cast<char>(value >> 8 * i);
     };
-    put(static_cast<std::uint64_t>(type), 2), put(40, 2), put(1, 4), put(0, 4);
+    put(2, 2), put(40, 2), put(1, 4), put(0, 4);
     put(headerSize, 4), put(0, 4), put(0, 4), put(headerSize, 2), put(entrySize, 2);
     put(segments.size(), 2), put(0, 6);
     for (const auto& [kind, offset, address, fileSize] : segments) {
@@ -181,48 +127,26 @@ std::string MakeElf(const std::vector<Segment>& segments, const std::string& byt
     return elf + bytes;
 }
 
-TEST(ImageFile, LoadsElfSegmentsWithBytesAtTheirPhysicalAddresses) {
+// Each row: what is done to the bytes of a good file (one is another, or it is cut there), and what
+// is said then.
+TEST(ImageFile, LoadsElfSegmentsAndRefusesFilesThatAreCutOffOrUnfit) {
     const std::vector<Segment> segments{
         {1, 0, 0x8000, 3}, {1, 0, 0x20000000, 0}, {6, 0, 0x30, 1}, {1, 3, 0xFFFFFFFF, 1}};
-    EXPECT_EQ(MakeImage({{0x8000, {'a', 'b', 'c'}}, {0xFFFFFFFF, {'d'}}}),
-              ParseImage(MakeElf(segments, "abcd"), "f", {}));
-}
-
-TEST(ImageFile, RefusesElfFilesThatAreCutOffOrUnfit) {
-    const std::vector<Segment> segments{{1, 0, 0x8000, 4}};
-    const std::string whole = MakeElf(segments, "abcd");
-    std::string badEntrySize = whole, noSections = whole, bigEndian = whole;
-    badEntrySize[42] = 40;
-    noSections[32] = 61, noSections[46] = 40, noSections[48] = 1;  // offset, entry size and count
-    bigEndian[5] = 2, bigEndian[16] = 0, bigEndian[17] = 2, bigEndian[23] = 1;
-    bigEndian.replace(28, 20, 20, 0);
-    std::string otherMachine = whole, moreInFile = whole;
-    otherMachine[18] = 62, moreInFile[72] = 3;
-    const std::string expected = " found, a 32-bit little-endian executable expected";
-    const std::pair<std::string, std::string> cases[] = {
-        {whole.substr(0, 30),
-         "f: ELF header: 52 bytes expected at offset 0, but the file ends at 30"},
-        {whole.substr(0, 70),
-         "f: program header table: 32 bytes expected at offset 52, but the file ends at 70"},
-        {whole.substr(0, 87),
-         "f: segment 0: 4 bytes expected at offset 84, but the file ends at 87"},
-        {badEntrySize, "f: program header table: entries of 40 bytes found, 32 expected"},
-        {noSections,
-         "f: section header table: 40 bytes expected at offset 61, but the file ends at 88"},
-        {MakeElf({{1, 0, 0, 0}}, ""), "f: no bytes to load found (read as elf)"},
-        {MakeElf({{1, 0, 8, 2}, {1, 1, 9, 1}, {1, 0, 9, 1}}, "ab"),
-         "f: segment 2 puts 0x61 at address 0x9, where 0x62 stands already"},
-        {MakeElf(segments, "abcd", 1), "f: a relocatable object" + expected},
-        {MakeElf(segments, "abcd", 3),
-         "f: a shared object or a position-independent program" + expected},
-        {MakeElf(segments, "abcd", 4), "f: a core" + expected},
-        {MakeElf(segments, "abcd", 9), "f: a file of type 9" + expected},
-        {bigEndian, "f: an executable, big-endian" + expected},
-        {otherMachine, "f: an executable, for another machine than Arm (62)" + expected},
-        {moreInFile, "f: segment 0: 4 bytes in the file, but 3 in memory"},
-    };
-    for (const auto& [contents, text] : cases)
-        EXPECT_EQ(text, Complaint(contents));
+    EXPECT_EQ(ReadingOf(MakeElf(segments, "abcd")), "8000:616263 ffffffff:64");
+    EXPECT_EQ(ReadingOf(MakeElf({{1, 0, 0, 0}}, "")), "3: f: no bytes to load found (read as elf)");
+    EXPECT_EQ(ReadingOf(MakeElf({{1, 0, 8, 2}, {1, 1, 9, 1}, {1, 0, 9, 1}}, "ab")),
+              "3: f: segment 2 puts 0x61 at address 0x9, where 0x62 stands already");
+    for (const auto& row : test::ReadTable("host/image/elf.txt", 2)) {
+        std::string elf = MakeElf({{1, 0, 0x8000, 4}}, "abcd");
+        for (const std::string& edit : test::Split(row[0], " ")) {
+            const std::size_t place = std::stoul(edit), equals = edit.find('=');
+            if (equals == edit.npos)
+                elf.resize(place);
+            else
+                elf[place] = static_cast<char>(std::stoi(edit.substr(equals + 1)));
+        }
+        EXPECT_EQ(ReadingOf(elf), "3: f: " + row[1]) << row[0];
+    }
 }
 
 // --- Damage
@@ -281,11 +205,11 @@ TEST(ImageFile, WritesRecordsThatEndAtMultiplesOfTheirLength) {
 TEST(ImageFile, RefusesToWriteElfAndHugeGaps) {
     const Image far = MakeImage({{0, {1}}, {0x10000000, {2}}});
     EXPECT_EQ(
-        "raw binary: the gaps filled, the bytes from 0x0 to 0x10000000 would take "
+        "2: raw binary: the gaps filled, the bytes from 0x0 to 0x10000000 would take "
         "256 MiB",
-        FailureOf([&] { FormatImage(far, Format::Binary); }, ExitStatus::WrongUsage));
-    EXPECT_EQ("ELF can't be made from memory contents",
-              FailureOf([&] { FormatImage(far, Format::Elf); }, ExitStatus::WrongUsage));
+        FailureOf([&] { FormatImage(far, Format::Binary); }));
+    EXPECT_EQ("2: ELF can't be made from memory contents",
+              FailureOf([&] { FormatImage(far, Format::Elf); }));
 }
 
 // --- Files and other tools
@@ -337,9 +261,9 @@ TEST(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
 TEST(ImageFiles, SayWhyTheyCannotBeRead) {
     const test::TemporaryDirectory directory;
     const std::string path = directory.Path();
-    EXPECT_EQ("can't read the image file " + path + ": Is a directory",
+    EXPECT_EQ("3: can't read the image file " + path + ": Is a directory",
               FailureOf([&] { ReadImageFile(path, {}); }));
-    EXPECT_EQ("can't read the image file " + path + "/x: No such file or directory",
+    EXPECT_EQ("3: can't read the image file " + path + "/x: No such file or directory",
               FailureOf([&] { ReadImageFile(path + "/x", {}); }));
 }
 
