@@ -2,194 +2,86 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstdio>
+#include <map>
+#include <sstream>
 #include <string>
+#include <vector>
 
 #include "host/driver/DeviceFailure.h"
+#include "tests/support/Cases.h"
 
 namespace host {
 namespace {
 
-struct Amount {
-    std::uint64_t done;
-    std::uint64_t total;
-};
-
-/// A state whose flash was attempted, erased, handed over and programmed from 0 on.
-KnownState Touched(Amount erase, Amount program, std::uint32_t handedOver = 0) {
-    KnownState state;
-    const auto add = [](base::AddressSet& set, std::uint64_t bytes) {
-        if (bytes != 0) set.Add({0, static_cast<std::uint32_t>(bytes - 1)});
+/// Flash that was attempted, erased, programmed and handed over from 0 on: "A of B, ...".
+void Touch(KnownState& state, const std::string& line) {
+    unsigned erased = 0, sectors = 0, programmed = 0, image = 0, handedOver = 0;
+    std::sscanf(line.c_str(), "erased %u of %u, programmed %u of %u, handed over %u", &erased,
+                &sectors, &programmed, &image, &handedOver);
+    const auto add = [](base::AddressSet& set, unsigned bytes) {
+        if (bytes != 0) set.Add({0, bytes - 1});
     };
-    add(state.flash.attempted, std::max(erase.total, program.total));
-    add(state.flash.erased, erase.done);
-    add(state.flash.programmed, program.done);
+    add(state.flash.attempted, std::max(sectors, image));
+    add(state.flash.erased, erased);
+    add(state.flash.programmed, programmed);
     add(state.flash.handedOver, handedOver);
-    state.phases[Phase::Erase] = {erase.done, erase.total};
-    state.phases[Phase::Program] = {program.done, program.total};
-    return state;
+    state.phases[Phase::Erase] = {erased, sectors};
+    state.phases[Phase::Program] = {programmed, image};
 }
 
-KnownState With(KnownState state, void (*change)(KnownState&)) {
-    change(state);
-    return state;
+/// What a line of failures.txt says is known.
+void Know(KnownState& state, const std::string& line) {
+    const std::string word = line.substr(0, line.find(' '));
+    const std::string rest = line.substr(std::min(word.size() + 1, line.size()));
+    std::istringstream values(rest);
+    values.unsetf(std::ios::basefield);
+    std::uint32_t first = 0;
+    std::uint32_t second = 0;
+    std::string commit;
+    values >> first >> second >> commit;
+    if (word == "traced") state.traced = true;
+    if (word == "unidentified") state.identified = false;
+    if (word == "interrupted") state.interrupted = true;
+    if (word == "halt-failed") state.haltFailed = true;
+    if (word == "advice") state.advice = rest;
+    if (word == "doubt") state.doubt = rest;
+    if (word == "not-blank") state.notBlank = {first, static_cast<std::uint8_t>(second)};
+    if (word == "holds") state.registerValues.at(first) = second;
+    if (word == "registers" || word == "wrote") state.registers.accessed = true;
+    if (word == "wrote")
+        state.registers.registers.at(first) = {second, commit == "None"    ? Commit::None
+                                                       : commit == "Begun" ? Commit::Begun
+                                                                           : Commit::Done};
+    if (word == "erased") Touch(state, line);
 }
-
-KnownState With(void (*change)(KnownState&)) {
-    return With({}, change);
-}
-
-constexpr char kTry[] = "; run it with --trace FILE to see every access";
-constexpr char kAgain[] = "; run the command again before the device is used";
 
 TEST(DeviceFailure, TellsWhatWasDoneWhyItFailedAndWhatTheDeviceHolds) {
-    const std::string incomplete = "the flash is incomplete: ";
-    const std::string asItWas = std::string("; the flash is as it was") + kTry;
-    const struct {
-        FailedCall call;
+    for (const test::Scenario& row : test::ReadScenarios("host/driver/failures.txt")) {
+        std::vector<std::string> call = test::Split(row.device, " | ");
+        call.resize(4);
+        const bool shown = !call[2].empty() && call[2] != "-";
         KnownState state;
-        ExitStatus status;
-        std::string text;
-        std::string remark = {};  ///< the text, when empty
-    } cases[] = {
-        {{"erasing", "no answer."}, {}, ExitStatus::DeviceFailed, "erasing: no answer" + asItWas},
-        {{"erasing", "", "Erase failed.."},
-         {},
-         ExitStatus::DeviceFailed,
-         "erasing: Erase failed" + asItWas,
-         "erasing ended with the errors above" + asItWas},
-        {{"erasing", "E", "Erase failed.."},
-         {},
-         ExitStatus::DeviceFailed,
-         "erasing: Erase failed; then E" + asItWas,
-         "erasing ended with the errors above; then E" + asItWas},
-        {{"erasing", "E", "S.", "the cable"},
-         With([](KnownState& state) { state.traced = true; }),
-         ExitStatus::DeviceFailed,
-         "erasing: S; then E; it began with: the cable; the flash is as it was; the trace has "
-         "every "
-         "access",
-         "erasing failed: the cable; the flash is as it was; the trace has every access"},
-        {{"erasing", "lost: the cable", {}, "the cable"},
-         {},
-         ExitStatus::DeviceFailed,
-         "erasing: lost: the cable" + asItWas},
-        {{"identifying", "no answer"},
-         With([](KnownState& state) {
-             state.identified = false;
-             state.advice = "look";
-         }),
-         ExitStatus::Unreachable,
-         "can't reach the target: identifying: no answer; look"},
-        {{"erasing", "E"},
-         With([](KnownState& state) { state.interrupted = state.haltFailed = true; }),
-         ExitStatus::Interrupted,
-         "interrupted; the flash is as it was; the target couldn't be halted"},
-        {{"D", "E"},
-         Touched({1024, 2048}, {0, 0}),
-         ExitStatus::DeviceFailed,
-         "D: E; " + incomplete + "1 KiB erased" + kAgain + kTry},
-        {{"D", "E"},
-         Touched({4096, 4096}, {2048, 3000}, 3000),
-         ExitStatus::DeviceFailed,
-         "D: E; " + incomplete +
-             "4 KiB erased, 2 KiB of 2.9 KiB written, 952 bytes handed to the loader and not seen "
-             "to be finished" +
-             kAgain + kTry},
-        {{"D", "E"},
-         Touched({4096, 4096}, {3000, 3000}, 3000),
-         ExitStatus::DeviceFailed,
-         std::string("D: E; the image is programmed, but not compared") + kTry},
-        {{"D", "E"},
-         Touched({4096, 4096}, {0, 0}),
-         ExitStatus::DeviceFailed,
-         std::string("D: E; 4 KiB are erased, but not compared") + kTry},
-        // An erase that wasn't seen to end isn't made good by what was programmed over it.
-        {{"D", "E"},
-         Touched({0, 4096}, {4096, 4096}),
-         ExitStatus::DeviceFailed,
-         "D: E; " + incomplete + "0 bytes erased, 4 KiB of 4 KiB written" + kAgain + kTry},
-        {{"checking", "", "not blank"},
-         With([](KnownState& state) {
-             state.notBlank = {0x20, 0x7F};
-         }),
-         ExitStatus::ContentsDiffer,
-         "checking: not blank",
-         "the flash isn't blank: 0x20 holds 0x7f, not 0xff"},
-        {{"checking", "", "not blank"},
-         With(Touched({64, 64}, {0, 32}),
-              [](KnownState& state) {
-                  state.notBlank = {0x20, 0};
-              }),
-         ExitStatus::ContentsDiffer,
-         "checking: not blank; it was erased just now, so the cell is worn out or protected; " +
-             incomplete + "64 bytes erased, 0 bytes of 32 bytes written" + kAgain,
-         "the flash isn't blank: 0x20 holds 0x00, not 0xff; it was erased just now, so the cell is "
-         "worn out or protected; " +
-             incomplete + "64 bytes erased, 0 bytes of 32 bytes written" + kAgain},
-        // What a failed access has left in the buffer is no contents.
-        {{"checking", "E", {}, "lost"},
-         With([](KnownState& state) {
-             state.notBlank = {0x20, 0x7F};
-         }),
-         ExitStatus::DeviceFailed,
-         "checking: E; it began with: lost" + asItWas},
-        // What was read of a device that is gone is no contents, and shows nothing done.
-        {{"checking", "", "not blank"},
-         With([](KnownState& state) {
-             state.notBlank = {0x20, 0};
-             state.doubt = "gone";
-         }),
-         ExitStatus::Unreachable,
-         "checking: gone; what was read of it can't be believed; the flash is as it was"},
-        {{"D", "E", {}, "the cable"},
-         With(Touched({64, 64}, {64, 64}),
-              [](KnownState& state) {
-                  state.registers = {true, {{{0x12, Commit::Done}, {}}}};
-                  state.registerValues = {0x12, 0x34};
-                  state.doubt = "gone";
-              }),
-         ExitStatus::DeviceFailed,
-         "D: gone; it began with: the cable; what was read of it can't be believed; user register "
-         "0 may have changed and can't be read (perhaps committed), user register 1 is as it was; "
-         "what the flash holds isn't known" +
-             std::string(kAgain)},
-        {{"D", "E"},
-         With([](KnownState& state) { state.registers.accessed = true; }),
-         ExitStatus::DeviceFailed,
-         std::string("D: E; the user registers are as they were") + kTry},
-        {{"D", "E"},
-         With(Touched({64, 128}, {0, 0}),
-              [](KnownState& state) {
-                  state.registers = {true, {{{0x12, Commit::Begun}, {0x34, Commit::Done}}}};
-                  state.registerValues = {0x12, {}};
-              }),
-         ExitStatus::DeviceFailed,
-         "D: E; user register 0 holds 0x00000012 (perhaps committed), user register 1 may have "
-         "changed and can't be read (committed); " +
-             incomplete + "64 bytes erased" + kAgain + kTry},
-        {{"D", "E"},
-         With([](KnownState& state) {
-             state.registers = {true, {{{0x12, Commit::None}, {}}}};
-             state.registerValues = {0x56, {}};
-         }),
-         ExitStatus::DeviceFailed,
-         std::string(
-             "D: E; user register 0 holds 0x00000056 (not committed), user register 1 is as "
-             "it was") +
-             kTry},
-    };
-    for (const auto& [call, state, status, text, remark] : cases) {
-        const DeviceFailure failure = MakeDeviceFailure(call, state, Json::object());
-        EXPECT_EQ(failure.what(), text);
-        EXPECT_EQ(failure.Remark(), remark.empty() ? text : remark);
-        EXPECT_EQ(failure.Status(), status) << text;
+        std::map<std::string, std::string> said;
+        for (const std::string& line : row.steps) {
+            Know(state, line);
+            said[line.substr(0, line.find(' '))] = line.substr(line.find(' ') + 1);
+        }
+        const DeviceFailure failure = MakeDeviceFailure(
+            {call[0], call[1], shown ? std::optional(call[2]) : std::nullopt, call[3]}, state,
+            Json::object());
+        const std::string text = failure.what();
+        EXPECT_EQ(std::to_string(static_cast<int>(failure.Status())) + ": " + text, said["says"]);
+        EXPECT_EQ(failure.Remark(), said.contains("remark") ? said["remark"] : text);
         EXPECT_EQ(failure.Result()["flashChanged"], !state.flash.attempted.Empty()) << text;
         EXPECT_EQ(failure.Result().contains("registers"), state.registers.accessed) << text;
     }
 }
 
 TEST(DeviceFailure, HasTheSameInItsJson) {
-    KnownState state = Touched({64, 64}, {0, 32});
+    KnownState state;
+    Touch(state, "erased 64 of 64, programmed 0 of 32");
     state.phases[Phase::Erase].seconds = 0.25;
     state.phases[Phase::Erase].simulatedSeconds = 1.5;
     state.notBlank = {0x20, 0x7F};
