@@ -290,9 +290,9 @@ TEST(Truth, HoldsOfWhatIsLeftAlone) {
     const ToolRuns runs;
     std::string image(12 * 1024 - 100, 'x');
     // How many bytes were looked at, erased and written.
-    const auto load = [&](Words words = {"program", "image.bin", "--base", "0"}) {
+    const auto load = [&](const Words& words = {"program", "image.bin", "--base", "0"}) {
         std::ofstream("image.bin") << image;
-        const Said said = ToolRuns::Run(std::move(words), "");
+        const Said said = ToolRuns::Run(words, "");
         EXPECT_EQ(said.status, 0) << said.text;
         const Contents now = ToolRuns::ReadDevice("");
         EXPECT_EQ(std::string(now.flash.begin(), now.flash.begin() + std::ssize(image)), image);
