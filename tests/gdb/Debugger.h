@@ -3,7 +3,6 @@
 
 #pragma once
 
-#include <gtest/gtest.h>
 #include <sys/socket.h>
 
 #include <chrono>
@@ -37,7 +36,7 @@ class Debugger {
         options.gdbOptions = {"timeout=1s"};
         probe_ = host::ProbeConnector(options, {}).Connect();
         int ends[2] = {};
-        EXPECT_EQ(socketpair(AF_UNIX, SOCK_STREAM, 0, ends), 0);
+        if (socketpair(AF_UNIX, SOCK_STREAM, 0, ends) != 0) throw SocketError("no pair");
         handle_ = ends[0];
         own_ = Socket(ends[0], {});
         client_.emplace(target::gdb::Reception::Client{Socket(ends[1], {}), ""});
@@ -67,6 +66,13 @@ class Debugger {
         return std::nullopt;
     }
 
+    /// The same for bytes that may be no request at all.
+    std::optional<std::string> Say(const std::string& bytes) try {
+        return Exchange(bytes, Frame::Kind::Packet);
+    } catch (const std::runtime_error&) {
+        return std::nullopt;
+    }
+
     // From any thread.
     void Interrupt() const { (void)!write(handle_, "\x03", 1); }
     void HangUp() const { shutdown(handle_, SHUT_RDWR); }
@@ -74,6 +80,7 @@ class Debugger {
     void Leave() { session_->Leave(); }
 
     std::string complaints;
+    std::chrono::milliseconds patience{3000};  ///< for an answer
 
   private:
     /// The next frame of this kind that comes back.
@@ -81,7 +88,7 @@ class Debugger {
         using std::chrono::steady_clock;
         own_.Write(bytes, After(std::chrono::seconds(1)));
         client_->Read();
-        for (const auto end = After(std::chrono::seconds(3)); steady_clock::now() < end;) {
+        for (const auto end = After(patience); steady_clock::now() < end;) {
             while (const auto frame = client_->Next())
                 session_->Take(*frame);
             decoder_.Feed(own_.Read({}));

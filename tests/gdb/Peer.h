@@ -3,12 +3,8 @@
 
 #pragma once
 
-#include <gtest/gtest.h>
-#include <unistd.h>
-
 #include <atomic>
 #include <chrono>
-#include <fstream>
 #include <functional>
 #include <initializer_list>
 #include <memory>
@@ -22,6 +18,7 @@
 #include "target/gdb/wire/Frame.h"
 #include "target/gdb/wire/Socket.h"
 #include "target/simulated/ServedSimulation.h"
+#include "tests/support/TemporaryDirectory.h"
 
 namespace test {
 
@@ -132,13 +129,13 @@ inline std::string Little(std::initializer_list<std::uint32_t> words) {
 /// The smallest program: one segment of four bytes, and as many behind it that aren't in the file.
 inline const std::string& LoaderFile() {
     static const std::string path = [] {
-        std::string file = testing::TempDir() + "gdb-test-loader-" + std::to_string(getpid());
-        std::ofstream(file) << "\x7f"
-                               "ELF\1\1\1"
-                            << std::string(9, '\0')
-                            << Little({0x00280002, 1, 0x20002001, 52, 0, 0, 0x00200034, 1, 0})
-                            << Little({1, 84, 0, 0x20002000, 4, 8, 7, 4}) << "\xfe\xe7\xfe\xe7";
-        return file;
+        static const TemporaryDirectory directory;
+        return directory.Write("loader.out",
+                               "\x7f"
+                               "ELF\1\1\1" +
+                                   std::string(9, '\0') +
+                                   Little({0x00280002, 1, 0x20002001, 52, 0, 0, 0x00200034, 1, 0}) +
+                                   Little({1, 84, 0, 0x20002000, 4, 8, 7, 4}) + "\xfe\xe7\xfe\xe7");
     }();
     return path;
 }

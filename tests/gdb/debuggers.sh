@@ -113,15 +113,19 @@ cat >qemu.gdb <<END
 target remote :$port
 set {int}0x20000010=0x1234
 set \$r7=77
-hbreak *0x3000
 $registers
+file image.elf
+load
+load
+monitor corvane
+compare-sections
+file firmware.elf
+set breakpoint always-inserted on
+hbreak Tick
 load
 $registers
-compare-sections
 monitor system_reset
 maintenance flush register-cache
-delete
-break Tick
 continue
 stepi
 delete
@@ -133,7 +137,8 @@ detach
 END
 timeout --foreground 100 gdb-multiarch -nx -batch -x qemu.gdb firmware.elf >gdb 2>&1 || { cat gdb qemu.refused; exit 1; }
 kill $emulator
-says gdb '^r7 *0x4d' '0x20000010:.0x00001234' '.text.*: matched' 'Breakpoint.*Tick ()' '^0x000000ae in Tick' \
+says gdb '^r7 *0x4d' '0x20000010:.0x00001234' '110.4 KiB in 112 sectors, 110.4 KiB of it' '.large.*: matched' \
+    '.ram.*: matched' 'Breakpoint.*Tick ()' '^0x000000ae in Tick' \
     'received signal SIGINT' '4.5 KiB of it left alone'
 [ -z "$(sed -n '/^</,/^>/ { /^>\|^pc \|^xpsr /d; s/^<//; p; }' gdb | sort | uniq -u)" ] || { cat gdb; exit 1; }
 
