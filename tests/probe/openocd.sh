@@ -18,6 +18,7 @@ sim=quen,flash=128K,erase-time=1ms,chunk-time=1ms
 # attach [FAULT...]: a board with these faults, and a server that has found it. The file keeps what the
 # last board held. OpenOCD hides failed reads unless it is told not to.
 attach() {
+    : >pins  # the last board's port would be found in it
     timeout 200 "$model" "$sim" board.sim "$@" >pins 2>refused &
     board=$!
     : >log
