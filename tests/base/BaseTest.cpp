@@ -2,37 +2,21 @@
 
 #include <gtest/gtest.h>
 
-#include <optional>
-#include <utility>
+#include <string>
 
 #include "base/AddressSet.h"
 #include "base/Crc32.h"
 #include "base/Hex.h"
+#include "tests/support/Cases.h"
 
 namespace base {
 namespace {
 
 TEST(Hex, NumbersAreReadWhole) {
-    const std::pair<const char*, std::optional<std::uint32_t>> cases[] = {
-        {"0", 0},
-        {"0x3FFFF", 0x3FFFF},
-        {"3ffff", 0x3FFFF},
-        {"0XfFfFfFfF", 0xFFFFFFFF},
-        {"", {}},
-        {"0x", {}},
-        {"100000000", {}},
-        {"12-34", {}},
-        {" 1", {}},
-        {"1 ", {}},
-        {"-1", {}},
-        {"+1", {}},
-        {"G1", {}},
-        {"0x0x1", {}},
-        {"0000000000001", 0x1},
-        {"1K", {}},
-    };
-    for (const auto& [text, expected] : cases)
-        EXPECT_EQ(ParseHex32(text), expected) << text;
+    for (const auto& row : test::ReadTable("base/hex.txt", 2)) {
+        const auto number = ParseHex32(test::Unescaped(row[0]));
+        EXPECT_EQ(number ? std::to_string(*number) : "", row[1]) << row[0];
+    }
 }
 
 TEST(Crc32, IsTheOneOfDebuggers) {

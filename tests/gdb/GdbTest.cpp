@@ -149,34 +149,35 @@ TEST(GdbClient, ReadsTargetDescriptions) {
     EXPECT_NE(NumbersIn(deep).find("no XML: </a> expected"), std::string::npos);
 }
 
-// What a server in all-stop mode makes of a read while the program runs.
-TEST(GdbClient, TriesWhetherARunningTargetCanBeAsked) {
-    const struct {
-        std::string answer;
-        const char* result;
-        bool live;
-    } rows[] = {
-        {Framed("00000000"), "done", true},
-        {Framed("E01"), "done", false},
-        {"", "done", false},
-        {Framed("T0b"), "stopped by itself: SIGSEGV", false},
-        {Framed("garbage"), "answered \"garbage\"", false},
-    };
-    for (const auto& row : rows) {
+TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
+    const std::optional<std::string> ok = "+$OK#9a";
+    for (const auto& row : test::ReadTable("gdb/running.txt", 5)) {
+        const bool nonStop = row[0] == "non-stop";
+        bool agreed = false;
         bool running = false;
         Peer peer([&](const std::string& payload) -> std::optional<std::string> {
-            if (payload == "\x03") running = false;
+            if (nonStop && payload.starts_with("qSupported"))
+                return "+" + Framed("QNonStop+;qXfer:features:read+");
+            if (payload.starts_with("QNonStop:")) agreed = payload.back() == '1';
+            if (payload.starts_with("QNonStop:") || payload == "vStopped") return ok;
+            if (agreed != nonStop) return std::nullopt;
             if (payload == "vCont;c") running = true;
+            if (payload == "vCont;c" && nonStop) return ok;
+            if (payload == "\x03" || payload == "vCont;t") running = false;
+            if (payload == "vCont;t") return row[4].empty() ? "+$OK#9a%Stop:T00#94" : row[4];
             if (!running || payload[0] != 'm') return std::nullopt;
-            return row.answer;
+            return row[1];
         });
         GdbOptions options = Quick();
-        options.server = FindProfile("generic");
+        if (!nonStop) options.server = FindProfile("generic");
         const std::string result = ResultOf([&] { return Work(peer.Where(), options); });
-        EXPECT_NE(result.find(row.result), std::string::npos) << row.answer << ": " << result;
+        EXPECT_NE(result.find(row[3]), std::string::npos) << row[1] << ": " << result;
         const auto log = peer.Log();
-        EXPECT_EQ(std::count(log.begin(), log.end(), "m2000100c,4"), row.live) << row.answer;
+        const bool looked = nonStop ? std::count(log.begin(), log.end(), "\x03") == 0
+                                    : std::count(log.begin(), log.end(), "m2000100c,4") == 1;
+        EXPECT_EQ(looked, row[2] == "looks") << row[0] << row[1];
         // Of a server that isn't known, "X" isn't believed.
+        if (nonStop) continue;
         EXPECT_TRUE(std::ranges::none_of(log, [](const auto& one) { return one[0] == 'X'; }));
     }
 }
@@ -197,19 +198,16 @@ TEST(GdbClient, AsksASecondServerAboutTheRunningTarget) {
 }
 
 TEST(GdbClient, RefusesALoaderThatDoesNotFit) {
-    const struct {
-        std::uint32_t ramStart;
-        std::uint32_t ramEnd;
-        std::uint32_t mailbox;
+    struct Row {
+        std::uint32_t ramStart, ramEnd, mailbox;
         const char* refusal;
-    } rows[] = {
-        {0x20000000, 0x20010000, 0x20001000, ""},
-        {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000ffff)"},
-        {0x20000000, 0x20002004, 0x20001000, "outside the RAM"},
-        {0x20000000, 0x20002010, 0x20001000, "leaves 8 bytes for its stack, below 0x20002010"},
-        {0x20000000, 0x20010000, 0x20001FF0, "where its buffers and parameter blocks are"},
     };
-    for (const auto& row : rows) {
+    for (const Row& row :
+         {Row{0x20000000, 0x20010000, 0x20001000, ""},
+          {0x20003000, 0x20010000, 0x20003000, "outside the RAM (0x20003000-0x2000ffff)"},
+          {0x20000000, 0x20002004, 0x20001000, "outside the RAM"},
+          {0x20000000, 0x20002010, 0x20001000, "leaves 8 bytes for its stack, below 0x20002010"},
+          {0x20000000, 0x20010000, 0x20001FF0, "where its buffers and parameter blocks are"}}) {
         Peer peer([](const std::string&) { return std::nullopt; });
         GdbOptions options = Quick();
         options.loader = LoaderFile();
@@ -364,54 +362,6 @@ TEST(GdbClient, KeepsToThePacketSizeAndCutsAtWords) {
             EXPECT_EQ(peer.Log().back(), "M400fd000,4:78563412");
             EXPECT_EQ(breach, "") << packetSize;
         }
-    }
-}
-
-// What a server in non-stop mode answers while the program runs, and whether that makes the client
-// look without stopping it.
-TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
-    const struct {
-        const char* look;  ///< the answer to a read while the program runs; null: the bytes
-        const char* news;  ///< sent along with it
-        const char* result;
-        bool live;
-        const char* stop = "+$OK#9a%Stop:T00#94";  ///< the answer to the request to stop
-    } rows[] = {
-        {nullptr, "", "done", true},
-        {"$E01#a6", "", "done", false},
-        {"", "", "done", false},
-        {"", "", "done", false, "+$E01#a6$OK#9a%Stop:T00#94"},
-        {nullptr, "%Stop:T0bthread:1;#e4", "stopped by itself: SIGSEGV", true},
-        {nullptr, "", "answered \"E22\" to \"vCont;t\"", true, "+$E22#a9"},
-    };
-    for (const auto& row : rows) {
-        bool nonStop = false;
-        bool running = false;
-        Peer peer([&](const std::string& payload) -> std::optional<std::string> {
-            if (payload.starts_with("qSupported"))
-                return "+" + Framed("QNonStop+;qXfer:features:read+");
-            if (payload.starts_with("QNonStop:")) {
-                nonStop = payload.back() == '1';
-                return "+$OK#9a";
-            }
-            if (!nonStop) return std::nullopt;
-            if (payload == "vCont;c") {
-                running = true;
-                return "+$OK#9a";
-            }
-            if (payload == "vCont;t") {
-                running = false;
-                return row.stop;
-            }
-            if (payload == "vStopped") return "+$OK#9a";
-            if (!running || payload[0] != 'm') return std::nullopt;
-            if (row.look != nullptr) return std::string("+") + row.look;
-            return "+" + Framed("00000000") + row.news;
-        });
-        const std::string result = ResultOf([&] { return Work(peer.Where()); });
-        EXPECT_NE(result.find(row.result), std::string::npos) << result;
-        const auto log = peer.Log();
-        EXPECT_EQ(std::count(log.begin(), log.end(), "\x03") == 0, row.live);
     }
 }
 

@@ -325,19 +325,6 @@ TEST(Misbehaving, TargetIsToldOfInBoundedTime) {
     }
 }
 
-// The plug-in cannot see it; whoever compares the flash does.
-TEST(Misbehaving, StuckCellIsFoundByComparing) {
-    RecordingHost host("tolva,flash=32K,stuck-cell=0x1500:0x10");
-    Plugin plugin(host);
-    EXPECT_EQ(test::LoadProgram(plugin, 0), "");
-    EXPECT_EQ(host.errors, std::vector<std::string>());
-    Bytes expected(0x8000, 0xFF);
-    test::PutProgram(expected, 0);
-    const Bytes flash = host.Device().FlashContents();
-    const auto differs = std::ranges::mismatch(flash, expected).in1;
-    EXPECT_EQ(differs - flash.begin(), 0x1500);
-}
-
 // The connection fails for good at each access in turn, while host and user interface go on.
 TEST(Misbehaving, ConnectionIsToldOf) {
     for (std::uint64_t access = 10, failed = 1; failed != 0; ++access) {

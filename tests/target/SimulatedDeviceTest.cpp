@@ -238,18 +238,10 @@ TEST(Device, BehavesAsTold) {
 }
 
 TEST(WriteKey, WrongOneDoesNothing) {
-    const struct {
-        const char* options;
-        std::uint32_t right, wrong;
-    } cases[] = {{"tolva,keyconfig=FFFFFFEF", 0xA442, 0x71D5},
-                 {"pell,keyconfig=FFFFFFEF", 0xA442, 0x71D5},
-                 {"quen", 0xA442, 0x71D5},
-                 {"quen,keyconfig=0", 0xA442, 0x71D5},
-                 {"quen,keyconfig=FFFFFFEF", 0x71D5, 0xA442},
-                 {"velk", 0x71D5, 0xA442},
-                 {"dorna,keyconfig=0x10", 0xA442, 0x71D5},
-                 {"dorna", 0x71D5, 0}};
-    for (const auto& [options, right, wrong] : cases) {
+    for (const auto& row : test::ReadTable("target/write-keys.txt", 3)) {
+        const std::string& options = row[0];
+        const auto right = static_cast<std::uint32_t>(std::stoul(row[1], nullptr, 16));
+        const auto wrong = static_cast<std::uint32_t>(std::stoul(row[2], nullptr, 16));
         DebuggedDevice debugged(options);
         debugged.device.Flash().Preset(0x4000, Bytes{0});
         for (const std::uint32_t key : {wrong, right}) {
@@ -424,25 +416,9 @@ TEST(Contents, MustAgreeWithTheOptions) {
               (std::array{0xFFFFFFFFU, 0xFFFFFFFFU}));
     const std::string contents = EncodeContents(
         target::SimulatedDevice(target::ParseDeviceOptions("velk,flash=1M,revision=B")));
-    const struct {
-        const char* options;
-        const char* error;
-    } cases[] = {
-        {"velk,flash=0x100000,sector=4096,fail-access=7,stuck-cell=fffff", "no error"},
-        {"dorna",
-         "Option \"class\" of the simulated device: dorna is asked for, but the kept device has "
-         "velk;"},
-        {"velk,flash=256K",
-         "Option \"flash\" of the simulated device: 256K is asked for, but the kept device has "
-         "1M;"},
-        {"velk,stuck-cell=100000",
-         "Option \"stuck-cell=0x00100000\" of the simulated device: the flash ends at 0x100000."},
-        {"velk,revision=A",
-         "Option \"revision\" of the simulated device: 0 is asked for, but the kept device has 1;"},
-    };
-    for (const auto& [options, expected] : cases) {
-        const std::string error = ErrorOf([&, &o = options] { Decode(contents, o); });
-        EXPECT_TRUE(error.starts_with(expected)) << error;
+    for (const auto& row : test::ReadTable("target/kept.txt", 2)) {
+        const std::string error = ErrorOf([&] { Decode(contents, row[0]); });
+        EXPECT_TRUE(error.starts_with(row[1].empty() ? "no error" : row[1])) << error;
     }
 }
 

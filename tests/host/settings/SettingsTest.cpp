@@ -10,6 +10,7 @@
 #include "host/facts/SettingKeys.h"
 #include "host/settings/ProjectFile.h"
 #include "host/settings/SettingStore.h"
+#include "tests/support/Cases.h"
 #include "tests/support/FailureOf.h"
 #include "tests/support/TemporaryDirectory.h"
 
@@ -19,28 +20,13 @@ namespace {
 using test::FailureOf;
 
 TEST(Settings, TakeWhatThePluginTakesAndNothingElse) {
-    const struct {
-        const char* key;
-        std::vector<const char*> accepted;
-        std::vector<const char*> refused;
-    } cases[] = {
-        {keys::kReset, {"0", "1"}, {"", "2", "-1", "true", " 1", "10", "+1", "01"}},
-        {keys::kVerbose,
-         {"0", "-1", "2147483647", "-2147483648"},
-         {"", "x", "1.0", " 1", "2147483648", "+", "+7"}},
-        {keys::kTimeout,
-         {"30", "1"},
-         {"", "s", "30s", "2147483648", "0x10", "-1", "0", "1.5", "1e3"}},
-        {keys::kEraseStart, {"0", "0x3FFFF", "ffffffff"}, {"", "xyz", "12-34", "100000000"}},
-        {keys::kEraseType, {"Entire Flash", "By Address Range"}, {"entire flash", "", "x"}},
-        {keys::kChecksumValue, {}, {"", "--", "ffff"}},
-    };
-    for (const auto& [key, accepted, refused] : cases) {
-        const SettingInfo& info = *FindSetting(key);
-        for (const char* text : accepted)
-            EXPECT_EQ(CheckedText(info, text), text) << key;
-        for (const char* text : refused)
-            EXPECT_THROW(CheckedText(info, text), std::invalid_argument) << key << " " << text;
+    for (const auto& row : test::ReadTable("host/settings/texts.txt", 3)) {
+        std::string checked = "refused";
+        try {
+            checked = CheckedText(*FindSetting(row[0]), row[1]);
+        } catch (const std::invalid_argument&) {
+        }
+        EXPECT_EQ(checked, row[2] == "taken" ? row[1] : row[2]) << row[0] << " " << row[1];
     }
     for (const SettingInfo& info : SettingCatalogue()) {
         if (info.form == SettingForm::Published) continue;
@@ -108,20 +94,12 @@ TEST(Settings, AreReadFromEverywhereAndKeptBesideTheUsersFile) {
 
 TEST(Settings, FilesThatAreWrongAreNamedWithTheLine) {
     const test::TemporaryDirectory directory;
-    const std::pair<const char*, const char*> cases[] = {
-        {"FlashTimeoutValue = \"x\"", "line 1: FlashTimeoutValue can't be 'x'"},
-        {"\nFlashNonsense = \"1\"", "line 2: unknown setting 'FlashNonsense'"},
-        {"FlashEraseEndAddr = 20000", "line 1: FlashEraseEndAddr must be a text between quotes"},
-        {"FlashEraseEndAddr = [1]", "line 1: FlashEraseEndAddr must be a text between quotes"},
-        {"FlashVerboseMode = 1\nFlashVerboseMode = 2", "line 2: "},
-        {"DeviceInfoFamily = \"x\"", "only the plug-in writes it"},
-        {"not toml", "line 1: "},
-    };
-    for (const auto& [text, expected] : cases) {
-        const std::string path = directory.Write("wrong.toml", text);
-        const std::string failure = FailureOf([&] { LoadSettings(path, {}); });
-        EXPECT_TRUE(failure.starts_with("3: settings file " + path)) << failure;
-        EXPECT_NE(failure.find(expected), std::string::npos) << failure;
+    for (const auto& row : test::ReadTable("host/settings/wrong.txt", 3)) {
+        const std::string path = directory.Write("wrong.toml", test::Unescaped(row[1]));
+        const bool project = row[0] == "project";
+        const std::string failure = FailureOf(
+            [&] { project ? void(ReadProjectFile(path)) : void(LoadSettings(path, {})); });
+        EXPECT_EQ(failure.find("3: " + row[0] + " file " + path + ": " + row[2]), 0) << failure;
         EXPECT_EQ(failure.find("delete it"), std::string::npos) << "it is the user's own";
     }
     EXPECT_TRUE(FailureOf([&] { LoadSettings(directory.File("none.toml"), {}); }).starts_with("3"));
@@ -146,27 +124,6 @@ TEST(Settings, ProjectFilesNameBoardsAndNothingThatIsRunOrWritten) {
     EXPECT_EQ(project.RequireBoard("b").settings.at(keys::kReset), "0");
     SettingStore store = LoadSettings("/dev/null", {}, {path, project.settings});
     EXPECT_EQ(store.Get(keys::kTimeout), (SettingValue{"5", Origin::Project}));
-
-    const std::pair<const char*, const char*> wrong[] = {
-        {"[board.a]\nplugin = 'x'", "line 2: plugin can't stand in a project file"},
-        {"[board.a]\ninit = 'x'", "line 2: init can't stand in a project file"},
-        {"[board.a]\nsim-file = 'x'", "line 2: sim-file can't stand in a project file"},
-        {"[board.a]\npc = '15,init=x'", "line 2: pc takes one value, without a comma"},
-        {"[board.a]\nlodaer = 'x'", "line 2: a board has no lodaer; did you mean 'loader'?"},
-        {"[board.a]\ngdb = ''", "line 2: gdb is empty"},
-        {"[board.a]\ngdb = [1]", "line 2: gdb must be a text between quotes"},
-        {"board = 'a'", "line 1: board.NAME is a table"},
-        {"default = 'a'", "line 1: there is no [board.a]"},
-        {"gdb = ':3'", "line 1: there is no gdb; a project file has default"},
-        {"[settings]\nFlashVerboseMode = 'x'", "line 2: FlashVerboseMode can't be 'x'"},
-        {"[board.a.settings]\nx = 1", "line 2: unknown setting 'x'"},
-        {"not toml", "line 1: "},
-    };
-    for (const auto& [text, expected] : wrong) {
-        directory.Write("corvane-flash.toml", text);
-        const std::string failure = FailureOf([&] { ReadProjectFile(path); });
-        EXPECT_TRUE(failure.starts_with("3: project file " + path + ": " + expected)) << failure;
-    }
 }
 
 }  // namespace
