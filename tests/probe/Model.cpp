@@ -74,8 +74,7 @@ int Run(const std::vector<std::string>& words) {
     probe::Cable cable(core, faults.cable);
     probe::AccessPort memory(cable);
     probe::DebugPort port(memory);
-    probe::Tap tap(port);
-    probe::Wire wire(tap, cable);
+    probe::Wire wire(port, cable);
 
     gdb::Socket listener = gdb::Socket::Listen(gdb::Address::Parse("127.0.0.1:0"), {});
     fmt::print("{}\n", listener.Port());

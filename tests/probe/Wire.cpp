@@ -25,8 +25,8 @@ std::optional<std::string> Wire::Take(std::string_view characters) {
     std::string levels;
     for (const char character : characters) {
         if (character >= '0' && character <= '7') SetPins(static_cast<unsigned>(character - '0'));
-        if (character == 'R') levels += cable_.IsOff() || tap_.Tdo() ? '1' : '0';
-        if (character == 't' || character == 'u') tap_.Reset();
+        if (character == 'R') levels += cable_.IsOff() || port_.Tdo() ? '1' : '0';
+        if (character == 't' || character == 'u') port_.Reset();
         if (character == 'Q') return std::nullopt;
     }
     return levels;
@@ -36,7 +36,7 @@ void Wire::SetPins(unsigned pins) {
     const bool clock = (pins & 4) != 0;
     const bool rises = clock && !clock_;
     clock_ = clock;
-    if (rises && !cable_.IsOff()) tap_.Clock((pins & 2) != 0, (pins & 1) != 0);
+    if (rises && !cable_.IsOff()) port_.Clock((pins & 2) != 0, (pins & 1) != 0);
 }
 
 }  // namespace probe

@@ -9,7 +9,7 @@
 #include <string_view>
 
 #include "tests/probe/AccessPort.h"
-#include "tests/probe/Tap.h"
+#include "tests/probe/DebugPort.h"
 
 namespace probe {
 
@@ -37,7 +37,7 @@ class Cable final : public Bus {
 
 class Wire {
   public:
-    Wire(Tap& tap, const Cable& cable) : tap_(tap), cable_(cable) {}
+    Wire(DebugPort& port, const Cable& cable) : port_(port), cable_(cable) {}
 
     /// Returns what is to be sent back; nothing when the debugger has left.
     std::optional<std::string> Take(std::string_view characters);
@@ -45,7 +45,7 @@ class Wire {
   private:
     void SetPins(unsigned pins);
 
-    Tap& tap_;
+    DebugPort& port_;
     const Cable& cable_;
     bool clock_ = false;
 };

@@ -6,25 +6,11 @@
 #include <utility>
 #include <vector>
 
-#include "host/driver/FlashHost.h"
 #include "host/facts/SettingKeys.h"
-#include "target/simulated/SimulatedDevice.h"
+#include "tests/host/driver/HostUnderTest.h"
 
 namespace host {
 namespace {
-
-/// A host over a simulated device, with what it says on standard error kept off the screen.
-struct HostUnderTest {
-    explicit HostUnderTest(const std::string& device = "tolva")
-        : target(target::ParseDeviceOptions(device)) {}
-
-    target::SimulatedDevice target;
-    SettingStore settings;
-    Reporter reporter{Reporter::Options{Verbosity::Quiet, false, "none"}};
-    WorkMeter meter{reporter};
-    FlashWatch watch{meter};
-    FlashHost host{target, settings, reporter, watch, "dir/"};
-};
 
 TEST(FlashHost, HoldsThePluginToTheProgressProtocol) {
     using Steps = std::vector<std::function<const char*(FlashHost&)>>;

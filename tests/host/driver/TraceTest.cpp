@@ -6,10 +6,9 @@
 #include <regex>
 #include <utility>
 
-#include "host/driver/FlashHost.h"
 #include "host/driver/TracingHost.h"
 #include "host/facts/LoaderMemory.h"
-#include "target/simulated/SimulatedDevice.h"
+#include "tests/host/driver/HostUnderTest.h"
 #include "tests/support/FailureOf.h"
 #include "tests/support/TemporaryDirectory.h"
 
@@ -54,13 +53,8 @@ TEST(TracingHost, WritesEverySlotWithItsAnswer) {
     const std::string file = directory.File("trace");
     {
         Trace trace(file, Existing::Keep);
-        target::SimulatedDevice device(target::ParseDeviceOptions("tolva,fail-access=3"));
-        SettingStore settings;
-        Reporter reporter({Verbosity::Quiet, false, "none"});
-        WorkMeter meter(reporter);
-        FlashWatch watch(meter);
-        FlashHost next(device, settings, reporter, watch, "dir/");
-        TracingHost host(next, trace);
+        HostUnderTest test("tolva,fail-access=3");
+        TracingHost host(test.host, trace);
         std::uint8_t bytes[8] = {};
         const std::uint16_t half = 0x1234;
         host.GetProperty("FlashTimeoutValue");

@@ -1,5 +1,6 @@
 // The plan of a load.
 
+#include <fmt/format.h>
 #include <gtest/gtest.h>
 
 #include <optional>
@@ -23,70 +24,45 @@ image::Section Bytes(std::uint32_t address, std::size_t count, std::uint8_t valu
     return {address, std::vector<std::uint8_t>(count, value)};
 }
 
-image::Section Joined(image::Section section, const std::vector<image::Section>& more) {
-    for (const image::Section& next : more) {
-        section.bytes.resize(next.address - section.address, 0xFF);
-        section.bytes.insert(section.bytes.end(), next.bytes.begin(), next.bytes.end());
+std::string RangesOf(const auto& parts, auto rangeOf) {
+    std::string text;
+    for (const auto& part : parts) {
+        const base::AddressRange range = rangeOf(part);
+        text += fmt::format("{:x}-{:x} ", range.first, range.last);
     }
-    return section;
+    return text;
 }
 
 TEST(LoadPlan, ErasesJoinsAndCounts) {
     using Kind = EraseChoice::Kind;
-    const FlashGeometry flash{0x10000, 0x400};
-    const image::Section a = Bytes(0x10, 0x20, 1);   // sector 0
-    const image::Section b = Bytes(0x600, 0x10, 2);  // sector 1, behind a short gap
-    const image::Section c =
-        Bytes(0x1000, 0x801, 3);  // sectors 4 to 6, behind a gap of more than one chunk
-    const struct {
-        EraseChoice erase;
-        LoadPlan expected;
-    } cases[] = {
+    image::Image image;  // in sector 0; behind a short gap in sector 1; far behind in 4 to 6
+    for (const auto& [address, bytes] :
+         {Bytes(0x10, 0x20, 1), Bytes(0x600, 0x10, 2), Bytes(0x1000, 0x801, 3)})
+        image.Add(address, bytes, "test");
+    const std::pair<EraseChoice, const char*> cases[] = {
         {{Kind::Necessary, {}},
-         {{Joined(a, {b}), c},
-          {{0, 0x7FF}, {0x1000, 0x1BFF}},
-          0x1400,
-          5,
-          0x831,
-          0xF00,
-          0xBCF,
-          {Kind::Necessary}}},
-        {{Kind::Nothing, {}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Nothing}}},
+         "10-60f 1000-1800 in f00; erased 0-7ff 1000-1bff 1400 in 5, bcf cleared"},
+        {{Kind::Nothing, {}}, "10-2f 600-60f 1000-1800 in 980; erased 0 in 0, 0 cleared"},
         {{Kind::Everything, {}},
-         {{Joined(a, {b}), c},
-          {{0, 0xFFFF}},
-          0x10000,
-          64,
-          0x831,
-          0xF00,
-          0xF7CF,
-          {Kind::Everything}}},
+         "10-60f 1000-1800 in f00; erased 0-ffff 10000 in 64, f7cf cleared"},
         {{Kind::Range, {0x3FF, 0x400}},
-         {{Joined(a, {b}), c},
-          {{0, 0x7FF}},
-          0x800,
-          2,
-          0x831,
-          0xF00,
-          0x7D0,
-          {Kind::Range, {0x3FF, 0x400}}}},
+         "10-60f 1000-1800 in f00; erased 0-7ff 800 in 2, 7d0 cleared"},
         {{Kind::Range, {0x5FF, 0x600}},
-         {{a, b, c},
-          {{0x400, 0x7FF}},
-          0x400,
-          1,
-          0x831,
-          0x980,
-          0x3F0,
-          {Kind::Range, {0x5FF, 0x600}}}},
-        {{Kind::Range, {2, 1}}, {{a, b, c}, {}, 0, 0, 0x831, 0x980, 0, {Kind::Range, {2, 1}}}},
+         "10-2f 600-60f 1000-1800 in 980; erased 400-7ff 400 in 1, 3f0 cleared"},
+        {{Kind::Range, {2, 1}}, "10-2f 600-60f 1000-1800 in 980; erased 0 in 0, 0 cleared"},
     };
-    image::Image image;
-    for (const image::Section& section : {a, b, c})
-        image.Add(section.address, section.bytes, "test");
     for (const auto& [erase, expected] : cases) {
-        EXPECT_EQ(PlanLoad({.erase = erase, .time = {0s, true}}, image, {}, flash), expected)
-            << static_cast<int>(erase.kind) << " " << RangeText(erase.range);
+        const LoadPlan plan = PlanLoad({.erase = erase}, image, {}, {0x10000, 0x400});
+        const auto sections = RangesOf(plan.sections, [](const image::Section& section) {
+            return base::AddressRange{section.address, section.Last()};
+        });
+        const auto erased = RangesOf(plan.erased, [](const auto& run) { return run; });
+        EXPECT_EQ(fmt::format("{}in {:x}; erased {}{:x} in {}, {:x} cleared", sections,
+                              plan.transferBytes, erased, plan.erasedBytes, plan.sectorCount,
+                              plan.clearedBytes),
+                  expected);
+        EXPECT_EQ(plan.imageBytes, 0x831U);
+        EXPECT_EQ(plan.erase, erase);
     }
 }
 
