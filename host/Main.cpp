@@ -1,11 +1,12 @@
 // corvane-flash: programs the flash of Corvane microcontrollers through the flash plug-in.
 
+#include "base/system/Environment.h"
+#include "base/system/Signals.h"
+#include "base/system/StandardStreams.h"
 #include "host/Tool.h"
-#include "host/base/Interrupt.h"
-#include "host/files/Streams.h"
 
 int main(int argc, char** argv) {
-    host::OccupyStandardStreams();
-    host::CatchSignals();
-    return host::RunTool({argv + 1, argv + argc});
+    base::OccupyStandardStreams();
+    base::CatchSignals();
+    return host::RunTool(base::ArgumentWords(argc, argv));
 }

@@ -3,14 +3,14 @@
 #include "host/Tool.h"
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
 #include <exception>
 #include <optional>
-#include <system_error>
 
+#include "base/system/ErrorText.h"
+#include "base/system/StandardStreams.h"
 #include "host/base/Interrupt.h"
 #include "host/cli/CommandLine.h"
 #include "host/commands/Commands.h"
@@ -89,8 +89,7 @@ Outcome Guarded(Reporter& reporter, Action&& action) try {
 /// Results that nobody could receive are no success; a reader that has had enough is.
 Outcome CheckOutput(Outcome outcome, int error, Reporter& reporter) {
     if (error == 0 || error == EPIPE || outcome.status != ExitStatus::Done) return outcome;
-    const std::string text =
-        "can't write to standard output: " + std::generic_category().message(error);
+    const std::string text = "can't write to standard output: " + base::ErrorText(error);
     reporter.ClosingError(text);
     const auto status = Interrupted() ? ExitStatus::Interrupted : ExitStatus::BadFile;
     return {status, text, outcome.result};
@@ -108,7 +107,7 @@ int RunTool(const std::vector<std::string>& words) {
         return Outcome{};
     });
     if (line.command == nullptr) {
-        outcome = CheckOutput(outcome, WriteAll(STDOUT_FILENO, line.answer), early);
+        outcome = CheckOutput(outcome, WriteAll(base::kStandardOutput, line.answer), early);
         if (outcome.status != ExitStatus::Done) early.End(outcome);
         return static_cast<int>(outcome.status);
     }

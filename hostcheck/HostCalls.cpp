@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <string_view>
 
+#include "base/system/ReadableMemory.h"
 #include "hostcheck/HostCheckDevice.h"
 #include "hostcheck/Limits.h"
 #include "plugin/ErrorText.h"
@@ -116,7 +117,7 @@ void HostCheckDevice::RequireSection(const void* data, std::uint32_t address,
             std::to_string(length) + " bytes for " + HexWord(address));
     if (!inFlash) return;
     Bytes bytes(length);
-    Require(length == 0 || CopyReadable(bytes.data(), data, length), call,
+    Require(length == 0 || base::CopyReadable(bytes.data(), data, length), call,
             "as many bytes to read as length says", "fewer");
 }
 

@@ -5,6 +5,7 @@
 #include <chrono>
 
 #include "base/Hex.h"
+#include "base/system/Environment.h"
 #include "host/base/Errors.h"
 #include "host/base/Text.h"
 #include "host/checks/CheckTable.h"
@@ -29,11 +30,11 @@ void RequireInRam(const CheckSubject& subject) {
 
 std::string CheckLoader(CheckSubject& subject) {
     try {
-        subject.opened.RequireLoader(ExecutableDirectory());
+        subject.opened.RequireLoader(base::ExecutableDirectory());
     } catch (const Failure& failure) {
         throw CheckFailed(failure.what());
     }
-    subject.loader = subject.opened.LoaderMemory(ExecutableDirectory());
+    subject.loader = subject.opened.LoaderMemory(base::ExecutableDirectory());
     if (subject.loader->empty()) return "the simulated device has its own";
     base::AddressSet used;
     for (const base::AddressRange& range : *subject.loader)
@@ -53,7 +54,8 @@ std::string CheckRun(CheckSubject& subject) {
     if (!subject.loader || !subject.memory || !subject.resets)
         throw CheckNotMade("it needs the loader, the RAM and a reset");
     target::Target& target = subject.Target();
-    target.LoadProgram(plugin::kLoaderFile, ExecutableDirectory() + plugin::kLoaderSubdirectory);
+    target.LoadProgram(plugin::kLoaderFile,
+                       base::ExecutableDirectory() + plugin::kLoaderSubdirectory);
     target.Run();
     constexpr int kLooks = 5;
     constexpr std::chrono::milliseconds kPause(10);

@@ -6,7 +6,6 @@
 #include <fmt/ranges.h>
 
 #include <algorithm>
-#include <cstdlib>
 
 #include "host/base/Errors.h"
 #include "host/base/Suggestion.h"
@@ -221,11 +220,6 @@ void Place(CommonOptions& common, const GivenOptions& given, const std::string& 
 }
 
 }  // namespace
-
-std::optional<std::string> ProcessEnvironment(const char* name) {
-    const char* text = std::getenv(name);
-    return text == nullptr ? std::nullopt : std::optional<std::string>(text);
-}
 
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
                             const ReadVariable& environment, const ReadProject& project) {

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 
+#include "base/system/Environment.h"
 #include "host/cli/CommonOptions.h"
 #include "host/cli/FollowedLine.h"
 #include "host/settings/ProjectFile.h"
@@ -23,14 +24,13 @@ struct ParsedLine {
 
 /// A variable's text; nothing when it isn't set.
 using ReadVariable = std::function<std::optional<std::string>(const char* name)>;
-std::optional<std::string> ProcessEnvironment(const char* name);
 
 using ReadProject = std::function<ProjectFile()>;
 
 /// Failure (WrongUsage) for a line that makes no sense, and what `project` throws. Commands that
 /// work on no target don't ask for the project.
 ParsedLine ParseCommandLine(const CommandRows& commands, const FollowedLine& line,
-                            const ReadVariable& environment = ProcessEnvironment,
+                            const ReadVariable& environment = base::EnvironmentVariable,
                             const ReadProject& project = ReadNearestProject);
 
 }  // namespace host

@@ -8,7 +8,7 @@
 #include <cstdio>
 #include <vector>
 
-#include "host/base/Terminal.h"
+#include "base/system/Terminal.h"
 #include "host/cli/Words.h"
 
 namespace host {
@@ -20,7 +20,7 @@ constexpr std::size_t kNarrowIndent = 6;
 
 std::size_t LineColumns() {
     static const std::size_t columns =
-        std::clamp<std::size_t>(TerminalColumns(stdout), 21, kPageColumns + 1) - 1;
+        std::clamp<std::size_t>(base::TerminalColumns(stdout), 21, kPageColumns + 1) - 1;
     return columns;
 }
 

@@ -6,13 +6,13 @@
 #include <fmt/ranges.h>
 
 #include <chrono>
-#include <cstdlib>
 #include <filesystem>
 #include <string_view>
 #include <thread>
 #include <utility>
 
 #include "base/Duration.h"
+#include "base/system/Environment.h"
 #include "host/base/Interrupt.h"
 #include "host/targets/ExpectedDevice.h"
 
@@ -98,9 +98,8 @@ Outcome WorkOn(Context& context, Trace* trace, const std::function<Outcome(Flash
 
 /// The logger of the plug-in appends to whatever file its variable names.
 void RequireOtherLog(const Context& context) {
-    const char* log = std::getenv("OSTREL_LOG");
-    if (log != nullptr && std::string_view(log) != "stderr")
-        InputFiles(context).RequireOther(log, "the log (OSTREL_LOG)");
+    const auto log = base::EnvironmentVariable("OSTREL_LOG");
+    if (log && *log != "stderr") InputFiles(context).RequireOther(*log, "the log (OSTREL_LOG)");
 }
 
 void RequireOtherDeviceFile(const Context& context) {

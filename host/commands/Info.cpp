@@ -2,7 +2,7 @@
 
 #include <fmt/format.h>
 
-#include "host/base/Terminal.h"
+#include "base/system/Terminal.h"
 #include "host/cli/Layout.h"
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
@@ -16,7 +16,7 @@ namespace {
 /// Wrapped behind the names where people read it; a line for programs.
 std::string OnThisScreen(const std::string& operations) {
     constexpr std::size_t kNameColumns = 12;
-    if (!IsTerminal(stdout)) return operations;
+    if (!base::IsTerminal(stdout)) return operations;
     std::string text = Wrap(operations, kNameColumns + 1, kNameColumns).substr(1);
     text.pop_back();
     return text;

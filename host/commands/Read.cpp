@@ -1,8 +1,8 @@
 // corvane-flash read: flash into a file, in the format that the file's extension asks for.
 
 #include <fmt/format.h>
-#include <unistd.h>
 
+#include "base/system/Terminal.h"
 #include "host/commands/Command.h"
 #include "host/commands/Commands.h"
 #include "host/commands/SharedOptions.h"
@@ -43,7 +43,7 @@ image::Format CheckOutput(const Context& context, const ReadOptions& options) {
 
 /// A terminal shows what people can read.
 bool WantsDump(const std::string& path, image::Format format) {
-    return path == "-" && format == image::Format::Binary && isatty(STDOUT_FILENO) != 0;
+    return path == "-" && format == image::Format::Binary && base::IsTerminal(stdout);
 }
 
 /// What was read up to the last byte that isn't blank. Failure (ContentsDiffer) when all of it is.

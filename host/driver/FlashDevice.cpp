@@ -10,6 +10,7 @@
 
 #include "base/Crc32.h"
 #include "base/Hex.h"
+#include "base/system/Environment.h"
 #include "host/base/Interrupt.h"
 #include "host/facts/FlashMemory.h"
 #include "host/facts/LoaderMemory.h"
@@ -71,14 +72,14 @@ FlashDevice::FlashDevice(std::unique_ptr<OpenTarget> target, const DeviceOptions
       meter_(reporter),
       watch_(meter_),
       loader_(target_->Get(), watch_),
-      host_(loader_, settings, reporter, watch_, ExecutableDirectory()),
+      host_(loader_, settings, reporter, watch_, base::ExecutableDirectory()),
       trace_(options.trace),
       library_(options.plugin.value_or("")) {
     if (target_->Get().SimulatesTime())
         meter_.SetSimulatedClock([this] { return target_->Get().Now(); });
     if (trace_) {
         tracingHost_.emplace(host_, *trace_);
-        pluginTrace_.emplace(*trace_, library_.Handle());
+        pluginTrace_.emplace(*trace_, library_.Library());
     }
     host_.SetConfirm([this] { return Confirm(); });
     Create();
@@ -149,7 +150,7 @@ base::AddressRange FlashDevice::RangeInFlash(const std::string& text) {
 }
 
 void FlashDevice::RequireLoader() {
-    target_->RequireLoader(ExecutableDirectory());
+    target_->RequireLoader(base::ExecutableDirectory());
 }
 
 void FlashDevice::ResetSettings(plugin::ResetMode mode) {

@@ -2,14 +2,14 @@
 
 #pragma once
 
-#include <memory>
 #include <string>
 
+#include "base/system/SharedLibrary.h"
 #include "plugin/IFlashDevice2.h"
 
 namespace host {
 
-/// The plug-in library's file: the one at `path`; for an empty one, the libflash_corvane.so that
+/// The plug-in library's file: the one at `path`; for an empty one, the flash_corvane library that
 /// was installed with the tool, or else its mere name, which the system's loader looks for.
 std::string PluginFile(const std::string& path);
 
@@ -20,20 +20,14 @@ class PluginLibrary {
     explicit PluginLibrary(const std::string& path);
 
     CreateFlashDevice2Function CreateDevice() const { return create_; }
-    void* Handle() const { return handle_.get(); }
+    const base::SharedLibrary& Library() const { return library_; }
 
     /// The file that was loaded.
     std::string Path() const;
 
   private:
-    struct Unloader {
-        void operator()(void* handle) const;
-    };
-    std::unique_ptr<void, Unloader> handle_;
-    CreateFlashDevice2Function create_ = nullptr;
+    base::SharedLibrary library_;
+    CreateFlashDevice2Function create_;
 };
-
-/// The directory that the running executable lies in, with a slash at its end.
-std::string ExecutableDirectory();
 
 }  // namespace host

@@ -2,16 +2,15 @@
 
 #include "host/driver/Trace.h"
 
-#include <dlfcn.h>
 #include <fmt/format.h>
-#include <sys/file.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <cerrno>
 #include <filesystem>
 #include <system_error>
 
+#include "base/system/ErrorText.h"
+#include "base/system/Files.h"
+#include "base/system/StandardStreams.h"
 #include "host/base/Printable.h"
 #include "host/files/InputFile.h"
 #include "host/files/Streams.h"
@@ -36,14 +35,14 @@ bool IsTrace(const std::string& path) {
 }
 
 base::Descriptor Open(const std::string& path, Existing existing) {
-    if (path == "-") return base::Descriptor(dup(STDERR_FILENO));
+    if (path == "-") return base::Duplicate(base::kStandardError);
     RequireWritable(kTraceFile, path, IsTrace(path) ? Existing::Replace : existing);
     base::Descriptor file = OpenForWriting(kTraceFile, path);
-    struct stat status {};
-    if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode)) return file;
-    if (flock(file.Get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK)
+    const auto status = base::StatusOf(file.Get());
+    if (!status || status->type != base::FileType::Regular) return file;
+    if (base::TryLock(file.Get()) == base::LockState::Busy)
         throw FileFailure(kTraceFile, "write", path, "another run is writing it");
-    if (ftruncate(file.Get(), 0) != 0) throw FileFailure(kTraceFile, "write", path, errno);
+    if (!base::MakeEmpty(file.Get())) throw FileFailure(kTraceFile, "write", path, errno);
     return file;
 }
 
@@ -66,11 +65,11 @@ void Trace::Write(const std::string& text) {
 std::string Trace::Problem() const {
     if (error_ == 0) return {};
     return fmt::format("the trace {} is incomplete: {}", path_ == "-" ? "on standard error" : path_,
-                       std::generic_category().message(error_));
+                       base::ErrorText(error_));
 }
 
-PluginTrace::PluginTrace(Trace& trace, void* library)
-    : setSink_(reinterpret_cast<SetSink>(dlsym(library, "OstrelLoggerSetSink"))) {
+PluginTrace::PluginTrace(Trace& trace, const base::SharedLibrary& library)
+    : setSink_(reinterpret_cast<SetSink>(library.Find("OstrelLoggerSetSink"))) {
     if (setSink_ == nullptr)
         trace.Line("host", "the logging library hands out no lines; its own output has them");
     else

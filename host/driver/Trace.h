@@ -6,7 +6,8 @@
 #include <chrono>
 #include <string>
 
-#include "base/Descriptor.h"
+#include "base/system/Descriptor.h"
+#include "base/system/SharedLibrary.h"
 #include "host/files/OutputFile.h"
 
 namespace host {
@@ -35,11 +36,11 @@ class Trace {
 };
 
 /// Sends the plug-in's trace lines to a trace for as long as it lives. The maker's logging library
-/// can't do that; then the trace says so and has the host's lines only. `library` is the handle of
-/// the loaded plug-in.
+/// can't do that; then the trace says so and has the host's lines only. `library` is the loaded
+/// plug-in.
 class PluginTrace {
   public:
-    PluginTrace(Trace& trace, void* library);
+    PluginTrace(Trace& trace, const base::SharedLibrary& library);
     ~PluginTrace();
 
     PluginTrace(const PluginTrace&) = delete;

@@ -3,19 +3,18 @@
 
 #include "host/files/FileLock.h"
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <sys/file.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <array>
 #include <cerrno>
 #include <chrono>
 #include <filesystem>
 #include <string_view>
+#include <system_error>
 #include <thread>
+#include <utility>
 
+#include "base/system/Files.h"
 #include "host/base/Interrupt.h"
 #include "host/files/OutputFile.h"
 #include "host/files/Streams.h"
@@ -32,10 +31,9 @@ constexpr std::chrono::seconds kPatience{10};
 constexpr std::chrono::milliseconds kLook{20};
 
 bool IsStillThere(const base::Descriptor& file, const std::string& path) {
-    struct stat locked {};
-    struct stat named {};
-    return fstat(file.Get(), &locked) == 0 && stat(path.c_str(), &named) == 0 &&
-           locked.st_dev == named.st_dev && locked.st_ino == named.st_ino;
+    const auto locked = base::StatusOf(file.Get());
+    const auto named = base::StatusOf(path);
+    return locked && named && base::IsSameFile(*locked, *named);
 }
 
 /// What a lock file holds: somebody may have another file of that name.
@@ -43,34 +41,31 @@ constexpr std::string_view kMark = "A lock of corvane-flash\n";
 
 bool HoldsMark(const base::Descriptor& file) {
     std::array<char, kMark.size() + 1> text{};
-    const ssize_t count = pread(file.Get(), text.data(), text.size(), 0);
-    return count > 0 && std::string_view(text.data(), static_cast<std::size_t>(count)) == kMark;
+    const auto count = base::ReadBeginning(file.Get(), text);
+    return count && std::string_view(text.data(), *count) == kMark;
 }
-
-enum class Attempt { Locked, Busy, Impossible };
 
 /// Makes the lock file, or opens the one that is there.
 base::Descriptor OpenLock(const std::string& path, bool& made) {
-    base::Descriptor file(
-        open(path.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0666));
+    base::Descriptor file = base::OpenNew(path);
     made = file.IsOpen();
     if (made) WriteAll(file.Get(), kMark);
-    if (made || errno != EEXIST) return file;
-    return base::Descriptor(open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    return made || errno != EEXIST ? std::move(file) : base::OpenBehindNoLink(path);
 }
 
-Attempt TryLock(base::Descriptor& file, const std::string& path, bool& made) {
+base::LockState Lock(base::Descriptor& file, const std::string& path, bool& made) {
+    std::error_code ignored;
     for (;;) {
         file = OpenLock(path, made);
         const bool gone = !file.IsOpen() && errno == ENOENT;
-        if (gone && access(fs::path(path).parent_path().c_str(), F_OK) == 0) continue;
-        if (!file.IsOpen()) return Attempt::Impossible;
-        if (flock(file.Get(), LOCK_EX | LOCK_NB) != 0) {
-            const bool busy = errno == EWOULDBLOCK;
+        if (gone && fs::exists(fs::path(path).parent_path(), ignored)) continue;
+        if (!file.IsOpen()) return base::LockState::Impossible;
+        const base::LockState state = base::TryLock(file.Get());
+        if (state != base::LockState::Locked) {
             file = base::Descriptor();
-            return busy ? Attempt::Busy : Attempt::Impossible;
+            return state;
         }
-        if (IsStillThere(file, path)) return Attempt::Locked;
+        if (IsStillThere(file, path)) return state;
     }
 }
 
@@ -86,7 +81,7 @@ FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNoti
     : path_(LockPath(path)) {
     if (path_.empty()) return;
     const auto start = Clock::now();
-    for (bool said = false; TryLock(file_, path_, made_) == Attempt::Busy; said = true) {
+    for (bool said = false; Lock(file_, path_, made_) == base::LockState::Busy; said = true) {
         ThrowIfInterrupted();
         if (!said)
             say(fmt::format("another run uses the {} {}; waiting up to {} s", kind.name, path,
@@ -103,7 +98,7 @@ FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNoti
 
 FileLock::~FileLock() {
     if (!file_.IsOpen() || !IsStillThere(file_, path_)) return;
-    if (made_ || HoldsMark(file_)) unlink(path_.c_str());
+    if (made_ || HoldsMark(file_)) base::Remove(path_);
 }
 
 }  // namespace host

@@ -3,10 +3,10 @@
 #include "host/files/FilesInUse.h"
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 #include <filesystem>
 
+#include "base/system/Files.h"
 #include "host/base/Errors.h"
 #include "host/files/FileLock.h"
 #include "host/files/OutputFile.h"
@@ -17,19 +17,16 @@ namespace {
 
 /// A terminal or /dev/null can be read and written at once: nothing gets lost.
 bool IsSameFile(const std::string& one, const std::string& other) {
-    struct stat first {};
-    struct stat second {};
-    const bool firstIsThere = stat(one.c_str(), &first) == 0;
-    const bool secondIsThere = stat(other.c_str(), &second) == 0;
-    if (firstIsThere && secondIsThere)
-        return first.st_dev == second.st_dev && first.st_ino == second.st_ino &&
-               !S_ISCHR(first.st_mode);
+    const auto first = base::StatusOf(one);
+    const auto second = base::StatusOf(other);
+    if (first && second)
+        return base::IsSameFile(*first, *second) && first->type != base::FileType::CharacterDevice;
     std::error_code ignored;
     const auto name = [&](const std::string& path) {
         return std::filesystem::weakly_canonical(std::filesystem::absolute(FollowLinks(path)),
                                                  ignored);
     };
-    return firstIsThere == secondIsThere && name(one) == name(other);
+    return !first && !second && name(one) == name(other);
 }
 
 }  // namespace

@@ -2,16 +2,16 @@
 
 #include "host/files/InputFile.h"
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <poll.h>
-#include <sys/stat.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <system_error>
+#include <span>
 #include <utility>
 
+#include "base/system/ErrorText.h"
+#include "base/system/Files.h"
+#include "base/system/StandardStreams.h"
 #include "host/base/Interrupt.h"
 #include "host/base/Text.h"
 #include "host/files/Streams.h"
@@ -27,21 +27,18 @@ bool IsStandardInput(const FileKind& kind, const std::string& path) {
     return kind.fromStandardInput && path == "-";
 }
 
-/// Blocking is what O_NONBLOCK prevents: the open of a pipe would wait for its writer. Standard
-/// input keeps its mode, which belongs to others as well.
+/// Standard input keeps its mode, which belongs to others as well.
 base::Descriptor Open(const FileKind& kind, const std::string& path) {
-    const int file = IsStandardInput(kind, path)
-                         ? fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, 3)
-                         : open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
-    if (file < 0) throw FileFailure(kind, "read", path, errno);
-    return base::Descriptor(file);
+    base::Descriptor file = IsStandardInput(kind, path) ? base::Duplicate(base::kStandardInput)
+                                                        : base::OpenToRead(path);
+    if (!file.IsOpen()) throw FileFailure(kind, "read", path, errno);
+    return file;
 }
 
 /// The size of a regular file; 0 of everything that doesn't know its own.
 std::uint64_t KnownSize(const base::Descriptor& file) {
-    struct stat status {};
-    const bool known = fstat(file.Get(), &status) == 0 && S_ISREG(status.st_mode);
-    return known ? static_cast<std::uint64_t>(status.st_size) : 0;
+    const auto status = base::StatusOf(file.Get());
+    return status && status->type == base::FileType::Regular ? status->sizeBytes : 0;
 }
 
 }  // namespace
@@ -54,7 +51,7 @@ Failure FileFailure(const FileKind& kind, const char* doing, const std::string& 
 }
 
 Failure FileFailure(const FileKind& kind, const char* doing, const std::string& path, int error) {
-    return FileFailure(kind, doing, path, std::generic_category().message(error));
+    return FileFailure(kind, doing, path, base::ErrorText(error));
 }
 
 InputFile::InputFile(const FileKind& kind, const std::string& path)
@@ -79,14 +76,13 @@ void InputFile::ReadUntil(std::uint64_t bytes) {
         ThrowIfInterrupted();
         const std::size_t had = contents_.size();
         const std::size_t wanted = std::min<std::uint64_t>(kPieceBytes, bytes - had);
-        if (!WaitUntilReady(file_.Get(), POLLIN)) continue;
+        if (!WaitUntilReady(file_.Get(), base::Ready::ToRead)) continue;
         contents_.resize(had + wanted);
-        const ssize_t count = read(file_.Get(), contents_.data() + had, wanted);
+        const auto count = base::ReadFrom(file_.Get(), std::span(contents_).subspan(had));
         const int error = errno;
-        contents_.resize(had + static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
-        ended_ = count == 0;
-        if (count < 0 && error != EINTR && error != EAGAIN)
-            throw FileFailure(kind_, "read", path_, error);
+        contents_.resize(had + count.value_or(0));
+        ended_ = count == 0U;
+        if (!count && error != EAGAIN) throw FileFailure(kind_, "read", path_, error);
     }
 }
 

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <string>
 
-#include "base/Descriptor.h"
+#include "base/system/Descriptor.h"
 #include "host/files/FileKind.h"
 
 namespace host {

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "base/Descriptor.h"
+#include "base/system/Descriptor.h"
 #include "host/files/FileKind.h"
 
 namespace host {

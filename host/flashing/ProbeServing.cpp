@@ -4,6 +4,7 @@
 
 #include <utility>
 
+#include "base/system/Environment.h"
 #include "host/base/Interrupt.h"
 #include "host/flashing/DebuggerLoad.h"
 #include "host/targets/Listening.h"
@@ -37,7 +38,7 @@ std::unique_ptr<gdb::FlashProgrammer> ProbeServing::OpenFlash(gdb::GdbTarget& pr
             return std::make_unique<FlashDevice>(std::make_unique<GdbServerTarget>(probe), options_,
                                                  settings, reporter_);
         },
-        [&probe] { return LoaderMemory(probe, ExecutableDirectory()); }, settings_);
+        [&probe] { return LoaderMemory(probe, base::ExecutableDirectory()); }, settings_);
 }
 
 }  // namespace host

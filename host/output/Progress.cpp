@@ -5,11 +5,10 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <string_view>
 #include <vector>
 
-#include "host/base/Terminal.h"
+#include "base/system/Terminal.h"
 #include "host/base/Text.h"
 
 namespace host {
@@ -49,10 +48,8 @@ std::string Bar(unsigned percent, std::size_t columns) {
 ProgressStyle ChooseStyle(const std::string& option, std::FILE* stream) {
     if (option == "bar") return ProgressStyle::Bar;
     if (option == "plain") return ProgressStyle::Plain;
-    if (option == "none" || !IsTerminal(stream)) return ProgressStyle::None;
-    const char* terminal = std::getenv("TERM");
-    const bool dumb = terminal == nullptr || std::string_view(terminal) == "dumb";
-    return dumb ? ProgressStyle::Plain : ProgressStyle::Bar;
+    if (option == "none" || !base::IsTerminal(stream)) return ProgressStyle::None;
+    return base::KnowsEscapes(stream) ? ProgressStyle::Bar : ProgressStyle::Plain;
 }
 
 std::string BarLine(Phase phase, const PhaseProgress& progress, std::size_t columns) {
@@ -95,7 +92,7 @@ std::string Erasure(std::size_t drawnColumns, std::size_t columns) {
 void ProgressDisplay::DrawBar(Phase phase, const PhaseProgress& progress) {
     if (style_ != ProgressStyle::Bar) return;
     // One column stays free: a terminal wraps when its last one is written.
-    const std::size_t columns = TerminalColumns(stream_);
+    const std::size_t columns = base::TerminalColumns(stream_);
     const std::string line = BarLine(phase, progress, columns - 1);
     write_(Erasure(drawnColumns_, columns) + line);
     drawnColumns_ = line.size();
@@ -111,7 +108,7 @@ void ProgressDisplay::DrawPlain(Phase phase, const PhaseProgress& progress) {
 
 void ProgressDisplay::Clear() {
     if (drawnColumns_ == 0) return;
-    write_(Erasure(drawnColumns_, TerminalColumns(stream_)));
+    write_(Erasure(drawnColumns_, base::TerminalColumns(stream_)));
     drawnColumns_ = 0;
 }
 

@@ -3,13 +3,13 @@
 #include "host/output/Reporter.h"
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 #include <cstdio>
-#include <cstdlib>
 #include <string_view>
 #include <utility>
 
+#include "base/system/Environment.h"
+#include "base/system/StandardStreams.h"
 #include "host/files/Streams.h"
 
 namespace host {
@@ -19,10 +19,7 @@ namespace {
 constexpr int kJsonVersion = 1;
 
 bool WantsColour(std::FILE* stream) {
-    const char* refused = std::getenv("NO_COLOR");
-    const char* terminal = std::getenv("TERM");
-    return isatty(fileno(stream)) != 0 && (refused == nullptr || *refused == '\0') &&
-           terminal != nullptr && std::string_view(terminal) != "dumb";
+    return base::KnowsEscapes(stream) && base::EnvironmentVariable("NO_COLOR").value_or("").empty();
 }
 
 ProgressStyle Style(const Reporter::Options& options) {
@@ -37,7 +34,7 @@ Reporter::Reporter(const Options& options)
       out_(options.json ? stderr : stdout),
       colour_(WantsColour(stderr)),
       display_(Style(options), stderr,
-               [](const std::string& text) { WriteAll(STDERR_FILENO, text); }) {}
+               [](const std::string& text) { WriteAll(base::kStandardError, text); }) {}
 
 void Reporter::Begin(const std::string& command, const Json& target) {
     JsonLine("begin", {{"tool", "corvane-flash " CORVANE_FLASH_VERSION},
@@ -128,7 +125,8 @@ void Reporter::Line(std::FILE* stream, const std::string& text, Breaks breaks) {
 // What can't be written to standard error is lost, and the work goes on.
 void Reporter::Write(std::FILE* stream, const std::string& text) {
     display_.Clear();
-    const int error = WriteAll(fileno(stream), text);
+    const int error =
+        WriteAll(stream == stdout ? base::kStandardOutput : base::kStandardError, text);
     if (stream == stdout && outputError_ == 0) outputError_ = error;
 }
 

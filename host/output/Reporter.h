@@ -8,10 +8,10 @@
 #include <string>
 #include <vector>
 
+#include "base/system/Terminal.h"
 #include "host/base/Errors.h"
 #include "host/base/Json.h"
 #include "host/base/Printable.h"
-#include "host/base/Terminal.h"
 #include "host/output/Progress.h"
 
 namespace host {
@@ -82,7 +82,7 @@ class Reporter {
     int OutputError() const { return outputError_; }
 
     /// How wide the terminal is that shows results.
-    std::size_t Columns() const { return TerminalColumns(out_); }
+    std::size_t Columns() const { return base::TerminalColumns(out_); }
 
     bool Hears(Verbosity level) const { return options_.verbosity >= level; }
 

@@ -5,11 +5,11 @@
 #include <fmt/format.h>
 #include <toml++/toml.h>
 
-#include <cstdlib>
 #include <filesystem>
 #include <sstream>
 #include <string_view>
 
+#include "base/system/Environment.h"
 #include "host/base/Errors.h"
 #include "host/files/InputFile.h"
 #include "host/files/OutputFile.h"
@@ -22,18 +22,6 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr char kCanBeDeleted[] = "; the tool wrote this file and can do without: delete it";
-
-std::string Variable(const char* name) {
-    const char* text = std::getenv(name);
-    return text == nullptr ? "" : text;
-}
-
-std::string ConfigurationDirectory() {
-    // Only an absolute path counts, by the rule of the XDG base directories.
-    if (std::string xdg = Variable("XDG_CONFIG_HOME"); xdg.starts_with('/')) return xdg;
-    if (const std::string home = Variable("HOME"); !home.empty()) return home + "/.config";
-    return {};
-}
 
 /// A file that can't even be looked at (there is no such directory, or it is somebody else's) is
 /// missing.
@@ -49,7 +37,7 @@ SettingPaths FindSettingPaths(const std::string& chosen) {
     paths.userMustExist = !chosen.empty();
     paths.user = chosen;
     if (chosen.empty()) {
-        const std::string directory = ConfigurationDirectory();
+        const std::string directory = base::ConfigurationDirectory();
         if (directory.empty()) return paths;
         paths.user = directory + "/corvane-flash/settings.toml";
     }

@@ -24,7 +24,7 @@ struct SettingPaths {
 };
 
 /// `chosen` is the file that the command line names. Without one, the user's file lies in
-/// corvane-flash/settings.toml below XDG_CONFIG_HOME or ~/.config. Beside a chosen one that is no
+/// corvane-flash/settings.toml in the user's directory for that. Beside a chosen one that is no
 /// regular file (a pipe, a device) nothing is kept.
 SettingPaths FindSettingPaths(const std::string& chosen);
 

@@ -3,11 +3,11 @@
 #include "host/settings/SettingStore.h"
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 #include <stdexcept>
 #include <string_view>
 
+#include "base/system/Environment.h"
 #include "host/base/Errors.h"
 #include "host/base/MacAddress.h"
 #include "host/facts/SettingKeys.h"
@@ -69,8 +69,8 @@ void SettingStore::Save(const WaitNotice& say) {
         throw Failure(
             ExitStatus::BadFile,
             paths_.user.empty()
-                ? "no place to keep settings: neither XDG_CONFIG_HOME nor HOME is set; name a file "
-                  "with --settings"
+                ? fmt::format("no place to keep settings: {}; name a file with --settings",
+                              base::kNoConfigurationDirectory)
                 : fmt::format("no place to keep settings: {} is no regular file; name another with "
                               "--settings",
                               paths_.user));
@@ -140,8 +140,8 @@ SettingStore LoadSettings(const std::string& settingsFile,
         store.Set(Origin::UserFile, key, text);
     for (const auto& [key, text] : ReadSettingFile(paths.kept, false, true))
         if (!IsOfOneBoard(key)) store.Set(Origin::Kept, key, text);
-    for (char** variable = environ; *variable != nullptr; ++variable)
-        if (const std::string text = *variable; text.starts_with(kEnvironmentPrefix))
+    for (const std::string& text : base::EnvironmentVariables())
+        if (text.starts_with(kEnvironmentPrefix))
             Assign(store, Origin::Environment, text.substr(kEnvironmentPrefix.size()),
                    "environment variable " + text.substr(0, text.find('=')));
     for (const std::string& assignment : assignments)

@@ -38,8 +38,8 @@ class Debugger {
         int ends[2] = {};
         if (socketpair(AF_UNIX, SOCK_STREAM, 0, ends) != 0) throw SocketError("no pair");
         handle_ = ends[0];
-        own_ = Socket(ends[0], {});
-        client_.emplace(target::gdb::Reception::Client{Socket(ends[1], {}), ""});
+        own_ = Socket(base::TcpSocket(ends[0]), {});
+        client_.emplace(target::gdb::Reception::Client{Socket(base::TcpSocket(ends[1]), {}), ""});
         if (way == Way::Plain) client_->StopAcknowledging();
         session_.emplace(*client_, *probe_, open_, complain_);
     }

@@ -2,16 +2,14 @@
 
 #include "target/gdb/client/LoaderFile.h"
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <cerrno>
-#include <system_error>
+#include <span>
 
-#include "base/Descriptor.h"
 #include "base/Elf.h"
+#include "base/system/ErrorText.h"
+#include "base/system/Files.h"
 #include "target/Target.h"
 
 namespace target::gdb {
@@ -23,31 +21,24 @@ constexpr std::uint64_t kFileBytesMax = std::uint64_t{64} << 20;
 constexpr std::uint64_t kMemoryBytesMax = std::uint64_t{16} << 20;
 
 [[noreturn]] void RefuseForError(const std::string& path, const char* what) {
-    RefuseLoader(path,
-                 fmt::format("can't be {}: {}", what, std::generic_category().message(errno)));
-}
-
-/// Doesn't wait for the writer of a pipe, which is no loader anyway.
-base::Descriptor OpenFile(const std::string& path) {
-    base::Descriptor file(open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-    if (!file.IsOpen()) RefuseForError(path, "opened");
-    return file;
+    RefuseLoader(path, fmt::format("can't be {}: {}", what, base::ErrorText(errno)));
 }
 
 std::string ReadContents(const std::string& path) {
-    const base::Descriptor file = OpenFile(path);
-    struct stat status {};
-    if (fstat(file.Get(), &status) != 0 || !S_ISREG(status.st_mode))
+    // Doesn't wait for the writer of a pipe, which is no loader anyway.
+    const base::Descriptor file = base::OpenToRead(path);
+    if (!file.IsOpen()) RefuseForError(path, "opened");
+    const auto status = base::StatusOf(file.Get());
+    if (!status || status->type != base::FileType::Regular)
         RefuseLoader(path, "is no regular file");
-    const auto size = static_cast<std::uint64_t>(status.st_size);
-    if (size > kFileBytesMax)
+    if (status->sizeBytes > kFileBytesMax)
         RefuseLoader(path, "is too large for a program in a microcontroller's RAM");
-    std::string contents(size, '\0');
+    std::string contents(status->sizeBytes, '\0');
     for (std::size_t done = 0; done < contents.size();) {
-        const ssize_t got = read(file.Get(), contents.data() + done, contents.size() - done);
-        if (got < 0 && errno != EINTR) RefuseForError(path, "read");
-        if (got == 0) contents.resize(done);  // it became shorter just now
-        if (got > 0) done += static_cast<std::size_t>(got);
+        const auto got = base::ReadFrom(file.Get(), std::span(contents).subspan(done));
+        if (!got && errno != EAGAIN) RefuseForError(path, "read");
+        if (got == 0U) contents.resize(done);  // it became shorter just now
+        done += got.value_or(0);
     }
     return contents;
 }

@@ -11,6 +11,8 @@
 #include <string>
 #include <string_view>
 
+#include "base/system/TcpSocket.h"
+
 namespace target::gdb {
 
 using Deadline = std::chrono::steady_clock::time_point;
@@ -41,10 +43,7 @@ struct Address {
 class Socket {
   public:
     Socket() = default;
-    Socket(int descriptor, InterruptCheck interrupted);
-    ~Socket();
-    Socket(Socket&& other) noexcept;
-    Socket& operator=(Socket&& other) noexcept;
+    Socket(base::TcpSocket socket, InterruptCheck interrupted);
 
     /// A connection to the first of the host's addresses that takes one.
     static Socket Connect(const Address& address, Deadline deadline,
@@ -54,7 +53,7 @@ class Socket {
     static Socket Listen(const Address& address, InterruptCheck interrupted);
 
     /// The port that a listening socket got.
-    std::uint16_t Port() const;
+    std::uint16_t Port() const { return socket_.Port(); }
 
     /// The next client; an unconnected socket when none came before the deadline.
     Socket Accept(Deadline deadline);
@@ -66,11 +65,11 @@ class Socket {
     /// interrupted the work.
     Deadline Until(Deadline deadline) const;
 
-    bool IsOpen() const { return descriptor_ >= 0; }
-    void Close();
+    bool IsOpen() const { return socket_.IsOpen(); }
+    void Close() { socket_ = {}; }
 
     /// The peer reads what was written, and then that there is no more.
-    void EndWriting() const;
+    void EndWriting() const { socket_.EndSending(); }
 
     /// What has arrived, as soon as anything has; an empty text when nothing came before the
     /// deadline. SocketError when the connection is closed or broken.
@@ -80,10 +79,10 @@ class Socket {
     void Write(std::string_view bytes, Deadline deadline);
 
   private:
-    bool Await(short events, Deadline deadline) const;
-    static bool Poll(std::span<const Socket* const> sockets, short events, Deadline deadline);
+    bool Await(base::Ready ready, Deadline deadline) const;
+    static bool Await(std::span<const Socket* const> sockets, base::Ready ready, Deadline deadline);
 
-    int descriptor_ = -1;
+    base::TcpSocket socket_;
     InterruptCheck interrupted_;
 };
 

@@ -2,13 +2,13 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
-#include <poll.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <csignal>
 #include <thread>
 
+#include "base/system/Signals.h"
 #include "host/base/Interrupt.h"
 #include "host/files/FileLock.h"
 #include "host/files/InputFile.h"
@@ -34,24 +34,25 @@ constexpr int kNo = 8;
 TEST(InterruptDeathTest, IsRememberedOnceAndEndsTheProcessTheSecondTime) {
     for (const int number : {SIGINT, SIGTERM, SIGHUP}) {
         // Signals that come together are one wish.
-        EXPECT_EXIT((CatchSignals(), raise(number), raise(number), Answer(Interrupted())),
+        EXPECT_EXIT((base::CatchSignals(), raise(number), raise(number), Answer(Interrupted())),
                     ExitedWithCode(kYes), "");
-        EXPECT_EXIT((CatchSignals(), raise(number), std::this_thread::sleep_for(250ms),
+        EXPECT_EXIT((base::CatchSignals(), raise(number), std::this_thread::sleep_for(250ms),
                      raise(number), Answer(true)),
                     KilledBySignal(number), "");
     }
-    EXPECT_EXIT((signal(SIGHUP, SIG_IGN), CatchSignals(), raise(SIGHUP), Answer(Interrupted())),
-                ExitedWithCode(kNo), "");
-    EXPECT_EXIT((CatchSignals(), raise(SIGPIPE), raise(SIGXFSZ), Answer(Interrupted())),
+    EXPECT_EXIT(
+        (signal(SIGHUP, SIG_IGN), base::CatchSignals(), raise(SIGHUP), Answer(Interrupted())),
+        ExitedWithCode(kNo), "");
+    EXPECT_EXIT((base::CatchSignals(), raise(SIGPIPE), raise(SIGXFSZ), Answer(Interrupted())),
                 ExitedWithCode(kNo), "");
 }
 
 TEST(InterruptDeathTest, IsHeldBackWhereAFileWouldBeLeftBehind) {
     const auto hold = [] {
-        CatchSignals();
+        base::CatchSignals();
         bool held = false;
         {
-            const SignalsHeld signals;
+            const base::SignalsHeld signals;
             raise(SIGTERM);
             held = !Interrupted();
         }
@@ -67,15 +68,15 @@ TEST(InterruptDeathTest, EndsEveryWait) {
     ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
     const base::Descriptor both(open(pipe.c_str(), O_RDWR | O_NONBLOCK));
     const auto interrupt = [] {
-        CatchSignals();
+        base::CatchSignals();
         raise(SIGINT);
     };
     const auto endsWith = [&](const auto& wait) {
         interrupt();
         Answer(test::FailureOf(wait) == "130: interrupted");
     };
-    EXPECT_EXIT((interrupt(), Answer(!WaitUntilReady(both.Get(), POLLIN))), ExitedWithCode(kYes),
-                "");
+    EXPECT_EXIT((interrupt(), Answer(!WaitUntilReady(both.Get(), base::Ready::ToRead))),
+                ExitedWithCode(kYes), "");
     EXPECT_EXIT((interrupt(), Answer(WriteAll(both.Get(), std::string(100000, 'x')) == EINTR)),
                 ExitedWithCode(kYes), "");
     EXPECT_EXIT(endsWith([&] { ReadWholeFile(kNote, pipe); }), ExitedWithCode(kYes), "");

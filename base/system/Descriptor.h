@@ -1,8 +1,6 @@
-// An open file descriptor that is closed when its owner goes.
+// An open file that is closed when its owner goes.
 
 #pragma once
-
-#include <unistd.h>
 
 #include <utility>
 
@@ -22,7 +20,7 @@ class Descriptor {
     int Get() const { return number_; }
 
     /// False, with errno, when what was written before could not be kept.
-    bool Close() { return !IsOpen() || close(std::exchange(number_, -1)) == 0; }
+    bool Close();
 
   private:
     int number_;
