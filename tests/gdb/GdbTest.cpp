@@ -150,7 +150,7 @@ TEST(GdbClient, ReadsTargetDescriptions) {
 }
 
 TEST(GdbClient, ReadsARunningTargetWhereTheServerCan) {
-    const std::optional<std::string> ok = "+$OK#9a";
+    const std::string ok = "+$OK#9a";
     for (const auto& row : test::ReadTable("gdb/running.txt", 5)) {
         const bool nonStop = row[0] == "non-stop";
         bool agreed = false;

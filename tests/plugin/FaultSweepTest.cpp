@@ -11,10 +11,12 @@
 
 #include <algorithm>
 #include <iostream>
+#include <map>
 #include <random>
 #include <span>
-#include <string_view>
 
+#include "base/Hex.h"
+#include "tests/support/Cases.h"
 #include "tests/support/Program.h"
 
 namespace {
@@ -25,33 +27,32 @@ using test::TextOf;
 using namespace std::chrono_literals;
 using Bytes = std::vector<std::uint8_t>;
 
+// "KEY=TEXT; KEY=TEXT"
+test::Settings SettingsOf(const std::string& text) {
+    test::Settings settings;
+    if (text.empty()) return settings;
+    for (const std::string& setting : test::Split(text, "; "))
+        settings[setting.substr(0, setting.find('='))] = setting.substr(setting.find('=') + 1);
+    return settings;
+}
+
 // An erase option, and what it may change: from the first byte up to the one before the end.
 struct EraseOption {
-    std::string_view name;
     std::uint32_t begin;
     std::uint32_t end;
     test::Settings settings;
 };
 
-const EraseOption EraseOptions[] = {
-    {"Pages", 0x1000, 0x2C00, {{"FlashVerboseMode", "1"}}},
-    {"Range",
-     0x0C00,
-     0x2C00,
-     {{"FlashProgramOption", "Use the Erase Options Specified Below"},
-      {"FlashEraseStartAddr", "C01"},
-      {"FlashEraseEndAddr", "0x2800"}}},
-    {"Whole",
-     0,
-     ~0U,
-     {{"FlashProgramOption", "Use the Erase Options Specified Below"},
-      {"FlashEraseType", "Entire Flash"},
-      {"FlashProgramBlankCheckOption", "1"}}},
-    {"Nothing",
-     0x13F0,
-     0x2858,
-     {{"FlashProgramOption", "Do Not Erase Flash Memory"}, {"FlashResetSetting", "0"}}},
-};
+const std::map<std::string, EraseOption>& EraseOptions() {
+    static const auto options = [] {
+        std::map<std::string, EraseOption> read;
+        for (const auto& row : test::ReadTable("plugin/erase-options.txt", 4))
+            read[row[0]] = {base::ParseHex32(row[1]).value(), base::ParseHex32(row[2]).value(),
+                            SettingsOf(row[3])};
+        return read;
+    }();
+    return options;
+}
 
 // The user registers as they read, then as they were committed.
 using Registers = std::array<std::uint32_t, 4>;
@@ -71,20 +72,20 @@ struct Work {
     std::string name;
     std::string device;
     test::Settings settings;
-    const char* operation = nullptr;        ///< null for a program load
+    std::string operation = {};             ///< empty for a program load
     const EraseOption* erase = nullptr;     ///< of a load or an erase
     test::Settings published = {};          ///< by a success
     Registers registers = RegistersBefore;  ///< after a success
 
-    bool Loads() const { return operation == nullptr; }
-    bool Erases() const { return erase != nullptr && erase->name != "Nothing"; }
+    bool Loads() const { return operation.empty(); }
+    bool Erases() const { return erase != nullptr && erase != &EraseOptions().at("Nothing"); }
 
     // Each attempt loads another version, unless the cells could not take it.
     int Version(int attempt) const { return Erases() ? attempt : 0; }
 
     std::string Run(Plugin& plugin, int attempt) const {
         return Loads() ? test::LoadProgram(plugin, Version(attempt))
-                       : TextOf(plugin->PerformOperation(operation));
+                       : TextOf(plugin->PerformOperation(operation.c_str()));
     }
     // The part of the flash that may change; empty for what touches none.
     std::span<std::uint8_t> MayChange(Bytes& flash) const {
@@ -118,34 +119,29 @@ void PrintTo(const Work& work, std::ostream* out) {
 }
 
 std::vector<Work> AllWorks() {
-    const test::Settings verbose = {{"FlashVerboseMode", "1"}};
-    std::vector<Work> works = {
-        {"EraseWhole", "mesk,flash=96K", EraseOptions[2].settings, "Erase", &EraseOptions[2]},
-        {"EraseRange", "quen,flash=64K", EraseOptions[1].settings, "Erase", &EraseOptions[1]},
-        {"BlankCheck", "tolva,flash=64K", verbose, "BlankCheck"},
-        {"Test", "tolva", {}, "Test"},
-    };
-    const auto add = [&](const char* operation, const char* device, const char* setting,
-                         const char* published, Registers registers = RegistersBefore) {
-        works.push_back({operation, device, verbose, operation, nullptr, {}, registers});
-        if (setting != nullptr) works.back().published = {{setting, published}};
-    };
-    add("CalculateChecksum", "tolva,flash=64K", "FlashChecksumValue", "deab7e4e");
-    add("ReadUserRegister0", "tolva", "FlashUserRegister0Input", "ffffffff");
-    add("ReadUserRegister1", "tolva", "FlashUserRegister1Input", "ffffffff");
-    add("ReadMACAddress", "tolva", "FlashMACAddrInput", "ff-ff-ff-ff-ff-ff");
-    add("ProgramUserRegister0", "tolva", nullptr, nullptr, {0x12AB, ~0U, ~0U, ~0U});
-    add("ProgramUserRegister1", "quen", nullptr, nullptr, {~0U, 0xABCDEF01, ~0U, 0xABCDEF01});
-    add("ProgramMACAddress", "dorna", nullptr, nullptr, {0xC31B02, 0x60504, 0xC31B02, 0x60504});
+    std::vector<Work> works;
+    for (const auto& row : test::ReadTable("plugin/works.txt", 5)) {
+        works.push_back({row[0], row[1], {{"FlashVerboseMode", "1"}}, row[0]});
+        Work& work = works.back();
+        work.published = SettingsOf(row[3]);
+        if (!row[2].empty()) {
+            work.operation = "Erase";
+            work.erase = &EraseOptions().at(row[2]);
+            work.settings = work.erase->settings;
+        }
+        std::istringstream registers(row[4]);
+        for (std::uint32_t& value : work.registers)
+            if (std::uint32_t given = 0; registers >> std::hex >> given) value = given;
+    }
     for (const char* device :
          {"ravik,flash=32K", "tolva,flash=32K", "mesk,flash=32K", "orrin,flash=32K",
           "pell,flash=32K", "quen,flash=32K,keyconfig=EF,chunk-time=20ms",
           "dorna,flash=130K,sector=1K,ram=8K"}) {
-        for (const EraseOption& erase : EraseOptions) {
+        for (const auto& [option, erase] : EraseOptions()) {
             const std::string name(device, std::find(device, device + 8, ','));
-            works.push_back({fmt::format("Load_{}_{}", name, erase.name),
+            works.push_back({fmt::format("Load_{}_{}", name, option),
                              std::string(device) + ",erase-time=4ms,mass-erase-time=8ms",
-                             erase.settings, nullptr, &erase});
+                             erase.settings, "", &erase});
             works.back().settings.insert({"FlashProgramCRCOption", "1"});
         }
     }
@@ -288,37 +284,16 @@ TEST_P(FaultSweep, OfPairsOfCalls) {
 INSTANTIATE_TEST_SUITE_P(, FaultSweep, testing::ValuesIn(AllWorks()),
                          [](const auto& work) { return work.param.name; });
 
-// A target that misbehaves, what the user is told, and whether that is all: an erase that fails
-// is told and the load goes on.
-struct Misbehaviour {
-    const char* fault;
-    int erase;  ///< index of the erase option
-    const char* told;
-};
-
+// What the user is told is all: an erase that fails is told and the load goes on.
 TEST(Misbehaving, TargetIsToldOfInBoundedTime) {
-    const Misbehaviour rows[] = {
-        {"erase=never", 0, "Erasing flash contents timed out!"},
-        {"erase=never", 1, "Erasing flash contents timed out!"},
-        {"erase=never", 2, "Erasing all of the flash contents failed!"},
-        {"loader=hangs", 0, "Flash programming timed out."},
-        {"loader=dead", 3, "Flash programming timed out."},
-        {"registers=ones", 0, "Erasing flash contents timed out!"},
-        {"registers=ones", 2, "Erasing all of the flash contents failed!"},
-        {"registers=zeros", 0, "Invalid Address Range for erase operation!"},
-        {"registers=zeros", 1, "Invalid Address Range for erase operation!"},
-        {"registers=zeros", 2, "Invalid range given for Blank Check."},
-        {"stuck-cell=0x1500:0x10", 2, "Error during Blank Check @ address 0x1500"},
-    };
-    for (const Misbehaviour& row : rows) {
-        SCOPED_TRACE(fmt::format("{} {}", row.fault, EraseOptions[row.erase].name));
-        RecordingHost host(fmt::format("tolva,flash=32K,{}", row.fault),
-                           EraseOptions[row.erase].settings);
+    for (const auto& row : test::ReadTable("plugin/misbehaving.txt", 3)) {
+        SCOPED_TRACE(row[0] + " " + row[1]);
+        RecordingHost host("tolva,flash=32K," + row[0], EraseOptions().at(row[1]).settings);
         Plugin plugin(host);
         host.Restart({});
         test::LoadProgram(plugin, 0);
         const auto told = fmt::format("{}", fmt::join(host.errors, "\n"));
-        EXPECT_NE(told.find(row.told), std::string::npos) << told;
+        EXPECT_NE(told.find(row[2]), std::string::npos) << told;
         const auto [link, pauses, clock] = host.Device().Time();
         EXPECT_LT(link + pauses + clock, std::chrono::seconds(60));
         EXPECT_LT(host.calls, 5000U);
