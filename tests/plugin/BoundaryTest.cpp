@@ -76,39 +76,6 @@ TEST(Identification, OfEveryClass) {
     }
 }
 
-TEST(Addresses, AreComparedStrictlyInThirtyTwoBits) {
-    RecordingHost host("tolva,flash=256K");
-    Plugin plugin(host);
-    const auto within = [&](std::uint64_t address, auto... size) {
-        bool result = true;
-        const std::string error = TextOf(plugin->AddressWithinFlash(address, size..., &result));
-        return error.empty() ? std::string(result ? "yes" : "no") : error;
-    };
-    const std::string tooBig = "Address value is too big";
-    EXPECT_EQ(within(0x3FFFF), "yes");
-    EXPECT_EQ(within(0x40000), "no");
-    EXPECT_EQ(within(0xFFFFFFFF), "no");
-    EXPECT_EQ(within(0x100000000), tooBig);
-    EXPECT_EQ(within(0x3F000, 0xFFF), "yes");
-    EXPECT_EQ(within(0x3F000, 0x1000), "no");
-    EXPECT_EQ(within(0x1000, -0x1000), "yes");
-    EXPECT_EQ(within(0x1000, -0x1001), "no");
-    EXPECT_EQ(within(0x40000, -1), "no");
-    EXPECT_EQ(within(0x1000, INT32_MIN), "no");
-    EXPECT_EQ(within(~0ull, 0), tooBig);
-
-    bool special = true;
-    EXPECT_EQ(TextOf(plugin->AddressWithinSpecialRegion(~0ull, &special)), tooBig);
-    EXPECT_TRUE(special);
-    EXPECT_EQ(plugin->AddressWithinSpecialRegion(0, &special), nullptr);
-    EXPECT_FALSE(special);
-    EXPECT_EQ(TextOf(plugin->WriteDataToFlash(static_cast<const unsigned char*>(nullptr),
-                                              0x100000000, 0, 0)),
-              tooBig);
-    EXPECT_EQ(TextOf(plugin->WriteDataToFlash(static_cast<const uint16_t*>(nullptr), 0, 0, 0)),
-              "Unsupported target data type");
-}
-
 TEST(ErrorTexts, StayReadableUntilTheNextFailure) {
     RecordingHost host;
     Plugin plugin(host);

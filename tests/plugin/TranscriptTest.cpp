@@ -48,8 +48,9 @@ class Stage {
         std::getline(words >> std::ws, rest);
         return rest;
     }
-    static std::uint32_t Hex(Words& words) {
-        std::uint32_t number = 0;
+    template <typename Number = std::uint32_t>
+    static Number Hex(Words& words) {
+        Number number = 0;
         words >> std::hex >> number >> std::dec;
         return number;
     }
@@ -72,17 +73,31 @@ class Stage {
         Returned("Initialize", plugin_->Initialize(&flash, &operations));
         host_.transcript.push_back((flash ? "flash, " : "no flash, ") + std::string(operations));
     }
+    // An answer is stored with success alone.
+    void Answered(const char* call, const char* error, bool answer) {
+        Returned(call, error);
+        host_.transcript.back() += error == nullptr ? (answer ? ": yes" : ": no")
+                                   : answer         ? ""
+                                                    : ", and stored an answer";
+    }
     void Within(Words& words) {
-        bool within = false;
-        const std::uint32_t address = Hex(words);
-        int size = 0;
-        Returned("AddressWithinFlash", words >> size
-                                           ? plugin_->AddressWithinFlash(address, size, &within)
-                                           : plugin_->AddressWithinFlash(address, &within));
+        bool within = true;
+        const auto address = Hex<std::uint64_t>(words);
+        std::int32_t size = 0;
+        const char* const error = words >> size
+                                      ? plugin_->AddressWithinFlash(address, size, &within)
+                                      : plugin_->AddressWithinFlash(address, &within);
+        Answered("AddressWithinFlash", error, within);
     }
     void Special(Words& words) {
-        bool within = false;
-        Returned("special region", plugin_->AddressWithinSpecialRegion(Hex(words), &within));
+        bool special = true;
+        const char* const error =
+            plugin_->AddressWithinSpecialRegion(Hex<std::uint64_t>(words), &special);
+        Answered("special region", error, special);
+    }
+    void LoadHalfwords(Words& /*words*/) {
+        const std::uint16_t* const none = nullptr;
+        Returned("WriteDataToFlash", plugin_->WriteDataToFlash(none, 0, 0, 0));
     }
     void Create(Words& words) {
         RecordingHost other(Rest(words));
@@ -94,7 +109,7 @@ class Stage {
         static std::vector<std::uint8_t> bytes(8192);
         std::iota(bytes.begin(), bytes.end(), std::uint8_t{1});
         host_.data = bytes.data();
-        const std::uint32_t address = Hex(words);
+        const auto address = Hex<std::uint64_t>(words);
         std::uint32_t length = 0;
         words >> length;
         Returned("WriteDataToFlash", plugin_->WriteDataToFlash(bytes.data(), address, length, 1));
@@ -168,11 +183,22 @@ class Stage {
 };
 
 const std::map<std::string, void (Stage::*)(Stage::Words&)> Stage::kSteps = {
-    {"initialize", &Stage::Initialize}, {"within", &Stage::Within}, {"special", &Stage::Special},
-    {"create", &Stage::Create},         {"load", &Stage::Load},     {"reset", &Stage::Reset},
-    {"perform", &Stage::PerformStep},   {"range", &Stage::Range},   {"write", &Stage::Write},
-    {"preset", &Stage::Preset},         {"fail", &Stage::Fail},     {"fail-next", &Stage::FailNext},
-    {"count", &Stage::Count},           {"drop", &Stage::Drop},     {"on", &Stage::On},
+    {"initialize", &Stage::Initialize},
+    {"within", &Stage::Within},
+    {"special", &Stage::Special},
+    {"create", &Stage::Create},
+    {"load", &Stage::Load},
+    {"load-halfwords", &Stage::LoadHalfwords},
+    {"reset", &Stage::Reset},
+    {"perform", &Stage::PerformStep},
+    {"range", &Stage::Range},
+    {"write", &Stage::Write},
+    {"preset", &Stage::Preset},
+    {"fail", &Stage::Fail},
+    {"fail-next", &Stage::FailNext},
+    {"count", &Stage::Count},
+    {"drop", &Stage::Drop},
+    {"on", &Stage::On},
 };
 
 class TranscriptTest : public testing::TestWithParam<Scenario> {};

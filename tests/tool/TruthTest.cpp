@@ -231,13 +231,19 @@ std::vector<std::string> ToolRuns::FalseClaims(const Work& work, const Said& sai
     return untrue;
 }
 
-void Check(const ToolRuns& runs, const Work& work, const std::string& fault, Said& said) {
-    runs.PutBack();
-    said = runs.Run(work.words, fault);
-    for (const std::string& text : runs.FalseClaims(work, said, ToolRuns::ReadDevice(fault)))
-        ADD_FAILURE() << "not true: " << text << "\n--sim " << kDevice << fault << ' '
+void Check(const ToolRuns& runs, const Work& work, const std::string& fault, const Said& said,
+           const Contents& now) {
+    for (const std::string& text : runs.FalseClaims(work, said, now))
+        ADD_FAILURE() << "not true: " << text << "\nwith " << fault << ": "
                       << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
                       << said.text << said.end;
+}
+
+Said CheckWith(const ToolRuns& runs, const Work& work, const std::string& fault) {
+    runs.PutBack();
+    const Said said = runs.Run(work.words, fault);
+    Check(runs, work, std::string("--sim ") + kDevice + fault, said, ToolRuns::ReadDevice(fault));
+    return said;
 }
 
 TEST(Truth, HoldsWhateverAccessFails) {
@@ -247,8 +253,7 @@ TEST(Truth, HoldsWhateverAccessFails) {
             // A fault that is swallowed doesn't end the sweep; one that comes too late does.
             int done = 0;
             for (int access = 1; done < 3 && !testing::Test::HasFailure(); ++access) {
-                Said said;
-                Check(runs, work, fmt::format(",{}={}", fault, access), said);
+                const Said said = CheckWith(runs, work, fmt::format(",{}={}", fault, access));
                 done = said.status == 0 ? done + 1 : 0;
                 EXPECT_TRUE(said.status == 0 || access > 6 || said.status == 4);
             }
@@ -263,16 +268,14 @@ TEST(Truth, HoldsOfFaultyDevices) {
             // What isn't read back isn't known.
             const bool compares = work.words.back() != "--no-verify";
             if (!compares && std::string(fault).starts_with(",stuck")) continue;
-            Said said;
-            Check(runs, work, fault, said);
+            CheckWith(runs, work, fault);
         }
 }
 
 TEST(Truth, HoldsHoweverSlowTheLoader) {
     const ToolRuns runs;
     for (const char* chunkTime : {"0", "1ms", "60ms", "100ms", "500ms", "1500ms"}) {
-        Said said;
-        Check(runs, kWorks[0], fmt::format(",chunk-time={}", chunkTime), said);
+        const Said said = CheckWith(runs, kWorks[0], fmt::format(",chunk-time={}", chunkTime));
         EXPECT_EQ(said.status, 0) << chunkTime << said.text;
         EXPECT_EQ(Bytes(said.end["result"], "program"), (kImageBytes + 127) / 128 * 128);
     }
@@ -316,10 +319,12 @@ TEST(Truth, HoldsOfWhatIsLeftAlone) {
     EXPECT_EQ(load(), "4000 400 400");
 }
 
-/// What one reply becomes; `late` is sent in front of the next one.
+/// What one reply becomes; `late` is sent in front of the next one. Or what is sent in place of
+/// doing what is asked.
 struct ReplyFault {
     const char* name;
     void (*bend)(std::string& wire, std::string& late);
+    const char* instead = nullptr;
 };
 
 const ReplyFault kReplyFaults[] = {
@@ -332,6 +337,8 @@ const ReplyFault kReplyFaults[] = {
     {"late", [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
     {"cut", [](std::string& wire,
                std::string&) { wire = wire.substr(0, wire.size() / 2) + test::Peer::kClose; }},
+    {"refused", nullptr, "+$E01#a6"},
+    {"lost", nullptr, ""},
 };
 
 /// One run with the device behind this server. Gives the number of packets that the server saw.
@@ -346,10 +353,7 @@ std::size_t CheckBehind(const ToolRuns& runs, const Work& work, const std::strin
     for (const std::uint32_t index : {0U, 1U})
         said.written.at(index) = device.PeekRegister(0x400FE1E0 + 4 * index);
     const Contents now{device.FlashContents(), device.CommittedUserRegisters()};
-    for (const std::string& text : runs.FalseClaims(work, said, now))
-        ADD_FAILURE() << "not true: " << text << "\nbehind a server with " << fault << ": "
-                      << fmt::format("{}", fmt::join(work.words, " ")) << '\n'
-                      << said.text << said.end;
+    Check(runs, work, "a server: " + fault, said, now);
     return packets;
 }
 
@@ -364,30 +368,22 @@ TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
             for (std::size_t failing = 0; failing < packets; ++failing) {
                 std::size_t index = 0;
                 std::string late;
-                std::string bent;
-                test::Peer peer([](const std::string&) { return std::nullopt; },
-                                [&](const std::string& payload, std::string& wire) {
-                                    wire.insert(0, std::exchange(late, ""));
-                                    if (index++ != failing) return;
-                                    bent = payload;
-                                    fault.bend(wire, late);
-                                },
-                                runs.Device());
+                std::string asked;
+                test::Peer peer(
+                    [&](const std::string& payload) -> std::optional<std::string> {
+                        if (index == failing) asked = payload;
+                        if (fault.instead == nullptr || index++ != failing) return std::nullopt;
+                        return fault.instead;
+                    },
+                    [&](const std::string&, std::string& wire) {
+                        if (fault.instead != nullptr) return;
+                        wire.insert(0, std::exchange(late, ""));
+                        if (index++ == failing) fault.bend(wire, late);
+                    },
+                    runs.Device());
                 CheckBehind(runs, work, fmt::format("reply {} {}", failing, fault.name), peer,
                             said);
-                if (HasFailure()) FAIL() << bent;
-            }
-        for (const char* refusal : {"+$E01#a6", ""})
-            for (std::size_t failing = 0; failing < packets; ++failing) {
-                std::size_t index = 0;
-                test::Peer peer(
-                    [&](const std::string&) -> std::optional<std::string> {
-                        if (index++ != failing) return std::nullopt;
-                        return refusal;
-                    },
-                    {}, runs.Device());
-                CheckBehind(runs, work, fmt::format("request {} not done: '{}'", failing, refusal),
-                            peer, said);
+                if (HasFailure()) FAIL() << asked;
             }
     }
 }
@@ -466,6 +462,16 @@ std::vector<LyingServer> LyingServers() {
             return drops ? std::optional(kOk) : std::nullopt;
         };
     };
+    const auto says = [](std::map<std::string, std::string> answers) {
+        return [=](const std::string& payload) -> std::optional<std::string> {
+            for (const auto& [request, wire] : answers)
+                if (payload.starts_with(request)) return wire;
+            return std::nullopt;
+        };
+    };
+    std::string signs;
+    for (int i = 0; i < 5000; ++i)
+        signs += test::Framed("O");
     const auto before = [](const char* request, const std::string& wire) {
         return [=](const std::string& payload, std::string& reply) {
             if (payload.starts_with(request)) reply.insert(0, wire);
@@ -482,26 +488,10 @@ std::vector<LyingServer> LyingServers() {
         {"a notification of an old stop", none, before("vCont?", "%Stop:T05#99")},
         {"garbage before a monitor command's OK", none, before("qRcmd", test::Framed("garbage"))},
         {"a stopped target that runs and can't be halted",
-         [](const std::string& payload) -> std::optional<std::string> {
-             if (payload == "?") return test::Framed("T05");
-             if (payload == "\x03") return "";
-             return payload.starts_with("qRcmd") ? std::optional(kOk) : std::nullopt;
-         },
+         says({{"?", test::Framed("T05")}, {"\x03", ""}, {"qRcmd", kOk}}),
          {}},
-        {"a reset that only says so",
-         [](const std::string& payload) {
-             return payload.starts_with("qRcmd") ? std::optional(kOk) : std::nullopt;
-         },
-         {}},
-        {"signs of life without end",
-         [](const std::string& payload) -> std::optional<std::string> {
-             if (!payload.starts_with("qRcmd")) return std::nullopt;
-             std::string signs;
-             for (int i = 0; i < 5000; ++i)
-                 signs += test::Framed("O");
-             return signs;
-         },
-         {}},
+        {"a reset that only says so", says({{"qRcmd", kOk}}), {}},
+        {"signs of life without end", says({{"qRcmd", signs}}), {}},
         {"zeros for failed reads", none, HideFailedRead},
         {"half of each answer to a read", none, CutRead},
         {"flash read once until the target runs", none, CachedReads()},
