@@ -7,6 +7,7 @@
 #include <cstring>
 #include <thread>
 
+#include "tests/support/Cases.h"
 #include "tests/support/FailingMemory.h"
 #include "tests/support/VirtualTime.h"
 
@@ -99,24 +100,7 @@ void PretendTarget::Reset() {
 }
 
 CheckedHost::CheckedHost() {
-    settings = {{"FlashProgramOption", "Necessary Pages Only"},
-                {"FlashProgramBlankCheckOption", "1"},
-                {"FlashProgramCRCOption", "1"},
-                {"FlashResetSetting", "0"},
-                {"FlashTimeoutValue", "1"},
-                {"FlashVerboseMode", "0"},
-                {"FlashCrystalFreq", "10"},
-                {"FlashMACAddrInput", "2-1b-c3-4-5-6"},
-                {"FlashMACAddrCommit", "0"}};
-    for (const std::string what : {"Erase", "BlankCheck", "Checksum"}) {
-        settings["Flash" + what + (what == "Erase" ? "Type" : "Selection")] = "Entire Flash";
-        settings["Flash" + what + "StartAddr"] = "";
-        settings["Flash" + what + "EndAddr"] = " 3ffff";
-    }
-    for (const std::string index : {"0", "1"}) {
-        settings["FlashUserRegister" + index + "Input"] = "0xFFFFFFFF";
-        settings["FlashUserRegister" + index + "Commit"] = "1";
-    }
+    settings = ReadSettings("hostcheck/settings.txt");
     get = [this](const char* name) {
         return settings.contains(name) ? settings[name].c_str() : nullptr;
     };

@@ -120,10 +120,11 @@ using Spoil = std::function<void(CheckedHost& host)>;
 
 /// A fault of a host, and a part of the line that tells it, which is the first one of a failure.
 struct FaultyHost {
-    const char* found;
+    std::string found;
     Spoil spoil;
 };
 
+std::vector<FaultyHost> FaultyValues();
 std::span<const FaultyHost> FaultySettings();
 std::span<const FaultyHost> FaultyMemory();
 std::span<const FaultyHost> FaultyCores();

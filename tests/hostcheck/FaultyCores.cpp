@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <chrono>
 #include <thread>
-#include <utility>
 
 #include "tests/hostcheck/CheckedHosts.h"
 
@@ -38,13 +37,6 @@ Spoil FailingStatus(bool read) {
     });
 }
 
-/// Fails the halt after that line, once.
-Spoil FailingHalt(const char* line) {
-    return On(&H::halt, [line, failed = false](H& h, auto& halt) mutable {
-        return h.Told(line) && !std::exchange(failed, true) ? "no" : halt();
-    });
-}
-
 /// Halts like that, and really before the next loader is loaded.
 Spoil HaltingLate(const char* (*halt)(H& host, const H::Slot& was)) {
     return [halt](H& host) {
@@ -54,15 +46,12 @@ Spoil HaltingLate(const char* (*halt)(H& host, const H::Slot& was)) {
 }
 
 const FaultyHost kFaultyCores[] = {
-    {"HaltTarget: expected null; came the error text \"no\"", Failing(&H::halt, "no")},
     {"expected null for a target that is halted already; came the error text \"halted",
      On(&H::halt, [n = 0](auto&...) mutable { return n++ > 0 ? "halted" : nullptr; })},
     {"ResetTarget: expected null for either flag; came the error text \"100 % no\"",
      On(&H::reset, [](auto&, auto& reset, bool flag) { return reset(flag), "100 % no"; })},
     {"ResetTarget: expected null for either flag; came the error text \"no flag\"",
      On(&H::reset, [](auto&, auto& reset, bool flag) { return flag ? reset(flag) : "no flag"; })},
-    {"that are reset; came 0x00004000, as it was written before, when the flag is true",
-     Failing(&H::reset, nullptr)},
     {"that are reset; came 0x00004000, as it was written before, when the flag is false",
      On(&H::reset, [](H& h, auto& reset, bool flag) { return flag ? reset(flag) : h.halt(); })},
     // Lets run what was there, and the program in flash: in silence, or so that nothing is loaded.
@@ -91,8 +80,6 @@ const FaultyHost kFaultyCores[] = {
          On(&H::halt, [](auto&, auto& halt) { return runs = false, halt(); })(host);
          On(&H::load, [](auto&, auto& load) { return runs ? "the target runs" : load(); })(host);
      }},
-    {"Sleep: expected pauses that last as long as was asked; came 1.00 ms for 5",
-     Failing(&H::sleep, nullptr)},
     {"Sleep: expected pauses that last as long as was asked; came 4.00 ms for 5",
      SleepsInstead([](uint32_t ms) { return ms - 2; })},
     {"Sleep: expected pauses that last as long as was asked; came 1.00 ms for 5",
@@ -103,24 +90,8 @@ const FaultyHost kFaultyCores[] = {
      SleepsInstead([](uint32_t ms) { return ms * 10; })},
     {"Sleep: expected pauses that don't last many times as long; came 2001.00 ms for 20",
      SleepsInstead([](uint32_t ms) { return ms * 100; })},
-    {"expected pauses that last as long as was asked; came the error text \"no time\"",
-     Failing(&H::sleep, "no time")},
-    {"HaltTarget: expected null after a reset; came the error text \"no\"",
-     FailingHalt("a target that is left halted, so that RAM stays")},
-    {"HaltTarget: expected null before the loader is loaded; came the error text \"no\"",
-     FailingHalt("flash on the page given to WriteDataToFlash")},
-    {"HaltTarget: expected null for a target that runs; came the error text \"no\"",
-     FailingHalt("2048 bytes of RAM while the program runs")},
-    {"GetDirectory: expected a text that ends in a path separator; came \"/opt\"",
-     Failing(&H::directory, "/opt")},
-    {"GetDirectory: expected a text that ends in a path separator; came null",
-     Failing(&H::directory, nullptr)},
     {"expected a text that ends in a path separator; came a text that changed",
      On(&H::directory, [](auto&...) { return Dangling("/opt/"); })},
-    {"LoadProgram: expected null for the loader; came the error text \"no file\"",
-     Failing(&H::load, "no file")},
-    {"do\" in the two status words, whatever RAM held; came 0xFFFFFFFF and 0xFFFFFFFF\n",
-     Failing(&H::load, nullptr)},
     {"do\" in the two status words, whatever RAM held; came 0x00000000 and 0xFFFFFFFF\n",
      On(&H::load, [](H& h, auto&) { return h.target.SetStatus(0, 0), nullptr; })},
     {"do\" in the two status words, whatever RAM held; came the error text \"no status\"",
@@ -134,12 +105,8 @@ const FaultyHost kFaultyCores[] = {
              if (t.address == 0x2000100C && t.Writes() && ++n > 1) t.count = 0;
          })(host);
      }},
-    {"RunTarget: expected null for the loader, at once; came the error text \"no start\"",
-     Failing(&H::run, "no start")},
     {"RunTarget: expected null for the loader, at once; came null after 3.0",
      AfterRun([](auto&) { std::this_thread::sleep_for(std::chrono::seconds(3)); })},
-    {"takes the chunk in block 0; came \"to do\" in block 0 after 1 s: the loader hangs",
-     Failing(&H::run, nullptr)},
     // One step.
     {"expected a loader that takes the chunk in block 0; came \"to do\" in block 0 after",
      AfterRun([](H& h) { h.target.Halt(); })},
@@ -174,8 +141,6 @@ const FaultyHost kFaultyCores[] = {
      })},
     {"expected no halt before the loader has done its last chunk; came \"to do\", so",
      On(&H::halt, [](H& h, auto&) { return h.target.Halt(), h.loaderRuns = false, nullptr; })},
-    {"expected no halt before the loader has done its last chunk; came the error text",
-     [](H& h) { h.target.chunkTime = std::chrono::milliseconds(700); }},
     {"expected no reset before the loader has done its last chunk; came \"to do\", so",
      On(&H::reset,
         [](H& h, auto&, bool) { return h.target.Reset(), h.loaderRuns = false, nullptr; })},

@@ -31,14 +31,6 @@ Spoil Asked(string (*bent)(const string&)) {
     });
 }
 
-/// Settings that the host hasn't.
-Spoil Without(const std::vector<string>& names) {
-    return [=](H& h) {
-        for (const string& name : names)
-            std::erase_if(h.settings, [&](auto& row) { return row.first.starts_with(name); });
-    };
-}
-
 string Upper(const string& text) {
     string upper = text;
     std::ranges::transform(upper, upper.begin(), [](unsigned char c) { return std::toupper(c); });
@@ -54,33 +46,10 @@ const FaultyHost kFaultySettings[] = {
      Failing(&H::get, kNoText)},
     {"expected null for a setting that the host hasn't; came an exception: \"no key\"",
      On(&H::get, [](auto&...) -> const char* { throw std::out_of_range("no key"); })},
-    {"whole, upper and lower case told apart; came \"0\" for \"flashresetsetting\"",
-     [](H& h) { h.settings["flashresetsetting"] = "0"; }},
     {"expected keys compared whole, upper and lower case told apart; came \"0\" for \"F",
      Asked([](const string& key) { return key.substr(0, 16); })},
     {"expected keys compared whole, upper and lower case told apart; came \"0\" for \" ",
      Asked([](const string& key) { return key.substr(key.starts_with(' ')); })},
-    {"expected a value for each setting that a load reads; came null for FlashTimeout",
-     Without({"FlashTimeoutValue"})},
-    {"null for FlashProgramOption FlashProgramBlankCheckOption FlashProgramCRCOption\n",
-     Without({"FlashProgram"})},
-    {"each setting that Erase reads; came null for FlashEraseType FlashEraseEndAddr\n",
-     Without({"FlashEraseType", "FlashEraseEndAddr"})},
-    {"for each setting that BlankCheck reads; came null for FlashBlankCheckSelection\n",
-     Without({"FlashBlankCheckSelection"})},
-    {"each setting that CalculateChecksum reads; came null for FlashChecksumStartAddr\n",
-     Without({"FlashChecksumStartAddr"})},
-    {"setting that ProgramUserRegister0 reads; came null for FlashUserRegister0Commit\n",
-     Without({"FlashUserRegister0Commit"})},
-    {"setting that ProgramUserRegister1 reads; came null for FlashUserRegister1Input\n",
-     Without({"FlashUserRegister1Input"})},
-    {"for each setting that ProgramMACAddress reads; came null for FlashMACAddrCommit\n",
-     Without({"FlashMACAddrCommit"})},
-    {"0 or 1; \"later\" for FlashTimeoutValue, which takes a whole decimal number of ",
-     [](H& h) {
-         h.settings["FlashProgramCRCOption"] = "yes";
-         h.settings["FlashTimeoutValue"] = "later";
-     }},
     {"GetProperty: expected the same text when it is asked twice; came \"3\", then \"4\"",
      On(&H::get,
         [n = 0](H& h, auto& get, auto* name) mutable {
@@ -107,8 +76,6 @@ const FaultyHost kFaultySettings[] = {
     {"expected a copy of the value, which GetProperty returns; came \"?\" after \"1\"",
      On(&H::get, [](auto&, auto& get,
                     auto* name) { return strcmp(name, "FlashChecksumValue") ? get(name) : "?"; })},
-    {"expected a copy of the value, which GetProperty returns; came null after \"1\"",
-     Failing(&H::set, nullptr)},
     {"expected a copy of the value, which GetProperty returns; came \"89ABCDEF\" after",
      Stored(Upper)},
     {"expected a copy of the value, which GetProperty returns; came \"89\" after",
@@ -147,8 +114,6 @@ const FaultyHost kFaultyDisplays[] = {
     {"ShowMessage: expected null for \"ReadMemory: ok: the identification",
      On(&H::message,
         [](auto&, auto&, auto* text) { return strstr(text, "ok") ? throw 1 : nullptr; })},
-    {"BeginProgress: expected null; came the error text \"\\xb5\\x0a\"",
-     Failing(&H::begin, "\xB5\n")},
     {"UpdateProgress: expected null for 0 to 100 percent; came an exception",
      On(&H::update, [](auto&...) -> const char* { throw 1; })},
     {"UpdateProgress: expected null for 0 to 100 percent; came the error text \"full\"",

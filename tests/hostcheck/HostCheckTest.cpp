@@ -18,7 +18,7 @@ using std::string;
 using H = CheckedHost;
 
 std::vector<FaultyHost> AllFaultyHosts() {
-    std::vector<FaultyHost> all;
+    std::vector<FaultyHost> all = FaultyValues();
     for (const auto table : {FaultySettings(), FaultyMemory(), FaultyCores(), FaultyDisplays()})
         all.insert(all.end(), table.begin(), table.end());
     return all;

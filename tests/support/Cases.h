@@ -4,6 +4,7 @@
 #pragma once
 
 #include <fstream>
+#include <map>
 #include <ostream>
 #include <stdexcept>
 #include <string>
@@ -58,6 +59,14 @@ inline std::vector<std::vector<std::string>> ReadTable(const std::string& file,
         rows.back().resize(columns);
     }
     return rows;
+}
+
+/// A table of keys and texts.
+inline std::map<std::string, std::string> ReadSettings(const std::string& file) {
+    std::map<std::string, std::string> settings;
+    for (const auto& row : ReadTable(file, 2))
+        settings[row[0]] = row[1];
+    return settings;
 }
 
 /// A line "NAME: DEVICE", and steps in lines that are indented.

@@ -7,35 +7,11 @@
 #include <cstring>
 
 #include "logger/ostrel_logger.h"
+#include "tests/support/Cases.h"
 
 namespace test {
 
 namespace {
-
-const Settings kOrdinarySettings = {
-    {"FlashVerboseMode", "0"},
-    {"FlashResetSetting", "1"},
-    {"FlashProgramCRCOption", "0"},
-    {"FlashBlankCheckSelection", "Entire Flash"},
-    {"FlashBlankCheckStartAddr", "0"},
-    {"FlashBlankCheckEndAddr", "0"},
-    {"FlashChecksumSelection", "Entire Flash"},
-    {"FlashChecksumStartAddr", "0"},
-    {"FlashChecksumEndAddr", "0"},
-    {"FlashProgramOption", "Necessary Pages Only"},
-    {"FlashProgramBlankCheckOption", "0"},
-    {"FlashEraseType", "By Address Range"},
-    {"FlashEraseStartAddr", "0"},
-    {"FlashEraseEndAddr", "0"},
-    {"FlashCrystalFreq", "8"},
-    {"FlashTimeoutValue", "5"},
-    {"FlashMACAddrInput", "02-1B-C3-04-05-06"},
-    {"FlashMACAddrCommit", "1"},
-    {"FlashUserRegister0Input", "12ab"},
-    {"FlashUserRegister0Commit", "0"},
-    {"FlashUserRegister1Input", "0xABCDEF01"},
-    {"FlashUserRegister1Commit", "1"},
-};
 
 std::string TransferText(const char* verb, size_t count, uint64_t address, int16_t page,
                          size_t width) {
@@ -59,7 +35,8 @@ std::string BytesText(const void* buffer, size_t count, size_t width) {
 }  // namespace
 
 const Settings& OrdinarySettings() {
-    return kOrdinarySettings;
+    static const Settings settings = ReadSettings("support/settings.txt");
+    return settings;
 }
 
 RecordingHost::RecordingHost(const std::string& deviceOptions, Settings changes)
@@ -67,7 +44,7 @@ RecordingHost::RecordingHost(const std::string& deviceOptions, Settings changes)
       device_(std::make_unique<target::SimulatedDevice>(target::ParseDeviceOptions(deviceOptions),
                                                         &clock_)),
       target_(device_.get()) {
-    settings.insert(kOrdinarySettings.begin(), kOrdinarySettings.end());
+    settings.insert(OrdinarySettings().begin(), OrdinarySettings().end());
     OstrelLoggerSetSink(
         [](void* self, int level, const char* text) {
             static_cast<RecordingHost*>(self)->NoteTrace(level, text);
