@@ -241,7 +241,7 @@ void Check(const ToolRuns& runs, const Work& work, const std::string& fault, con
 
 Said CheckWith(const ToolRuns& runs, const Work& work, const std::string& fault) {
     runs.PutBack();
-    const Said said = runs.Run(work.words, fault);
+    Said said = runs.Run(work.words, fault);
     Check(runs, work, std::string("--sim ") + kDevice + fault, said, ToolRuns::ReadDevice(fault));
     return said;
 }
@@ -462,7 +462,7 @@ std::vector<LyingServer> LyingServers() {
             return drops ? std::optional(kOk) : std::nullopt;
         };
     };
-    const auto says = [](std::map<std::string, std::string> answers) {
+    const auto says = [](const std::map<std::string, std::string>& answers) {
         return [=](const std::string& payload) -> std::optional<std::string> {
             for (const auto& [request, wire] : answers)
                 if (payload.starts_with(request)) return wire;

@@ -133,42 +133,6 @@ TEST(Comparison, ReadsWhatTheImageCoversPieceByPiece) {
     EXPECT_EQ(flash.Progress(Phase::Verify), "3145769 of 0");
 }
 
-TEST(Comparison, SaysWhichFileAndRange) {
-    LoadedImages images;
-    images.Add(ImageOf({{0x10, {1, 2}}}), "boot.elf");
-    const DifferentRange one{{0x10, 0x11}, 1, 0xFF};
-    const DifferentRange two{{0x40, 0x40}, 1, 0};
-    const struct {
-        Differences differences;
-        std::vector<std::string> details;
-    } cases[] = {
-        {{2, 1, {one}, 0x11},
-         {"  0x10-0x11               boot.elf: first expected 0x01, actual 0xff"}},
-        {{12, 11, {one, two}, 0x99, 0x40},
-         {"  0x10-0x11               boot.elf: first expected 0x01, actual 0xff",
-          "  0x40-0x40               boot.elf: first expected 0x01, actual 0x00",
-          "  and 9 more ranges"}},
-    };
-    for (const auto& [differences, details] : cases) {
-        Outcome outcome;
-        FailAsDifferent(outcome, differences, images, "try again");
-        EXPECT_EQ(outcome.details, details);
-        EXPECT_EQ(outcome.status, ExitStatus::ContentsDiffer);
-        Outcome erased;
-        FailAsNotErased(erased, differences);
-        EXPECT_EQ(erased.details.size(), differences.rangeCount == 1 ? 0 : details.size());
-        EXPECT_EQ(erased.result["blank"], false);
-    }
-    Outcome outcome;
-    FailAsDifferent(outcome, cases[1].differences, images, "try again");
-    EXPECT_EQ(outcome.error, "the flash differs from boot.elf: 12 bytes in 11 ranges; try again");
-    EXPECT_EQ(outcome.result.dump(),
-              R"({"difference":{"address":16,"expected":1,"actual":255,"bytes":12,"ranges":[)"
-              R"({"address":16,"bytes":2,"expected":1,"actual":255,"file":"boot.elf"},)"
-              R"({"address":64,"bytes":1,"expected":1,"actual":0,"file":"boot.elf"}],)"
-              R"("rangeCount":11,"notErased":true}})");
-}
-
 TEST(KeptBytes, AreReadWithTheSectorsOfTheImage) {
     test::FakeFlash flash(0x1000, 0xFF);
     flash.bytes[0x401] = flash.bytes[0x7FE] = flash.bytes[0x800] = 7;
