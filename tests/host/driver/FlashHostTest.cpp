@@ -7,11 +7,25 @@
 #include <utility>
 #include <vector>
 
+#include "host/driver/FlashHost.h"
 #include "host/facts/SettingKeys.h"
-#include "tests/host/driver/HostUnderTest.h"
+#include "target/simulated/SimulatedDevice.h"
 
 namespace host {
 namespace {
+
+/// A host over a simulated device, with what it says on standard error kept off the screen.
+struct HostUnderTest {
+    explicit HostUnderTest(const std::string& device = "tolva")
+        : target(target::ParseDeviceOptions(device)) {}
+
+    target::SimulatedDevice target;
+    SettingStore settings;
+    Reporter reporter{Reporter::Options{Verbosity::Quiet, false, "none"}};
+    WorkMeter meter{reporter};
+    FlashWatch watch{meter};
+    FlashHost host{target, settings, reporter, watch, "dir/"};
+};
 
 TEST(FlashHost, HoldsThePluginToTheProgressProtocol) {
     const std::pair<const char*, const char*> cases[] = {
