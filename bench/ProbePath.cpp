@@ -3,15 +3,14 @@
 // and the client. Prints a table, and adds it to a JSON file where asked.
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <array>
-#include <filesystem>
 #include <fstream>
 
-#include "base/ByteOrder.h"
+#include "bench/AddedFlash.h"
 #include "bench/DelayLine.h"
+#include "bench/LoaderFile.h"
 #include "bench/ProbeServer.h"
 #include "bench/Table.h"
 #include "host/facts/FlashMemory.h"
@@ -34,32 +33,6 @@ constexpr gdb::Mailbox kMailbox{
     plugin::kParameterBlocks[0],
     2 * (plugin::kParameterBlocks[1] - plugin::kParameterBlocks[0]),
     plugin::kStatusPending,
-};
-
-/// The smallest program; what is started in the simulated RAM is the loader, whatever it is.
-class LoaderFile {
-  public:
-    LoaderFile()
-        : path(std::filesystem::temp_directory_path() / fmt::format("loader-{}", getpid())) {
-        std::ofstream(path, std::ios::binary)
-            << std::string_view(
-                   "\x7f"
-                   "ELF\1\1\1\0\0\0\0\0\0\0\0\0",
-                   16)
-            << Words({0x00280002, 1, 0x20002001, 52, 0, 0, 0x00200034, 1, 0})
-            << Words({1, 84, 0x20002000, 0x20002000, 4, 4, 7, 4}) << "\xfe\xe7\xfe\xe7";
-    }
-    ~LoaderFile() { std::filesystem::remove(path); }
-
-    const std::string path;
-
-  private:
-    static std::string Words(std::initializer_list<std::uint32_t> words) {
-        std::string bytes;
-        for (const std::uint32_t word : words)
-            bytes += base::WordBytes(word);
-        return bytes;
-    }
 };
 
 class NobodyWatches final : public host::LoaderObserver {
@@ -136,7 +109,7 @@ Milliseconds Limit(const Setup& setup, gdb::GdbTarget& client) {
     return kChunks / 2 * (2 * bytes + 2 * words + 3 * look + 2 * flash);
 }
 
-Result Measure(const Setup& setup, const LoaderFile& loader) {
+Result Measure(const Setup& setup, const bench::LoaderFile& loader) {
     bench::ProbeServer server(
         fmt::format("dorna,flash=512K,latency=1ns,bandwidth=0,chunk-time={}us",
                     setup.chunkMs * 1000),
@@ -162,7 +135,7 @@ Result Measure(const Setup& setup, const LoaderFile& loader) {
 }
 
 bench::Table Measurements() {
-    const LoaderFile loader;
+    const bench::LoaderFile loader;
     bench::Table table(
         "probe",
         "Programming 256 KiB through a GDB server's socket, in ms. The limit: with "
@@ -186,13 +159,15 @@ int main(int argc, char** argv) {
         fmt::print(stderr, "usage: corvane_probe_bench [--json FILE]\n");
         return 2;
     }
-    const bench::Table table = Measurements();
-    table.Print();
+    const bench::Table tables[] = {Measurements(), bench::AddedFlashTable()};
+    for (const bench::Table& table : tables)
+        table.Print();
     if (argc == 1) return 0;
     nlohmann::json results = nlohmann::json::object();
     if (std::ifstream file(argv[2]); file) results = nlohmann::json::parse(file, nullptr, false);
     if (!results.is_object()) results = nlohmann::json::object();
-    table.AddTo(results);
+    for (const bench::Table& table : tables)
+        table.AddTo(results);
     std::ofstream(argv[2]) << results.dump(2) << '\n';
     return 0;
 }

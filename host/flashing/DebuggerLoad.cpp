@@ -1,4 +1,4 @@
-// Collecting, and programming what is collected in batches: each takes about as long as a debugger
+// Programming what is collected in batches: each takes about as long as a debugger
 // gladly waits for an answer.
 
 #include "host/flashing/DebuggerLoad.h"
@@ -31,12 +31,6 @@ constexpr std::uint64_t kFirstBatchBytes = std::uint64_t{32} << 10;
 constexpr std::uint64_t kBatchBytesMin = std::uint64_t{4} << 10;
 constexpr std::uint64_t kBatchBytesMax = std::uint64_t{4} << 20;
 
-constexpr char kOrigin[] = "the debugger";
-
-std::string RangeOfBytes(std::uint32_t address, std::uint64_t sizeBytes) {
-    return fmt::format("{} at {:#x}", CountText(sizeBytes, "byte"), address);
-}
-
 /// What the plug-in may do for a debugger, whatever the settings choose for "program".
 LoadRequest Request(const SettingStore& settings, EraseChoice::Kind erase) {
     LoadRequest request = RequestedLoad(settings);
@@ -58,6 +52,7 @@ DebuggerLoad::DebuggerLoad(OpenDevice open, ScratchMemory scratch, SettingStore 
         throw TargetError(failure.what());
     }
     flash_ = GeometryOf(device_->Info());
+    collected_ = CollectedFlash(flash_);
 }
 
 FlashDevice& DebuggerLoad::Device() {
@@ -73,128 +68,35 @@ target::gdb::MemoryRegion DebuggerLoad::Flash() const {
     return {0, static_cast<std::uint32_t>(flash_.flashBytes), flash_.sectorBytes};
 }
 
-base::AddressRange DebuggerLoad::RangeOf(std::uint32_t sector) const {
-    return SectorsCovering({sector, sector}, flash_);
-}
-
-void DebuggerLoad::RequireInFlash(std::uint32_t address, std::uint64_t sizeBytes) const {
-    if (address + sizeBytes <= flash_.flashBytes) return;
-    throw TargetError(fmt::format("{} don't lie in the flash, {}", RangeOfBytes(address, sizeBytes),
-                                  SizeText(flash_.flashBytes)));
-}
-
 // --- Collecting
 
 void DebuggerLoad::Erase(std::uint32_t address, std::uint32_t sizeBytes) {
-    const std::uint32_t sector = flash_.sectorBytes;
-    if (address % sector != 0 || sizeBytes % sector != 0)
-        throw TargetError(fmt::format("erasing {}: whole sectors of {} are erased",
-                                      RangeOfBytes(address, sizeBytes), SizeText(sector)));
-    // The flash may end inside its last sector, which is erased whole.
-    if (sizeBytes != 0) RequireInFlash(address, std::uint64_t{sizeBytes} - (sector - 1));
-    Begin();
-    const std::uint64_t end = std::uint64_t{address} + sizeBytes;
-    base::AddressSet erased;
-    for (std::uint64_t at = address; at < end; at += sector) {
-        const auto first = static_cast<std::uint32_t>(at);
-        collected_[first] = {};
-        erased.Add(RangeOf(first));
-    }
-    if (!loose_.Empty()) loose_ = Without(loose_, erased);
-}
-
-/// The first erase, or write, of a load.
-void DebuggerLoad::Begin() {
+    const bool begins = !HasBegun();
+    collected_.Erase(address, sizeBytes);
     failed_ = false;
-    if (!collected_.empty() || !loose_.Empty() || totals_.sectors != 0) return;
-    totals_ = {};
-    report_.clear();
+    if (begins) Begin();
 }
 
 void DebuggerLoad::Write(std::uint32_t address, std::string_view bytes) {
     if (failed_) throw TargetError("the load has failed already");
     if (bytes.empty()) return;
-    RequireInFlash(address, bytes.size());
-    CheckWrite(address, bytes);
-    Begin();
-    for (std::size_t done = 0; done < bytes.size();) {
-        const auto at = static_cast<std::uint32_t>(address + done);
-        const base::AddressRange range = RangeOf(at);
-        const std::size_t size = std::min<std::size_t>(bytes.size() - done, range.last - at + 1);
-        const std::string_view part = bytes.substr(done, size);
-        const auto found = collected_.find(range.first);
-        if (found == collected_.end()) {
-            loose_.Add(at, {part.begin(), part.end()}, kOrigin);
-        } else {
-            Sector& sector = found->second;
-            if (sector.bytes.empty()) sector.bytes.resize(range.Size(), 0xFF);
-            std::copy(part.begin(), part.end(), sector.bytes.begin() + (at - range.first));
-            sector.written.Add({at, at + static_cast<std::uint32_t>(size - 1)});
-            if (range.first != writing_ && collected_.contains(writing_))
-                finishedBytes_ += collected_[writing_].written.Bytes();
-            writing_ = range.first;
-        }
-        done += size;
+    const bool begins = !HasBegun();
+    try {
+        collected_.Write(address, bytes,
+                         [this](const auto& range) { return Device().ReadFlash(range); });
+    } catch (const Failure& failure) {
+        Fail(failure.what());
     }
+    if (begins) Begin();
 }
 
-/// Throws for bytes that can't be what the flash holds in the end.
-void DebuggerLoad::CheckWrite(std::uint32_t address, std::string_view bytes) {
-    for (std::size_t done = 0; done < bytes.size();) {
-        const auto at = static_cast<std::uint32_t>(address + done);
-        const base::AddressRange range = RangeOf(at);
-        const std::size_t size = std::min<std::size_t>(bytes.size() - done, range.last - at + 1);
-        const auto found = collected_.find(range.first);
-        if (found == collected_.end()) CheckNotErased(at, bytes.substr(done, size));
-        done += size;
-        if (found == collected_.end()) continue;
-        for (const base::AddressRange& written : found->second.written.Ranges())
-            for (std::uint64_t i = std::max(at, written.first);
-                 i <= written.last && i < std::uint64_t{at} + size; ++i)
-                if (found->second.bytes[i - range.first] !=
-                    static_cast<std::uint8_t>(bytes[i - address]))
-                    throw TargetError(
-                        fmt::format("writing {}: {:#x} was written before, with another value",
-                                    RangeOfBytes(address, bytes.size()), i));
-    }
+bool DebuggerLoad::HasBegun() const {
+    return !collected_.Empty() || totals_.sectors != 0;
 }
 
-void DebuggerLoad::CheckNotErased(std::uint32_t address, std::string_view bytes) try {
-    const auto last = static_cast<std::uint32_t>(address + bytes.size() - 1);
-    auto held = Device().ReadFlash({address, last});
-    std::string over(held.begin(), held.end());
-    Overlay(address, over);
-    for (std::size_t i = 0; i < bytes.size(); ++i)
-        if (over[i] != '\xFF' && over[i] != bytes[i])
-            throw TargetError(fmt::format("writing {}: {:#x} isn't blank, and wasn't erased",
-                                          RangeOfBytes(address, bytes.size()), address + i));
-} catch (const Failure& failure) {
-    Fail(failure.what());
-}
-
-bool DebuggerLoad::Touches(const base::AddressRange& range) const {
-    if (range.first >= flash_.flashBytes) return false;
-    const auto sector = collected_.lower_bound(RangeOf(range.first).first);
-    if (sector != collected_.end() && sector->first <= range.last) return true;
-    return std::ranges::any_of(loose_.Sections(), [&](const image::Section& section) {
-        return section.address <= range.last && section.Last() >= range.first;
-    });
-}
-
-void DebuggerLoad::Overlay(std::uint32_t address, std::string& bytes) const {
-    const auto put = [&](std::uint32_t first, const std::vector<std::uint8_t>& over) {
-        for (std::size_t i = first < address ? address - first : 0;
-             i < over.size() && first + i - address < bytes.size(); ++i)
-            bytes[first + i - address] = static_cast<char>(over[i]);
-    };
-    for (const image::Section& section : loose_.Sections())
-        put(section.address, section.bytes);
-    if (address >= flash_.flashBytes) return;
-    const std::vector<std::uint8_t> blank(flash_.sectorBytes, 0xFF);
-    for (auto sector = collected_.lower_bound(RangeOf(address).first);
-         sector != collected_.end() && sector->first < address + std::uint64_t{bytes.size()};
-         ++sector)
-        put(sector->first, sector->second.bytes.empty() ? blank : sector->second.bytes);
+void DebuggerLoad::Begin() {
+    totals_ = {};
+    report_.clear();
 }
 
 // --- Programming
@@ -214,9 +116,7 @@ void DebuggerLoad::Attempt(const target::gdb::InterruptCheck& stop, Action&& act
 
 void DebuggerLoad::Fail(const std::string& text) {
     device_.reset();
-    collected_.clear();
-    loose_ = {};
-    finishedBytes_ = 0;
+    collected_ = CollectedFlash(flash_);
     totals_ = {};
     failed_ = true;
     report_ = fmt::format("The load failed: {}\n", text);
@@ -224,25 +124,14 @@ void DebuggerLoad::Fail(const std::string& text) {
 }
 
 void DebuggerLoad::Work(const target::gdb::InterruptCheck& stop) {
-    Attempt(stop, [&] {
-        Sectors ready;
-        for (auto sector = collected_.begin(); sector != collected_.end();) {
-            const auto next = std::next(sector);
-            if (sector->first != writing_ && !sector->second.written.Empty())
-                ready.insert(collected_.extract(sector));
-            sector = next;
-        }
-        finishedBytes_ = 0;
-        Program(std::move(ready), {});
-    });
+    Attempt(stop, [&] { Program(collected_.TakeFinished(), {}); });
 }
 
 void DebuggerLoad::Done(const target::gdb::InterruptCheck& stop) {
     if (std::exchange(failed_, false)) throw TargetError("the load has failed");
-    if (collected_.empty() && loose_.Empty() && totals_.sectors == 0) return;
+    if (!HasBegun()) return;
     Attempt(stop, [&] {
-        finishedBytes_ = 0;
-        Program(std::exchange(collected_, {}), std::exchange(loose_, {}));
+        Program(collected_.TakeSectors(), collected_.TakeLoose());
         device_.reset();
     });
     report_ = fmt::format(
@@ -253,7 +142,7 @@ void DebuggerLoad::Done(const target::gdb::InterruptCheck& stop) {
     totals_ = {};
 }
 
-void DebuggerLoad::Program(Sectors&& sectors, const image::Image& loose) {
+void DebuggerLoad::Program(CollectedFlash::Sectors&& sectors, const image::Image& loose) {
     const auto start = Clock::now();
     FlashDevice& device = Device();
     image::Image written;
@@ -261,15 +150,15 @@ void DebuggerLoad::Program(Sectors&& sectors, const image::Image& loose) {
     base::AddressSet blank;
     for (auto& [first, sector] : sectors) {
         if (sector.written.Empty()) {
-            blank.Add(RangeOf(first));
+            blank.Add(collected_.RangeOf(first));
             continue;
         }
         for (const base::AddressRange& range : sector.written.Ranges())
             written.Add(range.first,
                         {sector.bytes.begin() + (range.first - first),
                          sector.bytes.begin() + (range.last - first) + 1},
-                        kOrigin);
-        contents.Add(first, std::move(sector.bytes), kOrigin);
+                        CollectedFlash::kOrigin);
+        contents.Add(first, std::move(sector.bytes), CollectedFlash::kOrigin);
     }
     const auto load = [&](const image::Image& image, EraseChoice::Kind erase) {
         if (image.Empty()) return;
@@ -324,16 +213,13 @@ void DebuggerLoad::Compare(const image::Image& contents) {
 // --- Telling
 
 std::string DebuggerLoad::Abandon() {
-    const bool begun = !collected_.empty() || !loose_.Empty() || totals_.sectors != 0;
-    if (!begun) return "";
-    const std::uint64_t left = collected_.size();
+    if (!HasBegun()) return "";
     std::string text = fmt::format(
         "the debugger left in the middle of a load: {} in {} were programmed and compared; {} more "
         "are as they were",
         SizeText(totals_.programmedBytes), CountText(totals_.sectors, "sector"),
-        CountText(left, "sector"));
-    collected_.clear();
-    loose_ = {};
+        CountText(collected_.SectorCount(), "sector"));
+    collected_ = CollectedFlash(flash_);
     totals_ = {};
     device_.reset();
     return text;

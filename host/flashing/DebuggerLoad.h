@@ -6,15 +6,14 @@
 #include <chrono>
 #include <cstdint>
 #include <functional>
-#include <map>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "base/AddressSet.h"
+#include "base/AddressRange.h"
 #include "host/driver/FlashDevice.h"
-#include "host/flashing/Sectors.h"
+#include "host/flashing/CollectedFlash.h"
 #include "host/image/Image.h"
 #include "host/settings/SettingStore.h"
 #include "target/gdb/probe/FlashProgrammer.h"
@@ -34,22 +33,19 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     std::vector<base::AddressRange> Scratch() override { return scratch_(); }
     void Erase(std::uint32_t address, std::uint32_t sizeBytes) override;
     void Write(std::uint32_t address, std::string_view bytes) override;
-    bool HasWork() const override { return finishedBytes_ >= batchBytes_; }
+    bool HasWork() const override { return collected_.FinishedBytes() >= batchBytes_; }
     void Work(const target::gdb::InterruptCheck& stop) override;
     void Done(const target::gdb::InterruptCheck& stop) override;
-    bool Touches(const base::AddressRange& range) const override;
-    void Overlay(std::uint32_t address, std::string& bytes) const override;
+    bool Touches(const base::AddressRange& range) const override {
+        return collected_.Touches(range);
+    }
+    void Overlay(std::uint32_t address, std::string& bytes) const override {
+        collected_.Overlay(address, bytes);
+    }
     std::string Abandon() override;
     std::string Report() const override;
 
   private:
-    /// A sector to be erased, with what was written for it. Both are empty until the first write.
-    struct Sector {
-        std::vector<std::uint8_t> bytes = {};
-        base::AddressSet written = {};
-    };
-    using Sectors = std::map<std::uint32_t, Sector>;  ///< by their first address
-
     /// What was done since the first erase.
     struct Totals {
         std::uint64_t programmedBytes = 0;
@@ -61,13 +57,10 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     template <typename Action>
     void Attempt(const target::gdb::InterruptCheck& stop, Action&& action);
     [[noreturn]] void Fail(const std::string& text);
+    bool HasBegun() const;
     void Begin();
     FlashDevice& Device();
-    base::AddressRange RangeOf(std::uint32_t sector) const;
-    void RequireInFlash(std::uint32_t address, std::uint64_t sizeBytes) const;
-    void CheckWrite(std::uint32_t address, std::string_view bytes);
-    void CheckNotErased(std::uint32_t address, std::string_view bytes);
-    void Program(Sectors&& sectors, const image::Image& loose);
+    void Program(CollectedFlash::Sectors&& sectors, const image::Image& loose);
     void EraseOnly(const std::vector<base::AddressRange>& runs);
     void Compare(const image::Image& contents);
 
@@ -78,11 +71,8 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     std::unique_ptr<FlashDevice> device_;  ///< for one load, or none after a failure
     FlashGeometry flash_;
 
-    Sectors collected_;
-    image::Image loose_;               ///< writes into flash that isn't to be erased
-    std::uint64_t finishedBytes_ = 0;  ///< of sectors that the writes have left behind
-    std::uint32_t writing_ = 0;        ///< the sector of the last byte that was written
-    std::uint64_t batchBytes_;         ///< so many are programmed at once
+    CollectedFlash collected_;
+    std::uint64_t batchBytes_;  ///< so many are programmed at once
 
     bool failed_ = false;
     Totals totals_;
