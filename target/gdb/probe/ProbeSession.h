@@ -56,8 +56,22 @@ class ProbeSession {
 
   private:
     using Reply = std::optional<std::string>;  ///< nothing: the packet passes
+    static constexpr char kDone[] = "OK";
+    static constexpr char kFailed[] = "E01";
+
     struct RequestRow;
-    class Own;
+
+    /// For as long as it lives, the probe's replies don't go to the debugger.
+    class Own {
+      public:
+        explicit Own(ProbeSession& session);
+        ~Own();
+        Own(const Own&) = delete;
+        Own& operator=(const Own&) = delete;
+
+      private:
+        ProbeSession& session_;
+    };
 
     static const RequestRow* FindRow(std::string_view payload);
 
