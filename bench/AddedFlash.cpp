@@ -103,6 +103,7 @@ class ImageFiles {
 
     std::string Binary() const { return directory_ / "image.bin"; }
     std::string Elf() const { return directory_ / "image.elf"; }
+    std::string Time() const { return directory_ / "time"; }
 
   private:
     std::filesystem::path directory_;
@@ -114,20 +115,21 @@ Seconds TimeOfProgram(const Board& board, const ImageFiles& image) {
                               image.Binary(), kAddress));
 }
 
-/// Without the time that the debugger needs to start.
+/// Of the command alone, once the debugger is connected.
 Seconds TimeOfLoad(const Board& board, const ImageFiles& image) {
     const Background server({CORVANE_TOOL, "--gdb", board.line.Where().Text(), "--loader",
                              board.loader.path, "serve", "0"});
-    const std::string::size_type colon = server.said.rfind(':', server.said.find(';'));
-    const std::string port = server.said.substr(colon + 1, server.said.find(';') - colon - 1);
-    const auto gdb = [&](const std::string& commands) {
-        return TimeOf(
-            fmt::format("gdb-multiarch -nx -batch -ex 'set architecture armv7e-m' {} '{}' "
-                        ">/dev/null 2>&1",
-                        commands, image.Elf()));
-    };
-    const Seconds start = gdb("");
-    return gdb(fmt::format("-ex 'target remote :{}' -ex load -ex detach", port)) - start;
+    const std::string::size_type end = server.said.find(';');
+    const std::string::size_type begin = server.said.rfind(':', end) + 1;
+    TimeOf(
+        fmt::format("gdb-multiarch -nx -batch -ex 'set architecture armv7e-m' "
+                    "-ex 'target remote :{}' -ex 'python import time; begin = time.time()' "
+                    "-ex load -ex 'python print(time.time() - begin, file=open(\"{}\", \"w\"))' "
+                    "-ex detach '{}' >/dev/null 2>&1",
+                    server.said.substr(begin, end - begin), image.Time(), image.Elf()));
+    double seconds = 0;
+    if (!(std::ifstream(image.Time()) >> seconds)) throw std::runtime_error("GDB loaded nothing");
+    return Seconds(seconds);
 }
 
 }  // namespace

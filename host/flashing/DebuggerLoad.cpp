@@ -25,8 +25,11 @@ namespace {
 using target::TargetError;
 using Clock = std::chrono::steady_clock;
 
-// Debuggers give an answer up after 8 s and more.
-constexpr std::chrono::duration<double> kBatchTime{2.5};
+// Debuggers give an answer up after 8 s and more. Each batch costs a reset and the start of the
+// loader, so that a rest which isn't much larger than a batch is left to be done with the last
+// answer.
+constexpr std::chrono::duration<double> kBatchTime{3.5};
+constexpr double kLargestRest = 1.3;
 constexpr std::uint64_t kFirstBatchBytes = std::uint64_t{32} << 10;
 constexpr std::uint64_t kBatchBytesMin = std::uint64_t{4} << 10;
 constexpr std::uint64_t kBatchBytesMax = std::uint64_t{4} << 20;
@@ -121,6 +124,12 @@ void DebuggerLoad::Fail(const std::string& text) {
     failed_ = true;
     report_ = fmt::format("The load failed: {}\n", text);
     throw TargetError(text);
+}
+
+bool DebuggerLoad::HasWork() const {
+    const std::uint64_t left = collected_.SectorCount() * flash_.sectorBytes;
+    return collected_.FinishedBytes() >= batchBytes_ &&
+           static_cast<double>(left) > kLargestRest * static_cast<double>(batchBytes_);
 }
 
 void DebuggerLoad::Work(const target::gdb::InterruptCheck& stop) {

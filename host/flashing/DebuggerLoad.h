@@ -33,7 +33,7 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     std::vector<base::AddressRange> Scratch() override { return scratch_(); }
     void Erase(std::uint32_t address, std::uint32_t sizeBytes) override;
     void Write(std::uint32_t address, std::string_view bytes) override;
-    bool HasWork() const override { return collected_.FinishedBytes() >= batchBytes_; }
+    bool HasWork() const override;
     void Work(const target::gdb::InterruptCheck& stop) override;
     void Done(const target::gdb::InterruptCheck& stop) override;
     bool Touches(const base::AddressRange& range) const override {
