@@ -58,7 +58,7 @@ class Debugger {
             if (client_->Next()) return std::nullopt;
             frame.erase(0, frame.size() / 2);
         }
-        const auto answer = Exchange(frame, Frame::Kind::Packet);
+        auto answer = Exchange(frame, Frame::Kind::Packet);
         if (way_ == Way::Refused && Exchange("-", Frame::Kind::Packet) != answer)
             return std::nullopt;
         return answer;
