@@ -47,7 +47,8 @@ void SavedTarget::Take(const std::vector<base::AddressRange>& memory) {
     if (!requests_.threads.empty()) probe_.Wire().Agrees("Hg0");
     for (const auto& [key, request] : requests_.breakpoints)
         probe_.Wire().Ask("z" + key);
-    registers_ = ReadRegisters();
+    registers_ = ReadRegisters(0);
+    FindGeneralRegisters();
     base::AddressSet ranges;
     for (const base::AddressRange& range : memory)
         ranges.Add(range);
@@ -58,24 +59,46 @@ void SavedTarget::Take(const std::vector<base::AddressRange>& memory) {
     }
 }
 
-/// Without those that the server doesn't tell, which nobody can have set either.
-std::map<unsigned, std::string> SavedTarget::ReadRegisters() {
+/// From this number on, without those that the server doesn't tell, which nobody can have set
+/// either.
+std::map<unsigned, std::string> SavedTarget::ReadRegisters(unsigned first) {
     std::map<unsigned, std::string> values;
     if (probe_.Registers().empty()) values[kAllRegisters] = probe_.Wire().Ask("g");
     for (const auto& [name, number] : probe_.Registers()) {
+        if (number < first) continue;
         const std::string reply = probe_.Wire().Ask(fmt::format("p{:x}", number));
         if (!IsError(reply) && base::FromHex(reply)) values[number] = reply;
     }
-    if (values.empty() || IsRefusal(values.begin()->second))
+    if (first == 0 && (values.empty() || IsRefusal(values.begin()->second)))
         throw ProtocolError("doesn't tell the core's registers, which could not be put back");
     return values;
 }
 
-/// Returns the number of one that wasn't yet as it should be. Some are others under a second name.
-std::optional<unsigned> SavedTarget::WriteRegisters() {
-    std::optional<unsigned> written;
-    const auto now = ReadRegisters();
+// Packet "g" has the registers in the order of their numbers, as far as the server goes.
+void SavedTarget::FindGeneralRegisters() {
+    const std::string all = probe_.Wire().Ask("g");
+    std::string values;
     for (const auto& [number, value] : registers_) {
+        if (number == kAllRegisters || values.size() >= all.size()) break;
+        values += value;
+        firstOther_ = number + 1;
+    }
+    if (values == all) general_ = all;
+}
+
+/// Returns the number of one that wasn't yet as it should be. Some are others under a second name.
+std::optional<unsigned> SavedTarget::WriteRegisters(bool allAtOnce) {
+    std::optional<unsigned> written;
+    unsigned first = 0;
+    if (!general_.empty() && probe_.Wire().Ask("g") == general_) {
+        first = firstOther_;
+    } else if (allAtOnce && !general_.empty() && probe_.Wire().Agrees("G" + general_)) {
+        first = firstOther_;
+        written = registers_.begin()->first;
+    }
+    const auto now = ReadRegisters(first);
+    for (const auto& [number, value] : registers_) {
+        if (number < first) continue;
         const auto found = now.find(number);
         if (found != now.end() && found->second == value) continue;
         written = number;
@@ -89,9 +112,9 @@ void SavedTarget::PutBack() try {
     for (const Block& block : memory_)
         probe_.Write(block.bytes.data(), block.bytes.size(), block.address, 0, 1);
     constexpr int kTimes = 3;
-    std::optional<unsigned> written = WriteRegisters();
+    std::optional<unsigned> written = WriteRegisters(true);
     for (int i = 1; written && i < kTimes; ++i)
-        written = WriteRegisters();
+        written = WriteRegisters(false);
     if (written) throw ProtocolError(fmt::format("doesn't take register {}", *written));
     for (const auto& [key, request] : requests_.breakpoints)
         probe_.Wire().RequireOk(request);

@@ -48,13 +48,16 @@ class SavedTarget {
     };
 
     void Take(const std::vector<base::AddressRange>& memory);
-    std::map<unsigned, std::string> ReadRegisters();
-    std::optional<unsigned> WriteRegisters();
+    std::map<unsigned, std::string> ReadRegisters(unsigned first);
+    void FindGeneralRegisters();
+    std::optional<unsigned> WriteRegisters(bool allAtOnce);
 
     GdbTarget& probe_;
     const DebuggerRequests requests_;
     std::vector<Block> memory_;                  ///< they don't overlap
     std::map<unsigned, std::string> registers_;  ///< values as the server writes them, by number
+    std::string general_;  ///< the same for those that "g" reads all at once, or nothing
+    unsigned firstOther_ = 0;
 };
 
 }  // namespace target::gdb
