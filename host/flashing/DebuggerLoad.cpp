@@ -10,6 +10,7 @@
 
 #include "host/base/Interrupt.h"
 #include "host/base/Text.h"
+#include "host/facts/LoaderMemory.h"
 #include "host/facts/Operations.h"
 #include "host/flashing/Comparison.h"
 #include "host/flashing/DeviceGeometry.h"
@@ -24,13 +25,13 @@ namespace {
 
 using target::TargetError;
 using Clock = std::chrono::steady_clock;
+using BatchTime = std::chrono::duration<double>;  ///< in seconds
 
 // Debuggers give an answer up after 8 s and more. Each batch costs a reset and the start of the
 // loader, so that a rest which isn't much larger than a batch is left to be done with the last
 // answer.
-constexpr std::chrono::duration<double> kBatchTime{3.5};
-constexpr double kLargestRest = 1.3;
-constexpr std::uint64_t kFirstBatchBytes = std::uint64_t{32} << 10;
+constexpr BatchTime kBatchTime{3.5};
+constexpr double kLargestRest = 1.2;
 constexpr std::uint64_t kBatchBytesMin = std::uint64_t{4} << 10;
 constexpr std::uint64_t kBatchBytesMax = std::uint64_t{4} << 20;
 
@@ -42,13 +43,19 @@ LoadRequest Request(const SettingStore& settings, EraseChoice::Kind erase) {
     return request;
 }
 
+/// The time of a chunk, its erases included, where reading as much takes so long: a read and its
+/// confirmation are two exchanges, a chunk 3.5 and a sector's erase 3, and flash has times of its
+/// own.
+BatchTime ChunkTime(BatchTime reading, std::uint32_t sectorBytes) {
+    constexpr BatchTime kFlashTime{0.015};
+    const double sectors = static_cast<double>(plugin::kChunkBytes) / sectorBytes;
+    return 1.75 * reading + kFlashTime + sectors * (1.5 * reading + kFlashTime);
+}
+
 }  // namespace
 
 DebuggerLoad::DebuggerLoad(OpenDevice open, ScratchMemory scratch, SettingStore settings)
-    : open_(std::move(open)),
-      scratch_(std::move(scratch)),
-      chosen_(std::move(settings)),
-      batchBytes_(kFirstBatchBytes) {
+    : open_(std::move(open)), scratch_(std::move(scratch)), chosen_(std::move(settings)) {
     try {
         Device().RequireFlash();
     } catch (const Failure& failure) {
@@ -100,6 +107,24 @@ bool DebuggerLoad::HasBegun() const {
 void DebuggerLoad::Begin() {
     totals_ = {};
     report_.clear();
+    if (batchBytes_ == 0) GuessBatch();
+}
+
+void DebuggerLoad::GuessBatch() {
+    const std::uint64_t size = std::min<std::uint64_t>(plugin::kChunkBytes, flash_.flashBytes);
+    const auto start = Clock::now();
+    try {
+        Device().ReadFlash({0, static_cast<std::uint32_t>(size - 1)});
+    } catch (const Failure&) {
+        // What fails is told when there is something to program.
+    }
+    SetBatch(plugin::kChunkBytes / ChunkTime(Clock::now() - start, flash_.sectorBytes).count());
+}
+
+/// For so many bytes a second.
+void DebuggerLoad::SetBatch(double rate) {
+    batchBytes_ = std::clamp(static_cast<std::uint64_t>(rate * kBatchTime.count()), kBatchBytesMin,
+                             kBatchBytesMax);
 }
 
 // --- Programming
@@ -153,6 +178,7 @@ void DebuggerLoad::Done(const target::gdb::InterruptCheck& stop) {
 
 void DebuggerLoad::Program(CollectedFlash::Sectors&& sectors, const image::Image& loose) {
     const auto start = Clock::now();
+    const std::uint64_t changedBefore = totals_.programmedBytes - totals_.unchangedBytes;
     FlashDevice& device = Device();
     image::Image written;
     image::Image contents = loose;
@@ -180,14 +206,13 @@ void DebuggerLoad::Program(CollectedFlash::Sectors&& sectors, const image::Image
     load(loose, EraseChoice::Kind::Nothing);
     EraseOnly(blank.Ranges());
     Compare(contents);
-    const Clock::duration took = Clock::now() - start;
+    const BatchTime took = Clock::now() - start;
     totals_.time += took;
     totals_.sectors += sectors.size() + (loose.Empty() ? 0 : 1);
-    if (written.Empty()) return;
-    const double rate =
-        static_cast<double>(written.ByteCount()) / std::max(totals_.time.count(), 0.001);
-    batchBytes_ = std::clamp(static_cast<std::uint64_t>(rate * kBatchTime.count()), kBatchBytesMin,
-                             kBatchBytesMax);
+    // What was left alone says nothing of the next batch.
+    const std::uint64_t changed = totals_.programmedBytes - totals_.unchangedBytes - changedBefore;
+    if (changed != 0 && changed >= written.ByteCount() / 2)
+        SetBatch(static_cast<double>(changed) / std::max(took.count(), 0.001));
 }
 
 /// Sectors of which nothing was written.

@@ -59,6 +59,8 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     [[noreturn]] void Fail(const std::string& text);
     bool HasBegun() const;
     void Begin();
+    void GuessBatch();
+    void SetBatch(double rate);
     FlashDevice& Device();
     void Program(CollectedFlash::Sectors&& sectors, const image::Image& loose);
     void EraseOnly(const std::vector<base::AddressRange>& runs);
@@ -72,7 +74,7 @@ class DebuggerLoad final : public target::gdb::FlashProgrammer {
     FlashGeometry flash_;
 
     CollectedFlash collected_;
-    std::uint64_t batchBytes_;  ///< so many are programmed at once
+    std::uint64_t batchBytes_ = 0;  ///< so many are programmed at once; 0 as long as nobody knows
 
     bool failed_ = false;
     Totals totals_;
