@@ -1,4 +1,4 @@
-// Files that are read, written and locked, and the files of a run.
+// Files that are read, written and locked.
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
@@ -9,7 +9,6 @@
 #include <thread>
 
 #include "host/files/FileLock.h"
-#include "host/files/FilesInUse.h"
 #include "host/files/InputFile.h"
 #include "host/files/OutputFile.h"
 #include "tests/support/FailureOf.h"
@@ -79,37 +78,6 @@ TEST(OutputFile, ReplacesTheWholeFileBehindALinkAndKeepsItsPermissions) {
               "3: can't write the note /dev/full: No space left on device");
 }
 
-TEST(OutputFile, IsRefusedBeforeAnythingIsWritten) {
-    const test::TemporaryDirectory directory;
-    const std::string file = directory.Write("file", "old");
-    const std::string locked = directory.Write("locked", "old");
-    fs::permissions(locked, fs::perms::owner_read);
-    fs::create_symlink("loop", directory.File("loop"));
-    const struct {
-        std::string path;
-        Existing existing;
-        std::string failure;
-    } cases[] = {
-        {file, Existing::Keep, "2: " + file + " exists; overwrite it with --force"},
-        {file, Existing::Replace, ""},
-        {directory.File("new"), Existing::Keep, ""},
-        {"/dev/null", Existing::Keep, ""},
-        {locked, Existing::Replace, "3: can't write the note " + locked + ": it is read-only"},
-        {directory.File("none/new"), Existing::Keep,
-         "3: can't write the note " + directory.File("none/new") + ": No such file or directory"},
-        {directory.File("loop"), Existing::Keep,
-         "3: can't write the note " + directory.File("loop") +
-             ": Too many levels of symbolic links"},
-    };
-    for (const auto& row : cases) {
-        EXPECT_EQ(FailureOf([&] { RequireWritable(kNote, row.path, row.existing); }), row.failure);
-        if (row.failure.empty()) continue;
-        EXPECT_EQ(FailureOf([&] { WriteWholeFile(kNote, row.path, "x", row.existing); }),
-                  row.failure);
-    }
-    EXPECT_EQ(test::Contents(file) + test::Contents(locked), "oldold");
-}
-
 TEST(FileLock, KeepsOthersOutUntilItIsGoneAndLeavesNothing) {
     const test::TemporaryDirectory directory;
     const std::string file = directory.File("file");
@@ -138,40 +106,6 @@ TEST(FileLock, KeepsOthersOutUntilItIsGoneAndLeavesNothing) {
     { const FileLock lock(kNote, directory.File("none/file"), say); }
     EXPECT_EQ(test::Contents(LockPath(file)), "mine");
     EXPECT_EQ(said.size(), 1U);
-}
-
-TEST(FilesInUse, AreFoundUnderAnyName) {
-    const test::TemporaryDirectory directory;
-    const std::string image = directory.Write("image", "x");
-    fs::create_symlink("image", directory.File("link"));
-    fs::create_hard_link(image, directory.File("hard"));
-    fs::create_symlink("device", directory.File("to-device"));
-    FilesInUse files;
-    files.Add("", "nothing");
-    files.Add("-", "standard input");
-    files.Add("/dev/null", "the settings file");
-    files.Add(image, "the image file");
-    files.AddLocked(directory.File("device"), "the device file");
-    const std::pair<const char*, const char*> cases[] = {
-        {"image", "the image file"},
-        {"link", "the image file"},
-        {"hard", "the image file"},
-        {"device", "the device file"},
-        {"to-device", "the device file"},
-        {"device.lock", "the lock of the device file"},
-        {"./none/../device", "the device file"},
-        {"other", ""},
-    };
-    for (const auto& [name, what] : cases) {
-        const std::string failure =
-            FailureOf([&, it = name] { files.RequireOther(directory.File(it), "the trace"); });
-        EXPECT_EQ(failure.substr(0, failure.rfind(',')),
-                  *what == '\0' ? ""
-                                : "2: the trace can't be written to " + directory.File(name) +
-                                      ": that is " + what + " of this run");
-    }
-    for (const char* harmless : {"", "-", "/dev/null"})
-        EXPECT_EQ(FailureOf([&] { files.RequireOther(harmless, "the trace"); }), "");
 }
 
 }  // namespace
