@@ -10,11 +10,9 @@
 #include "host/flashing/Comparison.h"
 #include "host/flashing/FlashMap.h"
 #include "host/flashing/Forecast.h"
-#include "host/flashing/ImageSet.h"
 #include "host/flashing/KeptBytes.h"
 #include "host/flashing/Unchanged.h"
 #include "tests/host/flashing/FakeFlash.h"
-#include "tests/support/FailureOf.h"
 
 namespace host {
 namespace {
@@ -196,30 +194,6 @@ TEST(Unchanged, IsLeftAloneWhereThatSavesMoreThanALoaderStart) {
          {base::AddressRange{0, 0x10}, {0x12, 0x13}, {0x20, 0x21}})
         addresses.Add(range);
     EXPECT_EQ(Without(image, addresses), ImageOf({{0x11, {2}}, {0x14, {5, 6}}}));
-}
-
-TEST(ImageSet, TellsWhatDoesNotFitAndWhereABytesComesFrom) {
-    LoadedImages images;
-    images.Add(ImageOf({{0x10, {1, 2, 3}}, {0x20, {4}}}), "boot.elf");
-    EXPECT_EQ(images.Name(), "boot.elf");
-    images.Add(ImageOf({{0x3FFF, {9}}}), "app.hex");
-    EXPECT_EQ(images.FileOf(0x12) + images.FileOf(0x3FFF) + images.FileOf(0x13),
-              "boot.elfapp.hexthe images");
-    const LoadedImages part = Within(images, {{0x11, 0x20}});
-    EXPECT_EQ(part.image, ImageOf({{0x11, {2, 3}}, {0x20, {4}}}));
-    EXPECT_EQ(part.origins.size(), 2U);
-    EXPECT_EQ(part.origins[0].range, (base::AddressRange{0x11, 0x12}));
-    EXPECT_EQ(test::FailureOf([&] {
-                  Within(images, {{0x20, 0x20}, {0x13, 0x1F}});
-              }),
-              "2: the images: no bytes in the range 0x13-0x1f");
-    test::FakeFlash fits(0x4000, 0xFF);
-    test::FakeFlash small(0x3FFF, 0xFF);
-    const DeviceInfo info{.family = "Quen", .flashBytes = 0x3FFF, .hasFlash = true};
-    EXPECT_EQ(test::FailureOf([&] { RequireFit(fits, info, images); }), "");
-    EXPECT_EQ(test::FailureOf([&] { RequireFit(small, info, images); }),
-              "3: app.hex: the section 0x3fff-0x3fff doesn't lie in the flash, 0x0-0x3ffe; nothing "
-              "was touched; is the image linked for this device (Quen)?");
 }
 
 }  // namespace
