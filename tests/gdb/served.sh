@@ -64,3 +64,16 @@ status=0
 wait "$server" || status=$?
 server=
 [ "$status" = 3 ] || { echo "unkept contents -> $status"; cat refused; exit 1; }
+
+# A server that drives another device.
+for registers in ones zeros; do
+    timeout 300 "$tool" --sim "quen,registers=$registers" serve 0 >listening 2>refused &
+    server=$!
+    port=$(await listening 's/.*:\([0-9]*\);.*/\1/p')
+    expect 4 'the server answers, but its target (architecture arm' --gdb ":$port" info
+    if grep -e --sim said; then exit 1; fi
+    kill "$server"
+    wait "$server"
+    server=
+    : >listening
+done

@@ -587,22 +587,6 @@ TEST(Truth, HoldsOfWhatIsReadAsTheCableComesOff) {
     }
 }
 
-TEST(Truth, HoldsOfAServerThatDrivesAnotherDevice) {
-    for (const auto* device : {"quen,registers=ones", "quen,registers=zeros"}) {
-        const test::TemporaryDirectory directory;
-        setenv("XDG_CONFIG_HOME", directory.Path().c_str(), 1);
-        fs::current_path(directory.Path());
-        test::Peer peer([](const std::string&) { return std::nullopt; }, device);
-        const Said said = ToolRuns::Run({"info"}, Words{"--gdb", peer.Where().Text()});
-        EXPECT_EQ(said.status, 4);
-        EXPECT_NE(said.text.find("the server answers, but its target (architecture arm"),
-                  std::string::npos)
-            << said.text;
-        EXPECT_EQ(said.text.find("--sim"), std::string::npos) << said.text;
-        fs::current_path("/");
-    }
-}
-
 // Whichever request of a check fails, the RAM is as it was, or told not to be.
 TEST(Truth, HoldsOfTheRamThatACheckWrites) {
     const ToolRuns runs;
