@@ -28,6 +28,7 @@ struct FileStatus {
     std::uint64_t sizeBytes;
     std::uint64_t device;  ///< with the number: which file it is, under all its names
     std::uint64_t number;
+    std::uint64_t names;  ///< how many names the file has (hard links)
     unsigned permissions;
     unsigned owner;
     unsigned group;

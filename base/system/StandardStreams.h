@@ -10,6 +10,9 @@ constexpr int kStandardInput = 0;
 constexpr int kStandardOutput = 1;
 constexpr int kStandardError = 2;
 
+/// What standard input is called among files.
+extern const char* const kStandardInputName;
+
 /// To be called before any file is opened: a standard stream that is closed would lend its number
 /// to the next file, which then would take messages for contents. Its place is taken by one that
 /// answers each use with an error.

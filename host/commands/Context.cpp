@@ -105,7 +105,7 @@ void RequireOtherLog(const Context& context) {
 void RequireOtherDeviceFile(const Context& context) {
     const std::string file = context.options.simFile.value_or("");
     if (!file.empty() && !context.isDryRun)
-        ReadFiles(context).RequireOther(fs::absolute(file), "the device");
+        ReadFiles(context).RequireOther(fs::absolute(file).string(), "the device");
 }
 
 }  // namespace
@@ -152,7 +152,7 @@ Outcome NothingTouched(Context& context, Json plan) {
 FilesInUse ReadFiles(const Context& context) {
     const CommonOptions& options = context.options;
     FilesInUse files;
-    files.Add("/dev/stdin", "the standard input");
+    files.AddStandardInput();
     for (const std::string& file : context.imageFiles)
         if (file != "-") files.Add(SplitAddress(file).path, "an image file");
     files.Add(options.loader.value_or(""), "the loader");

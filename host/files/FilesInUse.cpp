@@ -5,8 +5,10 @@
 #include <fmt/format.h>
 
 #include <filesystem>
+#include <optional>
 
 #include "base/system/Files.h"
+#include "base/system/StandardStreams.h"
 #include "host/base/Errors.h"
 #include "host/files/FileLock.h"
 #include "host/files/OutputFile.h"
@@ -16,23 +18,30 @@ namespace host {
 namespace {
 
 /// A terminal or /dev/null can be read and written at once: nothing gets lost.
-bool IsSameFile(const std::string& one, const std::string& other) {
-    const auto first = base::StatusOf(one);
-    const auto second = base::StatusOf(other);
-    if (first && second)
-        return base::IsSameFile(*first, *second) && first->type != base::FileType::CharacterDevice;
+bool IsSameFile(const std::optional<base::FileStatus>& one,
+                const std::optional<base::FileStatus>& other) {
+    return one && other && base::IsSameFile(*one, *other) &&
+           one->type != base::FileType::CharacterDevice;
+}
+
+/// Files that aren't there, but may be made.
+bool IsSameName(const std::string& one, const std::string& other) {
     std::error_code ignored;
     const auto name = [&](const std::string& path) {
         return std::filesystem::weakly_canonical(std::filesystem::absolute(FollowLinks(path)),
                                                  ignored);
     };
-    return !first && !second && name(one) == name(other);
+    return name(one) == name(other);
 }
 
 }  // namespace
 
 void FilesInUse::Add(const std::string& path, const std::string& what) {
     if (!path.empty()) files_.push_back({path, what});
+}
+
+void FilesInUse::AddStandardInput() {
+    files_.push_back({base::kStandardInputName, "the standard input", true});
 }
 
 void FilesInUse::AddLocked(const std::string& path, const std::string& what) {
@@ -42,12 +51,16 @@ void FilesInUse::AddLocked(const std::string& path, const std::string& what) {
 
 void FilesInUse::RequireOther(const std::string& path, const std::string& output) const {
     if (path.empty() || path == "-") return;
-    for (const File& file : files_)
-        if (IsSameFile(path, file.path))
+    const auto status = base::StatusOf(path);
+    for (const File& file : files_) {
+        const auto used =
+            file.isStandardInput ? base::StatusOf(base::kStandardInput) : base::StatusOf(file.path);
+        if (IsSameFile(status, used) || (!status && !used && IsSameName(path, file.path)))
             throw Failure(ExitStatus::WrongUsage,
                           fmt::format("{} can't be written to {}: that is {} of this run, {}; name "
                                       "another file",
                                       output, path, file.what, file.path));
+    }
 }
 
 }  // namespace host

@@ -15,6 +15,9 @@ class FilesInUse {
     /// The same for a file that is locked: its lock is in use as well.
     void AddLocked(const std::string& path, const std::string& what);
 
+    /// The file that standard input comes from.
+    void AddStandardInput();
+
     /// Failure (WrongUsage) when `path`, where `output` is to be written, is one of them under any
     /// name, links included.
     void RequireOther(const std::string& path, const std::string& output) const;
@@ -23,6 +26,7 @@ class FilesInUse {
     struct File {
         std::string path;
         std::string what;
+        bool isStandardInput = false;
     };
     std::vector<File> files_;
 };

@@ -133,7 +133,8 @@ void RemoveLeftovers(const std::string& path) {
     const fs::path target = FollowLinks(path);
     const std::string beginning = target.filename().string() + kTemporary;
     std::error_code ignored;
-    for (const fs::directory_entry& entry : fs::directory_iterator(DirectoryOf(target), ignored)) {
+    for (const fs::directory_entry& entry :
+         fs::directory_iterator(DirectoryOf(target.string()), ignored)) {
         const std::string name = entry.path().filename().string();
         const bool isOurs = name.starts_with(beginning) && name.size() == beginning.size() + 6;
         if (isOurs && entry.symlink_status(ignored).type() == fs::file_type::regular)

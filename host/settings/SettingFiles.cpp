@@ -10,6 +10,7 @@
 #include <string_view>
 
 #include "base/system/Environment.h"
+#include "base/system/Files.h"
 #include "host/base/Errors.h"
 #include "host/files/InputFile.h"
 #include "host/files/OutputFile.h"
@@ -42,7 +43,8 @@ SettingPaths FindSettingPaths(const std::string& chosen) {
         paths.user = directory + "/corvane-flash/settings.toml";
     }
     std::error_code ignored;
-    if (fs::exists(paths.user, ignored) && !fs::is_regular_file(paths.user, ignored)) return paths;
+    const auto status = base::StatusOf(paths.user);
+    if (status && status->type != base::FileType::Regular) return paths;
     constexpr std::string_view kExtension = ".toml";
     const bool isToml = paths.user.ends_with(kExtension);
     paths.kept = isToml ? paths.user.substr(0, paths.user.size() - kExtension.size()) + ".kept.toml"

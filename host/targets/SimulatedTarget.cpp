@@ -8,6 +8,7 @@
 #include <filesystem>
 #include <system_error>
 
+#include "base/system/Files.h"
 #include "host/base/Errors.h"
 #include "host/base/Suggestion.h"
 #include "host/files/InputFile.h"
@@ -52,13 +53,12 @@ std::string WithSuggestion(std::string text, const std::string& suggestion) {
 
 /// A file that is replaced when it is saved would part from its other names.
 void RequireOneName(const std::string& path) {
-    std::error_code error;
-    const auto names = std::filesystem::hard_link_count(path, error);
-    if (!error && names > 1 && std::filesystem::is_regular_file(path, error))
+    const auto status = base::StatusOf(path);
+    if (status && status->names > 1 && status->type == base::FileType::Regular)
         throw Failure(ExitStatus::BadFile,
                       fmt::format("the {} {} has {} names (hard links), and saving it would leave "
                                   "the others behind; copy it, or use a symbolic link",
-                                  kContentsFile.name, path, names));
+                                  kContentsFile.name, path, status->names));
 }
 
 std::unique_ptr<target::SimulatedDevice> Open(const TargetOptions& options) {

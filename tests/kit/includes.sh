@@ -31,7 +31,7 @@ host/image: host/image/records host/files host/base base
 host/image/records: host/image host/files host/base base
 host/settings: host/facts host/files host/base base base/system
 host/output: host/files host/base base base/system
-host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/gdb/probe target/simulated target/simulated/options base
+host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/gdb/probe target/simulated target/simulated/options base base/system
 host/driver: host/output host/settings host/targets host/image host/facts host/files host/base plugin target base base/system
 host/checks: host/driver host/targets host/output host/settings host/facts host/base target base base/system
 host/flashing: host/driver host/targets host/image host/output host/settings host/facts host/files host/base target/gdb/probe base base/system

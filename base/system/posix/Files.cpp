@@ -25,10 +25,15 @@ FileType TypeOf(mode_t mode) {
 }
 
 FileStatus Translate(const struct stat& status) {
-    return {TypeOf(status.st_mode), static_cast<std::uint64_t>(status.st_size),
-            status.st_dev,          status.st_ino,
-            status.st_mode & 0777,  status.st_uid,
-            status.st_gid,          (status.st_mode & 0222) == 0};
+    return {TypeOf(status.st_mode),
+            static_cast<std::uint64_t>(status.st_size),
+            status.st_dev,
+            status.st_ino,
+            status.st_nlink,
+            status.st_mode & 0777,
+            status.st_uid,
+            status.st_gid,
+            (status.st_mode & 0222) == 0};
 }
 
 std::optional<std::size_t> Transferred(ssize_t bytes) {

@@ -6,6 +6,8 @@
 
 namespace base {
 
+const char* const kStandardInputName = "/dev/stdin";
+
 void OccupyStandardStreams() {
     for (const int stream : {kStandardInput, kStandardOutput, kStandardError})
         // The lowest free number is taken, which is this one.
