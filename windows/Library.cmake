@@ -1,5 +1,4 @@
-# What the libraries need on Windows, and the packages made of them. The simulated device, the
-# reference host and the tests are not built there.
+# What libraries and tool need on Windows. The tool is built for 64 bit; the tests are not built.
 
 enable_language(RC)
 
@@ -38,10 +37,24 @@ function(corvane_import_library name definitions)
   set_target_properties(${name} PROPERTIES IMPORTED_LOCATION ${library}.a)
 endfunction()
 
-# Boost's headers lie among those of Linux. A directory that holds nothing but a link to them lets
+# Headers of libraries lie among those of Linux. A directory that holds nothing but links to them lets
 # the compiler see no others.
-find_path(BOOST_HEADERS boost/version.hpp PATHS /usr/include NO_CMAKE_FIND_ROOT_PATH REQUIRED)
-file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/boost-headers)
-file(CREATE_LINK ${BOOST_HEADERS}/boost ${PROJECT_BINARY_DIR}/boost-headers/boost SYMBOLIC)
-add_library(Boost::headers INTERFACE IMPORTED)
-target_include_directories(Boost::headers INTERFACE ${PROJECT_BINARY_DIR}/boost-headers)
+function(corvane_header_library target folder header)
+  find_path(found_${folder} ${folder}/${header} PATHS /usr/include NO_CMAKE_FIND_ROOT_PATH REQUIRED)
+  file(MAKE_DIRECTORY ${PROJECT_BINARY_DIR}/library-headers)
+  file(CREATE_LINK ${found_${folder}}/${folder} ${PROJECT_BINARY_DIR}/library-headers/${folder} SYMBOLIC)
+  add_library(${target} INTERFACE IMPORTED GLOBAL)
+  target_include_directories(${target} INTERFACE ${PROJECT_BINARY_DIR}/library-headers)
+endfunction()
+
+corvane_header_library(Boost::headers boost version.hpp)
+if(CORVANE_TOOL)
+  corvane_header_library(fmt::fmt fmt format.h)
+  target_compile_definitions(fmt::fmt INTERFACE FMT_HEADER_ONLY)
+  corvane_header_library(nlohmann_json::nlohmann_json nlohmann json.hpp)
+  corvane_header_library(tomlplusplus::tomlplusplus toml++ toml.h)
+  # The compiler finds its own.
+  add_library(ZLIB::ZLIB INTERFACE IMPORTED GLOBAL)
+  target_link_libraries(ZLIB::ZLIB INTERFACE z)
+  find_package(Threads REQUIRED)
+endif()

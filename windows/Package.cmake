@@ -1,10 +1,13 @@
-# The archive for makers of debuggers on Windows, made by script/package windows: the libraries, the
-# headers with their CMake package, and the documents.
+# The archive for Windows, made by script/package windows: the tool in the one for 64 bit, the libraries,
+# and for makers of debuggers the headers with their CMake package, and the documents.
 
 set(doc_directory .)
 include(cmake/Kit.cmake)
 install(TARGETS flash_corvane flash_host_check ostrel_logger EXPORT FlashCorvane
         RUNTIME DESTINATION bin)
+if(CORVANE_TOOL)
+  install(TARGETS corvane-flash RUNTIME DESTINATION bin)
+endif()
 
 set(CPACK_GENERATOR ZIP)
 set(CPACK_PACKAGE_FILE_NAME flash-corvane-${PROJECT_VERSION}-windows-${windows_name})

@@ -90,7 +90,8 @@ Result RunShell(const std::string& commands) {
         "' && exec >.out 2>.err </dev/null\n"
         "export XDG_CONFIG_HOME=\"$PWD/config\" TERM=xterm\n"
         "unset NO_COLOR CORVANE_SIM CORVANE_SIM_FILE CORVANE_GDB CORVANE_LOADER CORVANE_PLUGIN\n"
-        "export TOOL='" CORVANE_FLASH_TOOL "' TOOLS='" CORVANE_FLASH_DIRECTORY
+        "export TOOL=\"${CORVANE_TRIED_TOOL:-" CORVANE_FLASH_TOOL
+        "}\" TOOLS='" CORVANE_FLASH_DIRECTORY
         "'\n"
         "f='" FIRMWARE_DIRECTORY
         "/firmware'; ELF=$f.elf HEX=$f.ihex BIN=$f.bin\n"
