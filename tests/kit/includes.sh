@@ -34,7 +34,7 @@ host/output: host/files host/base base base/system
 host/targets: host/facts host/files host/base target target/gdb/wire target/gdb/client target/gdb/server target/gdb/probe target/simulated target/simulated/options base base/system
 host/driver: host/output host/settings host/targets host/image host/facts host/files host/base plugin target base base/system
 host/checks: host/driver host/targets host/output host/settings host/facts host/base target base base/system
-host/flashing: host/driver host/targets host/image host/output host/settings host/facts host/files host/base target/gdb/probe base base/system
+host/flashing: host/driver host/targets host/image host/output host/settings host/facts host/files host/base target target/gdb/probe base base/system
 host/cli: host/settings host/targets host/facts host/files host/base target/gdb/client target/simulated/options base/system
 host/commands: host/cli host/checks host/flashing host/driver host/targets host/image host/output host/settings host/facts host/files host/base base base/system
 host: host/commands host/cli host/output host/settings host/facts host/files host/base base/system"
