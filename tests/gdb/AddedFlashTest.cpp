@@ -148,6 +148,21 @@ TEST(AddedFlash, IsLoadedAndNothingElseChanges) {
               std::string::npos);
 }
 
+// As an emulator whose target ran does it.
+TEST(AddedFlash, KeepsAStopThatNobodyAskedForToItself) {
+    const test::Patience patience;
+    Peer peer(
+        [](const std::string& payload) -> std::optional<std::string> {
+            if (!payload.starts_with("qSupported")) return std::nullopt;
+            return "+" + Framed("T02thread:1;") + Framed("PacketSize=400");
+        },
+        {}, Device());
+    Debugger debugger(peer);
+    const Told told = AskAll(debugger, {"qSupported", "?", "mf800,2"});
+    EXPECT_EQ(fmt::format("{}", fmt::join(told.answers, " ")),
+              "PacketSize=400;QStartNoAckMode+;qXfer:memory-map:read+ T05thread:1; ffff");
+}
+
 // Each line: requests of a session of its own, and the answers. Nothing is touched by what is
 // refused.
 TEST(AddedFlash, RefusesWhatItCanNotDo) {

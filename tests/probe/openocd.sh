@@ -11,7 +11,7 @@ server=
 trap 'kill $server $board 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$here/../gdb/as-inside.sh"
-require openocd
+require openocd gdb-multiarch lldb arm-none-eabi-as
 build_loader
 sim=quen,flash=128K,erase-time=1ms,chunk-time=1ms
 
@@ -104,6 +104,12 @@ compare-sections
 detach
 END
 timeout 90 gdb-multiarch -nx -batch -x load.gdb "$elf" >gdb 2>&1
+echo '.incbin "half.bin", 0, 3000' | arm-none-eabi-as -o half.o -
+arm-none-eabi-ld -e 0x9003 -Ttext=0x9003 half.o -o half.elf
+timeout 90 lldb -x -b -o "gdb-remote 127.0.0.1:$(await listening 's/.*:\([0-9]*\);.*/\1/p')" \
+    -o 'register write r5 0x6666' -o 'target modules load --file half.elf --load --slide 0' \
+    -o 'register read r5' -o 'process plugin packet monitor corvane' half.elf >lldb 2>&1 || { cat lldb refused; exit 1; }
+grep -q 'compared: .*, 0 bytes of it left' lldb && grep -q 'r5 = 0x00006666' lldb || { cat lldb refused; exit 1; }
 kill $adder
 wait $adder
 leave halted running

@@ -78,6 +78,10 @@ void ProbeSession::TakeFromProbe(const Frame& frame) {
     if (frame.kind == Frame::Kind::Notification) return client_.Notify(Escaped(frame.payload));
     const auto stop = ParseStopReply(frame.payload);
     if (stop && stop->kind == StopReply::Kind::Output) return client_.Send(Escaped(frame.payload));
+    if (stop && IsUnasked()) {
+        stopped_ = stop->kind == StopReply::Kind::Stopped;
+        return;
+    }
     const bool answersResume =
         std::exchange(running_, running_ && !stop && !IsRefusal(frame.payload));
     stopped_ = stop ? stop->kind == StopReply::Kind::Stopped : stopped_ && !answersResume;
@@ -85,6 +89,12 @@ void ProbeSession::TakeFromProbe(const Frame& frame) {
     if (asked_ && asked_->starts_with("qSupported") && !IsError(reply)) reply = WithFlash(reply);
     NoteReply(reply);
     client_.Send(Escaped(reply));
+}
+
+// A server that stops its target for whoever connects may tell that at once, which a debugger would
+// take for the answer to its first request, and all other answers for those to the one before.
+bool ProbeSession::IsUnasked() const {
+    return !running_ && (!asked_ || asked_->starts_with("qSupported"));
 }
 
 void ProbeSession::NoteReply(const std::string& reply) {

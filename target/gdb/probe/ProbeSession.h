@@ -77,6 +77,7 @@ class ProbeSession {
 
     // From the probe.
     void TakeFromProbe(const Frame& frame);
+    bool IsUnasked() const;
     void NoteReply(const std::string& reply);
     std::string WithFlash(const std::string& features);
 
