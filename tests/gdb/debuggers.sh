@@ -142,12 +142,12 @@ END
 timeout --foreground 100 gdb-multiarch -nx -batch -x qemu.gdb firmware.elf >gdb 2>&1 || { cat gdb qemu.refused; exit 1; }
 lend again
 echo '.incbin "large.bin"' | arm-none-eabi-as -o beside.o -
-arm-none-eabi-ld -e 0x41 -Ttext=0x8001 beside.o -o beside.elf  # the firmware runs on
+arm-none-eabi-ld -N -e 0x41 -Ttext=0x8001 beside.o -o beside.elf  # the firmware runs on
 timeout 60 lldb -x -b -o "gdb-remote 127.0.0.1:$port" -o 'register write r7 0x1234567' \
     -o 'target modules load --file beside.elf --load --slide 0' -o 'register read r7' \
     -o 'process plugin packet monitor corvane' -o detach beside.elf >lldb 2>&1 || { cat lldb; exit 1; }
 kill $emulator
-says lldb 'r7 = 0x01234567' 'compared: 107.[0-9] KiB in 10[89] sectors' detached
+says lldb 'r7 = 0x01234567' 'compared: 107.[0-9] KiB in 108 sectors' detached
 says gdb '^r7 *0x4d' '0x20000010:.0x00001234' '110.4 KiB in 112 sectors, 110.4 KiB of it' '.large.*: matched' \
     '.ram.*: matched' 'Breakpoint.*Tick ()' '^0x000000ae in Tick' \
     'received signal SIGINT' '4.5 KiB of it left alone'

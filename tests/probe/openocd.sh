@@ -105,7 +105,7 @@ detach
 END
 timeout 90 gdb-multiarch -nx -batch -x load.gdb "$elf" >gdb 2>&1
 echo '.incbin "half.bin", 0, 3000' | arm-none-eabi-as -o half.o -
-arm-none-eabi-ld -e 0x9003 -Ttext=0x9003 half.o -o half.elf
+arm-none-eabi-ld -N -e 0x9003 -Ttext=0x9003 half.o -o half.elf
 timeout 90 lldb -x -b -o "gdb-remote 127.0.0.1:$(await listening 's/.*:\([0-9]*\);.*/\1/p')" \
     -o 'register write r5 0x6666' -o 'target modules load --file half.elf --load --slide 0' \
     -o 'register read r5' -o 'process plugin packet monitor corvane' half.elf >lldb 2>&1 || { cat lldb refused; exit 1; }
