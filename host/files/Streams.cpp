@@ -12,9 +12,9 @@
 namespace host {
 
 bool WaitUntilReady(int file, base::Ready ready) {
-    constexpr std::chrono::milliseconds kLook{100};
+    constexpr std::chrono::milliseconds kSlice{100};
     for (;;) {
-        if (base::AwaitFile(file, ready, kLook)) return true;
+        if (base::AwaitFile(file, ready, kSlice)) return true;
         if (Interrupted()) return false;
     }
 }
