@@ -12,7 +12,7 @@ namespace hostcheck {
 
 namespace {
 
-constexpr std::size_t kPageBytes = 4096;
+constexpr std::size_t kPageBytes = 4096;  // larger pages are multiples of that
 constexpr std::size_t kTextBytesMax = std::size_t{64} * 1024;
 
 }  // namespace
