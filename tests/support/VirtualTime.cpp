@@ -63,8 +63,10 @@ __attribute__((visibility("default"))) int clock_nanosleep(clockid_t, int flags,
 }
 
 __attribute__((visibility("default"))) int poll(struct pollfd* files, nfds_t count, int timeoutMs) {
-    const auto wait = std::min(timeoutMs, patienceMs.load());
-    const auto ready = static_cast<int>(syscall(SYS_poll, files, count, wait));
+    const int waitMs = std::min(timeoutMs, patienceMs.load());
+    const timespec wait{waitMs / 1000, waitMs % 1000 * 1'000'000L};
+    const timespec* const limit = timeoutMs < 0 ? nullptr : &wait;
+    const auto ready = static_cast<int>(syscall(SYS_ppoll, files, count, limit, nullptr, 0));
     if (ready == 0) nowNs += timeoutMs * 1'000'000LL;
     return ready;
 }
