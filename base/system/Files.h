@@ -39,6 +39,13 @@ struct FileStatus {
 std::optional<FileStatus> StatusOf(const std::string& path);
 std::optional<FileStatus> StatusOf(int file);
 
+/// The file that a symbolic link leads to, be it there or not; the path itself when it is no link.
+std::string FollowLinks(const std::string& path);
+
+/// The one name of a file, whichever way leads to it, be it there or not; empty when that can't be
+/// told.
+std::string CanonicalPath(const std::string& path);
+
 bool IsSameFile(const FileStatus& one, const FileStatus& other);
 
 /// Whether this user may write the file, or make files in the directory.

@@ -13,6 +13,7 @@
 
 #include "base/Duration.h"
 #include "base/system/Environment.h"
+#include "base/system/Paths.h"
 #include "host/base/Interrupt.h"
 #include "host/targets/ExpectedDevice.h"
 
@@ -105,7 +106,8 @@ void RequireOtherLog(const Context& context) {
 void RequireOtherDeviceFile(const Context& context) {
     const std::string file = context.options.simFile.value_or("");
     if (!file.empty() && !context.isDryRun)
-        ReadFiles(context).RequireOther(fs::absolute(file).string(), "the device");
+        ReadFiles(context).RequireOther(base::NameOf(fs::absolute(base::PathOf(file))),
+                                        "the device");
 }
 
 }  // namespace

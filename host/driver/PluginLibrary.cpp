@@ -8,6 +8,7 @@
 #include <system_error>
 
 #include "base/system/Environment.h"
+#include "base/system/Paths.h"
 #include "host/base/Errors.h"
 
 namespace host {
@@ -24,9 +25,9 @@ std::string InstalledPath() {
     std::string file = base::LibraryFileName(kLibrary);
     std::error_code ignored;
     for (const char* directory : {"../lib", CORVANE_LIBRARY_DIRECTORY})
-        if (fs::path path = fs::path(base::ExecutableDirectory()) / directory / file;
+        if (fs::path path = base::PathOf(base::ExecutableDirectory()) / directory / file;
             fs::exists(path, ignored))
-            return path.lexically_normal().string();
+            return base::NameOf(path.lexically_normal());
     return file;
 }
 
@@ -44,7 +45,7 @@ base::SharedLibrary Load(const std::string& file) try {
 std::string PluginFile(const std::string& path) {
     if (path.empty()) return InstalledPath();
     // A bare file name would be looked for where the system keeps its libraries, not here.
-    return fs::path(path).has_parent_path() ? path : "./" + path;
+    return base::PathOf(path).has_parent_path() ? path : "./" + path;
 }
 
 PluginLibrary::PluginLibrary(const std::string& path)

@@ -5,8 +5,6 @@
 #include <fmt/format.h>
 
 #include <cerrno>
-#include <filesystem>
-#include <system_error>
 
 #include "base/system/ErrorText.h"
 #include "base/system/Files.h"
@@ -29,8 +27,8 @@ void ReceiveLine(void* context, int level, const char* text) {
 }
 
 bool IsTrace(const std::string& path) {
-    std::error_code ignored;
-    return std::filesystem::is_regular_file(path, ignored) &&
+    const auto status = base::StatusOf(path);
+    return status && status->type == base::FileType::Regular &&
            InputFile(kTraceFile, path).Beginning().starts_with(kFirstLine);
 }
 

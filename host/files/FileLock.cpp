@@ -8,13 +8,12 @@
 #include <array>
 #include <cerrno>
 #include <chrono>
-#include <filesystem>
 #include <string_view>
-#include <system_error>
 #include <thread>
 #include <utility>
 
 #include "base/system/Files.h"
+#include "base/system/Paths.h"
 #include "host/base/Interrupt.h"
 #include "host/files/OutputFile.h"
 #include "host/files/Streams.h"
@@ -22,8 +21,6 @@
 namespace host {
 
 namespace {
-
-namespace fs = std::filesystem;
 
 using Clock = std::chrono::steady_clock;
 
@@ -54,11 +51,11 @@ base::Descriptor OpenLock(const std::string& path, bool& made) {
 }
 
 base::LockState Lock(base::Descriptor& file, const std::string& path, bool& made) {
-    std::error_code ignored;
+    const std::string directory = base::NameOf(base::PathOf(path).parent_path());
     for (;;) {
         file = OpenLock(path, made);
         const bool gone = !file.IsOpen() && errno == ENOENT;
-        if (gone && fs::exists(fs::path(path).parent_path(), ignored)) continue;
+        if (gone && base::StatusOf(directory)) continue;
         if (!file.IsOpen()) return base::LockState::Impossible;
         const base::LockState state = base::TryLock(file.Get());
         if (state != base::LockState::Locked) {
@@ -72,9 +69,8 @@ base::LockState Lock(base::Descriptor& file, const std::string& path, bool& made
 }  // namespace
 
 std::string LockPath(const std::string& path) {
-    std::error_code error;
-    const fs::path file = fs::weakly_canonical(FollowLinks(path), error);
-    return error || file.empty() ? "" : fs::absolute(file).string() + ".lock";
+    const std::string file = base::CanonicalPath(path);
+    return file.empty() ? "" : file + ".lock";
 }
 
 FileLock::FileLock(const FileKind& kind, const std::string& path, const WaitNotice& say)

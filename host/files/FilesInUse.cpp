@@ -4,14 +4,12 @@
 
 #include <fmt/format.h>
 
-#include <filesystem>
 #include <optional>
 
 #include "base/system/Files.h"
 #include "base/system/StandardStreams.h"
 #include "host/base/Errors.h"
 #include "host/files/FileLock.h"
-#include "host/files/OutputFile.h"
 
 namespace host {
 
@@ -26,12 +24,7 @@ bool IsSameFile(const std::optional<base::FileStatus>& one,
 
 /// Files that aren't there, but may be made.
 bool IsSameName(const std::string& one, const std::string& other) {
-    std::error_code ignored;
-    const auto name = [&](const std::string& path) {
-        return std::filesystem::weakly_canonical(std::filesystem::absolute(FollowLinks(path)),
-                                                 ignored);
-    };
-    return name(one) == name(other);
+    return base::CanonicalPath(one) == base::CanonicalPath(other);
 }
 
 }  // namespace

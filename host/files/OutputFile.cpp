@@ -11,6 +11,7 @@
 #include <thread>
 
 #include "base/system/Files.h"
+#include "base/system/Paths.h"
 #include "base/system/Signals.h"
 #include "base/system/StandardStreams.h"
 #include "host/base/Interrupt.h"
@@ -23,7 +24,7 @@ namespace {
 namespace fs = std::filesystem;
 
 std::string DirectoryOf(const std::string& path) {
-    const std::string directory = fs::path(path).parent_path().string();
+    const std::string directory = base::NameOf(base::PathOf(path).parent_path());
     return directory.empty() ? "." : directory;
 }
 
@@ -93,18 +94,9 @@ void WriteInto(const FileKind& kind, const std::string& path, std::string_view c
 
 }  // namespace
 
-std::string FollowLinks(const std::string& path) {
-    constexpr int kLinksMax = 40;  // as the kernel has it
-    std::error_code ignored;
-    fs::path target = path;
-    for (int i = 0; i < kLinksMax && fs::is_symlink(target, ignored); ++i)
-        target = target.parent_path() / fs::read_symlink(target, ignored);
-    return target.string();
-}
-
 void RequireWritable(const FileKind& kind, const std::string& path, Existing existing) {
     const auto status = Look(kind, path);
-    if (!status && !base::MayWrite(DirectoryOf(FollowLinks(path))))
+    if (!status && !base::MayWrite(DirectoryOf(base::FollowLinks(path))))
         throw FileFailure(kind, "write", path, errno);
     if (!IsRegular(status)) return;
     if (IsStandardInput(*status))
@@ -124,18 +116,18 @@ void WriteWholeFile(const FileKind& kind, const std::string& path, std::string_v
     RequireWritable(kind, path, existing);
     const auto old = Look(kind, path);
     if (old && !IsRegular(old)) return WriteInto(kind, path, contents);
-    TemporaryFile file(kind, FollowLinks(path));
+    TemporaryFile file(kind, base::FollowLinks(path));
     file.Write(contents, old);
     file.Rename(existing);
 }
 
 void RemoveLeftovers(const std::string& path) {
-    const fs::path target = FollowLinks(path);
-    const std::string beginning = target.filename().string() + kTemporary;
+    const fs::path target = base::PathOf(base::FollowLinks(path));
+    const std::string beginning = base::NameOf(target.filename()) + kTemporary;
     std::error_code ignored;
-    for (const fs::directory_entry& entry :
-         fs::directory_iterator(DirectoryOf(target.string()), ignored)) {
-        const std::string name = entry.path().filename().string();
+    for (const fs::directory_entry& entry : fs::directory_iterator(
+             target.has_parent_path() ? target.parent_path() : fs::path("."), ignored)) {
+        const std::string name = base::NameOf(entry.path().filename());
         const bool isOurs = name.starts_with(beginning) && name.size() == beginning.size() + 6;
         if (isOurs && entry.symlink_status(ignored).type() == fs::file_type::regular)
             fs::remove(entry.path(), ignored);

@@ -12,9 +12,6 @@ namespace host {
 
 enum class Existing { Keep, Replace };
 
-/// The file that a path leads to when all links are followed; it need not exist.
-std::string FollowLinks(const std::string& path);
-
 /// What can be known before the work begins: that there is a file which is to be kept (Failure,
 /// WrongUsage), or one that may not be written (Failure, of the kind's status).
 void RequireWritable(const FileKind& kind, const std::string& path, Existing existing);

@@ -5,10 +5,9 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <filesystem>
-#include <system_error>
 
 #include "base/Hex.h"
+#include "base/system/Files.h"
 #include "host/base/Errors.h"
 #include "host/base/Text.h"
 
@@ -34,8 +33,7 @@ std::string LoadedImages::Name() const {
 
 NamedFile SplitAddress(const std::string& text) {
     const std::size_t at = text.rfind('@');
-    std::error_code ignored;
-    if (at == std::string::npos || std::filesystem::exists(text, ignored)) return {text, {}};
+    if (at == std::string::npos || base::StatusOf(text)) return {text, {}};
     const std::string behind = text.substr(at + 1);
     if (const auto address = base::ParseHex32(behind)) return {text.substr(0, at), address};
     throw Failure(

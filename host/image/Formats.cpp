@@ -4,10 +4,10 @@
 
 #include <algorithm>
 #include <array>
-#include <filesystem>
 #include <string_view>
 #include <utility>
 
+#include "base/system/Paths.h"
 #include "host/base/Errors.h"
 
 namespace host::image {
@@ -51,7 +51,7 @@ std::optional<Format> FormatFromName(const std::string& name) {
 }
 
 Format FormatForWriting(const std::string& path) {
-    std::string extension = std::filesystem::path(path).extension().string();
+    std::string extension = base::NameOf(base::PathOf(path).extension());
     std::ranges::transform(extension, extension.begin(), ToLower);
     const auto found =
         std::ranges::find(kExtensions, extension, &decltype(kExtensions)::value_type::first);

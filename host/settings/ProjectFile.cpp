@@ -10,6 +10,7 @@
 #include <filesystem>
 #include <string_view>
 
+#include "base/system/Paths.h"
 #include "host/base/Errors.h"
 #include "host/base/Suggestion.h"
 #include "host/files/InputFile.h"
@@ -79,7 +80,8 @@ void AddKey(Board& board, const std::string& folder, const std::string& key,
     if (row->key == Key::GdbOption)
         board.options.emplace_back("--gdb-option", fmt::format("{}={}", key, text));
     else if (row->key == Key::File)
-        board.options.emplace_back("--" + key, (fs::path(folder) / text).string());
+        board.options.emplace_back("--" + key,
+                                   base::NameOf(base::PathOf(folder) / base::PathOf(text)));
     else
         board.options.emplace_back("--" + key, text);
 }
@@ -98,7 +100,7 @@ Board BoardOf(const toml::table& table, const ProjectFile& project, const std::s
 }
 
 void AddBoards(ProjectFile& project, const toml::node& node) {
-    const std::string folder = fs::path(project.path).parent_path().string();
+    const std::string folder = base::NameOf(base::PathOf(project.path).parent_path());
     for (const auto& [name, board] : RequireTable(node, "board.NAME"))
         project.boards.emplace(
             name.str(),
@@ -160,7 +162,7 @@ ProjectFile ReadNearestProject() {
     for (fs::path folder = fs::current_path(error); !error; folder = folder.parent_path()) {
         const fs::path file = folder / kProjectFileName;
         std::error_code ignored;
-        if (fs::exists(file, ignored)) return ReadProjectFile(file.string());
+        if (fs::exists(file, ignored)) return ReadProjectFile(base::NameOf(file));
         if (folder == folder.parent_path()) break;
     }
     return {};

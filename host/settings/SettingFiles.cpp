@@ -11,6 +11,7 @@
 
 #include "base/system/Environment.h"
 #include "base/system/Files.h"
+#include "base/system/Paths.h"
 #include "host/base/Errors.h"
 #include "host/files/InputFile.h"
 #include "host/files/OutputFile.h"
@@ -20,15 +21,12 @@ namespace host {
 
 namespace {
 
-namespace fs = std::filesystem;
-
 constexpr char kCanBeDeleted[] = "; the tool wrote this file and can do without: delete it";
 
 /// A file that can't even be looked at (there is no such directory, or it is somebody else's) is
 /// missing.
 std::string Contents(const std::string& path, bool mustExist) {
-    std::error_code ignored;
-    return mustExist || fs::exists(path, ignored) ? ReadWholeFile(kSettingsFile, path) : "";
+    return mustExist || base::StatusOf(path) ? ReadWholeFile(kSettingsFile, path) : "";
 }
 
 }  // namespace
@@ -42,7 +40,6 @@ SettingPaths FindSettingPaths(const std::string& chosen) {
         if (directory.empty()) return paths;
         paths.user = directory + "/corvane-flash/settings.toml";
     }
-    std::error_code ignored;
     const auto status = base::StatusOf(paths.user);
     if (status && status->type != base::FileType::Regular) return paths;
     constexpr std::string_view kExtension = ".toml";
@@ -70,7 +67,7 @@ SettingTexts ReadSettingFile(const std::string& path, bool mustExist, bool kept)
 
 void MakeDirectoryOf(const std::string& path) {
     std::error_code ignored;  // what follows from it is reported by the writing
-    fs::create_directories(fs::path(path).parent_path(), ignored);
+    std::filesystem::create_directories(base::PathOf(path).parent_path(), ignored);
 }
 
 void WriteKeptSettings(const std::string& path, const SettingTexts& texts) {

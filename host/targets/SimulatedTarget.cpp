@@ -5,8 +5,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <filesystem>
-#include <system_error>
+#include <cerrno>
 
 #include "base/system/Files.h"
 #include "host/base/Errors.h"
@@ -27,8 +26,7 @@ constexpr FileKind kContentsFile{"contents file of the simulated device", ExitSt
 constexpr FileKind kKeptContents{kContentsFile.name, ExitStatus::BadFile, kContentsFile.maxBytes};
 
 bool IsThere(const std::string& path) {
-    std::error_code error;
-    return std::filesystem::exists(path, error) || error;
+    return base::StatusOf(path) || (errno != ENOENT && errno != ENOTDIR);
 }
 
 /// The class or option that the first unknown name in an option text probably stands for.

@@ -27,7 +27,7 @@ target/simulated: target/simulated/options target/gdb/server target base
 host/base: base base/system
 host/files: host/base base base/system
 host/facts:
-host/image: host/image/records host/files host/base base
+host/image: host/image/records host/files host/base base base/system
 host/image/records: host/image host/files host/base base
 host/settings: host/facts host/files host/base base base/system
 host/output: host/files host/base base base/system
@@ -66,6 +66,12 @@ condition='(_WIN32|__linux__|__unix__|__MINGW32__)'
 if grep -rnE "^#include $system|^#.*\b$condition\b" --include='*.h' --include='*.cpp' \
     base host target hostcheck device flash verify operations | grep -vE '^base/system/(posix|windows)/'; then
     echo "these belong in base/system/"
+    failed=1
+fi
+# A plain text is none of UTF-8 to the C++ library: base/system/Paths.h turns it into a path and back.
+if grep -rnE '\bstd::filesystem::path\(|\bfs::path\([^"]|[a-z)]\.(generic_)?string\(\)' --include='*.h' --include='*.cpp' \
+    base host target | grep -vE '^base/system/posix/|fs::path\(\)'; then
+    echo "these need base::PathOf or base::NameOf"
     failed=1
 fi
 exit $failed

@@ -13,10 +13,13 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstdio>
+#include <filesystem>
 
 namespace base {
 
 namespace {
+
+namespace fs = std::filesystem;
 
 FileType TypeOf(mode_t mode) {
     if (S_ISREG(mode)) return FileType::Regular;
@@ -74,6 +77,22 @@ std::optional<FileStatus> StatusOf(int file) {
     struct stat status {};
     if (fstat(file, &status) != 0) return std::nullopt;
     return Translate(status);
+}
+
+std::string FollowLinks(const std::string& path) {
+    constexpr int kLinksMax = 40;  // as the kernel has it
+    std::error_code ignored;
+    fs::path target = path;
+    for (int i = 0; i < kLinksMax && fs::is_symlink(target, ignored); ++i)
+        target = target.parent_path() / fs::read_symlink(target, ignored);
+    return target.string();
+}
+
+std::string CanonicalPath(const std::string& path) {
+    std::error_code error;
+    const fs::path full = fs::absolute(FollowLinks(path), error);
+    const fs::path canonical = error ? fs::path() : fs::weakly_canonical(full, error);
+    return error ? "" : canonical.string();
 }
 
 bool IsSameFile(const FileStatus& one, const FileStatus& other) {

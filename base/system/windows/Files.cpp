@@ -11,6 +11,7 @@
 #include <cerrno>
 #include <random>
 
+#include "base/system/Paths.h"
 #include "base/system/windows/Text.h"
 
 namespace base {
@@ -80,6 +81,28 @@ std::optional<FileStatus> StatusOfHandle(HANDLE handle) {
     return status;
 }
 
+Handle OpenToLook(const std::string& path, DWORD access = 0) {
+    return Handle(CreateFileW(SystemPath(path).c_str(), access, kShareAll, nullptr, OPEN_EXISTING,
+                              FILE_FLAG_BACKUP_SEMANTICS, nullptr));
+}
+
+bool IsLink(const std::string& path) {
+    const DWORD attributes = GetFileAttributesW(SystemPath(path).c_str());
+    return attributes != INVALID_FILE_ATTRIBUTES &&
+           (attributes & FILE_ATTRIBUTE_REPARSE_POINT) != 0;
+}
+
+/// The name of a file that is there, all links followed; empty when the system doesn't tell.
+std::string FinalPath(const std::string& path) {
+    const Handle file = OpenToLook(path);
+    if (!file.IsOpen()) return "";
+    std::wstring name(32768, L'\0');
+    name.resize(GetFinalPathNameByHandleW(file.Get(), name.data(), static_cast<DWORD>(name.size()),
+                                          VOLUME_NAME_DOS));
+    if (name.starts_with(L"\\\\?\\UNC\\")) return Utf8(L"\\\\" + name.substr(8));
+    return Utf8(name.starts_with(L"\\\\?\\") ? name.substr(4) : name);
+}
+
 bool IsConsole(HANDLE handle) {
     DWORD mode = 0;
     return GetConsoleMode(handle, &mode) != 0;
@@ -135,8 +158,7 @@ bool Descriptor::Close() {
 }
 
 std::optional<FileStatus> StatusOf(const std::string& path) {
-    const Handle file(CreateFileW(SystemPath(path).c_str(), 0, kShareAll, nullptr, OPEN_EXISTING,
-                                  FILE_FLAG_BACKUP_SEMANTICS, nullptr));
+    const Handle file = OpenToLook(path);
     if (file.IsOpen()) return StatusOfHandle(file.Get());
     SetErrno();
     return std::nullopt;
@@ -144,6 +166,22 @@ std::optional<FileStatus> StatusOf(const std::string& path) {
 
 std::optional<FileStatus> StatusOf(int file) {
     return StatusOfHandle(HandleOf(file));
+}
+
+std::string FollowLinks(const std::string& path) {
+    const std::string file = IsLink(path) ? FinalPath(path) : "";
+    return file.empty() ? path : file;
+}
+
+// The case of letters, short names and drives that stand for others are the file's own.
+std::string CanonicalPath(const std::string& path) {
+    std::string file = FinalPath(path);
+    if (!file.empty()) return file;
+    std::error_code error;
+    const auto full = std::filesystem::absolute(PathOf(path), error);
+    const std::string directory = error ? "" : FinalPath(NameOf(full.parent_path()));
+    if (error || directory.empty()) return error ? "" : NameOf(full);
+    return directory + (directory.ends_with('\\') ? "" : "\\") + NameOf(full.filename());
 }
 
 bool IsSameFile(const FileStatus& one, const FileStatus& other) {
@@ -154,8 +192,7 @@ bool MayWrite(const std::string& path) {
     const auto status = StatusOf(path);
     if (!status) return false;
     const DWORD access = status->type == FileType::Other ? FILE_ADD_FILE : FILE_WRITE_DATA;
-    const Handle file(CreateFileW(SystemPath(path).c_str(), access, kShareAll, nullptr,
-                                  OPEN_EXISTING, FILE_FLAG_BACKUP_SEMANTICS, nullptr));
+    const Handle file = OpenToLook(path, access);
     if (!file.IsOpen()) SetErrno();
     return file.IsOpen();
 }
@@ -173,8 +210,7 @@ Descriptor OpenNew(const std::string& path) {
 }
 
 Descriptor OpenBehindNoLink(const std::string& path) {
-    const DWORD attributes = GetFileAttributesW(SystemPath(path).c_str());
-    if (attributes != INVALID_FILE_ATTRIBUTES && (attributes & FILE_ATTRIBUTE_REPARSE_POINT) != 0) {
+    if (IsLink(path)) {
         errno = ELOOP;
         return Descriptor();
     }

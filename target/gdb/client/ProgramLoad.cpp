@@ -3,10 +3,10 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <filesystem>
 
 #include "base/ByteOrder.h"
 #include "base/Hex.h"
+#include "base/system/Paths.h"
 #include "target/gdb/client/GdbTarget.h"
 #include "target/gdb/client/LoaderFile.h"
 #include "target/gdb/client/Texts.h"
@@ -33,7 +33,7 @@ std::string LoaderPath(const GdbOptions& options, const std::string& fileName,
                        std::string directory) {
     if (!options.loader.empty()) return options.loader;
     std::replace(directory.begin(), directory.end(), '\\', '/');
-    return std::filesystem::path(directory + fileName).lexically_normal().string();
+    return base::NameOf(base::PathOf(directory + fileName).lexically_normal());
 }
 
 }  // namespace
