@@ -12,15 +12,29 @@ else()
   set(windows_link_options LINKER:--entry=_LibraryEntry@12 LINKER:--wrap=_imp__TlsAlloc@0)
 endif()
 
-# corvane_windows_library(TARGET DESCRIPTION): TARGET.dll with that text in its version resource.
-function(corvane_windows_library target description)
+# Gives a target a version resource, and the manifest that the line names.
+function(corvane_windows_resources target file file_type description manifest)
   string(REPLACE "." "," version_numbers ${PROJECT_VERSION})
   configure_file(${PROJECT_SOURCE_DIR}/windows/Version.rc.in ${target}.rc @ONLY)
-  target_sources(${target} PRIVATE
-    ${PROJECT_SOURCE_DIR}/windows/LibraryEntry.cpp ${CMAKE_CURRENT_BINARY_DIR}/${target}.rc)
+  target_sources(${target} PRIVATE ${CMAKE_CURRENT_BINARY_DIR}/${target}.rc)
+endfunction()
+
+# corvane_windows_library(TARGET DESCRIPTION): TARGET.dll with that text in its version resource.
+function(corvane_windows_library target description)
+  corvane_windows_resources(${target} ${target}.dll VFT_DLL ${description} "")
+  target_sources(${target} PRIVATE ${PROJECT_SOURCE_DIR}/windows/LibraryEntry.cpp)
   target_link_options(${target} PRIVATE
     -static LINKER:--no-insert-timestamp ${windows_link_options})
   set_target_properties(${target} PROPERTIES PREFIX "")
+endfunction()
+
+# corvane_windows_program(TARGET DESCRIPTION): the same for TARGET.exe, which needs no DLL of the compiler's.
+function(corvane_windows_program target description)
+  set(manifest ${PROJECT_SOURCE_DIR}/windows/Tool.manifest)
+  corvane_windows_resources(${target} ${target}.exe VFT_APP ${description}
+    "1 24 /* a manifest */ \"${manifest}\"\n")
+  set_property(SOURCE ${CMAKE_CURRENT_BINARY_DIR}/${target}.rc APPEND PROPERTY OBJECT_DEPENDS ${manifest})
+  target_link_options(${target} PRIVATE -static LINKER:--no-insert-timestamp)
 endfunction()
 
 # corvane_import_library(NAME DEFINITIONS): a library to link with in place of the DLL whose exports
