@@ -51,6 +51,7 @@ install(FILES ${PROJECT_BINARY_DIR}/FlashCorvaneConfig.cmake
 install(FILES cmake/KitReadme.md RENAME README.md DESTINATION ${doc_directory} COMPONENT tool)
 install(FILES CHANGELOG.md DESTINATION ${doc_directory} COMPONENT tool)
 install(FILES docs/boards.md docs/command-line-json.md docs/debuggers.md docs/simulated-device.md
+        docs/windows.md
         DESTINATION ${doc_directory}/docs COMPONENT tool)
 install(FILES docs/host-guide.md docs/host-transcript.md
         DESTINATION ${doc_directory}/docs COMPONENT development)

@@ -7,6 +7,7 @@ install(TARGETS flash_corvane flash_host_check ostrel_logger EXPORT FlashCorvane
         RUNTIME DESTINATION bin)
 if(CORVANE_TOOL)
   install(TARGETS corvane-flash RUNTIME DESTINATION bin)
+  install(FILES host/cli/completions/corvane-flash.ps1 DESTINATION completions)
 endif()
 
 set(CPACK_GENERATOR ZIP)

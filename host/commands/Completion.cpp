@@ -56,17 +56,18 @@ std::vector<std::string> Choices() {
 CommandRow Completion() {
     return Command<CompletionOptions>(
         {.name = "completion",
-         .help = "Print the completion script of a shell: bash, zsh or fish",
+         .help = "Print the completion script of a shell",
          .details = "The scripts ask the tool itself what may stand at the cursor: 'completion "
                     "words -- WORD...' answers with a line for each word that may take the place "
                     "of the last WORD, with a tab before what it means.",
          .example = "  corvane-flash completion bash > "
                     "~/.local/share/bash-completion/completions/corvane-flash\n"
+                    "  corvane-flash completion powershell | Out-String | Invoke-Expression\n"
                     "  corvane-flash completion words -- erase --",
          .needs = Needs::Nothing},
         {{&CompletionOptions::shell,
           {.names = "SHELL",
-           .help = "bash, zsh, fish, or words",
+           .help = "bash, zsh, fish, powershell, or words",
            .choices = Choices(),
            .isRequired = true}},
          {&CompletionOptions::words,
