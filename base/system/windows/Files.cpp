@@ -189,10 +189,8 @@ bool IsSameFile(const FileStatus& one, const FileStatus& other) {
 }
 
 bool MayWrite(const std::string& path) {
-    const auto status = StatusOf(path);
-    if (!status) return false;
-    const DWORD access = status->type == FileType::Other ? FILE_ADD_FILE : FILE_WRITE_DATA;
-    const Handle file = OpenToLook(path, access);
+    // Of a directory this is the right to add files.
+    const Handle file = OpenToLook(path, FILE_WRITE_DATA);
     if (!file.IsOpen()) SetErrno();
     return file.IsOpen();
 }

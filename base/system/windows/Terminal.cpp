@@ -30,7 +30,8 @@ bool KnowsEscapes(std::FILE* stream) {
 std::size_t TerminalColumns(std::FILE* stream) {
     CONSOLE_SCREEN_BUFFER_INFO console{};
     if (GetConsoleScreenBufferInfo(ConsoleOf(stream), &console) == 0) return 80;
-    return static_cast<std::size_t>(console.srWindow.Right - console.srWindow.Left + 1);
+    const int columns = console.srWindow.Right - console.srWindow.Left + 1;
+    return static_cast<std::size_t>(columns);
 }
 
 }  // namespace base
