@@ -1,6 +1,10 @@
-# shellcheck shell=bash disable=SC2154
-# Sourced with $tool set: a place to work in, and the commands that must find a device behind a GDB
-# server as they find it inside the process.
+# shellcheck shell=bash
+# Sourced with the tool as the first argument: a place to work in, a list of servers that end with the
+# script, and the commands that must find a device behind a GDB server as they find it inside the process.
+
+tool=$1
+servers=()
+trap 'kill "${servers[@]}" 2>/dev/null || true; rm -rf "$work"' EXIT
 
 firmware=$(cd "$(dirname "${BASH_SOURCE[0]}")/../../examples/firmware" && pwd)
 work=$(mktemp -d)

@@ -2,10 +2,7 @@
 # debuggers.sh TOOL REGISTER-LENDER: stock GDB and LLDB load through the tool, which adds flash to a probe's GDB server:
 # here the one of the simulated device, whose own flash packets never pass.
 set -euo pipefail
-tool=$1
 lender=$2
-servers=()
-trap 'kill "${servers[@]}" 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$(dirname "$0")/as-inside.sh"
 require gdb-multiarch lldb arm-none-eabi-as qemu-system-arm

@@ -2,10 +2,7 @@
 # qemu.sh TOOL REGISTER-LENDER: the tool against a server and a core that are nobody's here. QEMU executes
 # the example of a loader, by which a generic board with RAM where the flash would be is programmed.
 set -euo pipefail
-tool=$1
 lender=$2
-servers=()
-trap 'kill "${servers[@]}" 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$(dirname "$0")/as-inside.sh"
 require clang ld.lld qemu-system-arm

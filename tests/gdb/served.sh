@@ -2,11 +2,10 @@
 # served.sh TOOL: the simulated device as a GDB server. The tool's own client must find it as it finds
 # the device inside the process; stock GDB must be able to load, compare, read and leave it.
 set -euo pipefail
-tool=$1
-server=
-trap 'kill $server 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$(dirname "$0")/as-inside.sh"
+server=
+trap 'kill $server 2>/dev/null || true; rm -rf "$work"' EXIT
 require gdb-multiarch
 build_loader
 sim=quen,erase-time=1ms,chunk-time=1ms

@@ -3,14 +3,12 @@
 # a modelled debug port in front of the simulated device; then with faults of target and cable. What the
 # tool says is held against what the device's file holds afterwards.
 set -euo pipefail
-tool=$1
 model=$2
 here=$(cd "$(dirname "$0")" && pwd)
-board=
-server=
-trap 'kill $server $board 2>/dev/null || true; rm -rf "$work"' EXIT
 # shellcheck source=tests/gdb/as-inside.sh
 . "$here/../gdb/as-inside.sh"
+board='' server=''
+trap 'kill $server $board 2>/dev/null || true; rm -rf "$work"' EXIT
 require openocd gdb-multiarch lldb arm-none-eabi-as
 build_loader
 sim=quen,flash=128K,erase-time=1ms,chunk-time=1ms
