@@ -61,32 +61,15 @@ Script Parse(std::string_view input) {
     return script;
 }
 
-void Bend(std::deque<Harm>& harms, std::string& wire) {
+/// A letter that no fault has bends nothing.
+void Bend(std::deque<Harm>& harms, std::string& late, std::string& wire) {
+    wire.insert(0, std::exchange(late, ""));
     if (harms.empty() || harms.front().goodOnes-- > 0) return;
     const Harm harm = std::move(harms.front());
     harms.pop_front();
-    switch (harm.kind) {
-        case 'd':
-            wire.clear();
-            break;
-        case 'e':
-            wire = "+" + Framed("E01");
-            break;
-        case 'x':
-            wire.empty() ? void() : void(wire.back() ^= 1);
-            break;
-        case '2':
-            wire += wire;
-            break;
-        case 'c':
-            wire = wire.substr(0, wire.size() / 2) + test::Peer::kClose;
-            break;
-        case '=':
-            wire = "+" + Framed(harm.text);
-            break;
-        default:
-            break;
-    }
+    if (harm.kind == '=') wire = "+" + Framed(harm.text);
+    for (const test::ReplyFault& fault : test::kReplyFaults)
+        if (fault.letter == harm.kind && fault.bend != nullptr) fault.bend(wire, late);
 }
 
 /// What the debugger was allowed to write, by what it was answered.
@@ -139,8 +122,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     [[maybe_unused]] static void* const keptLoaded = dlopen(FLASH_CORVANE_LIBRARY, RTLD_NOW);
     Script script = Parse({reinterpret_cast<const char*>(data), size});
     const bool harmless = Harmless(script);
+    std::string late;
     test::Peer peer([](const std::string&) { return std::nullopt; },
-                    [&](const std::string&, std::string& wire) { Bend(script.probe, wire); },
+                    [&](const std::string&, std::string& wire) { Bend(script.probe, late, wire); },
                     std::make_unique<SimulatedDevice>(ParseDeviceOptions(
                         "quen,flash=64K,latency=1ns,bandwidth=0,erase-time=1us")));
     test::Debugger debugger(peer);

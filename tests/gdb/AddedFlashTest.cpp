@@ -84,13 +84,16 @@ std::string ExpectedRam() {
 
 struct Told {
     std::vector<std::string> answers;  ///< "-" for none
-    bool Done() const { return answers.back() == "OK"; }
+    bool flashRefused = false;
+    bool Done() const { return answers.back() == "OK" && !flashRefused; }
 };
 
 Told AskAll(Debugger& debugger, const std::vector<std::string>& requests) {
     Told told;
-    for (const std::string& request : requests)
+    for (const std::string& request : requests) {
         told.answers.push_back(debugger.Ask(request).value_or("-"));
+        told.flashRefused |= request.starts_with("vFlash") && told.answers.back() != "OK";
+    }
     return told;
 }
 
@@ -276,24 +279,6 @@ TEST(AddedFlash, CanBeInterruptedAndLeft) {
     }
 }
 
-struct ReplyFault {
-    const char* name;
-    void (*bend)(std::string& wire, std::string& late);
-};
-
-const ReplyFault kFaults[] = {
-    {"dropped", [](std::string& wire, std::string&) { wire.clear(); }},
-    {"refused", [](std::string& wire, std::string&) { wire = "+" + Framed("E01"); }},
-    {"damaged",
-     [](std::string& wire, std::string&) {
-         if (!wire.empty()) wire.back() ^= 1;
-     }},
-    {"doubled", [](std::string& wire, std::string&) { wire += wire; }},
-    {"late", [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
-    {"cut", [](std::string& wire,
-               std::string&) { wire = wire.substr(0, wire.size() / 2) + Peer::kClose; }},
-};
-
 // A chunk, an erase or a loader that went nowhere, although the probe said OK.
 TEST(AddedFlash, ComparesWhatItSaysIsDone) {
     for (const char* lost : {"X20000000", "X20001004", "M400fd008", "X20002000"}) {
@@ -312,22 +297,13 @@ TEST(AddedFlash, ComparesWhatItSaysIsDone) {
 
 TEST(AddedFlash, TellsTheTruthWhateverTheProbeAnswers) {
     std::size_t packets = 0;
-    for (const ReplyFault& fault : kFaults)
+    for (const test::ReplyFault& fault : test::kReplyFaults)
         for (std::size_t failing = 0; failing == 0 || failing < packets; ++failing) {
-            std::size_t index = 0;
-            std::string late;
-            std::string bent;
-            Peer peer([](const std::string&) { return kAsItIs; },
-                      [&](const std::string& payload, std::string& wire) {
-                          wire.insert(0, std::exchange(late, ""));
-                          if (index++ != failing) return;
-                          bent = payload.substr(0, 30);
-                          fault.bend(wire, late);
-                      },
-                      Device());
+            test::OneFault one(fault, failing);
+            Peer peer(one.Instead(), one.Bend(), Device());
             CheckLoad(peer, fmt::format("{} {}", failing, fault.name), kLoad);
-            packets = std::max(packets, index);
-            if (HasFailure()) FAIL() << bent;
+            packets = std::max(packets, one.Packets());
+            if (HasFailure()) FAIL() << one.Asked();
         }
     EXPECT_GT(packets, 100U);
 }

@@ -118,6 +118,63 @@ class Peer {
     std::thread thread_;
 };
 
+/// What becomes of one answer of a server; `late` is sent in front of the next one. Or what is sent
+/// in place of doing what is asked.
+struct ReplyFault {
+    const char* name;
+    char letter;
+    void (*bend)(std::string& wire, std::string& late);
+    const char* instead = nullptr;
+};
+
+inline constexpr ReplyFault kReplyFaults[] = {
+    {"dropped", 'd', [](std::string& wire, std::string&) { wire.clear(); }},
+    {"damaged", 'x',
+     [](std::string& wire, std::string&) {
+         if (!wire.empty()) wire.back() ^= 1;
+     }},
+    {"doubled", '2', [](std::string& wire, std::string&) { wire += wire; }},
+    {"late", 'l', [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
+    {"cut", 'c',
+     [](std::string& wire, std::string&) {
+         wire = wire.substr(0, wire.size() / 2) + Peer::kClose;
+     }},
+    {"said to have failed", 'e', [](std::string& wire, std::string&) { wire = "+$E01#a6"; }},
+    {"refused", 'r', nullptr, "+$E01#a6"},
+    {"lost", 'n', nullptr, ""},
+};
+
+/// One packet of all meets a fault. Outlives the peer that it is for.
+class OneFault {
+  public:
+    OneFault(const ReplyFault& fault, std::size_t failing) : fault_(fault), failing_(failing) {}
+
+    Peer::Hook Instead() {
+        return [this](const std::string& payload) -> std::optional<std::string> {
+            if (Packets() == failing_) asked_ = payload.substr(0, 30);
+            if (fault_.instead == nullptr || packets_++ != failing_) return std::nullopt;
+            return fault_.instead;
+        };
+    }
+    Peer::Bend Bend() {
+        return [this](const std::string&, std::string& wire) {
+            if (fault_.instead != nullptr) return;
+            wire.insert(0, std::exchange(late_, ""));
+            if (packets_++ == failing_) fault_.bend(wire, late_);
+        };
+    }
+
+    std::size_t Packets() const { return packets_; }
+    const std::string& Asked() const { return asked_; }
+
+  private:
+    const ReplyFault& fault_;
+    const std::size_t failing_;
+    std::size_t packets_ = 0;
+    std::string late_;
+    std::string asked_;
+};
+
 inline std::string Little(std::initializer_list<std::uint32_t> words) {
     std::string bytes;
     for (const std::uint32_t word : words)

@@ -319,28 +319,6 @@ TEST(Truth, HoldsOfWhatIsLeftAlone) {
     EXPECT_EQ(load(), "4000 400 400");
 }
 
-/// What one reply becomes; `late` is sent in front of the next one. Or what is sent in place of
-/// doing what is asked.
-struct ReplyFault {
-    const char* name;
-    void (*bend)(std::string& wire, std::string& late);
-    const char* instead = nullptr;
-};
-
-const ReplyFault kReplyFaults[] = {
-    {"dropped", [](std::string& wire, std::string&) { wire.clear(); }},
-    {"damaged",
-     [](std::string& wire, std::string&) {
-         if (!wire.empty()) wire.back() ^= 1;
-     }},
-    {"doubled", [](std::string& wire, std::string&) { wire += wire; }},
-    {"late", [](std::string& wire, std::string& late) { late = std::exchange(wire, ""); }},
-    {"cut", [](std::string& wire,
-               std::string&) { wire = wire.substr(0, wire.size() / 2) + test::Peer::kClose; }},
-    {"refused", nullptr, "+$E01#a6"},
-    {"lost", nullptr, ""},
-};
-
 /// One run with the device behind this server. Gives the number of packets that the server saw.
 std::size_t CheckBehind(const ToolRuns& runs, const Work& work, const std::string& fault,
                         test::Peer& peer, Said& said, const char* options = "timeout=1s") {
@@ -364,26 +342,13 @@ TEST(Truth, HoldsBehindAServerThatFailsAtAnyPacket) {
         test::Peer sound([](const std::string&) { return std::nullopt; }, {}, runs.Device());
         const std::size_t packets = CheckBehind(runs, work, "no fault", sound, said, "timeout=60s");
         EXPECT_EQ(said.status, 0) << said.text;
-        for (const ReplyFault& fault : kReplyFaults)
+        for (const test::ReplyFault& fault : test::kReplyFaults)
             for (std::size_t failing = 0; failing < packets; ++failing) {
-                std::size_t index = 0;
-                std::string late;
-                std::string asked;
-                test::Peer peer(
-                    [&](const std::string& payload) -> std::optional<std::string> {
-                        if (index == failing) asked = payload;
-                        if (fault.instead == nullptr || index++ != failing) return std::nullopt;
-                        return fault.instead;
-                    },
-                    [&](const std::string&, std::string& wire) {
-                        if (fault.instead != nullptr) return;
-                        wire.insert(0, std::exchange(late, ""));
-                        if (index++ == failing) fault.bend(wire, late);
-                    },
-                    runs.Device());
+                test::OneFault one(fault, failing);
+                test::Peer peer(one.Instead(), one.Bend(), runs.Device());
                 CheckBehind(runs, work, fmt::format("reply {} {}", failing, fault.name), peer,
                             said);
-                if (HasFailure()) FAIL() << asked;
+                if (HasFailure()) FAIL() << one.Asked();
             }
     }
 }
