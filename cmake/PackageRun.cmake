@@ -10,3 +10,9 @@ if("$ENV{SOURCE_DATE_EPOCH}" STREQUAL "")
   endif()
   set(ENV{SOURCE_DATE_EPOCH} ${changed})
 endif()
+
+# dpkg-shlibdeps finds what the binaries depend on.
+if(CPACK_DPKG_DATABASE)
+  set(ENV{DPKG_ADMINDIR} ${CPACK_DPKG_DATABASE})
+  set(ENV{DEB_HOST_ARCH} ${CPACK_DEBIAN_PACKAGE_ARCHITECTURE})
+endif()
