@@ -24,7 +24,8 @@ bool IsSameFile(const std::optional<base::FileStatus>& one,
 
 /// Files that aren't there, but may be made.
 bool IsSameName(const std::string& one, const std::string& other) {
-    return base::CanonicalPath(one) == base::CanonicalPath(other);
+    const std::string name = base::CanonicalPath(one);
+    return !name.empty() && name == base::CanonicalPath(other);
 }
 
 }  // namespace
