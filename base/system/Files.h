@@ -10,6 +10,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "base/system/Descriptor.h"
 #include "base/system/Ready.h"
@@ -45,6 +46,9 @@ std::string FollowLinks(const std::string& path);
 /// The one name of a file, whichever way leads to it, be it there or not; empty when that can't be
 /// told.
 std::string CanonicalPath(const std::string& path);
+
+/// The names of the regular files in a directory, without links; none when it can't be read.
+std::vector<std::string> RegularFilesIn(const std::string& directory);
 
 bool IsSameFile(const FileStatus& one, const FileStatus& other);
 

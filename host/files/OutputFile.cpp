@@ -6,7 +6,6 @@
 
 #include <cerrno>
 #include <chrono>
-#include <filesystem>
 #include <optional>
 #include <thread>
 
@@ -20,8 +19,6 @@
 namespace host {
 
 namespace {
-
-namespace fs = std::filesystem;
 
 std::string DirectoryOf(const std::string& path) {
     const std::string directory = base::NameOf(base::PathOf(path).parent_path());
@@ -122,16 +119,12 @@ void WriteWholeFile(const FileKind& kind, const std::string& path, std::string_v
 }
 
 void RemoveLeftovers(const std::string& path) {
-    const fs::path target = base::PathOf(base::FollowLinks(path));
-    const std::string beginning = base::NameOf(target.filename()) + kTemporary;
-    std::error_code ignored;
-    for (const fs::directory_entry& entry : fs::directory_iterator(
-             target.has_parent_path() ? target.parent_path() : fs::path("."), ignored)) {
-        const std::string name = base::NameOf(entry.path().filename());
-        const bool isOurs = name.starts_with(beginning) && name.size() == beginning.size() + 6;
-        if (isOurs && entry.symlink_status(ignored).type() == fs::file_type::regular)
-            fs::remove(entry.path(), ignored);
-    }
+    const std::string target = base::FollowLinks(path);
+    const std::string directory = DirectoryOf(target);
+    const std::string beginning = base::NameOf(base::PathOf(target).filename()) + kTemporary;
+    for (const std::string& name : base::RegularFilesIn(directory))
+        if (name.starts_with(beginning) && name.size() == beginning.size() + 6)
+            base::Remove(directory + "/" + name);
 }
 
 base::Descriptor OpenForWriting(const FileKind& kind, const std::string& path) {

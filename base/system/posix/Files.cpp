@@ -95,6 +95,17 @@ std::string CanonicalPath(const std::string& path) {
     return error ? "" : canonical.string();
 }
 
+std::vector<std::string> RegularFilesIn(const std::string& directory) {
+    std::vector<std::string> names;
+    std::error_code error;
+    std::error_code ignored;
+    for (fs::directory_iterator each(directory, error), end; !error && each != end;
+         each.increment(error))
+        if (each->symlink_status(ignored).type() == fs::file_type::regular)
+            names.push_back(each->path().filename().string());
+    return names;
+}
+
 bool IsSameFile(const FileStatus& one, const FileStatus& other) {
     return one.device == other.device && one.number == other.number;
 }

@@ -184,6 +184,20 @@ std::string CanonicalPath(const std::string& path) {
     return directory + (directory.ends_with('\\') ? "" : "\\") + NameOf(full.filename());
 }
 
+std::vector<std::string> RegularFilesIn(const std::string& directory) {
+    constexpr DWORD kOthers =
+        FILE_ATTRIBUTE_DIRECTORY | FILE_ATTRIBUTE_REPARSE_POINT | FILE_ATTRIBUTE_DEVICE;
+    std::vector<std::string> names;
+    WIN32_FIND_DATAW found{};
+    const HANDLE search = FindFirstFileW(SystemPath(directory + "/*").c_str(), &found);
+    if (search == INVALID_HANDLE_VALUE) return names;
+    do {
+        if ((found.dwFileAttributes & kOthers) == 0) names.push_back(Utf8(found.cFileName));
+    } while (FindNextFileW(search, &found) != 0);
+    FindClose(search);
+    return names;
+}
+
 bool IsSameFile(const FileStatus& one, const FileStatus& other) {
     return one.type == other.type && one.device == other.device && one.number == other.number;
 }
