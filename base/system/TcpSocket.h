@@ -8,6 +8,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "base/system/Ready.h"
@@ -45,9 +46,12 @@ class TcpSocket {
 
     TcpSocket() = default;
     explicit TcpSocket(Handle handle);  ///< takes it over
-    ~TcpSocket();
-    TcpSocket(TcpSocket&& other) noexcept;
-    TcpSocket& operator=(TcpSocket&& other) noexcept;
+    ~TcpSocket() { Close(); }
+    TcpSocket(TcpSocket&& other) noexcept : handle_(std::exchange(other.handle_, kNone)) {}
+    TcpSocket& operator=(TcpSocket other) noexcept {
+        std::swap(handle_, other.handle_);
+        return *this;
+    }
 
     bool IsOpen() const { return handle_ != kNone; }
 
@@ -79,6 +83,7 @@ class TcpSocket {
     static constexpr Handle kNone = -1;
 
     int Open(int family);
+    void Close();
 
     Handle handle_ = kNone;
 };

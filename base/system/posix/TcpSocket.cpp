@@ -13,7 +13,6 @@
 #include <array>
 #include <cerrno>
 #include <memory>
-#include <utility>
 
 namespace base {
 
@@ -79,16 +78,8 @@ TcpSocket::TcpSocket(Handle handle) : handle_(handle) {
     fcntl(SocketOf(handle_), F_SETFL, fcntl(SocketOf(handle_), F_GETFL) | O_NONBLOCK);
 }
 
-TcpSocket::~TcpSocket() {
+void TcpSocket::Close() {
     if (IsOpen()) close(SocketOf(handle_));
-}
-
-TcpSocket::TcpSocket(TcpSocket&& other) noexcept : handle_(std::exchange(other.handle_, kNone)) {}
-
-TcpSocket& TcpSocket::operator=(TcpSocket&& other) noexcept {
-    if (IsOpen() && this != &other) close(SocketOf(handle_));
-    handle_ = std::exchange(other.handle_, kNone);
-    return *this;
 }
 
 int TcpSocket::Open(int family) {

@@ -129,16 +129,8 @@ TcpSocket::TcpSocket(Handle handle) : handle_(handle) {
     ioctlsocket(SocketOf(handle_), static_cast<long>(FIONBIO), &nonBlocking);
 }
 
-TcpSocket::~TcpSocket() {
+void TcpSocket::Close() {
     if (IsOpen()) closesocket(SocketOf(handle_));
-}
-
-TcpSocket::TcpSocket(TcpSocket&& other) noexcept : handle_(std::exchange(other.handle_, kNone)) {}
-
-TcpSocket& TcpSocket::operator=(TcpSocket&& other) noexcept {
-    if (IsOpen() && this != &other) closesocket(SocketOf(handle_));
-    handle_ = std::exchange(other.handle_, kNone);
-    return *this;
 }
 
 int TcpSocket::Open(int family) {
