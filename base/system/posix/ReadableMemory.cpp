@@ -15,7 +15,8 @@ namespace base {
 
 namespace {
 
-/// As much as a pipe takes at once. Not by write(): under a sanitizer that reads what it is given.
+/// As much as a pipe takes at once. The call is made here, because a sanitizer's write() reads what
+/// it is given.
 bool CopyPiece(const int* ends, char* to, const char* from, std::size_t bytes) {
     return syscall(SYS_write, ends[1], from, bytes) == static_cast<long>(bytes) &&
            read(ends[0], to, bytes) == static_cast<ssize_t>(bytes);
