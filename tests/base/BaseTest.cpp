@@ -27,6 +27,7 @@ TEST(AddressSet, JoinsWhatOverlapsOrTouches) {
     AddressSet set;
     for (const AddressRange& range : {AddressRange{0x40, 0x4F},
                                       {0x80, 0x8F},
+                                      {0x70, 0x7F},
                                       {0x10, 0x1F},
                                       {0x20, 0x2F},
                                       {0x48, 0x58},
@@ -34,8 +35,8 @@ TEST(AddressSet, JoinsWhatOverlapsOrTouches) {
         set.Add(range);
     EXPECT_EQ(set.Ranges(),
               (std::vector<AddressRange>{
-                  {0x10, 0x2F}, {0x40, 0x58}, {0x80, 0x8F}, {0xFFFFFFF0, 0xFFFFFFFF}}));
-    EXPECT_EQ(set.BytesIn({0x2F, 0x80}), 0x1BU);
+                  {0x10, 0x2F}, {0x40, 0x58}, {0x70, 0x8F}, {0xFFFFFFF0, 0xFFFFFFFF}}));
+    EXPECT_EQ(set.BytesIn({0x2F, 0x80}), 0x2BU);
     set.Add({0x18, 0xFFFFFFFF});
     EXPECT_EQ(set.Bytes(), 0xFFFFFFF0U);
 }

@@ -1,6 +1,7 @@
 // The host check finds what a host does wrong: tables of hosts with one fault each, and the line
 // that names it. It survives all of them, does no harm, and accuses nobody else.
 
+#include <dlfcn.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -34,6 +35,7 @@ TEST(HostCheck, FindsTheFaultOfEachHostAndNothingInAGoodOne) {
     CheckedHost good;
     const std::vector<unsigned char> flash = good.target.flash;
     EXPECT_EQ(good.Faults(), "");
+    EXPECT_TRUE(good.Told("ResetSettings: ok: 0, sections and 2, which is a whole load"));
     EXPECT_EQ(std::memcmp(good.target.ram.data() + 0x1840, string(64, '\0').data(), 64), 0);
     std::vector<string> found;
     for (const FaultyHost& row : AllFaultyHosts()) {
@@ -164,6 +166,16 @@ TEST(HostCheck, StartsNoLoaderOnLeftovers) {
     EXPECT_TRUE(host.Told("Host check, CheckLoader: 8 of 9 hold, 13 not checked"));
 }
 
+TEST(HostCheck, JudgesEachLoaderByItself) {
+    CheckedHost host;
+    host.Faults([&host](IFlashDevice2& d) {
+        EXPECT_EQ(d.PerformOperation("CheckLoader"), nullptr);
+        host.target.chunkTime = std::chrono::hours(1);
+        return d.PerformOperation("CheckLoader");
+    });
+    EXPECT_TRUE(host.Told("; the loader takes no chunks"));
+}
+
 /// What a call returned; "yes" or "no" where it was asked something.
 const char* Call(IFlashDevice2& device, const string& call) {
     static const unsigned char data[200] = {};
@@ -212,6 +224,19 @@ TEST(HostCheck, LooksAtTheCallsOfTheHostToo) {
     EXPECT_TRUE(faults.starts_with(
         "error: BeginProgress: expected null; came the error text \"called before"));
     EXPECT_NE(faults.find("expected no other call before this one has returned"), string::npos);
+}
+
+TEST(HostCheck, WantsAHostAndAPlaceForTheDevice) {
+    void* const library = dlopen(FLASH_HOST_CHECK_LIBRARY, RTLD_NOW | RTLD_LOCAL);
+    const auto create =
+        reinterpret_cast<CreateFlashDevice2Function>(dlsym(library, "CreateFlashDevice2"));
+    CheckedHost host;
+    IFlashDevice2* device = nullptr;
+    for (const char* const told :
+         {create("", "", "", nullptr, &device), create("", "", "", &host, nullptr)})
+        EXPECT_STREQ(told,
+                     "CreateFlashDevice2: expected a host and a place for the device; came null");
+    dlclose(library);
 }
 
 TEST(HostCheck, TellsWhatItIsAndPublishesTheDevice) {

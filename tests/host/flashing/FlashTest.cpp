@@ -63,6 +63,7 @@ TEST(Forecast, IsWhatTheLoadWouldFind) {
     image::Image image;
     image.Add(2, {0x0F, 0xF0}, "image");
     image.Add(16, {0x80}, "image");
+    image.Add(31, {0x80}, "image");
     LoadPlan plan;
     plan.sections = image.Sections();
     plan.erased = {{16, 31}};
