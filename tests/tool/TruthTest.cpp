@@ -135,6 +135,9 @@ class ToolRuns {
         const Answer answer = kTriedTool == nullptr ? RunHere(words) : RunTried(words);
         Said said{answer.status, {}, answer.err, {0xABC, 0xDEF}};
         const std::string& lines = answer.out;
+        if (lines.empty())
+            throw std::runtime_error(
+                fmt::format("nothing but {} and '{}'", answer.status, answer.err));
         said.end = json::parse(lines.substr(lines.rfind('\n', lines.size() - 2) + 1));
         std::ifstream trace("trace");
         for (std::string line; std::getline(trace, line);)
