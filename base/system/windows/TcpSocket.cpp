@@ -195,23 +195,19 @@ void TcpSocket::EndSending() const {
     shutdown(SocketOf(handle_), SD_SEND);
 }
 
-// A connection that failed is no error for the one list and not ready for the other: it is on a
-// third.
+// A connection that failed is not ready to write: it is on a third list, which nobody needs who
+// reads.
 int TcpSocket::Await(std::span<const TcpSocket* const> sockets, Ready ready,
                      std::chrono::milliseconds time) {
     fd_set waiting;
-    fd_set failed;
     FD_ZERO(&waiting);
-    FD_ZERO(&failed);
-    for (const TcpSocket* const each : sockets) {
+    for (const TcpSocket* const each : sockets)
         FD_SET(SocketOf(each->handle_), &waiting);
-        FD_SET(SocketOf(each->handle_), &failed);
-    }
+    fd_set failed = waiting;
     timeval slice{static_cast<long>(time.count() / 1000),
                   static_cast<long>(time.count() % 1000 * 1000)};
-    const bool toRead = ready == Ready::ToRead;
-    const int count =
-        select(0, toRead ? &waiting : nullptr, toRead ? nullptr : &waiting, &failed, &slice);
+    const int count = ready == Ready::ToRead ? select(0, &waiting, nullptr, nullptr, &slice)
+                                             : select(0, nullptr, &waiting, &failed, &slice);
     if (count > 0) return 0;
     return count == 0 ? EAGAIN : NumberOf(WSAGetLastError());
 }
