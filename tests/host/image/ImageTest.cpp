@@ -258,6 +258,15 @@ TEST(ImageFiles, OfARealFirmwareAreEqualInAllFormats) {
     EXPECT_EQ(image, ReadImageFile(firmware + ".ihex", {}).image);
 }
 
+TEST(ImageFiles, AreDumpedForPeople) {
+    const Image image = MakeImage({{0x400, Bytes(36, ' ')}, {0x500, {'~', 0x7F, 0x1F, 'A'}}});
+    EXPECT_EQ(
+        "00000400  20 20 20 20 20 20 20 20  20 20 20 20 20 20 20 20  |                |\n*\n"
+        "00000420  20 20 20 20                                       |    |\n"
+        "00000500  7e 7f 1f 41                                       |~..A|\n",
+        FormatDump(image));
+}
+
 TEST(ImageFiles, SayWhyTheyCannotBeRead) {
     const test::TemporaryDirectory directory;
     const std::string path = directory.Path();
