@@ -124,7 +124,7 @@ void RemoveLeftovers(const std::string& path) {
     const std::string beginning = base::NameOf(base::PathOf(target).filename()) + kTemporary;
     for (const std::string& name : base::RegularFilesIn(directory))
         if (name.starts_with(beginning) && name.size() == beginning.size() + 6)
-            base::Remove(directory + "/" + name);
+            base::Remove(fmt::format("{}/{}", directory, name));
 }
 
 base::Descriptor OpenForWriting(const FileKind& kind, const std::string& path) {
